@@ -1,0 +1,20 @@
+# Flags for every target. Single precision arithmetic is part of what the pen promises: nothing may fuse or
+# reorder it, on any processor.
+add_compile_options(-ffp-contract=off -Wall -Wextra -Wshadow -Wnon-virtual-dtor -Werror=missing-field-initializers
+                    -Werror=return-type)
+if(QELT_WERROR)
+  add_compile_options(-Werror)
+endif()
+if(QELT_SANITIZE)
+  add_compile_options(-fsanitize=${QELT_SANITIZE} -fno-omit-frame-pointer -g)
+  if(QELT_SANITIZE MATCHES "undefined")
+    add_compile_options(-fno-sanitize-recover=undefined)
+  endif()
+  add_link_options(-fsanitize=${QELT_SANITIZE})
+else()
+  add_link_options(LINKER:--no-undefined)
+endif()
+find_program(QELT_CCACHE ccache)
+if(QELT_CCACHE)
+  set(CMAKE_CXX_COMPILER_LAUNCHER ${QELT_CCACHE})
+endif()

@@ -1,0 +1,22 @@
+#pragma once
+
+#include "base/HostApi.h"
+
+namespace Qelt {
+
+// Something that owns GL objects and hears of the loss of the GL context. Render thread.
+// Slots: destructor pair, OnRelease, OnRestore.
+class QELT_HOST_API ManagedObject {
+ public:
+  virtual ~ManagedObject();
+  // The context is about to go, or has gone.
+  virtual void OnRelease() = 0;
+  // There is a context again; GL objects made through the host's wrappers exist again, without contents.
+  virtual void OnRestore() = 0;
+
+  // The registry does not own. Registering twice counts once; unregistering a stranger does nothing.
+  static void Register(ManagedObject* object);
+  static void Unregister(ManagedObject* object);
+};
+
+}  // namespace Qelt

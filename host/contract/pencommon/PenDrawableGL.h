@@ -1,0 +1,45 @@
+#pragma once
+
+#include "base/HostApi.h"
+
+namespace Qelt {
+
+class IDepthMapBitmapSettable;
+class IReferenceBitmapSettable;
+class ISPPenCanvas;
+class PenDrawableRT;
+class PenGLDataManager;
+
+// The main-thread half of every drawable: its canvas and its render-thread partner. Main thread. Slots:
+// destructor pair, then as declared. Chosen here: that the four kinds share one base with these fields.
+class QELT_HOST_API PenDrawableGL {
+ public:
+  explicit PenDrawableGL(PenGLDataManager* manager);  // borrowed
+  virtual ~PenDrawableGL();
+  PenDrawableGL(const PenDrawableGL&) = delete;
+  PenDrawableGL& operator=(const PenDrawableGL&) = delete;
+
+  // The canvas to draw into, borrowed; null takes it away. Has the partner prepared on the render thread.
+  virtual void SetCanvas(ISPPenCanvas* canvas);
+  virtual ISPPenCanvas* GetCanvas();
+  virtual int GetCanvasBitmapType();
+  virtual void SetCanvasCleared();
+  virtual IReferenceBitmapSettable* GetReferenceBitmapSettable();
+  virtual IDepthMapBitmapSettable* GetDepthMapBitmapSettable();
+
+ protected:
+  // Hands over the partner, which may be null; the base owns it from here on.
+  void setDrawableRT(PenDrawableRT* drawable);
+  // Has the partner released and deleted on the render thread, after everything posted before. Where the
+  // queue refuses, waits until what it took has run and deletes the partner here. To be called by the
+  // destructor of the final class.
+  void destroy();
+
+  PenGLDataManager* mDataManager;
+  ISPPenCanvas* mCanvas = nullptr;
+
+ private:
+  PenDrawableRT* mDrawableRT = nullptr;
+};
+
+}  // namespace Qelt
