@@ -1,0 +1,18 @@
+# What every test target shares.
+find_package(GTest REQUIRED)
+include(GoogleTest)
+
+# qelt_add_tests(TARGET SOURCES ... [LIBRARIES ...] [LABEL ...]): one executable of GoogleTest cases, each of
+# them a test of ctest's. The label "threaded" marks what ./check runs under ThreadSanitizer.
+function(qelt_add_tests target)
+  cmake_parse_arguments(PARSE_ARGV 1 arg "" "LABEL" "SOURCES;LIBRARIES")
+  if(NOT arg_LABEL)
+    set(arg_LABEL single)
+  endif()
+  add_executable(${target} ${arg_SOURCES})
+  target_link_libraries(${target} PRIVATE qelt_test_support ${arg_LIBRARIES})
+  # A test that needs a GL context takes the software renderer; a loaded machine may need minutes to start it.
+  gtest_discover_tests(${target}
+    DISCOVERY_TIMEOUT 120
+    PROPERTIES TIMEOUT 300 LABELS ${arg_LABEL} ENVIRONMENT "EGL_PLATFORM=surfaceless")
+endfunction()
