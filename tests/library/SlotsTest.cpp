@@ -1,0 +1,164 @@
+// A host built elsewhere calls through slot numbers. These tests do the same with the built library, and hold
+// the contract's headers against the same numbers.
+
+#include <dlfcn.h>
+#include <gtest/gtest.h>
+
+#include <cstddef>
+#include <cstdint>
+#include <cstring>
+#include <memory>
+#include <string>
+
+#include "base/RectF.h"
+#include "base/String.h"
+#include "desktop/engine/PluginLibrary.h"
+#include "gl/ITask.h"
+#include "gl/ManagedObject.h"
+#include "pencommon/IPen.h"
+#include "pencommon/IPenMorphable.h"
+#include "pencommon/Pen.h"
+#include "pencommon/PenDrawableRT.h"
+#include "pencommon/PenStrokeDrawableRT.h"
+
+namespace {
+
+using Qelt::IPenMorphable;
+using Qelt::Pen;
+using Qelt::PenDrawableRT;
+using Qelt::PenStrokeDrawableRT;
+
+void* codeAt(const void* object, int slot) {
+  return (*static_cast<void* const* const*>(object))[slot];
+}
+
+template <typename Result, typename... Arguments>
+Result callSlot(void* object, int slot, Arguments... arguments) {
+  const auto function = reinterpret_cast<Result (*)(void*, Arguments...)>(codeAt(object, slot));
+  return function(object, arguments...);
+}
+
+// The slot a pointer to a virtual member names. The ABI keeps an offset into the table in its first word; on
+// x86-64 that word also carries the mark "virtual", on 64-bit ARM the second word does.
+template <typename Member>
+int slotOf(Member member) {
+  std::uintptr_t words[2];
+  static_assert(sizeof(words) == sizeof(member));
+  std::memcpy(words, &member, sizeof(words));
+#if defined(__aarch64__)
+  if ((words[1] & 1) == 0) return -1;
+  return static_cast<int>(words[0] / sizeof(void*));
+#else
+  if ((words[0] & 1) == 0) return -1;
+  return static_cast<int>((words[0] - 1) / sizeof(void*));
+#endif
+}
+
+std::string libraryOf(const void* code) {
+  Dl_info info;
+  if (dladdr(code, &info) == 0) return "?";
+  const std::string path = info.dli_fname;
+  return path.substr(path.rfind('/') + 1);
+}
+
+class Slots : public testing::Test {
+ protected:
+  QeltDesktop::PluginLibrary mLibrary{QELT_PLUGIN_PATH};
+  std::unique_ptr<Pen> mPen{mLibrary.createPen()};
+};
+
+TEST_F(Slots, ThePenAnswersAtItsSlots) {
+  void* pen = mPen.get();
+  EXPECT_EQ((callSlot<float>(pen, 3)), 0.477f);  // size of a fresh pen
+  EXPECT_EQ((callSlot<float>(pen, 4)), 0.477f);  // smallest
+  EXPECT_EQ((callSlot<float>(pen, 5)), 6.571f);  // largest
+  callSlot<void>(pen, 2, 3.0f);
+  EXPECT_EQ((callSlot<float>(pen, 3)), 3.0f);
+  EXPECT_EQ((callSlot<int>(pen, 7)), static_cast<int>(0xFF000000u));
+  callSlot<void>(pen, 6, 0x12345678);
+  EXPECT_EQ((callSlot<int>(pen, 7)), 0x12345678);
+  callSlot<void>(pen, 11, 5);
+  EXPECT_EQ((callSlot<int>(pen, 12)), 5);
+  callSlot<void>(pen, 13, 0.25f);
+  EXPECT_EQ((callSlot<float>(pen, 14)), 0.25f);
+  callSlot<void>(pen, 15, 7);
+  EXPECT_EQ((callSlot<int>(pen, 16)), 7);
+  for (const int attribute : {-1, 0, 1, 2, 3, 4, 5}) {
+    const bool expected = attribute >= 0 && attribute <= 4 && attribute != 3;
+    EXPECT_EQ((callSlot<bool>(pen, 18, attribute)), expected) << attribute;
+  }
+  EXPECT_EQ((callSlot<void*>(pen, 25)), static_cast<void*>(mPen->GetMorphable()));
+  EXPECT_EQ((callSlot<void*>(pen, 26)), nullptr);
+  EXPECT_TRUE((callSlot<bool>(pen, 30)));  // curves
+  EXPECT_TRUE((callSlot<bool>(pen, 29, false)));
+  EXPECT_FALSE((callSlot<bool>(pen, 30)));
+  EXPECT_TRUE((callSlot<bool>(pen, 31, true)));
+  EXPECT_TRUE((callSlot<bool>(pen, 32)));
+  EXPECT_TRUE((callSlot<bool>(pen, 33, -1.0f)));
+  EXPECT_EQ((callSlot<float>(pen, 34)), -1.0f);
+}
+
+TEST_F(Slots, TheMorphingOptionsForwardToThePen) {
+  void* pen = mPen.get();
+  void* morphable = mPen->GetMorphable();
+  EXPECT_TRUE((callSlot<bool>(morphable, 3)));  // curves
+  EXPECT_TRUE((callSlot<bool>(morphable, 2, false)));
+  EXPECT_FALSE((callSlot<bool>(pen, 30)));
+  EXPECT_FALSE((callSlot<bool>(morphable, 5)));  // fixed width
+  EXPECT_TRUE((callSlot<bool>(morphable, 4, true)));
+  EXPECT_TRUE((callSlot<bool>(pen, 32)));
+  EXPECT_EQ((callSlot<float>(morphable, 7)), 0.0f);
+  EXPECT_TRUE((callSlot<bool>(morphable, 6, 2.5f)));
+  EXPECT_EQ((callSlot<float>(pen, 34)), 2.5f);
+}
+
+// What the pen leaves to the host's base, a later host may change without a new pen.
+TEST_F(Slots, ThePenOverridesOnlyItsOwn) {
+  for (const int slot : {0, 1, 4, 5, 18, 19, 25, 26, 29, 30, 31, 32, 33, 34}) {
+    EXPECT_EQ(libraryOf(codeAt(mPen.get(), slot)), "libQeltPencil2.so") << "slot " << slot;
+  }
+  for (const int slot : {2, 3, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15, 16, 17, 23, 24, 27, 28}) {
+    EXPECT_EQ(libraryOf(codeAt(mPen.get(), slot)), "libQeltPenCommon.so") << "slot " << slot;
+  }
+}
+
+TEST(ContractSlots, OfThePen) {
+  EXPECT_EQ(slotOf(&Pen::SetSize), 2);
+  EXPECT_EQ(slotOf(&Pen::GetMaxSize), 5);
+  EXPECT_EQ(slotOf(&Pen::SetScreenResolution), 8);
+  EXPECT_EQ(slotOf(&Pen::GetAdvancedSetting), 10);
+  EXPECT_EQ(slotOf(&Pen::SetEnhancedAntiAlias), 17);
+  EXPECT_EQ(slotOf(&Pen::GetStrokeDrawableGL), 19);
+  EXPECT_EQ(slotOf(&Pen::GetPredictionStrokeDrawableGL), 20);
+  EXPECT_EQ(slotOf(&Pen::GetOutlineDrawableGL), 21);
+  EXPECT_EQ(slotOf(&Pen::GetPreviewDrawableGL), 22);
+  EXPECT_EQ(slotOf(&Pen::GetTestDrawableGL), 23);
+  EXPECT_EQ(slotOf(&Pen::GetStrokeRect), 27);
+  EXPECT_EQ(slotOf(&Pen::setPenDataManager), 28);
+  EXPECT_EQ(slotOf(&IPenMorphable::SetCurveEnabled), 2);
+  EXPECT_EQ(slotOf(&IPenMorphable::GetFixedWidth), 7);
+}
+
+TEST(ContractSlots, OfTasksAndRenderDrawables) {
+  EXPECT_EQ(slotOf(&Qelt::ITask::run), 2);
+  EXPECT_EQ(slotOf(&Qelt::ITask::isGlobalLockAllowed), 3);
+  EXPECT_EQ(slotOf(&Qelt::ManagedObject::OnRelease), 2);
+  EXPECT_EQ(slotOf(&Qelt::ManagedObject::OnRestore), 3);
+  EXPECT_EQ(slotOf(&PenDrawableRT::ReleaseGLObject), 4);
+  EXPECT_EQ(slotOf(&PenDrawableRT::RestoreGLObject), 5);
+  EXPECT_EQ(slotOf(&PenDrawableRT::Init), 6);
+  EXPECT_EQ(slotOf(&PenDrawableRT::Release), 7);
+  EXPECT_EQ(slotOf(&PenDrawableRT::AddPoint), 8);
+  EXPECT_EQ(slotOf(&PenDrawableRT::CreatePenCanvas), 9);
+  EXPECT_EQ(slotOf(&PenDrawableRT::ClearPenCanvas), 10);
+  EXPECT_EQ(slotOf(&PenDrawableRT::Clear), 11);
+  EXPECT_EQ(slotOf(&PenDrawableRT::Update), 12);
+  EXPECT_EQ(slotOf(&PenDrawableRT::Draw), 13);
+  EXPECT_EQ(slotOf(&PenDrawableRT::GetDepthMapBitmapSettable), 14);
+  EXPECT_EQ(slotOf(&PenDrawableRT::GetReferenceBitmapSettable), 15);
+  EXPECT_EQ(slotOf(&PenStrokeDrawableRT::SetBuffer), 16);
+  EXPECT_EQ(slotOf(&PenStrokeDrawableRT::SendDataToGPU), 17);
+  EXPECT_EQ(slotOf(&PenStrokeDrawableRT::SetCacheBuffer), 18);
+}
+
+}  // namespace

@@ -1,0 +1,46 @@
+#pragma once
+
+#include <gmock/gmock.h>
+
+#include <string>
+#include <vector>
+
+namespace QeltTests {
+
+// A stamp, read back from its six vertices.
+struct Stamp {
+  float x, y;                    // centre, stroke units
+  float halfWidth, halfHeight;   // stroke units
+  float alpha;                   // 0 to 1
+  float narrowing;               // 0 round
+  int tile;                      // 0 to 2
+  float directionX, directionY;  // unit vector
+  float innerRadius = 0.0f;      // only where a vertex has 11 floats
+  float alphaByWidth = 1.0f;     // only where a vertex has 11 floats
+};
+
+std::ostream& operator<<(std::ostream& out, const Stamp& stamp);
+
+// The stamps of a batch with `stride` floats a vertex. Fails the test when the batch does not consist of
+// whole stamps, or a stamp's vertices are not the two triangles of one rectangle with one set of values.
+std::vector<Stamp> stampsOf(const std::vector<float>& batch, int stride);
+
+// A stamp whose centre lies within `tolerance` of (x, y).
+MATCHER_P3(StampNear, x, y, tolerance,
+           (negation ? "isn't" : "is") + std::string(" a stamp near (") + testing::PrintToString(x) + ", " +
+               testing::PrintToString(y) + ")") {
+  const float dx = arg.x - static_cast<float>(x);
+  const float dy = arg.y - static_cast<float>(y);
+  *result_listener << "which lies " << dx << ", " << dy << " away";
+  return dx * dx + dy * dy <= static_cast<float>(tolerance) * static_cast<float>(tolerance);
+}
+
+// A batch of `count` stamps with `stride` floats a vertex.
+MATCHER_P2(BatchOf, count, stride,
+           std::string(negation ? "isn't" : "is") + " a batch of " + testing::PrintToString(count) +
+               " stamps") {
+  *result_listener << "which has " << arg.size() << " floats";
+  return arg.size() == static_cast<std::size_t>(count) * 6 * static_cast<std::size_t>(stride);
+}
+
+}  // namespace QeltTests

@@ -1,0 +1,17 @@
+#pragma once
+
+#include <array>
+
+namespace QeltTests {
+
+// Every rendering version a pen can have.
+inline constexpr std::array<int, 8> allVersions() {
+  return {1, 2, 3, 4, 5, 6, 7, 8};
+}
+
+// Floats in one vertex of a stroke's batch.
+inline constexpr int strideOf(int renderingVersion) {
+  return renderingVersion == 8 ? 11 : 9;
+}
+
+}  // namespace QeltTests
