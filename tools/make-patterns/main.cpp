@@ -216,9 +216,9 @@ int bestCut(const Field& field, bool rows) {
 }
 
 std::vector<std::uint8_t> makeGrain() {
-  // Of 400 seeds this one gave the relief without a landmark: its largest blob stands out least at every
-  // scale. A single conspicuous pit would show the eye where the grain repeats.
-  constexpr std::uint64_t kSeed = 366;
+  // One of the handful, of 1,000 tried, whose blobs and streaks stand out least at every scale; among those
+  // the most even to the eye. A single conspicuous pit or row would show where the grain repeats.
+  constexpr std::uint64_t kSeed = 608;
   // Two texels are one stroke unit: tooth of one to three units, a slower swell under it, and a fine
   // roughness.
   const Field tooth = Field::noise(kGrainSide, kSeed + 0x7061706572);
