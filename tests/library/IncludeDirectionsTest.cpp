@@ -56,7 +56,6 @@ int floorOf(const std::string& path) {
 }
 
 bool mayInclude(const Include& include) {
-  // Sources generated into the build's tree stand beside those of the folder they are named after.
   if (fs::exists(kSource / "host/contract" / include.what)) return true;
   const int own = floorOf(include.from);
   const int other = floorOf(include.what);
