@@ -1,0 +1,36 @@
+#include "pen/DrawableFactory.h"
+
+#include <new>
+
+#include "stroke/Pencil2StrokeDrawableGLV1.h"
+#include "stroke/Pencil2StrokeDrawableGLV2.h"
+#include "stroke/Pencil2StrokeDrawableGLV3.h"
+#include "stroke/Pencil2StrokeDrawableGLV4.h"
+#include "stroke/Pencil2StrokeDrawableGLV5.h"
+#include "stroke/Pencil2StrokeDrawableGLV7.h"
+#include "stroke/Pencil2StrokeDrawableGLV8.h"
+
+namespace Qelt {
+
+Pencil2StrokeDrawableGL* createStrokeDrawable(std::int32_t strokeVersion, Pencil2Data* penData,
+                                              PenGLDataManager* manager) {
+  switch (strokeVersion) {
+    case 2:
+      return new (std::nothrow) Pencil2StrokeDrawableGLV2(penData, manager);
+    case 3:
+      return new (std::nothrow) Pencil2StrokeDrawableGLV3(penData, manager);
+    case 4:
+    case 6:
+      return new (std::nothrow) Pencil2StrokeDrawableGLV4(penData, manager);
+    case 5:
+      return new (std::nothrow) Pencil2StrokeDrawableGLV5(penData, manager);
+    case 7:
+      return new (std::nothrow) Pencil2StrokeDrawableGLV7(penData, manager);
+    case 8:
+      return new (std::nothrow) Pencil2StrokeDrawableGLV8(penData, manager);
+    default:
+      return new (std::nothrow) Pencil2StrokeDrawableGLV1(penData, manager);
+  }
+}
+
+}  // namespace Qelt

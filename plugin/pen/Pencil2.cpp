@@ -1,0 +1,145 @@
+#include "pen/Pencil2.h"
+
+#include <atomic>
+#include <new>
+#include <utility>
+
+#include "base/String.h"
+#include "pen/DrawableFactory.h"
+#include "pen/Pencil2Data.h"
+#include "pen/VersionTable.h"
+#include "pencommon/PenGLDataManager.h"
+#include "pencommon/PenManager.h"
+#include "pencommon/PenPredictionDrawableGL.h"
+#include "render/Posting.h"
+#include "stroke/Pencil2StrokeDrawableGL.h"
+
+namespace Qelt {
+namespace {
+
+constexpr float kMinSize = 0.477f;  // stroke units
+constexpr float kMaxSize = 6.571f;
+constexpr std::uint32_t kOpaqueBlack = 0xFF000000u;
+constexpr int kAdvancedSettingVersion = 8;
+
+// The name of a pen whose queue took the release that reads it, but not its deletion.
+std::atomic<String*> unclaimedName{nullptr};
+
+}  // namespace
+
+Pencil2::Pencil2() : mData(new (std::nothrow) Pencil2Data{}) {
+  if (mData != nullptr) {
+    mData->mSettingData = getSettingData();
+    mData->mCurveEnabled = true;
+    mData->mLastAlpha = -1.0f;
+  }
+  String setting;
+  setting.Append(kAdvancedSettingVersion);
+  setting.Append(';');
+  SetAdvancedSetting(&setting);
+  SetSize(kMinSize);
+  SetColor(static_cast<int>(kOpaqueBlack));
+}
+
+// Drawables go before the data they leave on the render thread, and the record last: their destructors may
+// still read it.
+Pencil2::~Pencil2() {
+  delete std::exchange(mStrokeDrawable, nullptr);
+  releasePenData();
+  delete mData;
+}
+
+void Pencil2::releasePenData() {
+  PenGLDataManager* manager = getPenDataManager();
+  if (manager == nullptr) return;
+  IGLMsgQueue* queue = manager->GetMsgQueue();
+  if (queue != nullptr) {
+    auto* name = new (std::nothrow) String(PenManager::QELT_PENCIL2_NAME);
+    if (name != nullptr && !post(queue, manager, &PenGLDataManager::ReleasePenData, name)) {
+      delete name;
+    } else if (name != nullptr && !postDelete(queue, name) && !postDelete(queue, name)) {
+      // The release was taken and may yet read the name; it goes with the next one.
+      delete unclaimedName.exchange(name);
+    }
+  }
+  setPenDataManager(nullptr);
+}
+
+float Pencil2::GetMinSize() {
+  return kMinSize;
+}
+
+float Pencil2::GetMaxSize() {
+  return kMaxSize;
+}
+
+bool Pencil2::GetPenAttribute(IPen::PenAttribute attribute) {
+  switch (static_cast<int>(attribute)) {
+    case 0:
+    case 1:
+    case 2:
+    case 4:
+      return true;
+    default:
+      return false;
+  }
+}
+
+PenStrokeDrawableGL* Pencil2::GetStrokeDrawableGL() {
+  const std::int32_t version = versionTable[versionRow(getVersion())][0];
+  if (mStrokeDrawable != nullptr && mStrokeVersion == version) return mStrokeDrawable;
+  delete std::exchange(mStrokeDrawable, nullptr);
+  mStrokeDrawable = createStrokeDrawable(version, mData, getPenDataManager());
+  mStrokeVersion = version;
+  return mStrokeDrawable;
+}
+
+IPenPredictionDrawableGL* Pencil2::GetPredictionStrokeDrawableGL() {
+  return nullptr;
+}
+
+PenOutlineDrawableGL* Pencil2::GetOutlineDrawableGL() {
+  return nullptr;
+}
+
+PenPreviewDrawableGL* Pencil2::GetPreviewDrawableGL() {
+  return nullptr;
+}
+
+IPenMorphable* Pencil2::GetMorphable() {
+  return this;
+}
+
+IGLMsgQueue* Pencil2::GetMsgQueue() {
+  if (PenGLDataManager* manager = getPenDataManager(); manager != nullptr) mMsgQueue = manager->GetMsgQueue();
+  return mMsgQueue;
+}
+
+bool Pencil2::SetCurveEnabled(bool enabled) {
+  if (mData != nullptr) mData->mCurveEnabled = enabled;
+  return true;
+}
+
+bool Pencil2::IsCurveEnabled() {
+  return mData != nullptr && mData->mCurveEnabled;
+}
+
+bool Pencil2::SetFixedWidthEnabled(bool enabled) {
+  if (mData != nullptr) mData->mFixedWidthEnabled = enabled;
+  return true;
+}
+
+bool Pencil2::IsFixedWidthEnabled() {
+  return mData != nullptr && mData->mFixedWidthEnabled;
+}
+
+bool Pencil2::SetFixedWidth(float width) {
+  if (mData != nullptr) mData->mFixedWidth = width;
+  return true;
+}
+
+float Pencil2::GetFixedWidth() {
+  return mData != nullptr ? mData->mFixedWidth : 0.0f;
+}
+
+}  // namespace Qelt

@@ -1,0 +1,58 @@
+#pragma once
+
+#include <cstdint>
+
+#include "pencommon/IPenMorphable.h"
+#include "pencommon/Pen.h"
+
+namespace Qelt {
+
+class Pencil2OutlineDrawableGL;
+class Pencil2PredictionDrawableGL;
+class Pencil2PreviewDrawableGL;
+class Pencil2StrokeDrawableGL;
+struct Pencil2Data;
+
+// The pencil: settings, and the drawables that draw by them. Main thread. Drawables are made on first demand
+// and live until the pen dies, but for those that a change of the rendering version replaces, in their
+// getter.
+class Pencil2 final : public Pen, public IPenMorphable {
+ public:
+  Pencil2();
+  ~Pencil2() override;
+
+  float GetMinSize() override;  // stroke units
+  float GetMaxSize() override;
+  bool GetPenAttribute(IPen::PenAttribute attribute) override;
+  // Each null when memory ran out.
+  PenStrokeDrawableGL* GetStrokeDrawableGL() override;
+  IPenPredictionDrawableGL* GetPredictionStrokeDrawableGL() override;
+  PenOutlineDrawableGL* GetOutlineDrawableGL() override;
+  PenPreviewDrawableGL* GetPreviewDrawableGL() override;
+  IPenMorphable* GetMorphable() override;
+  // The data manager's queue; without a data manager the last one seen.
+  IGLMsgQueue* GetMsgQueue() override;
+
+  // Options take effect with the next event a drawable handles. Setters always answer true.
+  bool SetCurveEnabled(bool enabled) override;
+  bool IsCurveEnabled() override;
+  bool SetFixedWidthEnabled(bool enabled) override;
+  bool IsFixedWidthEnabled() override;
+  bool SetFixedWidth(float width) override;
+  float GetFixedWidth() override;
+
+ private:
+  void releasePenData();
+
+  Pencil2StrokeDrawableGL* mStrokeDrawable = nullptr;
+  Pencil2PredictionDrawableGL* mPredictionDrawable = nullptr;
+  Pencil2OutlineDrawableGL* mOutlineDrawable = nullptr;
+  Pencil2PreviewDrawableGL* mPreviewDrawable = nullptr;
+  void* mSpareDrawable = nullptr;     // Kept: never filled
+  Pencil2Data* mData;                 // null when its allocation failed
+  std::int32_t mStrokeVersion = -1;   // that the stroke drawable was made for
+  std::int32_t mOutlineVersion = -1;  // that the outline drawable was made for
+  IGLMsgQueue* mMsgQueue = nullptr;   // last one the data manager gave
+};
+
+}  // namespace Qelt

@@ -1,0 +1,220 @@
+#pragma once
+
+#include <GLES3/gl3.h>
+
+#include <cmath>
+#include <cstddef>
+#include <utility>
+#include <vector>
+
+#include "base/Vector.h"
+#include "gl/GraphicsFactory.h"
+#include "gl/GraphicsObject.h"
+#include "gl/ManagedObject.h"
+#include "gl/OpenGLRenderer.h"
+#include "gl/OpenGLShaderProgram.h"
+#include "gl/VertexDescriptor.h"
+#include "graphics/ISPBitmap.h"
+#include "log/Log.h"
+#include "math/Matrix4.h"
+#include "pencommon/PenGLDataManager.h"
+#include "render/GrainOrigin.h"
+#include "render/PatternTextures.h"
+#include "render/RenderVersions.h"
+#include "render/StampVertices.h"
+#include "render/UnclaimedBatch.h"
+#include "shaders/ShaderRegistry.h"
+
+namespace Qelt {
+
+// A render drawable of stamps: appends them as vertices on the main thread, uploads and draws the batch on
+// the render thread. `HostBase` is the host's render drawable of the kind; `Version` a row of
+// RenderVersions.h (or the preview's or the prediction's), which holds all that differs. Adds no slots to the
+// host's.
+//
+// Main thread: AddPoint, reserve, SetInverseScale, unclaimedBatch. Render thread: the rest.
+template <typename HostBase, typename Version>
+class StampRenderer : public HostBase {
+  static constexpr const RenderProfile& kProfile = Version::profile;
+  static constexpr bool kAntialiased = kProfile.expansion == StampExpansion::Antialiased;
+
+ public:
+  static constexpr std::size_t kFloatsPerVertex = kAntialiased ? 11 : 9;
+  static constexpr std::size_t kFloatsPerStamp = 6 * kFloatsPerVertex;
+
+  using HostBase::HostBase;
+
+  void AddPoint(Vector2<float>, float) final {}
+
+  // Appends one stamp to the write buffer. `point` addresses the centre, then the direction (-sin a, cos a).
+  // `size`: the stamp's width (version 1 and 2, preview) or half width (version 3, prediction), stroke units.
+  // `tile`: stamp shape 0, 1 or 2. Throws std::bad_alloc where the buffer cannot grow; without a buffer
+  // nothing happens.
+  void AddPoint(const Vector2<float>* point, float size, float alpha, float tiltBlend, int tile) {
+    std::vector<float>* buffer = this->mWriteBuffer;
+    if (buffer == nullptr) return;
+    const StampLook look{alpha, tiltBlend, static_cast<float>(tile), point[1]};
+    const auto vertices = stampVertices<kFloatsPerVertex>(quad(point[0], size), look);
+    buffer->insert(buffer->end(), vertices.begin(), vertices.end());
+  }
+
+  // Makes room for stamps to come, so that appending them does not allocate. Throws std::bad_alloc.
+  void reserve(std::size_t stamps) { reserveStamps(this->mWriteBuffer, stamps, kFloatsPerStamp); }
+
+  UnclaimedBatch* unclaimedBatch() { return &mUnclaimed; }
+
+  void Init() final {
+    if (kProfile.logsSetup) log("Init()");
+    if (mGraphicsObject == nullptr) {
+      VertexDescriptor descriptor;
+      descriptor.addAttribute(AttributeType::Float, 4, -1);
+      descriptor.addAttribute(AttributeType::Float, 3, -1);
+      descriptor.addAttribute(AttributeType::Float, 2, -1);
+      if (kAntialiased) descriptor.addAttribute(AttributeType::Float, 2, -1);
+      mGraphicsObject =
+          GraphicsFactory::createGraphicsObject(1, GraphicsFactory::kTriangles, descriptor, 0, 0);
+    }
+    if (mShader == nullptr) mShader = ShaderManager::GetInstance()->GetShader<typename Version::Shader>();
+    buildTextures(kGrainSide, kGrainSide);
+    setTextures(kGrainSide, kGrainSide);
+    ManagedObject::Register(this);
+  }
+
+  void Release() final {
+    log("Release()");
+    ManagedObject::Unregister(this);
+    ShaderManager::GetInstance()->ReleaseShader(std::exchange(mShader, nullptr));
+    if (mGraphicsObject != nullptr) std::exchange(mGraphicsObject, nullptr)->release();
+    mTextures.release();
+  }
+
+  void RestoreGLObject() final {
+    log("RestoreGLObject()");
+    setTextures(kGrainSide, kGrainSide);
+  }
+
+  void CreatePenCanvas(int, int, IGLMsgQueue*) final {
+    if (kProfile.logsSetup) log("CreatePenCanvas(int, int, Qelt::IGLMsgQueue *)");
+    if (!mTextures.ready()) this->Init();
+  }
+
+  void buildTextures(int width, int height) {
+    IGLMsgQueue* queue = this->mDataManager != nullptr ? this->mDataManager->GetMsgQueue() : nullptr;
+    mTextures.build(queue, width, height, kProfile.className);
+  }
+
+  void setTextures(int width, int height) { mTextures.upload(width, height, kProfile.points); }
+
+  void Clear() final {
+    this->mHasPendingData = false;
+    if (this->mRenderBuffer == nullptr) return;
+    // The vector itself is freed by its own task.
+    this->mRenderBuffer->clear();
+    this->mRenderBuffer = nullptr;
+  }
+
+  void Update(bool useCacheBuffer) final {
+    mUseCacheBuffer = kProfile.hasCacheBuffer && useCacheBuffer;
+    const std::vector<float>* batch = currentBatch();
+    if (batch == nullptr || batch->empty() || mGraphicsObject == nullptr) return;
+    mGraphicsObject->updateBuffer(0, batch->data(), static_cast<int>(batch->size() / kFloatsPerVertex));
+  }
+
+  void Draw(ISPSubBitmap* tile, Matrix4<float>& matrix) final {
+    const std::vector<float>* batch = currentBatch();
+    if (tile == nullptr || batch == nullptr || batch->empty()) return;
+    if (mGraphicsObject == nullptr || mShader == nullptr || !mShader->isLinked() || !mTextures.ready())
+      return;
+
+    tile->BeginRender(0);
+    const Matrix4<float> projection = tile->GetProjection() * matrix;
+    // The first tile after SetStartPoint fixes the grain for the whole stroke.
+    mGrainOrigin.settle(projection, OpenGLRenderer::getViewport());
+
+    OpenGLRenderer::enableState(GL_BLEND);
+    OpenGLRenderer::setBlendFuncFactors(GL_SRC_ALPHA, GL_ONE_MINUS_SRC_ALPHA, GL_ONE, GL_ONE_MINUS_SRC_ALPHA);
+    mShader->activate();
+    mShader->projectionMatrix = projection;
+    mShader->inputColor = this->mPenColor;
+    mShader->grainOffset = mGrainOrigin.value();
+    mShader->numTilesOfPoints = 3.0f;
+    mTextures.bindGrain(0);
+    mShader->sampler0 = 0;
+    const Vector2<float> grain = grainSize(matrix);
+    mShader->textureWidth = grain.x;
+    mShader->textureHeight = grain.y;
+    mTextures.bindPoints(1);
+    mShader->sampler1 = 1;
+    if constexpr (kProfile.hasOpacity) mShader->inputOpacity = this->GetOpacity();
+
+    mGraphicsObject->draw(0, -1, true, 0);
+    tile->EndRender(0);
+  }
+
+  // Turns the start point into window pixels under a projection and the current viewport, at once.
+  void transformStartPoint(const Matrix4<float>& projection) {
+    mGrainOrigin.transform(projection, OpenGLRenderer::getViewport());
+  }
+
+  Vector2<float> grainOrigin() const { return mGrainOrigin.value(); }
+
+ protected:
+  // Render thread. The final class declares the public operation, so that posted tasks name it.
+  void setStartPoint(float x, float y) { mGrainOrigin.set(x, y); }
+
+  // Stroke units a device pixel in x and y. Anything but two finite positive numbers counts as (1, 1).
+  void setInverseScale(const Vector2<float>& inverseScale) {
+    const auto usable = [](float scale) { return std::isfinite(scale) && scale > 0.0f; };
+    mInverseScale =
+        usable(inverseScale.x) && usable(inverseScale.y) ? inverseScale : Vector2<float>{1.0f, 1.0f};
+  }
+
+ private:
+  static constexpr int kGrainSide = 150;
+
+  StampQuad quad(Vector2<float> centre, float size) const {
+    if constexpr (kAntialiased) {
+      return antialiasedQuad(centre, size, mInverseScale);
+    } else {
+      return squareQuad(centre, size);
+    }
+  }
+
+  const std::vector<float>* currentBatch() const {
+    if constexpr (kProfile.hasCacheBuffer) {
+      if (mUseCacheBuffer) return this->mCacheBuffer;
+    }
+    return this->mRenderBuffer;
+  }
+
+  // The on-screen extent of the grain's 150 texels. Kept: under a rotation it is what the formula gives, the
+  // extent of the diagonal of a 150-unit square in x and in y.
+  static Vector2<float> grainSize(const Matrix4<float>& m) {
+    if constexpr (kProfile.grainFollowsView) {
+      const auto map = [&m](float q) {
+        const float w = m[3] * q + m[7] * q + m[15];
+        return Vector2<float>{(m[0] * q + m[4] * q + m[12]) / w, (m[1] * q + m[5] * q + m[13]) / w};
+      };
+      const Vector2<float> far = map(static_cast<float>(kGrainSide));
+      const Vector2<float> near = map(0.0f);
+      return {(far.x - near.x) * kProfile.grainScale, (far.y - near.y) * kProfile.grainScale};
+    } else {
+      (void)m;
+      return {kGrainSide * kProfile.grainScale, kGrainSide * kProfile.grainScale};
+    }
+  }
+
+  static void log(const char* operation) {
+    __android_log_print(kLogDebug, kLogTag, "virtual void Qelt::%s::%s", kProfile.className, operation);
+  }
+
+  bool mUseCacheBuffer = false;
+  GraphicsObject* mGraphicsObject = nullptr;
+  typename Version::Shader* mShader = nullptr;
+  PatternTextures mTextures;
+  GrainOrigin mGrainOrigin;
+  Vector2<float> mInverseScale{1.0f, 1.0f};
+  UnclaimedBatch mUnclaimed;
+};
+
+}  // namespace Qelt

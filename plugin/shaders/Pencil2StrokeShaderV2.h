@@ -1,0 +1,27 @@
+#pragma once
+
+#include "shaders/ShaderProgram.h"
+#include "shaders/StampUniforms.h"
+
+namespace Qelt {
+
+// Draws stamps of stroke render version 3: the rim's ramp and the dimming of thin stamps come with the
+// vertices. Render thread.
+class Pencil2StrokeShaderV2 : public StampUniforms {
+ public:
+  // Throws InvalidArgumentException when a uniform has another type than its binding.
+  Pencil2StrokeShaderV2();
+
+  // False when the host could not make the program; nothing can be drawn then.
+  bool isLinked() const { return mProgram.get() != nullptr; }
+  void activate() { mProgram.get()->activate(); }
+
+  // GLSL ES 3.00, zero-terminated. Exported.
+  __attribute__((visibility("default"))) static const char szVertexShader[];
+  __attribute__((visibility("default"))) static const char szFragmentShader[];
+
+ private:
+  ShaderProgram mProgram;
+};
+
+}  // namespace Qelt

@@ -1,0 +1,51 @@
+#pragma once
+
+#include <new>
+#include <typeinfo>
+
+#include "base/CriticalSection.h"
+#include "gl/ShaderManager.h"
+#include "log/Log.h"
+
+// The plug-in's half of the shader registry: one shared shader a class, counted. Any thread; shaders
+// themselves are used on the render thread only.
+namespace Qelt {
+
+template <typename T>
+T* ShaderManager::GetShader() {
+  const AutoCriticalSection lock(&mLock);
+  const Key key(typeid(T).name());
+  auto found = mShaders.find(key);
+  if (found == mShaders.end()) {
+    __android_log_print(kLogDebug, kLogTag, "ShaderManager::GetShader, New %s is added", typeid(T).name());
+    found = mShaders.emplace(key, Entry{new (std::nothrow) T, 0}).first;
+  }
+  ++found->second.references;
+  return static_cast<T*>(found->second.shader);
+}
+
+template <typename T>
+void ShaderManager::ReleaseShader(T* shader) {
+  if (shader == nullptr) return;
+  const AutoCriticalSection lock(&mLock);
+  const Key key(typeid(T).name());
+  const auto found = mShaders.find(key);
+  if (found == mShaders.end()) {
+    __android_log_print(kLogError, kLogTag, "%s. Shader (%s) not in shader manager (not found).",
+                        "ReleaseShader", key.GetText());
+    return;
+  }
+  if (found->second.shader != shader) {
+    __android_log_print(kLogError, kLogTag, "%s. Shader (%s) not in shader manager (pointer mismatch).",
+                        "ReleaseShader", typeid(T).name());
+    return;
+  }
+  if (found->second.references == 1) {
+    delete shader;
+    mShaders.erase(found);
+  } else {
+    --found->second.references;
+  }
+}
+
+}  // namespace Qelt

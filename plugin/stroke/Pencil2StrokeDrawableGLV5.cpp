@@ -1,0 +1,7 @@
+#include "stroke/Pencil2StrokeDrawableGLV5.h"
+
+namespace Qelt {
+
+template class StrokePipeline<StrokeV5>;
+
+}  // namespace Qelt

@@ -1,0 +1,54 @@
+#pragma once
+
+#include <cmath>
+
+#include "base/PointF.h"
+#include "stroke/parts/PenSample.h"
+
+namespace Qelt {
+
+// Stroke units. In double precision where the squares do not fit into a float.
+inline float distanceBetween(PointF a, PointF b) {
+  const float dx = b.x - a.x;
+  const float dy = b.y - a.y;
+  const float squared = dx * dx + dy * dy;
+  if (!std::isinf(squared)) return std::sqrt(squared);
+  const double wideX = static_cast<double>(b.x) - static_cast<double>(a.x);
+  const double wideY = static_cast<double>(b.y) - static_cast<double>(a.y);
+  return static_cast<float>(std::sqrt(wideX * wideX + wideY * wideY));
+}
+
+// Decides which moves become segments: very short ones never, short ones every other time.
+class MoveFilter {
+ public:
+  // Shorter moves are dropped; the last point stays where it is, so that a slow drag adds up. Stroke units.
+  void setMinimumMove(float distance) { mMinimumMove = distance; }
+  float minimumMove() const { return mMinimumMove; }
+
+  // Moves shorter than `skipDistance` are taken every other time, the first of them not. Stroke units.
+  void restart(float skipDistance) {
+    mSkipDistance = skipDistance;
+    mSkipToggle = true;
+  }
+
+  // Whether the move from `last` to `at` becomes a segment. A point that is not finite never does.
+  bool accepts(PointF last, PointF at) {
+    if (!isFinite(at)) return false;
+    const float distance = distanceBetween(last, at);
+    if (distance < mMinimumMove) return false;
+    if (distance < mSkipDistance) {
+      const bool skips = mSkipToggle;
+      mSkipToggle = !mSkipToggle;
+      return !skips;
+    }
+    mSkipToggle = true;
+    return true;
+  }
+
+ private:
+  float mMinimumMove = 5.0f;
+  float mSkipDistance = 5.0f;
+  bool mSkipToggle = true;
+};
+
+}  // namespace Qelt

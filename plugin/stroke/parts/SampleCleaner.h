@@ -1,0 +1,43 @@
+#pragma once
+
+#include <cmath>
+
+#include "engine/MotionEvent.h"
+
+namespace Qelt {
+
+// Replaces what is not a number and caps what is too large, by one version's numbers, before any geometry
+// sees it.
+struct SampleCleaner {
+  float unknownPressure;  // of tools that report none, and for NaN
+  float tiltCap;          // radians
+
+  float pressure(float reported, int toolType) const {
+    if (toolType == kToolFinger || toolType == kToolMouse || std::isnan(reported)) return unknownPressure;
+    return reported > 1.0f ? 1.0f : reported;
+  }
+
+  // Tilt before the cap.
+  static float knownTilt(float reported) { return std::isfinite(reported) ? reported : 0.0f; }
+
+  float tilt(float reported) const {
+    const float known = knownTilt(reported);
+    return known > tiltCap ? tiltCap : known;
+  }
+
+  bool exceedsCap(float reported) const { return knownTilt(reported) > tiltCap; }
+
+  static float orientation(float reported) { return std::isfinite(reported) ? reported : 0.0f; }
+};
+
+// A stylus on a touch screen reports no pressure.
+inline bool isTouchStylus(int toolType, int source) {
+  return toolType == kToolStylus && source == kSourceTouchScreen;
+}
+
+// Tools whose short moves are thinned out.
+inline bool isCoarseTool(int toolType, int source) {
+  return toolType == kToolFinger || toolType == kToolMouse || isTouchStylus(toolType, source);
+}
+
+}  // namespace Qelt

@@ -1,0 +1,69 @@
+#pragma once
+
+#include "base/PointF.h"
+#include "graphics/SmPath.h"
+
+namespace Qelt {
+
+// Whether segments are smoothed through mid points or run straight between input points.
+enum class Smoothing { Curve, Straight };
+
+// Builds the path of one segment at a time. Curves run from mid point to mid point with the input point
+// between them as control, so that they meet without a corner:
+//
+//     mid --( last )-- new mid        x, the new point
+//
+// All in stroke units.
+class SegmentPath {
+ public:
+  SegmentPath() { mPath.incReserve(3); }
+  ~SegmentPath() { mPath.freeMemory(); }
+  SegmentPath(const SegmentPath&) = delete;
+  SegmentPath& operator=(const SegmentPath&) = delete;
+
+  // Both points of a stroke's start.
+  void start(PointF at) { mLast = mMid = at; }
+  void setMid(PointF at) { mMid = at; }
+  void setLast(PointF at) { mLast = at; }
+  PointF last() const { return mLast; }
+  PointF mid() const { return mMid; }
+
+  // Builds the segment towards an accepted point; answers its length. A curve moves the mid point on.
+  float extend(PointF to, Smoothing smoothing) {
+    if (smoothing == Smoothing::Straight) return line(to);
+    const PointF newMid{(mLast.x + to.x) / 2.0f, (mLast.y + to.y) / 2.0f};
+    const float length = curve(newMid);
+    mMid = newMid;
+    return length;
+  }
+
+  // Builds the closing segment, which ends at the point itself.
+  float close(PointF to, Smoothing smoothing) {
+    return smoothing == Smoothing::Straight ? line(to) : curve(to);
+  }
+
+  const SmPath& path() const { return mPath; }
+
+ private:
+  float curve(PointF to) {
+    mPath.rewind();
+    mPath.moveTo(mMid.x, mMid.y);
+    mPath.quadTo(mLast.x, mLast.y, to.x, to.y);
+    mPath.resetPath(0);
+    return mPath.getLength();
+  }
+
+  float line(PointF to) {
+    mPath.rewind();
+    mPath.moveTo(mLast.x, mLast.y);
+    mPath.lineTo(to.x, to.y);
+    mPath.resetPath(0);
+    return mPath.getLength();
+  }
+
+  SmPath mPath;
+  PointF mLast;
+  PointF mMid;
+};
+
+}  // namespace Qelt
