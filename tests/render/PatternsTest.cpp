@@ -122,7 +122,7 @@ TEST(PaperGrain, HasNoPeriodicStructure) {
   Grain striped = grain();
   for (int i = 0; i < kGrainPixels; ++i)
     striped[i] +=
-        8.0 * std::sin(2.0 * std::numbers::pi * (12 * (i % kGrainSide) + 9 * (i / kGrainSide)) / kGrainSide);
+        8.0 * std::sin(2.0 * std::numbers::pi * (20 * (i % kGrainSide) + 15 * (i / kGrainSide)) / kGrainSide);
   EXPECT_GT(strongestPeak(spectrum(striped)), 20.0);
 }
 
