@@ -1,5 +1,6 @@
 #include "math/Matrix3.h"
 
+#include <algorithm>
 #include <cmath>
 #include <cstring>
 #include <limits>
@@ -65,7 +66,7 @@ Matrix3<T>::Matrix3() {
 
 template <typename T>
 Matrix3<T>::Matrix3(const T& value) {
-  for (T& element : mElements) element = value;
+  std::fill_n(mElements, 9, value);
 }
 
 template <typename T>
@@ -85,7 +86,7 @@ Matrix3<T>::Matrix3(const Matrix3& other) {
 
 template <typename T>
 Matrix3<T>& Matrix3<T>::operator=(const Matrix3& other) {
-  std::memmove(mElements, other.mElements, sizeof(mElements));
+  if (this != &other) std::memcpy(mElements, other.mElements, sizeof(mElements));
   return *this;
 }
 
@@ -98,7 +99,7 @@ Matrix3<T>& Matrix3<T>::identitySelf() {
 
 template <typename T>
 Matrix3<T>& Matrix3<T>::zeroSelf() {
-  for (T& element : mElements) element = T(0);
+  std::fill_n(mElements, 9, T(0));
   return *this;
 }
 
@@ -112,6 +113,7 @@ bool Matrix3<T>::isIdentity() const {
 
 template <typename T>
 bool Matrix3<T>::operator==(const Matrix3& other) const {
+  // NOLINTNEXTLINE(bugprone-suspicious-memory-comparison): bytes are what is promised
   return std::memcmp(mElements, other.mElements, sizeof(mElements)) == 0;
 }
 

@@ -1,5 +1,6 @@
 #include "math/Matrix4.h"
 
+#include <algorithm>
 #include <cmath>
 #include <cstring>
 
@@ -65,7 +66,7 @@ Matrix4<T>::Matrix4() {
 
 template <typename T>
 Matrix4<T>::Matrix4(const T& value) {
-  for (T& element : mElements) element = value;
+  std::fill_n(mElements, 16, value);
 }
 
 template <typename T>
@@ -85,7 +86,7 @@ Matrix4<T>::Matrix4(const Matrix4& other) {
 
 template <typename T>
 Matrix4<T>& Matrix4<T>::operator=(const Matrix4& other) {
-  std::memmove(mElements, other.mElements, sizeof(mElements));
+  if (this != &other) std::memcpy(mElements, other.mElements, sizeof(mElements));
   return *this;
 }
 
@@ -98,12 +99,13 @@ Matrix4<T>& Matrix4<T>::identitySelf() {
 
 template <typename T>
 Matrix4<T>& Matrix4<T>::zeroSelf() {
-  for (T& element : mElements) element = T(0);
+  std::fill_n(mElements, 16, T(0));
   return *this;
 }
 
 template <typename T>
 bool Matrix4<T>::operator==(const Matrix4& other) const {
+  // NOLINTNEXTLINE(bugprone-suspicious-memory-comparison): bytes are what is promised
   return std::memcmp(mElements, other.mElements, sizeof(mElements)) == 0;
 }
 
