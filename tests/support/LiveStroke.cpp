@@ -41,6 +41,7 @@ LiveStroke::LiveStroke(const LiveStrokeOptions& options)
       mQueue(options.thread ? RenderQueue::Mode::Thread : RenderQueue::Mode::Caller,
              options.picture ? RenderQueue::GL::Context : RenderQueue::GL::None),
       mData(&mQueue) {
+  mQueue.onAccepted = [this](const Qelt::ITask& task) { mPosted.push_back(typeName(task)); };
   if (options.picture) {
     mLayer = std::make_unique<CanvasLayer>(mQueue, options.width, options.height, options.tile);
   }
@@ -62,12 +63,12 @@ LiveStroke::LiveStroke(const LiveStrokeOptions& options)
   if (mDrawable == nullptr) throw std::runtime_error("no stroke drawable");
   mDrawable->SetCanvas(mCanvas.get());
   mQueue.finish();
-  mQueue.onAccepted = [this](const Qelt::ITask& task) { mPosted.push_back(typeName(task)); };
+  mPosted.clear();
+  mBatches.clear();
 }
 
 LiveStroke::~LiveStroke() {
   deletePen();
-  mQueue.onAccepted = nullptr;
   QeltDesktop::setBatchObserver(nullptr);
 }
 

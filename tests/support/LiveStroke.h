@@ -77,6 +77,9 @@ class LiveStroke {
 
  private:
   LiveStrokeOptions mOptions;
+  // Written by the queue, so they outlive it.
+  std::vector<std::vector<float>> mBatches;
+  std::vector<std::string> mPosted;
   QeltDesktop::PluginLibrary mLibrary;
   QeltDesktop::RenderQueue mQueue;
   std::unique_ptr<QeltDesktop::CanvasLayer> mLayer;
@@ -87,8 +90,6 @@ class LiveStroke {
   std::unique_ptr<Qelt::MotionEvent> mEvent;
   std::int64_t mTime = 0;
   Qelt::RectF mRect;
-  std::vector<std::vector<float>> mBatches;
-  std::vector<std::string> mPosted;
 };
 
 }  // namespace QeltTests
