@@ -31,15 +31,19 @@ class QELT_HOST_API PenDrawableGL {
   // Hands over the partner, which may be null; the base owns it from here on.
   void setDrawableRT(PenDrawableRT* drawable);
   // Has the partner released and deleted on the render thread, after everything posted before. Where the
-  // queue refuses, waits until what it took has run and deletes the partner here. To be called by the
-  // destructor of the final class.
+  // queue refuses, waits until what it took has run and has the partner gone on return. To be called by
+  // the destructor of the final class; the base's does it too, for whoever forgot.
   void destroy();
 
   PenGLDataManager* mDataManager;
   ISPPenCanvas* mCanvas = nullptr;
 
  private:
+  // Posts `CreatePenCanvas` for a partner on a canvas that can be drawn into.
+  void prepareDrawableRT();
+
   PenDrawableRT* mDrawableRT = nullptr;
+  bool mPrepared = false;  // `CreatePenCanvas` has been posted
 };
 
 }  // namespace Qelt

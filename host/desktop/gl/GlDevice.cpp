@@ -1,0 +1,116 @@
+#include "desktop/gl/GlDevice.h"
+
+#include <algorithm>
+
+#include "desktop/gl/EglContext.h"
+#include "desktop/gl/GlCall.h"
+#include "desktop/gl/ManagedObjects.h"
+
+namespace QeltDesktop {
+
+namespace {
+
+thread_local GlDevice* tCurrent = nullptr;
+
+std::string glText(GLenum name) {
+  const GLubyte* const text = gl(glGetString)(name);
+  return text != nullptr ? reinterpret_cast<const char*>(text) : "?";
+}
+
+}  // namespace
+
+GlResource::GlResource() : mDevice(GlDevice::current()) {
+  if (mDevice == nullptr) return;
+  const std::lock_guard guard(mDevice->mLock);
+  mDevice->mResources.push_back(this);
+}
+
+GlResource::~GlResource() {
+  if (mDevice == nullptr) return;
+  const std::lock_guard guard(mDevice->mLock);
+  // Most objects die young: look from the back.
+  auto& all = mDevice->mResources;
+  const auto found = std::find(all.rbegin(), all.rend(), this);
+  if (found != all.rend()) all.erase(std::next(found).base());
+}
+
+bool GlResource::isLive() const {
+  return mDevice != nullptr && GlDevice::live() == mDevice;
+}
+
+void GlResource::save() {}
+
+GlDevice::GlDevice() : mContext(std::make_unique<EglContext>()) {
+  makeCurrent();
+  readLimits();
+}
+
+GlDevice::~GlDevice() {
+  for (GlResource* resource : resources()) {
+    resource->forget();
+    resource->mDevice = nullptr;
+  }
+  ManagedObjects::forget(this);
+  clearCurrent();
+}
+
+GlDevice* GlDevice::current() {
+  return tCurrent;
+}
+
+GlDevice* GlDevice::live() {
+  return tCurrent != nullptr && !tCurrent->isLost() ? tCurrent : nullptr;
+}
+
+void GlDevice::makeCurrent() {
+  if (mContext != nullptr) mContext->makeCurrent();
+  tCurrent = this;
+}
+
+void GlDevice::clearCurrent() {
+  if (mContext != nullptr) mContext->clearCurrent();
+  tCurrent = nullptr;
+}
+
+void GlDevice::lose() {
+  if (isLost()) return;
+  ManagedObjects::release(this);
+  const std::vector<GlResource*> all = resources();
+  for (GlResource* resource : all) resource->save();
+  for (GlResource* resource : all) resource->forget();
+  mContext->clearCurrent();
+  mContext.reset();
+  mProgram = 0;
+}
+
+void GlDevice::restore() {
+  if (!isLost()) return;
+  auto context = std::make_unique<EglContext>();
+  context->makeCurrent();
+  mContext = std::move(context);
+  readLimits();
+  for (GlResource* resource : resources()) resource->remake();
+  ManagedObjects::restore(this);
+}
+
+void GlDevice::useProgram(GLuint program) {
+  if (program == mProgram) return;
+  gl(glUseProgram)(program);
+  mProgram = program;
+}
+
+void GlDevice::forgetProgram(GLuint program) {
+  if (program == mProgram) useProgram(0);
+}
+
+void GlDevice::readLimits() {
+  gl(glGetIntegerv)(GL_MAX_TEXTURE_SIZE, &mMaxTextureSize);
+  mDescription = glText(GL_RENDERER) + ", " + glText(GL_VERSION);
+}
+
+std::vector<GlResource*> GlDevice::resources() {
+  const std::lock_guard guard(mLock);
+  return mResources;
+}
+
+}  // namespace QeltDesktop

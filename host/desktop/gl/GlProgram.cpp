@@ -1,0 +1,237 @@
+#include <algorithm>
+#include <iterator>
+#include <memory>
+#include <new>
+#include <string>
+#include <vector>
+
+#include "desktop/base/Log.h"
+#include "desktop/gl/GlCall.h"
+#include "desktop/gl/GlDevice.h"
+#include "gl/GraphicsFactory.h"
+#include "gl/OpenGLShaderProgram.h"
+#include "math/Matrix4.h"
+
+namespace Qelt {
+
+IParameterBinding::~IParameterBinding() = default;
+OpenGLShaderProgram::~OpenGLShaderProgram() = default;
+
+}  // namespace Qelt
+
+namespace QeltDesktop {
+
+namespace {
+
+// The host's number of a GL uniform type; the pens know the named ones only.
+Qelt::BindingType bindingTypeOf(GLenum type) {
+  switch (type) {
+    case GL_FLOAT_MAT4:
+      return Qelt::kBindingMatrix4;
+    case GL_FLOAT_VEC2:
+      return Qelt::kBindingVector2;
+    case GL_FLOAT_VEC4:
+      return Qelt::kBindingVector4;
+    case GL_FLOAT:
+      return Qelt::kBindingFloat;
+    case GL_INT:
+    case GL_SAMPLER_2D:
+      return Qelt::kBindingInt;
+    default:
+      return static_cast<Qelt::BindingType>(100);
+  }
+}
+
+struct Uniform {
+  std::string name;
+  GLint location;
+  Qelt::BindingType type;
+};
+
+// The program itself, shared with its bindings, which may be given back after it.
+class ProgramState final : public GlResource {
+ public:
+  ProgramState(const char* vertexSource, const char* fragmentSource)
+      : mVertexSource(vertexSource), mFragmentSource(fragmentSource) {}
+  ~ProgramState() override { destroy(); }
+
+  bool build() {
+    const GLuint vertex = compile(GL_VERTEX_SHADER, mVertexSource);
+    const GLuint fragment = vertex != 0 ? compile(GL_FRAGMENT_SHADER, mFragmentSource) : 0;
+    if (fragment != 0) link(vertex, fragment);
+    if (fragment != 0) gl(glDeleteShader)(fragment);
+    if (vertex != 0) gl(glDeleteShader)(vertex);
+    if (mProgram != 0) readUniforms();
+    return mProgram != 0;
+  }
+
+  // Makes the program current; false when there is none.
+  bool use() {
+    if (mProgram == 0 || !isLive()) return false;
+    device()->useProgram(mProgram);
+    return true;
+  }
+
+  // The index of a uniform, -1 when the program has none of that name.
+  int find(const char* name) const {
+    const auto found = std::find_if(mUniforms.begin(), mUniforms.end(),
+                                    [&](const Uniform& uniform) { return uniform.name == name; });
+    return found == mUniforms.end() ? -1 : static_cast<int>(found - mUniforms.begin());
+  }
+
+  const Uniform& uniform(int index) const { return mUniforms[static_cast<std::size_t>(index)]; }
+
+  void destroy() {
+    mReleased = true;
+    if (mProgram != 0 && isLive()) {
+      device()->forgetProgram(mProgram);
+      gl(glDeleteProgram)(mProgram);
+    }
+    mProgram = 0;
+  }
+
+ private:
+  void forget() override { mProgram = 0; }
+  void remake() override {
+    if (!mReleased) build();
+  }
+
+  static GLuint compile(GLenum stage, const char* source) {
+    const GLuint shader = gl(glCreateShader)(stage);
+    gl(glShaderSource)(shader, 1, &source, nullptr);
+    gl(glCompileShader)(shader);
+    GLint compiled = GL_FALSE;
+    gl(glGetShaderiv)(shader, GL_COMPILE_STATUS, &compiled);
+    if (compiled == GL_TRUE) return shader;
+    GLint length = 0;
+    gl(glGetShaderiv)(shader, GL_INFO_LOG_LENGTH, &length);
+    std::string report(static_cast<std::size_t>(std::max(length, 1)), '\0');
+    gl(glGetShaderInfoLog)(shader, static_cast<GLsizei>(report.size()), nullptr, report.data());
+    logError(std::string(stage == GL_VERTEX_SHADER ? "vertex" : "fragment") +
+             " shader does not compile: " + report.c_str());
+    gl(glDeleteShader)(shader);
+    return 0;
+  }
+
+  void link(GLuint vertex, GLuint fragment) {
+    const GLuint program = gl(glCreateProgram)();
+    gl(glAttachShader)(program, vertex);
+    gl(glAttachShader)(program, fragment);
+    gl(glLinkProgram)(program);
+    gl(glDetachShader)(program, vertex);
+    gl(glDetachShader)(program, fragment);
+    GLint linked = GL_FALSE;
+    gl(glGetProgramiv)(program, GL_LINK_STATUS, &linked);
+    if (linked == GL_TRUE) {
+      mProgram = program;
+      return;
+    }
+    GLint length = 0;
+    gl(glGetProgramiv)(program, GL_INFO_LOG_LENGTH, &length);
+    std::string report(static_cast<std::size_t>(std::max(length, 1)), '\0');
+    gl(glGetProgramInfoLog)(program, static_cast<GLsizei>(report.size()), nullptr, report.data());
+    logError(std::string("shader program does not link: ") + report.c_str());
+    gl(glDeleteProgram)(program);
+  }
+
+  // Indices stay what they were the first time: bindings keep them across contexts.
+  void readUniforms() {
+    for (Uniform& known : mUniforms) known.location = -1;
+    GLint count = 0;
+    gl(glGetProgramiv)(mProgram, GL_ACTIVE_UNIFORMS, &count);
+    for (GLint i = 0; i < count; ++i) {
+      char name[256] = {};
+      GLint size = 0;
+      GLenum type = 0;
+      gl(glGetActiveUniform)(mProgram, static_cast<GLuint>(i), sizeof name, nullptr, &size, &type, name);
+      const GLint location = gl(glGetUniformLocation)(mProgram, name);
+      const int known = find(name);
+      if (known >= 0) {
+        mUniforms[static_cast<std::size_t>(known)].location = location;
+      } else {
+        mUniforms.push_back({name, location, bindingTypeOf(type)});
+      }
+    }
+  }
+
+  const char* mVertexSource;
+  const char* mFragmentSource;
+  GLuint mProgram = 0;
+  bool mReleased = false;
+  std::vector<Uniform> mUniforms;
+};
+
+class GlUniform final : public Qelt::IParameterBinding {
+ public:
+  GlUniform(std::shared_ptr<ProgramState> program, int index) : mProgram(std::move(program)), mIndex(index) {}
+
+  Qelt::BindingType getType() const override { return mProgram->uniform(mIndex).type; }
+
+  void set(const Qelt::Matrix4<float>& value) override {
+    if (ready(Qelt::kBindingMatrix4)) gl(glUniformMatrix4fv)(location(), 1, GL_FALSE, value.data());
+  }
+  void set(const Qelt::Vector2<float>& value) override {
+    if (ready(Qelt::kBindingVector2)) gl(glUniform2f)(location(), value.x, value.y);
+  }
+  void set(const Qelt::Vector4<float>& value) override {
+    if (ready(Qelt::kBindingVector4)) gl(glUniform4f)(location(), value.x, value.y, value.z, value.w);
+  }
+  void set(float value) override {
+    if (ready(Qelt::kBindingFloat)) gl(glUniform1f)(location(), value);
+  }
+  void set(int value) override {
+    if (ready(Qelt::kBindingInt)) gl(glUniform1i)(location(), value);
+  }
+  void release() override { delete this; }
+
+ private:
+  // A value of another type is dropped rather than handed to GL.
+  bool ready(Qelt::BindingType type) const { return getType() == type && mProgram->use(); }
+  GLint location() const { return mProgram->uniform(mIndex).location; }
+
+  std::shared_ptr<ProgramState> mProgram;
+  int mIndex;
+};
+
+class GlProgram final : public Qelt::OpenGLShaderProgram {
+ public:
+  explicit GlProgram(std::shared_ptr<ProgramState> state) : mState(std::move(state)) {}
+
+  void activate() override { mState->use(); }
+
+  Qelt::IParameterBinding* getBindingIntf(const char* name, int type) override {
+    const int index = name != nullptr ? mState->find(name) : -1;
+    if (index < 0) return nullptr;
+    if (type != Qelt::kBindingAny && type != mState->uniform(index).type) return nullptr;
+    return new (std::nothrow) GlUniform(mState, index);
+  }
+
+  void release() override {
+    mState->destroy();
+    delete this;
+  }
+
+ private:
+  std::shared_ptr<ProgramState> mState;
+};
+
+}  // namespace
+
+}  // namespace QeltDesktop
+
+namespace Qelt {
+
+OpenGLShaderProgram* GraphicsFactory::createOpenGLShaderProgram(const char* vertexSource,
+                                                                const char* fragmentSource, const char*) {
+  if (vertexSource == nullptr || fragmentSource == nullptr) return nullptr;
+  if (QeltDesktop::GlDevice::live() == nullptr) return nullptr;
+  try {
+    auto state = std::make_shared<QeltDesktop::ProgramState>(vertexSource, fragmentSource);
+    if (!state->build()) return nullptr;
+    return new QeltDesktop::GlProgram(std::move(state));
+  } catch (const std::bad_alloc&) {
+    return nullptr;
+  }
+}
+
+}  // namespace Qelt

@@ -1,0 +1,58 @@
+#include "desktop/graphics/CanvasLayer.h"
+
+#include <stdexcept>
+#include <string>
+
+#include "desktop/gl/GlDevice.h"
+#include "desktop/gl/RenderQueue.h"
+#include "desktop/graphics/GlBitmap.h"
+
+namespace Qelt {
+
+ISPLayer::~ISPLayer() = default;
+
+}  // namespace Qelt
+
+namespace QeltDesktop {
+
+CanvasLayer::CanvasLayer(RenderQueue& queue, int width, int height, int tileSize)
+    : mQueue(queue), mWidth(width), mHeight(height) {
+  const std::string size = std::to_string(width) + " x " + std::to_string(height) + " pixels";
+  if (width < 1 || height < 1 || tileSize < 1) throw std::runtime_error("a page of " + size + " has no area");
+  const bool ran = mQueue.run([&] {
+    const GlDevice* const device = GlDevice::live();
+    if (device == nullptr) throw std::runtime_error("a page needs OpenGL, and there is none");
+    const int most = device->maxTextureSize();
+    if (width > most || height > most) {
+      throw std::runtime_error("a page of " + size + " is larger than OpenGL can draw here (" +
+                               std::to_string(most) + " x " + std::to_string(most) + ")");
+    }
+    mBitmap = std::make_unique<GlBitmap>(width, height, tileSize, GlBitmap::OnLoss::Keep);
+    if (!mBitmap->isRenderable()) {
+      mBitmap.reset();
+      throw std::runtime_error("OpenGL has no memory for a page of " + size);
+    }
+  });
+  if (!ran) throw std::runtime_error("a page needs a render thread, and it has been shut down");
+}
+
+CanvasLayer::~CanvasLayer() {
+  mQueue.run([this] { mBitmap.reset(); });
+}
+
+Qelt::ISPBitmap* CanvasLayer::GetBitmap() {
+  return mBitmap.get();
+}
+
+void CanvasLayer::clear() {
+  mQueue.run([this] { mBitmap->clear(0.0f, 0.0f, 0.0f, 0.0f); });
+}
+
+std::vector<std::uint8_t> CanvasLayer::readPixels() {
+  std::vector<std::uint8_t> pixels;
+  mQueue.run([&] { pixels = mBitmap->readPixels(); });
+  if (pixels.empty()) throw std::runtime_error("a page cannot be read back without OpenGL");
+  return pixels;
+}
+
+}  // namespace QeltDesktop

@@ -1,0 +1,185 @@
+#include "desktop/graphics/GlBitmap.h"
+
+#include <algorithm>
+#include <cstddef>
+
+#include "desktop/gl/GlCall.h"
+
+namespace Qelt {
+
+ISPTexture::~ISPTexture() = default;
+ISPSubBitmap::~ISPSubBitmap() = default;
+ISPBitmap::~ISPBitmap() = default;
+
+}  // namespace Qelt
+
+namespace QeltDesktop {
+
+namespace {
+
+std::size_t byteCount(int width, int height) {
+  return static_cast<std::size_t>(width) * static_cast<std::size_t>(height) * 4;
+}
+
+}  // namespace
+
+void GlTexture::SetFilter(int filterParameter, int glValue) {
+  if (filterParameter == kMinFilter) mBitmap.setParameter(GL_TEXTURE_MIN_FILTER, glValue);
+  if (filterParameter == kMagFilter) mBitmap.setParameter(GL_TEXTURE_MAG_FILTER, glValue);
+}
+
+void GlTexture::SetParameter(unsigned int glName, int glValue) {
+  mBitmap.setParameter(glName, glValue);
+}
+
+void GlTexture::Bind(int textureUnit) {
+  constexpr int kUnits = 16;  // what every OpenGL ES 3.0 offers a fragment shader
+  if (textureUnit < 0 || textureUnit >= kUnits || !mBitmap.isLive()) return;
+  gl(glActiveTexture)(GL_TEXTURE0 + static_cast<GLenum>(textureUnit));
+  mBitmap.bindTexture();
+}
+
+GlTile::GlTile(GlBitmap& bitmap, int x, int y, int width, int height)
+    : mBitmap(bitmap), mX(x), mY(y), mWidth(width), mHeight(height) {
+  // Worked out in double: tiles whose size is a power of two then get a projection without any rounding.
+  mProjection[0] = static_cast<float>(2.0 / width);
+  mProjection[5] = static_cast<float>(2.0 / height);
+  mProjection[12] = static_cast<float>(-1.0 - 2.0 * x / width);
+  mProjection[13] = static_cast<float>(-1.0 - 2.0 * y / height);
+}
+
+void GlTile::BeginRender(int) {
+  mBitmap.beginRender(mX, mY, mWidth, mHeight);
+}
+
+void GlTile::EndRender(int) {
+  mBitmap.endRender();
+}
+
+GlBitmap::GlBitmap(int width, int height, int tileSize, OnLoss onLoss)
+    : mWidth(width), mHeight(height), mOnLoss(onLoss), mTextureInterface(*this) {
+  for (int y = 0; tileSize > 0 && y < height; y += std::min(tileSize, height - y)) {
+    for (int x = 0; x < width; x += std::min(tileSize, width - x)) {
+      mTiles.push_back(std::make_unique<GlTile>(*this, x, y, std::min(tileSize, width - x),
+                                                std::min(tileSize, height - y)));
+    }
+  }
+  // Sampling works without mipmaps from the start.
+  mParameters = {{GL_TEXTURE_MIN_FILTER, GL_LINEAR},
+                 {GL_TEXTURE_MAG_FILTER, GL_LINEAR},
+                 {GL_TEXTURE_WRAP_S, GL_CLAMP_TO_EDGE},
+                 {GL_TEXTURE_WRAP_T, GL_CLAMP_TO_EDGE}};
+  if (isLive()) makeTexture();
+}
+
+GlBitmap::~GlBitmap() {
+  if (!isLive()) return;
+  gl(glDeleteFramebuffers)(1, &mFramebuffer);
+  gl(glDeleteTextures)(1, &mTexture);
+}
+
+void GlBitmap::SetDebugName(const char*) {}
+
+void GlBitmap::SetPixels(const void* pixels, int width, int height) {
+  const int columns = std::min(width, mWidth);
+  const int rows = std::min(height, mHeight);
+  if (pixels == nullptr || columns <= 0 || rows <= 0 || !isLive()) return;
+  bindTexture();
+  gl(glPixelStorei)(GL_UNPACK_ROW_LENGTH, width);
+  gl(glTexSubImage2D)(GL_TEXTURE_2D, 0, 0, 0, columns, rows, GL_RGBA, GL_UNSIGNED_BYTE, pixels);
+  gl(glPixelStorei)(GL_UNPACK_ROW_LENGTH, 0);
+}
+
+Qelt::ISPSubBitmap* GlBitmap::GetSubBitmap(int index) {
+  if (index < 0 || index >= GetTileCount()) return nullptr;
+  return mTiles[static_cast<std::size_t>(index)].get();
+}
+
+bool GlBitmap::isRenderable() {
+  const bool complete =
+      bindFramebuffer() && gl(glCheckFramebufferStatus)(GL_FRAMEBUFFER) == GL_FRAMEBUFFER_COMPLETE;
+  if (isLive()) gl(glBindFramebuffer)(GL_FRAMEBUFFER, 0);
+  return complete;
+}
+
+bool GlBitmap::beginRender(int x, int y, int width, int height) {
+  if (!bindFramebuffer()) return false;
+  gl(glViewport)(x, y, width, height);
+  gl(glScissor)(x, y, width, height);
+  gl(glEnable)(GL_SCISSOR_TEST);
+  return true;
+}
+
+void GlBitmap::endRender() {
+  if (!isLive()) return;
+  gl(glDisable)(GL_SCISSOR_TEST);
+  gl(glBindFramebuffer)(GL_FRAMEBUFFER, 0);
+}
+
+void GlBitmap::clear(float red, float green, float blue, float alpha) {
+  if (!beginRender(0, 0, mWidth, mHeight)) return;
+  gl(glClearColor)(red, green, blue, alpha);
+  gl(glClear)(GL_COLOR_BUFFER_BIT);
+  endRender();
+}
+
+std::vector<std::uint8_t> GlBitmap::readPixels() {
+  std::vector<std::uint8_t> pixels;
+  if (!bindFramebuffer()) return pixels;
+  pixels.resize(byteCount(mWidth, mHeight));
+  gl(glReadPixels)(0, 0, mWidth, mHeight, GL_RGBA, GL_UNSIGNED_BYTE, pixels.data());
+  gl(glBindFramebuffer)(GL_FRAMEBUFFER, 0);
+  return pixels;
+}
+
+void GlBitmap::save() {
+  if (mOnLoss == OnLoss::Keep) mSaved = readPixels();
+}
+
+void GlBitmap::forget() {
+  mTexture = mFramebuffer = 0;
+}
+
+void GlBitmap::remake() {
+  makeTexture();
+}
+
+void GlBitmap::makeTexture() {
+  // Drivers need not zero a new texture.
+  if (mSaved.empty()) mSaved.resize(byteCount(mWidth, mHeight));
+  gl(glGenTextures)(1, &mTexture);
+  bindTexture();
+  gl(glTexImage2D)(GL_TEXTURE_2D, 0, GL_RGBA8, mWidth, mHeight, 0, GL_RGBA, GL_UNSIGNED_BYTE, mSaved.data());
+  for (const auto& [name, value] : mParameters) gl(glTexParameteri)(GL_TEXTURE_2D, name, value);
+  mSaved = {};
+}
+
+bool GlBitmap::bindFramebuffer() {
+  if (!isLive()) return false;
+  const bool isNew = mFramebuffer == 0;
+  if (isNew) gl(glGenFramebuffers)(1, &mFramebuffer);
+  gl(glBindFramebuffer)(GL_FRAMEBUFFER, mFramebuffer);
+  if (isNew) {
+    gl(glFramebufferTexture2D)(GL_FRAMEBUFFER, GL_COLOR_ATTACHMENT0, GL_TEXTURE_2D, mTexture, 0);
+  }
+  return true;
+}
+
+void GlBitmap::bindTexture() {
+  gl(glBindTexture)(GL_TEXTURE_2D, mTexture);
+}
+
+void GlBitmap::setParameter(GLenum name, GLint value) {
+  const auto known = std::find_if(mParameters.begin(), mParameters.end(),
+                                  [&](const auto& parameter) { return parameter.first == name; });
+  if (known == mParameters.end()) {
+    mParameters.emplace_back(name, value);
+  } else {
+    known->second = value;
+  }
+  if (!isLive()) return;
+  bindTexture();
+  gl(glTexParameteri)(GL_TEXTURE_2D, name, value);
+}
+
+}  // namespace QeltDesktop

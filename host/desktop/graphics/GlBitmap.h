@@ -1,0 +1,101 @@
+#pragma once
+
+#include <GLES3/gl3.h>
+
+#include <cstdint>
+#include <memory>
+#include <utility>
+#include <vector>
+
+#include "base/HostApi.h"
+#include "desktop/gl/GlDevice.h"
+#include "graphics/ISPBitmap.h"
+#include "math/Matrix4.h"
+
+namespace QeltDesktop {
+
+class GlBitmap;
+
+// The texture of a bitmap: nothing but the bitmap seen from another side.
+class GlTexture final : public Qelt::ISPTexture {
+ public:
+  explicit GlTexture(GlBitmap& bitmap) : mBitmap(bitmap) {}
+  void SetFilter(int filterParameter, int glValue) override;
+  void SetParameter(unsigned int glName, int glValue) override;
+  void Bind(int textureUnit) override;
+
+ private:
+  GlBitmap& mBitmap;
+};
+
+// One tile: a window into the bitmap's framebuffer.
+class GlTile final : public Qelt::ISPSubBitmap {
+ public:
+  GlTile(GlBitmap& bitmap, int x, int y, int width, int height);
+  int GetX() const override { return mX; }
+  int GetY() const override { return mY; }
+  int GetWidth() const override { return mWidth; }
+  int GetHeight() const override { return mHeight; }
+  const Qelt::Matrix4<float>& GetProjection() const override { return mProjection; }
+  void BeginRender(int mode) override;
+  void EndRender(int mode) override;
+
+ private:
+  GlBitmap& mBitmap;
+  int mX, mY, mWidth, mHeight;
+  Qelt::Matrix4<float> mProjection;
+};
+
+// An RGBA8 texture, its first row texture coordinate 0 and window coordinate 0. It is zeroed when made and
+// when it comes back after a context loss, unless it keeps its pixels. Made by any thread, used and
+// destroyed on the render thread.
+class QELT_HOST_API GlBitmap final : public Qelt::ISPBitmap, public GlResource {
+ public:
+  // What happens to the pixels when the context is lost.
+  enum class OnLoss { Zero, Keep };
+
+  // `tileSize` 0: no tiles, the bitmap is no render target for pens.
+  GlBitmap(int width, int height, int tileSize, OnLoss onLoss);
+  ~GlBitmap() override;
+
+  int GetWidth() const override { return mWidth; }
+  int GetHeight() const override { return mHeight; }
+  Qelt::ISPTexture* GetTexture() override { return &mTextureInterface; }
+  void SetDebugName(const char* name) override;
+  void SetPixels(const void* pixels, int width, int height) override;
+  int GetTileCount() const override { return static_cast<int>(mTiles.size()); }
+  Qelt::ISPSubBitmap* GetSubBitmap(int index) override;
+
+  // True when the texture and a framebuffer around it exist in the current context.
+  bool isRenderable();
+  // Makes a rectangle the render target: framebuffer, viewport and scissor. False without a context.
+  bool beginRender(int x, int y, int width, int height);
+  void endRender();
+  void clear(float red, float green, float blue, float alpha);
+  // width x height x 4 bytes, first row first; empty without a context.
+  std::vector<std::uint8_t> readPixels();
+
+ private:
+  friend class GlTexture;
+
+  void save() override;
+  void forget() override;
+  void remake() override;
+
+  void makeTexture();
+  bool bindFramebuffer();
+  void bindTexture();
+  void setParameter(GLenum name, GLint value);
+
+  const int mWidth;
+  const int mHeight;
+  const OnLoss mOnLoss;
+  GlTexture mTextureInterface;
+  std::vector<std::unique_ptr<GlTile>> mTiles;
+  std::vector<std::pair<GLenum, GLint>> mParameters;  // set again in the next context
+  std::vector<std::uint8_t> mSaved;                   // while the context is lost
+  GLuint mTexture = 0;
+  GLuint mFramebuffer = 0;
+};
+
+}  // namespace QeltDesktop

@@ -1,0 +1,35 @@
+#pragma once
+
+#include "base/HostApi.h"
+#include "graphics/ISPPenCanvas.h"
+#include "math/Matrix3.h"
+
+namespace QeltDesktop {
+
+class CanvasLayer;
+
+// A view of a layer. Everything it is given is borrowed and outlives it. Main thread, but for the layer.
+class QELT_HOST_API PenCanvas : public Qelt::ISPPenCanvas {
+ public:
+  // Without a layer nothing is drawn and no GL is needed.
+  PenCanvas(Qelt::IGLMsgQueue* queue, CanvasLayer* layer);
+  ~PenCanvas() override;
+
+  // Stroke units to canvas pixels, column-major; the identity at first. Also tells the cache of stored
+  // strokes the scale that their drawings are computed at from now on.
+  void setMatrix(const Qelt::Matrix3<float>& matrix);
+  CanvasLayer* layer() const { return mLayer; }
+
+  Qelt::IGLMsgQueue* GetMsgQueue() override;
+  const Qelt::Matrix3<float>& GetMatrix() override;
+  Qelt::ISPLayer* GetLayer() override;
+  void BeginTile(int index) override;
+  void EndTile(int index) override;
+
+ private:
+  Qelt::IGLMsgQueue* mQueue;
+  CanvasLayer* mLayer;
+  Qelt::Matrix3<float> mMatrix;
+};
+
+}  // namespace QeltDesktop

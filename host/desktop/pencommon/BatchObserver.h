@@ -1,0 +1,31 @@
+#pragma once
+
+#include <functional>
+#include <initializer_list>
+#include <vector>
+
+#include "base/HostApi.h"
+
+namespace Qelt {
+class PenDrawableRT;
+}  // namespace Qelt
+
+namespace QeltDesktop {
+
+// A copy of what one hand-over brought to a render drawable.
+struct Batch {
+  const Qelt::PenDrawableRT* drawable;
+  bool cached;                              // by SetCacheBuffer
+  std::vector<std::vector<float>> buffers;  // one, or an outline's two: inner first
+};
+
+// Whom to show every batch that reaches a render drawable, on the render thread; an empty function ends it.
+// Any thread.
+QELT_HOST_API void setBatchObserver(std::function<void(Batch)> observer);
+
+// Shows a hand-over to the observer, if there is one. Null buffers are left out, and a hand-over of nothing
+// else is not shown. Render thread.
+void observeBatch(const Qelt::PenDrawableRT* drawable, bool cached,
+                  std::initializer_list<const std::vector<float>*> buffers);
+
+}  // namespace QeltDesktop

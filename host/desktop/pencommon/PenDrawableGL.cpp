@@ -1,0 +1,109 @@
+#include "pencommon/PenDrawableGL.h"
+
+#include "desktop/gl/CallTask.h"
+#include "desktop/gl/RenderQueue.h"
+#include "desktop/graphics/CanvasLayer.h"
+#include "desktop/graphics/PenCanvas.h"
+#include "graphics/ISPPenCanvas.h"
+#include "pencommon/PenDrawableRT.h"
+#include "pencommon/PenGLDataManager.h"
+
+namespace Qelt {
+
+namespace {
+
+// The way to the render thread: the pens' own, else the canvas's.
+IGLMsgQueue* queueOf(PenGLDataManager* manager, ISPPenCanvas* canvas) {
+  IGLMsgQueue* const queue = manager != nullptr ? manager->GetMsgQueue() : nullptr;
+  if (queue != nullptr || canvas == nullptr) return queue;
+  return canvas->GetMsgQueue();
+}
+
+// Runs a call once the queue has run everything it took: there, while it still runs, else here.
+template <typename Call>
+void runAfterAll(IGLMsgQueue* queue, Call call) {
+  auto* const renderQueue = dynamic_cast<QeltDesktop::RenderQueue*>(queue);
+  if (renderQueue == nullptr || !renderQueue->run(call)) call();
+}
+
+}  // namespace
+
+PenDrawableGL::PenDrawableGL(PenGLDataManager* manager) : mDataManager(manager) {}
+
+PenDrawableGL::~PenDrawableGL() {
+  destroy();
+}
+
+void PenDrawableGL::SetCanvas(ISPPenCanvas* canvas) {
+  mCanvas = canvas;
+  prepareDrawableRT();
+}
+
+ISPPenCanvas* PenDrawableGL::GetCanvas() {
+  return mCanvas;
+}
+
+int PenDrawableGL::GetCanvasBitmapType() {
+  return 0;
+}
+
+void PenDrawableGL::SetCanvasCleared() {}
+
+IReferenceBitmapSettable* PenDrawableGL::GetReferenceBitmapSettable() {
+  return mDrawableRT != nullptr ? mDrawableRT->GetReferenceBitmapSettable() : nullptr;
+}
+
+IDepthMapBitmapSettable* PenDrawableGL::GetDepthMapBitmapSettable() {
+  return mDrawableRT != nullptr ? mDrawableRT->GetDepthMapBitmapSettable() : nullptr;
+}
+
+void PenDrawableGL::setDrawableRT(PenDrawableRT* drawable) {
+  if (drawable == mDrawableRT) return;
+  destroy();
+  mDrawableRT = drawable;
+  prepareDrawableRT();
+}
+
+void PenDrawableGL::prepareDrawableRT() {
+  if (mCanvas == nullptr || mDrawableRT == nullptr) return;
+  IGLMsgQueue* const queue = queueOf(mDataManager, mCanvas);
+  if (queue == nullptr) return;
+  int width = 0;
+  int height = 0;
+  // Other hosts' canvases do not tell their layer to this thread; they are taken to have one.
+  if (const auto* const canvas = dynamic_cast<const QeltDesktop::PenCanvas*>(mCanvas)) {
+    if (canvas->layer() == nullptr) return;
+    width = canvas->layer()->width();
+    height = canvas->layer()->height();
+  }
+  const bool posted = QeltDesktop::postCall(*queue, [drawable = mDrawableRT, width, height, queue] {
+    drawable->CreatePenCanvas(width, height, queue);
+  });
+  mPrepared = mPrepared || posted;
+}
+
+void PenDrawableGL::destroy() {
+  PenDrawableRT* const drawable = mDrawableRT;
+  const bool prepared = mPrepared;
+  mDrawableRT = nullptr;
+  mPrepared = false;
+  if (drawable == nullptr) return;
+  IGLMsgQueue* const queue = queueOf(mDataManager, mCanvas);
+  if (queue == nullptr) {
+    delete drawable;
+    return;
+  }
+  const bool released = prepared && QeltDesktop::postCall(*queue, [drawable] { drawable->Release(); });
+  if (prepared && !released) {
+    runAfterAll(queue, [drawable] {
+      drawable->Release();
+      delete drawable;
+    });
+    return;
+  }
+  if (!QeltDesktop::postCall(*queue, [drawable] { delete drawable; })) {
+    runAfterAll(queue, [drawable] { delete drawable; });
+  }
+}
+
+}  // namespace Qelt
