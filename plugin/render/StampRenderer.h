@@ -46,20 +46,42 @@ class StampRenderer : public HostBase {
 
   void AddPoint(Vector2<float>, float) final {}
 
-  // Appends one stamp to the write buffer. `point` addresses the centre, then the direction (-sin a, cos a).
-  // `size`: the stamp's width (version 1 and 2, preview) or half width (version 3, prediction), stroke units.
-  // `tile`: stamp shape 0, 1 or 2. Throws std::bad_alloc where the buffer cannot grow; without a buffer
-  // nothing happens.
-  void AddPoint(const Vector2<float>* point, float size, float alpha, float tiltBlend, int tile) {
-    std::vector<float>* buffer = this->mWriteBuffer;
-    if (buffer == nullptr) return;
-    const StampLook look{alpha, tiltBlend, static_cast<float>(tile), point[1]};
-    const auto vertices = stampVertices<kFloatsPerVertex>(quad(point[0], size), look);
-    buffer->insert(buffer->end(), vertices.begin(), vertices.end());
-  }
+  // Appends stamps to the write buffer. Each has a centre and a direction (-sin a, cos a), two vectors in a
+  // row; a size, the stamp's width (versions 1 and 2, preview) or half width (version 3, prediction) in
+  // stroke units; an opacity factor; a tilt blend; and its shape, tile 0, 1 or 2. Lives while the buffer and
+  // the inverse scale stay as they are.
+  class Appender {
+   public:
+    // Makes room for so many stamps, so that appending them does not allocate. Throws std::bad_alloc.
+    Appender(StampRenderer& renderer, std::size_t stamps)
+        : mStamps(renderer.mWriteBuffer, stamps), mInverseScale(renderer.mInverseScale) {}
 
-  // Makes room for stamps to come, so that appending them does not allocate. Throws std::bad_alloc.
-  void reserve(std::size_t stamps) { reserveStamps(this->mWriteBuffer, stamps, kFloatsPerStamp); }
+    void AddPoint(const Vector2<float>* point, float size, float alpha, float tiltBlend, int tile) {
+      mStamps.add(quad(point[0], size), {alpha, tiltBlend, static_cast<float>(tile), point[1]});
+    }
+
+    // The buffer holds all stamps from here on.
+    void flush() { mStamps.flush(); }
+
+   private:
+    StampQuad quad(Vector2<float> centre, float size) const {
+      if constexpr (kAntialiased) {
+        return antialiasedQuad(centre, size, mInverseScale);
+      } else {
+        return squareQuad(centre, size);
+      }
+    }
+
+    StampAppender<kFloatsPerVertex> mStamps;
+    Vector2<float> mInverseScale;
+  };
+
+  // Appends one stamp. Throws std::bad_alloc where the buffer cannot grow; without a buffer nothing happens.
+  void AddPoint(const Vector2<float>* point, float size, float alpha, float tiltBlend, int tile) {
+    Appender one(*this, 1);
+    one.AddPoint(point, size, alpha, tiltBlend, tile);
+    one.flush();
+  }
 
   UnclaimedBatch* unclaimedBatch() { return &mUnclaimed; }
 
@@ -171,14 +193,6 @@ class StampRenderer : public HostBase {
 
  private:
   static constexpr int kGrainSide = 150;
-
-  StampQuad quad(Vector2<float> centre, float size) const {
-    if constexpr (kAntialiased) {
-      return antialiasedQuad(centre, size, mInverseScale);
-    } else {
-      return squareQuad(centre, size);
-    }
-  }
 
   const std::vector<float>* currentBatch() const {
     if constexpr (kProfile.hasCacheBuffer) {

@@ -360,10 +360,9 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
   // One stamp every spacing, the leftover carried from segment to segment.
   void placeSpaced(float length, float width, float alpha, float blend, RectF* rect) {
     const float first = mCarried;
-    mRender->reserve(spacedStamps(first, kProfile.stampSpacing, length));
     // The ramps' count is worked out apart from the walk, and may differ from it by one.
     const int count = rules::incremented(rules::saturatedCount((length - first) / kProfile.stampSpacing));
-    StampRun run(*this, width, alpha, blend, count);
+    StampRun run(*this, width, alpha, blend, count, spacedStamps(first, kProfile.stampSpacing, length));
     const WalkResult walk = walkSpaced(mPath.path(), first, kProfile.stampSpacing, length, run);
     run.finish(rect);
     mCarried = walk.carry;
@@ -379,8 +378,8 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
                             static_cast<double>(length), static_cast<double>(size));
       }
     }
-    mRender->reserve(static_cast<std::size_t>(std::min(count, kMostStampsPerSegment)));
-    StampRun run(*this, width, alpha, blend, count);
+    const int most = std::min(count, kMostStampsPerSegment);
+    StampRun run(*this, width, alpha, blend, count, static_cast<std::size_t>(most));
     const bool cutShort = walkEvenly(mPath.path(), count, length, run);
     run.finish(rect);
     if (cutShort) logCut(length);
@@ -390,13 +389,15 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
   // walk runs in registers.
   class StampRun {
    public:
-    StampRun(StrokePipeline& pen, float width, float alpha, float blend, int count)
+    // `steps`: of the ramps; `stamps`: at the most.
+    StampRun(StrokePipeline& pen, float width, float alpha, float blend, int steps, std::size_t stamps)
         : mPen(pen),
+          mAppender(*pen.mRender, stamps),
           mWidth(pen.mWidth),
           mAlpha(pen.mAlpha),
-          mWidthStep(rules::rampStep(pen.mWidth, width, count)),
-          mAlphaStep(kProfile.stampCount == nullptr ? (alpha - pen.mAlpha) / static_cast<float>(count)
-                                                    : rules::rampStep(pen.mAlpha, alpha, count)),
+          mWidthStep(rules::rampStep(pen.mWidth, width, steps)),
+          mAlphaStep(kProfile.stampCount == nullptr ? (alpha - pen.mAlpha) / static_cast<float>(steps)
+                                                    : rules::rampStep(pen.mAlpha, alpha, steps)),
           mBlend(blend),
           mStamps(pen.mStamps) {
       mStamp[1] = pen.direction();
@@ -405,14 +406,15 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     void operator()(SmPoint at) {
       mStamp[0] = {at.x, at.y};
       mBox.add(at.x, at.y, kProfile.stampReach(mWidth));
-      mPen.mRender->AddPoint(mStamp, kProfile.stampSize(mWidth), kProfile.stampAlpha(mAlpha), mBlend,
-                             mStamps.next());
+      mAppender.AddPoint(mStamp, kProfile.stampSize(mWidth), kProfile.stampAlpha(mAlpha), mBlend,
+                         mStamps.next());
       mLastAlpha = mAlpha;
       mWidth += mWidthStep;
       mAlpha += mAlphaStep;
     }
 
     void finish(RectF* rect) {
+      mAppender.flush();
       mBox.uniteInto(rect);
       mPen.mStamps = mStamps;
       mPen.mLastStamp = mStamp[0];
@@ -421,6 +423,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
 
    private:
     StrokePipeline& mPen;
+    typename RenderDrawable::Appender mAppender;
     float mWidth, mAlpha;
     float mWidthStep, mAlphaStep;
     float mBlend;
