@@ -13,7 +13,9 @@ std::string_view withoutPrefix(std::string_view name) {
 
 }  // namespace
 
-std::string_view localName(const pugi::xml_node& node) { return withoutPrefix(node.name()); }
+std::string_view localName(const pugi::xml_node& node) {
+  return withoutPrefix(node.name());
+}
 
 bool isElement(const pugi::xml_node& node, std::string_view name) {
   return node.type() == pugi::node_element && localName(node) == name;

@@ -169,8 +169,8 @@ class PageReader {
     if (depth > kDeepestNesting) throw refusalAt(mSource, context, "contextRef leads back to itself", "");
     if (const pugi::xml_node own = childElement(context, "traceFormat")) return own;
     if (const pugi::xml_node named = referred(context, "traceFormatRef", "traceFormat")) return named;
-    for (const pugi::xml_node& ink : {childElement(context, "inkSource"),
-                                      referred(context, "inkSourceRef", "inkSource")}) {
+    for (const pugi::xml_node& ink :
+         {childElement(context, "inkSource"), referred(context, "inkSourceRef", "inkSource")}) {
       if (const pugi::xml_node format = childElement(ink, "traceFormat")) return format;
     }
     return formatOfContext(referred(context, "contextRef", "context"), depth + 1);
@@ -242,8 +242,12 @@ class PageReader {
 
 }  // namespace
 
-Page readInkml(const SourceText& source) { return PageReader(source).read(); }
+Page readInkml(const SourceText& source) {
+  return PageReader(source).read();
+}
 
-Page readInkmlFile(const std::string& path) { return readInkml(SourceText::fromFile(path)); }
+Page readInkmlFile(const std::string& path) {
+  return readInkml(SourceText::fromFile(path));
+}
 
 }  // namespace QeltDesktop

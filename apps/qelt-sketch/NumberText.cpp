@@ -1,12 +1,12 @@
 #include "NumberText.h"
 
+#include <locale.h>
 #include <charconv>
 #include <cmath>
 #include <cstddef>
 #include <cstdio>
 #include <cstdlib>
 #include <string>
-#include <locale.h>
 #include <system_error>
 
 namespace QeltDesktop {
@@ -17,8 +17,12 @@ locale_t plainLocale() {
   return kPlain;
 }
 
-float fromPlain(const char* text, float) { return strtof_l(text, nullptr, plainLocale()); }
-double fromPlain(const char* text, double) { return strtod_l(text, nullptr, plainLocale()); }
+float fromPlain(const char* text, float) {
+  return strtof_l(text, nullptr, plainLocale());
+}
+double fromPlain(const char* text, double) {
+  return strtod_l(text, nullptr, plainLocale());
+}
 
 template <typename Number>
 std::optional<Number> parse(std::string_view text) {
@@ -47,9 +51,13 @@ std::optional<unsigned int> parseHexColor(std::string_view text, std::size_t dig
 
 }  // namespace
 
-std::optional<float> parseFloat(std::string_view text) { return parse<float>(text); }
+std::optional<float> parseFloat(std::string_view text) {
+  return parse<float>(text);
+}
 
-std::optional<double> parseDouble(std::string_view text) { return parse<double>(text); }
+std::optional<double> parseDouble(std::string_view text) {
+  return parse<double>(text);
+}
 
 std::optional<int> parseInt(std::string_view text) {
   int value = 0;
@@ -76,9 +84,13 @@ void appendJson(std::string& out, float value) {
   if (digits.find_first_of(".e") == std::string_view::npos) out += ".0";
 }
 
-std::optional<unsigned int> parseRgb(std::string_view text) { return parseHexColor(text, 6); }
+std::optional<unsigned int> parseRgb(std::string_view text) {
+  return parseHexColor(text, 6);
+}
 
-std::optional<unsigned int> parseArgb(std::string_view text) { return parseHexColor(text, 8); }
+std::optional<unsigned int> parseArgb(std::string_view text) {
+  return parseHexColor(text, 8);
+}
 
 std::string formatArgb(unsigned int argb) {
   char text[16];

@@ -14,8 +14,9 @@ std::string oneLine(const std::string& text) {
     while (end > 0 && (static_cast<unsigned char>(line[end]) & 0xC0) == 0x80) --end;
     line = line.substr(0, end) + "...";
   }
-  std::replace_if(line.begin(), line.end(),
-                  [](char c) { return static_cast<unsigned char>(c) < 0x20 || c == 0x7F; }, ' ');
+  std::replace_if(
+      line.begin(), line.end(), [](char c) { return static_cast<unsigned char>(c) < 0x20 || c == 0x7F; },
+      ' ');
   return line;
 }
 

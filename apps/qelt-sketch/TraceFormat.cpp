@@ -69,7 +69,8 @@ Channel readChannel(const SourceText& source, const pugi::xml_node& node) {
     const std::string text = textOf(node, "max");
     const std::optional<float> max = parseFloat(text);
     if (!max || !std::isfinite(*max) || *max <= 0.0f) {
-      throw refusalAt(source, node, "max of channel F must be a number above 0", text.empty() ? "\"\"" : text);
+      throw refusalAt(source, node, "max of channel F must be a number above 0",
+                      text.empty() ? "\"\"" : text);
     }
     channel.max = *max;
   }

@@ -22,11 +22,19 @@ struct ChannelState {
   double change = 0.0;  // from the value before the last to the last
 };
 
-bool isSpace(char c) { return c == ' ' || c == '\t' || c == '\n' || c == '\r'; }
-bool isDigit(char c) { return c >= '0' && c <= '9'; }
-bool isHexDigit(char c) { return isDigit(c) || (c >= 'A' && c <= 'F') || (c >= 'a' && c <= 'f'); }
+bool isSpace(char c) {
+  return c == ' ' || c == '\t' || c == '\n' || c == '\r';
+}
+bool isDigit(char c) {
+  return c >= '0' && c <= '9';
+}
+bool isHexDigit(char c) {
+  return isDigit(c) || (c >= 'A' && c <= 'F') || (c >= 'a' && c <= 'f');
+}
 // What may follow a number without a space between.
-bool startsValue(char c) { return std::string_view("!'\"+-#*?TF").find(c) != std::string_view::npos; }
+bool startsValue(char c) {
+  return std::string_view("!'\"+-#*?TF").find(c) != std::string_view::npos;
+}
 
 }  // namespace
 
@@ -34,7 +42,10 @@ bool startsValue(char c) { return std::string_view("!'\"+-#*?TF").find(c) != std
 class TraceText::Scanner {
  public:
   Scanner(const TraceText& trace, const TraceFormat& format)
-      : mTrace(trace), mText(trace.mText), mFormat(format), mStates(format.channels.size()),
+      : mTrace(trace),
+        mText(trace.mText),
+        mFormat(format),
+        mStates(format.channels.size()),
         mPoint(format.channels.size()) {}
 
   bool atEnd() const { return mAt == mText.size(); }
@@ -174,7 +185,8 @@ class TraceText::Scanner {
   Refusal wrongCount() const {
     const std::string point = trimmed(textUntil(mPointStart, [](char c) { return c == ','; }));
     const std::string wanted = std::to_string(mFormat.regularCount);
-    return mTrace.mSource.refusal(mTrace.lineAt(mPointStart), "point does not have the " + wanted + " values of its format",
+    return mTrace.mSource.refusal(mTrace.lineAt(mPointStart),
+                                  "point does not have the " + wanted + " values of its format",
                                   point.empty() ? "\"\"" : point);
   }
 
@@ -201,9 +213,8 @@ TraceText::TraceText(const SourceText& source, const pugi::xml_node& trace) : mS
   if (trimmed(mText).empty()) throw refusalAt(source, trace, "trace without points", "");
 }
 
-void TraceText::forEachPoint(
-    const TraceFormat& format,
-    const std::function<void(const std::vector<Reading>&)>& take) const {
+void TraceText::forEachPoint(const TraceFormat& format,
+                             const std::function<void(const std::vector<Reading>&)>& take) const {
   Scanner scanner(*this, format);
   while (!scanner.atEnd()) take(scanner.readPoint());
 }

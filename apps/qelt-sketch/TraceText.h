@@ -14,7 +14,7 @@ namespace QeltDesktop {
 
 // One channel's value at one point.
 struct Reading {
-  bool known = false;    // false until the channel has had a value, and where "?" says it has none
+  bool known = false;  // false until the channel has had a value, and where "?" says it has none
   double value = 0.0;
   float nearest = 0.0f;  // of a plain number the float nearest to the decimal, rounded once
 };
@@ -24,10 +24,11 @@ class TraceText {
  public:
   TraceText(const SourceText& source, const pugi::xml_node& trace);
 
-  // Hands over the points in order, one reading a channel. An omitted intermittent value and "?" leave the channel's reading as it was; "*" repeats the number before it under
-  // the same prefix. Differences add up from the channel's last value: ' is the change, " the change of the
-  // change; a prefix holds for its channel until the next one. Throws Refusal at the first malformed value,
-  // and at one that no float can hold in a channel that we use.
+  // Hands over the points in order, one reading a channel. An omitted intermittent value and "?" leave the
+  // channel's reading as it was; "*" repeats the number before it under the same prefix. Differences add up
+  // from the channel's last value: ' is the change, " the change of the change; a prefix holds for its
+  // channel until the next one. Throws Refusal at the first malformed value, and at one that no float can
+  // hold in a channel that we use.
   void forEachPoint(const TraceFormat& format,
                     const std::function<void(const std::vector<Reading>&)>& take) const;
 

@@ -1,0 +1,255 @@
+#include "Options.h"
+
+#include <cmath>
+#include <functional>
+#include <map>
+#include <sstream>
+#include <string_view>
+#include <utility>
+
+#include <CLI/CLI.hpp>
+
+#include "NumberText.h"
+#include "engine/MotionEvent.h"
+
+namespace QeltDesktop {
+namespace {
+
+template <typename Value>
+using Parser = std::function<std::optional<Value>(const std::string&)>;
+
+// An option whose text `parse` understands; every number goes through our own parsers, which no locale bends.
+template <typename Value, typename Target>
+void addValue(CLI::App& app, const char* name, Target& target, const Parser<Value>& parse, const char* shape,
+              const char* help) {
+  app.add_option_function<std::string>(
+         name,
+         [&target, parse, name, shape](const std::string& text) {
+           const std::optional<Value> value = parse(text);
+           if (!value)
+             throw CLI::ValidationError(name, std::string("expects ") + shape + ", not '" + text + "'");
+           target = *value;
+         },
+         help)
+      ->type_name(shape);
+}
+
+std::optional<int> countFrom(int least, const std::string& text) {
+  const std::optional<int> count = parseInt(text);
+  return count && *count >= least ? count : std::nullopt;
+}
+std::optional<int> count(const std::string& text) {
+  return countFrom(1, text);
+}
+std::optional<int> countOrNone(const std::string& text) {
+  return countFrom(0, text);
+}
+std::optional<int> integer(const std::string& text) {
+  return parseInt(text);
+}
+
+std::optional<float> anyFloat(const std::string& text) {
+  return parseFloat(text);
+}
+
+std::optional<float> finiteFloat(const std::string& text) {
+  const std::optional<float> value = parseFloat(text);
+  return value && std::isfinite(*value) ? value : std::nullopt;
+}
+
+std::optional<float> positiveFloat(const std::string& text) {
+  const std::optional<float> value = finiteFloat(text);
+  return value && *value > 0.0f ? value : std::nullopt;
+}
+
+std::optional<float> share(const std::string& text) {
+  const std::optional<float> value = parseFloat(text);
+  return value && *value >= 0.0f && *value <= 1.0f ? value : std::nullopt;
+}
+
+std::optional<std::uint32_t> argbColor(const std::string& text) {
+  return parseArgb(text);
+}
+
+std::optional<PageSize> pageSize(const std::string& text) {
+  const std::size_t cross = text.find('x');
+  if (cross == std::string::npos) return std::nullopt;
+  const std::optional<float> width = positiveFloat(text.substr(0, cross));
+  const std::optional<float> height = positiveFloat(text.substr(cross + 1));
+  if (!width || !height) return std::nullopt;
+  return PageSize{*width, *height};
+}
+
+std::optional<OutlineOptions> outline(const std::string& text) {
+  const std::size_t comma = text.find(',');
+  if (comma == std::string::npos) return std::nullopt;
+  const std::optional<float> size = parseFloat(text.substr(0, comma));
+  const std::optional<unsigned int> argb = parseArgb(text.substr(comma + 1));
+  if (!size || !argb) return std::nullopt;
+  return OutlineOptions{*size, *argb};
+}
+
+// The outer value says that the text was understood, the inner one is the colour or none for transparent.
+std::optional<std::optional<std::uint32_t>> background(const std::string& text) {
+  if (text == "white") return std::optional<std::uint32_t>(0xFFFFFF);
+  if (text == "transparent") return std::optional<std::uint32_t>();
+  const std::optional<unsigned int> rgb = parseRgb(text);
+  if (!rgb) return std::nullopt;
+  return std::optional<std::uint32_t>(*rgb);
+}
+
+template <typename Value>
+Parser<Value> oneOf(std::map<std::string, Value> names) {
+  return [names = std::move(names)](const std::string& text) -> std::optional<Value> {
+    const auto found = names.find(text);
+    if (found == names.end()) return std::nullopt;
+    return found->second;
+  };
+}
+
+const std::map<std::string, Mode> kModes{
+    {"live", Mode::Live}, {"event", Mode::Event}, {"stroke", Mode::Stroke}};
+const std::map<std::string, int> kTools{
+    {"stylus", Qelt::kToolStylus}, {"finger", Qelt::kToolFinger}, {"mouse", Qelt::kToolMouse}};
+const std::map<std::string, DrawableKind> kDrawables{{"stroke", DrawableKind::Stroke},
+                                                     {"outline", DrawableKind::Outline},
+                                                     {"preview", DrawableKind::Preview},
+                                                     {"prediction", DrawableKind::Prediction}};
+
+template <typename Value>
+const char* nameIn(const std::map<std::string, Value>& names, Value value) {
+  for (const auto& [name, named] : names) {
+    if (named == value) return name.c_str();
+  }
+  return "";
+}
+
+// Option by option, in the order the help shows them.
+
+void addInput(CLI::App& app, Options& options) {
+  app.add_option("INPUT", options.input, "page of W3C InkML (default: the sample page)")->type_name("");
+}
+
+void addOutput(CLI::App& app, Options& options, const char* help) {
+  app.add_option("-o,--output", options.output, help)->required()->type_name("FILE");
+}
+
+void addPlugin(CLI::App& app, Options& options) {
+  app.add_option("--plugin", options.plugin, "pen plug-in to load")->type_name("FILE")->group("");
+}
+
+void addPen(CLI::App& app, Options& options) {
+  addValue<float>(app, "--size", options.size, anyFloat, "S",
+                  "pen size (default: the file's, else the pen's)");
+  addValue<std::uint32_t>(app, "--color", options.argb, argbColor, "'#AARRGGBB'",
+                          "pen colour (default: the file's, else the pen's)");
+}
+
+void addFeeding(CLI::App& app, Options& options) {
+  app.add_flag_callback(
+      "--no-curve", [&options] { options.curve = false; }, "straight segments");
+  addValue<Mode>(app, "--mode", options.mode, oneOf(kModes), "live|event|stroke",
+                 "how strokes reach the plug-in (default live)");
+  addValue<int>(app, "--batch", options.batch, count, "N", "live: samples a move event (default 4)");
+  addValue<int>(app, "--tool", options.tool, oneOf(kTools), "stylus|finger|mouse",
+                "tool (default: the file's, else stylus)");
+  addValue<int>(app, "--source", options.source, integer, "N",
+                "event source (default 16386 stylus, 4098 finger, 8194 mouse)");
+}
+
+void addDrawing(CLI::App& app, Options& options) {
+  addValue<int>(app, "--rendering-version", options.renderingVersion, integer, "N", "of the pen (default 8)");
+  addPen(app, options);
+  addFeeding(app, options);
+  addValue<int>(app, "--repeat", options.repeat, count, "N",
+                "draw the page N times, each onto a cleared layer; in stroke mode from the cache");
+  addValue<float>(app, "--zoom", options.zoom, positiveFloat, "Z", "canvas pixels a stroke unit (default 1)");
+  addValue<float>(app, "--rotate", options.rotate, finiteFloat, "DEG",
+                  "turn clockwise about the page's centre (default 0)");
+  addValue<PageSize>(app, "--page", options.page, pageSize, "WxH",
+                     "page in stroke units, from (0, 0) (default: the file's extent plus a margin)");
+  addValue<std::optional<std::uint32_t>>(app, "--background", options.background, background,
+                                         "white|transparent|'#RRGGBB'", "default white");
+  addValue<OutlineOptions>(app, "--outline", options.outline, outline, "SIZE,'#AARRGGBB'",
+                           "draw every stroke's outline under the strokes");
+  addValue<int>(app, "--predict", options.predict, countOrNone, "K",
+                "live: K predicted samples after every move event");
+  addValue<float>(app, "--opacity", options.opacity, share, "O", "of the prediction, 0 to 1 (default 0.5)");
+  addValue<int>(app, "--points", options.points, count, "N",
+                "stop after the first N points of the last trace, the pen still down");
+}
+
+// What no single option can see.
+void checkTogether(const Options& options) {
+  if (options.command != Command::Trace) return;
+  if (options.drawable == DrawableKind::Prediction && (options.mode != Mode::Live || options.predict == 0)) {
+    throw CLI::ValidationError("--drawable prediction", "needs --mode live and --predict K");
+  }
+  if (options.drawable == DrawableKind::Preview && options.mode == Mode::Stroke) {
+    throw CLI::ValidationError("--drawable preview", "takes --mode live or event");
+  }
+}
+
+}  // namespace
+
+std::variant<Options, UsageEnd> parseOptions(int argc, const char* const* argv) {
+  Options options;
+  CLI::App app("Draws recorded ink with the pencil plug-in.", "qelt-sketch");
+  app.require_subcommand(1);
+
+  CLI::App* const draw = app.add_subcommand("draw", "draw the page as a PNG picture");
+  addInput(*draw, options);
+  addOutput(*draw, options, "picture to write");
+  addDrawing(*draw, options);
+
+  CLI::App* const trace =
+      app.add_subcommand("trace", "write what the plug-in did, call by call, as JSON Lines");
+  addInput(*trace, options);
+  addOutput(*trace, options, "file to write; - is standard output");
+  addDrawing(*trace, options);
+  addValue<DrawableKind>(*trace, "--drawable", options.drawable, oneOf(kDrawables),
+                         "stroke|outline|preview|prediction", "whose calls to write (default stroke)");
+
+  CLI::App* const preview = app.add_subcommand("preview", "draw the settings panel's sample stroke");
+  addOutput(*preview, options, "picture to write");
+  addPen(*preview, options);
+
+  CLI::App* const sheet = app.add_subcommand("sheet", "draw the page once in every rendering version");
+  addInput(*sheet, options);
+  addOutput(*sheet, options, "picture to write");
+  addPen(*sheet, options);
+  addFeeding(*sheet, options);
+
+  CLI::App* const info =
+      app.add_subcommand("info", "show plug-in path, GL renderer, version table and pen limits");
+
+  const std::pair<CLI::App*, Command> commands[] = {{draw, Command::Draw},
+                                                    {trace, Command::Trace},
+                                                    {preview, Command::Preview},
+                                                    {sheet, Command::Sheet},
+                                                    {info, Command::Info}};
+  for (const auto& [command, value] : commands) addPlugin(*command, options);
+
+  try {
+    app.parse(argc, argv);
+    for (const auto& [command, value] : commands) {
+      if (command->parsed()) options.command = value;
+    }
+    checkTogether(options);
+  } catch (const CLI::ParseError& error) {
+    std::ostringstream text;
+    const bool asked = app.exit(error, text, text) == 0;
+    return UsageEnd{text.str(), asked ? 0 : 2};
+  }
+  return options;
+}
+
+const char* nameOf(Mode mode) {
+  return nameIn(kModes, mode);
+}
+
+const char* nameOf(DrawableKind drawable) {
+  return nameIn(kDrawables, drawable);
+}
+
+}  // namespace QeltDesktop

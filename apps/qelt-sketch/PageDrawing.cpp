@@ -1,0 +1,150 @@
+#include "PageDrawing.h"
+
+#include <algorithm>
+#include <array>
+#include <cmath>
+#include <cstdio>
+#include <optional>
+#include <vector>
+
+#include "PagePlayer.h"
+#include "PenSession.h"
+#include "Progress.h"
+#include "Refusal.h"
+#include "desktop/gl/RenderQueue.h"
+#include "desktop/graphics/CanvasLayer.h"
+#include "desktop/graphics/Compose.h"
+#include "desktop/graphics/PenCanvas.h"
+
+namespace QeltDesktop {
+namespace {
+
+// 256 MiB a layer.
+constexpr double kMostPixels = 67'108'864.0;
+constexpr double kLongestSide = 32'767.0;
+
+// Whole pixels; what rounding errors leave over is none.
+double pixelsFor(double length) {
+  return std::max(std::ceil(length - 1e-3), 1.0);
+}
+
+struct PixelSize {
+  int width, height;
+};
+
+PixelSize pixelSizeOf(const PageLayout& layout) {
+  const double width = pixelsFor(layout.width);
+  const double height = pixelsFor(layout.height);
+  // Not a single comparison holds for a size that is not a number.
+  if (width <= kLongestSide && height <= kLongestSide && width * height <= kMostPixels) {
+    return {static_cast<int>(width), static_cast<int>(height)};
+  }
+  std::array<char, 128> text{};
+  std::snprintf(text.data(), text.size(), "the picture is too large to draw: %.6g x %.6g pixels", width,
+                height);
+  throw Refusal(text.data());
+}
+
+// A layer and the view of the page that a drawable has of it.
+class Layer {
+ public:
+  Layer(RenderQueue& queue, PixelSize size, const Qelt::Matrix3<float>& matrix)
+      : mPixels(queue, size.width, size.height), mCanvas(&queue, &mPixels) {
+    mCanvas.setMatrix(matrix);
+  }
+
+  CanvasLayer& pixels() { return mPixels; }
+  PenCanvas* canvas() { return &mCanvas; }
+
+ private:
+  CanvasLayer mPixels;
+  PenCanvas mCanvas;
+};
+
+class Drawing : public PlayObserver {
+ public:
+  Drawing(RenderQueue& queue, PixelSize size, const PageLayout& layout, const DrawableSet& drawables,
+          Progress& progress)
+      : mQueue(queue), mProgress(progress) {
+    if (drawables.outline) mOutline.emplace(queue, size, layout.matrix);
+    if (drawables.stroke || drawables.preview) mStroke.emplace(queue, size, layout.matrix);
+    if (drawables.prediction) mPrediction.emplace(queue, size, layout.matrix);
+    mCanvases.stroke = drawables.stroke ? mStroke->canvas() : nullptr;
+    mCanvases.preview = drawables.preview ? mStroke->canvas() : nullptr;
+    mCanvases.outline = mOutline ? mOutline->canvas() : nullptr;
+    mCanvases.prediction = mPrediction ? mPrediction->canvas() : nullptr;
+  }
+
+  const Canvases& canvases() const { return mCanvases; }
+
+  void passBegins() override {
+    for (std::optional<Layer>* layer : {&mOutline, &mStroke, &mPrediction}) {
+      if (*layer) (*layer)->pixels().clear();
+    }
+  }
+
+  void predictionEnds() override { mPrediction->pixels().clear(); }
+
+  void call(const DrawableCall&, const std::function<bool(Qelt::RectF*)>& make) override {
+    Qelt::RectF rect;
+    make(&rect);
+  }
+
+  void strokeEnds() override {
+    // Keeps the tasks that wait, and their batches, to a stroke's worth.
+    mQueue.finish();
+    mProgress.step();
+  }
+
+  // From the lowest to the highest.
+  std::vector<std::vector<std::uint8_t>> readLayers() {
+    std::vector<std::vector<std::uint8_t>> layers;
+    for (std::optional<Layer>* layer : {&mOutline, &mStroke, &mPrediction}) {
+      if (*layer) layers.push_back((*layer)->pixels().readPixels());
+    }
+    return layers;
+  }
+
+ private:
+  RenderQueue& mQueue;
+  Progress& mProgress;
+  std::optional<Layer> mOutline, mStroke, mPrediction;
+  Canvases mCanvases;
+};
+
+}  // namespace
+
+DrawableSet drawablesFor(const Options& options) {
+  return {.stroke = true,
+          .outline = options.outline.has_value(),
+          .preview = false,
+          .prediction = options.predict > 0 && options.mode == Mode::Live};
+}
+
+float largestPenSize(const PluginLibrary& plugin, RenderQueue& queue, const Page& page,
+                     const Options& options) {
+  const PenSession session(plugin, queue, options);
+  float largest = 0.0f;
+  for (const Trace& trace : page.traces) {
+    largest = std::fmax(largest, styleFor(trace.brush, session.ownStyle(), options).size);
+  }
+  return largest;
+}
+
+Picture drawPage(const PluginLibrary& plugin, RenderQueue& queue, const Page& page, const Options& options,
+                 const PageLayout& layout, const DrawableSet& drawables, Progress& progress) {
+  const PixelSize size = pixelSizeOf(layout);
+  Drawing drawing(queue, size, layout, drawables, progress);
+  {
+    PenSession session(plugin, queue, options);
+    PagePlayer(session, page, options, drawing.canvases()).play(drawing);
+  }
+  std::optional<std::array<std::uint8_t, 3>> background;
+  if (const std::optional<std::uint32_t> rgb = options.background) {
+    background = {static_cast<std::uint8_t>(*rgb >> 16), static_cast<std::uint8_t>(*rgb >> 8),
+                  static_cast<std::uint8_t>(*rgb)};
+  }
+  return Picture(size.width, size.height, composeLayers(drawing.readLayers(), background));
+}
+
+}  // namespace QeltDesktop

@@ -1,0 +1,151 @@
+#include "PagePlayer.h"
+
+#include <string>
+
+#include "Refusal.h"
+#include "engine/MotionEvent.h"
+#include "pencommon/Pen.h"
+#include "pencommon/PenOutlineDrawableGL.h"
+#include "pencommon/PenPredictionDrawableGL.h"
+#include "pencommon/PenPreviewDrawableGL.h"
+#include "pencommon/PenStrokeDataManager.h"
+#include "pencommon/PenStrokeDrawableGL.h"
+
+namespace QeltDesktop {
+namespace {
+
+// The pen's drawable of one kind, on its canvas; null when there is no canvas.
+template <typename Drawable>
+Drawable* drawableOn(Qelt::ISPPenCanvas* canvas, Qelt::Pen& pen, Drawable* (Qelt::Pen::*getter)(),
+                     DrawableKind kind) {
+  if (canvas == nullptr) return nullptr;
+  Drawable* const drawable = (pen.*getter)();
+  if (drawable == nullptr) {
+    throw Refusal("the pen has no " + std::string(nameOf(kind)) + " drawable in rendering version " +
+                  std::to_string(pen.getVersion()));
+  }
+  drawable->SetCanvas(canvas);
+  return drawable;
+}
+
+}  // namespace
+
+PagePlayer::PagePlayer(PenSession& session, const Page& page, const Options& options,
+                       const Canvases& canvases)
+    : mSession(session), mPage(page), mOptions(options) {
+  using Qelt::Pen;
+  Pen& pen = session.pen();
+  mStroke = drawableOn(canvases.stroke, pen, &Pen::GetStrokeDrawableGL, DrawableKind::Stroke);
+  mOutline = drawableOn(canvases.outline, pen, &Pen::GetOutlineDrawableGL, DrawableKind::Outline);
+  mPreview = drawableOn(canvases.preview, pen, &Pen::GetPreviewDrawableGL, DrawableKind::Preview);
+  mPrediction =
+      drawableOn(canvases.prediction, pen, &Pen::GetPredictionStrokeDrawableGL, DrawableKind::Prediction);
+  if (mOutline != nullptr && options.outline) {
+    mOutline->SetOutlineSize(options.outline->size);
+    mOutline->SetOutlineColor(static_cast<int>(options.outline->argb));
+  }
+  if (mPrediction != nullptr) mPrediction->SetOpacity(options.opacity);
+  if (options.mode == Mode::Stroke) {
+    for (std::size_t i = 0; i < page.traces.size(); ++i) {
+      mStoredStrokes.push_back(storedStroke(page.traces[i], pointerOf(i)));
+      Qelt::PenStrokeDataManager::GetInstance()->CreateStrokeData(mStoredStrokes.back()->GetRuntimeHandle());
+    }
+  }
+}
+
+PagePlayer::~PagePlayer() {
+  for (const auto& stroke : mStoredStrokes) {
+    Qelt::PenStrokeDataManager::GetInstance()->DropStrokeData(stroke->GetRuntimeHandle());
+  }
+}
+
+void PagePlayer::play(PlayObserver& observer) {
+  for (int pass = 0; pass < mOptions.repeat; ++pass) {
+    observer.passBegins();
+    for (std::size_t i = 0; i < mPage.traces.size(); ++i) {
+      playTrace(i, observer);
+      observer.strokeEnds();
+    }
+  }
+}
+
+void PagePlayer::playTrace(std::size_t index, PlayObserver& observer) {
+  mSession.setStyle(styleFor(mPage.traces[index].brush, mSession.ownStyle(), mOptions));
+  if (mOptions.mode == Mode::Stroke) {
+    playStored(index, observer);
+    return;
+  }
+  if (mOptions.mode == Mode::Live) playLive(index, observer);
+  playRecorded(index, observer);
+}
+
+void PagePlayer::playLive(std::size_t index, PlayObserver& observer) {
+  const bool penStaysDown = mOptions.points.has_value() && index + 1 == mPage.traces.size();
+  feedLive(mPage.traces[index], pointerOf(index), mOptions.batch, penStaysDown, [&](LiveEvent& live) {
+    const Qelt::MotionEvent& event = live.event;
+    const int action = event.GetAction();
+    if (mPrediction != nullptr) observer.predictionEnds();
+    if (mStroke != nullptr) {
+      observer.call({DrawableKind::Stroke, index, "Draw", action},
+                    [&](Qelt::RectF* rect) { return mStroke->Draw(&event, rect); });
+    }
+    if (mPreview != nullptr) {
+      observer.call({DrawableKind::Preview, index, "Draw", action},
+                    [&](Qelt::RectF* rect) { return mPreview->Draw(&event, rect); });
+    }
+    if (mPrediction != nullptr && action == Qelt::kActionMove) predict(index, live.sample, observer);
+  });
+}
+
+void PagePlayer::predict(std::size_t index, std::size_t sample, PlayObserver& observer) {
+  const std::vector<Sample>& samples = mPage.traces[index].samples;
+  const Qelt::MotionEvent event =
+      predictedEvent(samples[sample - 1], samples[sample], pointerOf(index), mOptions.predict);
+  observer.call({DrawableKind::Prediction, index, "Draw", event.GetAction()},
+                [&](Qelt::RectF* rect) { return mPrediction->Draw(&event, rect); });
+}
+
+// What takes a whole stroke at once. Outlines have no live input: in live mode they come with the recording.
+void PagePlayer::playRecorded(std::size_t index, PlayObserver& observer) {
+  const bool live = mOptions.mode == Mode::Live;
+  if (live && mOutline == nullptr) return;
+  const Trace& trace = mPage.traces[index];
+  const auto play = [&](DrawableKind drawable, const char* operation, const auto& draw) {
+    // The pen corrects the event it is given: each drawable gets its own.
+    const Qelt::MotionEvent event = recordedEvent(trace, pointerOf(index));
+    observer.call({drawable, index, operation, event.GetAction()},
+                  [&](Qelt::RectF* rect) { return draw(&event, rect); });
+  };
+  using Event = const Qelt::MotionEvent*;
+  if (mOutline != nullptr) {
+    play(DrawableKind::Outline, "DrawOutline",
+         [&](Event event, Qelt::RectF* rect) { return mOutline->DrawOutline(event, rect); });
+  }
+  if (live) return;
+  if (mStroke != nullptr) {
+    play(DrawableKind::Stroke, "RedrawPen",
+         [&](Event event, Qelt::RectF* rect) { return mStroke->RedrawPen(event, rect); });
+  }
+  if (mPreview != nullptr) {
+    play(DrawableKind::Preview, "RedrawPen",
+         [&](Event event, Qelt::RectF* rect) { return mPreview->RedrawPen(event, rect); });
+  }
+}
+
+void PagePlayer::playStored(std::size_t index, PlayObserver& observer) {
+  const Qelt::ObjectStroke* const stroke = mStoredStrokes[index].get();
+  if (mOutline != nullptr) {
+    observer.call({DrawableKind::Outline, index, "DrawOutline", std::nullopt},
+                  [&](Qelt::RectF* rect) { return mOutline->DrawOutline(stroke, rect); });
+  }
+  if (mStroke != nullptr) {
+    observer.call({DrawableKind::Stroke, index, "RedrawPen", std::nullopt},
+                  [&](Qelt::RectF* rect) { return mStroke->RedrawPen(stroke, rect); });
+  }
+}
+
+Pointer PagePlayer::pointerOf(std::size_t index) const {
+  return pointerFor(mPage.traces[index], mOptions.tool, mOptions.source);
+}
+
+}  // namespace QeltDesktop

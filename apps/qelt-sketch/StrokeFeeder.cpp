@@ -1,0 +1,104 @@
+#include "StrokeFeeder.h"
+
+#include <algorithm>
+#include <cmath>
+#include <cstdint>
+#include <span>
+
+#include "base/PointF.h"
+
+namespace QeltDesktop {
+namespace {
+
+std::int64_t wholeMilliseconds(double time) {
+  constexpr double kFarAway = 9.0e18;  // below what 64 bits hold
+  return std::llround(std::clamp(time, -kFarAway, kFarAway));
+}
+
+Qelt::PointerCoords coordsOf(const Sample& sample) {
+  return {.x = sample.x,
+          .y = sample.y,
+          .pressure = sample.pressure,
+          .tilt = sample.tilt,
+          .orientation = sample.orientation};
+}
+
+// One event: the last sample is current, those before it are history.
+Qelt::MotionEvent eventOf(std::span<const Sample> samples, double downTime, int action,
+                          const Pointer& pointer) {
+  const Qelt::PointerProperties properties{.id = 0, .toolType = pointer.tool};
+  const Qelt::PointerCoords first = coordsOf(samples.front());
+  Qelt::MotionEvent event(wholeMilliseconds(downTime), wholeMilliseconds(samples.front().time), action, 1,
+                          &properties, &first, 0, pointer.source, 0);
+  for (const Sample& sample : samples.subspan(1)) {
+    const Qelt::PointerCoords coords = coordsOf(sample);
+    event.AddBatch(wholeMilliseconds(sample.time), &coords);
+  }
+  return event;
+}
+
+}  // namespace
+
+Pointer pointerFor(const Trace& trace, std::optional<int> tool, std::optional<int> source) {
+  Pointer pointer{};
+  pointer.tool = tool.value_or(trace.tool.value_or(Qelt::kToolStylus));
+  const int usual = pointer.tool == Qelt::kToolFinger  ? Qelt::kSourceTouchScreen
+                    : pointer.tool == Qelt::kToolMouse ? Qelt::kSourceMouse
+                                                       : Qelt::kSourceStylus;
+  pointer.source = source.value_or(usual);
+  return pointer;
+}
+
+void cutLastTrace(Page& page, int points) {
+  std::vector<Sample>& samples = page.traces.back().samples;
+  samples.resize(std::min(samples.size(), static_cast<std::size_t>(points)));
+}
+
+void feedLive(const Trace& trace, const Pointer& pointer, int batch, bool penStaysDown,
+              const std::function<void(LiveEvent&)>& take) {
+  const std::span<const Sample> samples(trace.samples);
+  const double downTime = samples.front().time;
+  const auto feed = [&](std::size_t first, std::size_t count, int action) {
+    LiveEvent live{eventOf(samples.subspan(first, count), downTime, action, pointer), first + count - 1};
+    take(live);
+  };
+  feed(0, 1, Qelt::kActionDown);
+  for (std::size_t next = 1; next < samples.size();) {
+    const std::size_t count = std::min(samples.size() - next, static_cast<std::size_t>(batch));
+    feed(next, count, Qelt::kActionMove);
+    next += count;
+  }
+  if (!penStaysDown) feed(samples.size() - 1, 1, Qelt::kActionUp);
+}
+
+Qelt::MotionEvent recordedEvent(const Trace& trace, const Pointer& pointer) {
+  const Sample& last = trace.samples.back();
+  Qelt::MotionEvent event = eventOf(trace.samples, trace.samples.front().time, Qelt::kActionUp, pointer);
+  const Qelt::PointerCoords coords = coordsOf(last);
+  event.AddBatch(wholeMilliseconds(last.time), &coords);
+  return event;
+}
+
+std::unique_ptr<StoredStroke> storedStroke(const Trace& trace, const Pointer& pointer) {
+  auto stroke = std::make_unique<StoredStroke>(pointer.tool);
+  stroke->reserve(static_cast<int>(trace.samples.size()));
+  for (const Sample& sample : trace.samples) {
+    stroke->addPoint({.x = sample.x, .y = sample.y}, wholeMilliseconds(sample.time), sample.pressure,
+                     sample.tilt, sample.orientation);
+  }
+  return stroke;
+}
+
+Qelt::MotionEvent predictedEvent(const Sample& previous, const Sample& last, const Pointer& pointer,
+                                 int count) {
+  std::vector<Sample> samples(static_cast<std::size_t>(count), last);
+  for (int k = 1; k <= count; ++k) {
+    Sample& sample = samples[static_cast<std::size_t>(k - 1)];
+    sample.x = last.x + static_cast<float>(k) * (last.x - previous.x);
+    sample.y = last.y + static_cast<float>(k) * (last.y - previous.y);
+    sample.time = last.time + k * (last.time - previous.time);
+  }
+  return eventOf(samples, last.time, Qelt::kActionMove, pointer);
+}
+
+}  // namespace QeltDesktop
