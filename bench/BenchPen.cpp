@@ -1,0 +1,18 @@
+#include "BenchPen.h"
+
+#include "pen/PencilEntry.h"
+
+namespace QeltBench {
+
+BenchPen::BenchPen(int version, float size)
+    : mQueue(QeltDesktop::RenderQueue::Mode::Caller, QeltDesktop::RenderQueue::GL::None),
+      mManager(&mQueue),
+      mCanvas(&mQueue, nullptr),
+      mPen(createPenInst()) {
+  mPen->setPenDataManager(&mManager);
+  mPen->setVersion(version);
+  mPen->SetSize(size);
+  mPen->SetScreenResolution(1440, 2960);
+}
+
+}  // namespace QeltBench

@@ -1,0 +1,108 @@
+#include <benchmark/benchmark.h>
+
+#include <vector>
+
+#include "Floor.h"
+#include "base/Vector.h"
+#include "render/Pencil2StrokeDrawableRTV1.h"
+#include "render/Pencil2StrokeDrawableRTV2.h"
+#include "render/Pencil2StrokeDrawableRTV3.h"
+
+// Nanoseconds a stamp for what surrounds the walk: the bytes alone, and the pen's vertices.
+namespace {
+
+constexpr int kStampsPerBatch = 100;  // about a move event's
+
+void countStamps(benchmark::State& state) {
+  state.counters["ns/stamp"] =
+      benchmark::Counter(static_cast<double>(state.iterations()) * kStampsPerBatch * 1e-9,
+                         benchmark::Counter::kIsRate | benchmark::Counter::kInvert);
+}
+
+// (a) Appending 66 prepared floats to a batch reserved once.
+void appendPreparedStamps(benchmark::State& state) {
+  std::vector<float> batch;
+  batch.reserve(kStampsPerBatch * QeltBench::kStampFloats);
+  QeltBench::Stamp stamp;
+  stamp.fill(1.5f);
+  for (auto _ : state) {
+    batch.clear();
+    for (int i = 0; i < kStampsPerBatch; ++i) {
+      benchmark::DoNotOptimize(stamp);
+      QeltBench::appendPrepared(batch, stamp);
+    }
+    benchmark::ClobberMemory();
+  }
+  countStamps(state);
+}
+BENCHMARK(appendPreparedStamps)->Name("a/append_prepared");
+
+// The inputs are hidden from the compiler, so that nothing is worked out ahead.
+struct Inputs {
+  Qelt::Vector2<float> point[2] = {{10.3f, 20.7f}, {-0.6f, 0.8f}};
+  float size = 3.2f;
+};
+
+// (b) AddPoint alone, as the walk calls it.
+template <typename Renderer>
+void addPoint(benchmark::State& state) {
+  Renderer renderer(nullptr);
+  std::vector<float> batch;
+  batch.reserve(kStampsPerBatch * Renderer::kFloatsPerStamp);
+  renderer.SetBuffer(&batch);
+  Inputs in;
+  for (auto _ : state) {
+    batch.clear();
+    typename Renderer::Appender stamps(renderer, kStampsPerBatch);
+    for (int i = 0; i < kStampsPerBatch; ++i) {
+      benchmark::DoNotOptimize(in);
+      stamps.AddPoint(in.point, in.size, 0.1f, 0.2f, 1);
+    }
+    stamps.flush();
+    benchmark::ClobberMemory();
+  }
+  countStamps(state);
+}
+BENCHMARK(addPoint<Qelt::Pencil2StrokeDrawableRTV1>)->Name("b/AddPoint_RTV1");
+BENCHMARK(addPoint<Qelt::Pencil2StrokeDrawableRTV2>)->Name("b/AddPoint_RTV2");
+BENCHMARK(addPoint<Qelt::Pencil2StrokeDrawableRTV3>)->Name("b/AddPoint_RTV3");
+
+// One call a stamp, each appending to the batch at once.
+void addPointOneByOne(benchmark::State& state) {
+  Qelt::Pencil2StrokeDrawableRTV3 renderer(nullptr);
+  std::vector<float> batch;
+  batch.reserve(kStampsPerBatch * QeltBench::kStampFloats);
+  renderer.SetBuffer(&batch);
+  Inputs in;
+  for (auto _ : state) {
+    batch.clear();
+    for (int i = 0; i < kStampsPerBatch; ++i) {
+      benchmark::DoNotOptimize(in);
+      renderer.AddPoint(in.point, in.size, 0.1f, 0.2f, 1);
+    }
+    benchmark::ClobberMemory();
+  }
+  countStamps(state);
+}
+BENCHMARK(addPointOneByOne)->Name("b/AddPoint_RTV3_one_by_one");
+
+// (c) The cheapest honest walk, on a segment of a typical event's length.
+void cheapWalk(benchmark::State& state) {
+  std::vector<float> out((kStampsPerBatch + 8) * QeltBench::kStampFloats);
+  std::size_t stamps = 0;
+  float end = 40.0f;
+  for (auto _ : state) {
+    benchmark::DoNotOptimize(end);
+    // As many curves as a move event of four samples has.
+    for (int i = 0; i < 4; ++i) {
+      const QeltBench::CheapWalk walk(0.0f, 0.0f, end / 8.0f, 1.0f, end / 4.0f, 0.0f);
+      stamps += walk.walk(0.4f, out.data(), kStampsPerBatch);
+    }
+    benchmark::ClobberMemory();
+  }
+  state.counters["ns/stamp"] = benchmark::Counter(static_cast<double>(stamps) * 1e-9,
+                                                  benchmark::Counter::kIsRate | benchmark::Counter::kInvert);
+}
+BENCHMARK(cheapWalk)->Name("c/cheap_walk");
+
+}  // namespace

@@ -1,0 +1,93 @@
+#include <benchmark/benchmark.h>
+
+#include <chrono>
+#include <cmath>
+#include <cstdint>
+#include <vector>
+
+#include "BenchPen.h"
+#include "base/RectF.h"
+#include "desktop/pencommon/BatchObserver.h"
+#include "engine/MotionEvent.h"
+#include "pencommon/PenStrokeDrawableGL.h"
+
+// Nanoseconds a stamp of a live move event, the whole road on the main thread: the pen, the host's path, the
+// tasks and their posting.
+namespace {
+
+using Clock = std::chrono::steady_clock;
+using QeltBench::BenchPen;
+
+constexpr int kSamplesPerEvent = 4;
+constexpr float kUnitsPerSample = 10.0f;  // the median of real ink
+
+// A long gentle curve with changing pressure and a slightly tilted pen.
+Qelt::PointerCoords sampleAt(int i) {
+  const float angle = 0.02f * static_cast<float>(i);
+  const float radius = kUnitsPerSample / 0.02f;
+  return {600.0f + radius * std::cos(angle), 600.0f + radius * std::sin(angle),
+          0.6f + 0.2f * std::sin(0.3f * static_cast<float>(i)), 0.4f, 0.5f};
+}
+
+Qelt::MotionEvent eventOf(int action, int firstSample, int samples) {
+  const Qelt::PointerProperties stylus{0, Qelt::kToolStylus};
+  Qelt::PointerCoords coords = sampleAt(firstSample);
+  Qelt::MotionEvent event(0, firstSample, action, 1, &stylus, &coords, 0, Qelt::kSourceStylus, 0);
+  for (int i = 1; i < samples; ++i) {
+    coords = sampleAt(firstSample + i);
+    event.AddBatch(firstSample + i, &coords);
+  }
+  return event;
+}
+
+// (d) for version 8; the other versions beside it.
+void liveMove(benchmark::State& state) {
+  BenchPen bench(static_cast<int>(state.range(0)), 6.0f);
+  Qelt::PenStrokeDrawableGL* drawable = bench.pen().GetStrokeDrawableGL();
+  drawable->SetCanvas(&bench.canvas());
+  std::uint64_t floats = 0;
+  QeltDesktop::setBatchObserver(
+      [&floats](const QeltDesktop::Batch& batch) { floats += batch.buffers[0].size(); });
+
+  constexpr int kEvents = 500;
+  std::vector<Qelt::MotionEvent> events;
+  for (int i = 0; i < kEvents; ++i)
+    events.push_back(eventOf(Qelt::kActionMove, 1 + i * kSamplesPerEvent, kSamplesPerEvent));
+  const Qelt::MotionEvent down = eventOf(Qelt::kActionDown, 0, 1);
+  const double floatsPerStamp = state.range(0) == 8 ? 66.0 : 54.0;
+
+  // One round counts the stamps, which the observer's copying would disturb.
+  Qelt::RectF rect;
+  drawable->Draw(&down, &rect);
+  for (const auto& event : events) drawable->Draw(&event, &rect);
+  bench.drain();
+  QeltDesktop::setBatchObserver({});
+  const double stampsPerRound = static_cast<double>(floats) / floatsPerStamp;
+
+  for (auto _ : state) {
+    double seconds = 0.0;
+    drawable->Draw(&down, &rect);
+    for (const auto& event : events) {
+      const auto begin = Clock::now();
+      drawable->Draw(&event, &rect);
+      seconds += std::chrono::duration<double>(Clock::now() - begin).count();
+      bench.drain();
+    }
+    state.SetIterationTime(seconds);
+  }
+  state.counters["ns/stamp"] =
+      benchmark::Counter(static_cast<double>(state.iterations()) * stampsPerRound * 1e-9,
+                         benchmark::Counter::kIsRate | benchmark::Counter::kInvert);
+}
+BENCHMARK(liveMove)
+    ->Name("d/live_move_V")
+    ->Arg(8)
+    ->Arg(1)
+    ->Arg(2)
+    ->Arg(3)
+    ->Arg(4)
+    ->Arg(5)
+    ->Arg(7)
+    ->UseManualTime();
+
+}  // namespace
