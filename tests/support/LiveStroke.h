@@ -40,7 +40,8 @@ struct LiveStrokeOptions {
 };
 
 // What a host sets up to draw one live stroke with the built library: pen, queue, canvas. Each call returns
-// when the render thread has done its part, so batches and pixels can be read.
+// when the render thread has done its part, so batches and pixels can be read. One at a time: the observer of
+// batches, and the GL context of a picture, belong to the process.
 class LiveStroke {
  public:
   explicit LiveStroke(const LiveStrokeOptions& options = {});
