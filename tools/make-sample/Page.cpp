@@ -1,6 +1,7 @@
 #include "Page.h"
 
 #include <cmath>
+#include <cstddef>
 #include <cstdio>
 #include <utility>
 
