@@ -212,13 +212,26 @@ TEST(WholeStroke, WhatIsNoNumberNeverReachesAStamp) {
   }
 }
 
-TEST(WholeStroke, FarPointsAreBoundedAndSaidOnce) {
+TEST(WholeStroke, EndlessSegmentsAreCutShortAndSaidOnceAStroke) {
   LogCapture log;
-  LiveStroke stroke;
+  LiveStrokeOptions options;
+  options.curve = false;
+  LiveStroke stroke(options);
   stroke.down({0, 0});
-  stroke.move({{1e30f, 0}, {-1e30f, 3e38f}, {20, 20}, {60, 20}});
-  stroke.up({70, 20});
-  EXPECT_THAT(stroke.takeBatches(), SizeIs(3));
+  stroke.takeBatches();
+  log.take();
+  stroke.move({{1e30f, 0}});
+  EXPECT_THAT(stroke.takeBatches(), ElementsAre(BatchOf(262144, 11)));
+  stroke.move({{20, 20}});
+  stroke.takeBatches();
+  const std::vector<LogLine> lines = log.take();
+  ASSERT_THAT(lines, SizeIs(1)) << "two segments were cut";
+  EXPECT_EQ(lines[0].priority, 6);
+  EXPECT_EQ(lines[0].tag, "qel_log");
+  EXPECT_THAT(lines[0].text, HasSubstr("cut short"));
+  // The next segment starts as if the walk had ended on its spacing: 40 units, a stamp every 0.4.
+  stroke.move({{60, 20}});
+  EXPECT_THAT(allStamps(stroke), SizeIs(AllOf(Ge(99u), Le(101u))));
 }
 
 TEST(WholeStroke, OddSizesPlaceNothing) {
