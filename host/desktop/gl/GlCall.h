@@ -2,10 +2,12 @@
 
 #include <GLES3/gl3.h>
 
+#include "base/HostApi.h"
+
 namespace QeltDesktop {
 
 // Logs every error GL has noted since the last call. Render thread.
-void reportGlErrors(const char* file, int line);
+QELT_HOST_API void reportGlErrors(const char* file, int line);
 
 #ifdef NDEBUG
 

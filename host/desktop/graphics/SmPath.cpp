@@ -4,7 +4,6 @@
 #include <array>
 #include <cmath>
 #include <cstddef>
-#include <limits>
 #include <new>
 #include <vector>
 
@@ -324,9 +323,15 @@ void SmPath::incReserve(int pointCount) {
   if (pointCount <= 0) return;
   if (mMeasure == nullptr) mMeasure.reset(new (std::nothrow) Measure);
   if (mMeasure == nullptr) return;
-  const auto points = static_cast<std::size_t>(pointCount);
-  mMeasure->segments.reserve(mMeasure->segments.size() + points);
-  mMeasure->contours.reserve(mMeasure->contours.size() + 1);
+  // A hint beyond this is taken as far as that; the path still grows as it is built.
+  constexpr int kMostReserved = 1 << 16;
+  const auto points = static_cast<std::size_t>(std::min(pointCount, kMostReserved));
+  try {
+    mMeasure->segments.reserve(mMeasure->segments.size() + points);
+    mMeasure->contours.reserve(mMeasure->contours.size() + points);
+  } catch (const std::bad_alloc&) {
+    // Only a hint.
+  }
 }
 
 void SmPath::rewind() {
