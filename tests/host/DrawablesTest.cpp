@@ -1,0 +1,194 @@
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "desktop/gl/RenderQueue.h"
+#include "desktop/graphics/CanvasLayer.h"
+#include "desktop/graphics/PenCanvas.h"
+#include "desktop/pencommon/BatchObserver.h"
+#include "desktop/pencommon/PenDataManager.h"
+#include "gl/IGLMsgQueue.h"
+#include "gl/ITask.h"
+#include "pencommon/Pen.h"
+#include "pencommon/PenDrawableGL.h"
+#include "pencommon/PenOutlineDrawableRT.h"
+#include "pencommon/PenStrokeDrawableRT.h"
+
+namespace {
+
+using QeltDesktop::CanvasLayer;
+using QeltDesktop::PenCanvas;
+using QeltDesktop::PenDataManager;
+using QeltDesktop::RenderQueue;
+using testing::ElementsAre;
+
+using Notes = std::vector<std::string>;
+
+// Notes what the render thread is asked to do.
+class NotingRT : public Qelt::PenStrokeDrawableRT {
+ public:
+  explicit NotingRT(Notes& notes) : PenStrokeDrawableRT(nullptr), mNotes(notes) {}
+  ~NotingRT() override { mNotes.push_back("gone"); }
+  void CreatePenCanvas(int width, int height, Qelt::IGLMsgQueue*) override {
+    mNotes.push_back("create " + std::to_string(width) + " x " + std::to_string(height));
+  }
+  void Release() override { mNotes.push_back("release"); }
+
+  bool hasPendingData() const { return mHasPendingData; }
+  const Qelt::Vector4<float>& color() const { return mPenColor; }
+
+ private:
+  Notes& mNotes;
+};
+
+class PlainGL : public Qelt::PenDrawableGL {
+ public:
+  PlainGL(Qelt::PenGLDataManager* manager, Qelt::PenDrawableRT* partner) : PenDrawableGL(manager) {
+    setDrawableRT(partner);
+  }
+  ~PlainGL() override { destroy(); }
+};
+
+TEST(Drawables, PrepareAndReleaseTheirPartnerOnTheRenderThread) {
+  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
+  PenDataManager manager(&queue);
+  CanvasLayer layer(queue, 30, 20);
+  PenCanvas canvas(&queue, &layer);
+  Notes notes;
+  {
+    PlainGL drawable(&manager, new NotingRT(notes));
+    drawable.SetCanvas(&canvas);
+    EXPECT_EQ(drawable.GetCanvas(), &canvas);
+    drawable.SetCanvas(nullptr);
+    EXPECT_THAT(notes, ElementsAre());
+  }
+  EXPECT_THAT(notes, ElementsAre());
+  queue.finish();
+  EXPECT_THAT(notes, ElementsAre("create 30 x 20", "release", "gone"));
+}
+
+TEST(Drawables, OnACanvasWithoutALayerNothingIsPrepared) {
+  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
+  PenDataManager manager(&queue);
+  PenCanvas canvas(&queue, nullptr);
+  Notes notes;
+  int posts = 0;
+  queue.onAccepted = [&](const Qelt::ITask&) { ++posts; };
+  {
+    PlainGL drawable(&manager, new NotingRT(notes));
+    drawable.SetCanvas(&canvas);
+    EXPECT_EQ(posts, 0);
+  }
+  queue.finish();
+  EXPECT_THAT(notes, ElementsAre("gone"));
+}
+
+TEST(Drawables, APartnerWithoutAnyQueueIsDeletedAtOnce) {
+  Notes notes;
+  { const PlainGL drawable(nullptr, new NotingRT(notes)); }
+  PenDataManager manager(nullptr);
+  { const PlainGL drawable(&manager, new NotingRT(notes)); }
+  { const PlainGL drawable(&manager, nullptr); }
+  EXPECT_THAT(notes, ElementsAre("gone", "gone"));
+}
+
+// Refusals may come at any post; whatever was taken runs first, and the partner is released if it was
+// prepared and gone exactly once.
+TEST(Drawables, SurviveAQueueThatRefuses) {
+  for (const auto mode : {RenderQueue::Mode::Thread, RenderQueue::Mode::Caller}) {
+    for (int refusedPost = 0; refusedPost < 4; ++refusedPost) {
+      for (const bool fromThereOn : {false, true}) {
+        SCOPED_TRACE(std::to_string(refusedPost) + (fromThereOn ? " and after" : ""));
+        RenderQueue queue(mode, RenderQueue::GL::Context);
+        PenDataManager manager(&queue);
+        CanvasLayer layer(queue, 8, 8);
+        PenCanvas canvas(&queue, &layer);
+        int posts = 0;
+        queue.accept = [&](const Qelt::ITask&) {
+          const int post = posts++;
+          return fromThereOn ? post < refusedPost : post != refusedPost;
+        };
+        Notes notes;
+        {
+          PlainGL drawable(&manager, new NotingRT(notes));
+          drawable.SetCanvas(&canvas);
+        }
+        queue.finish();
+        if (refusedPost == 0) {
+          EXPECT_THAT(notes, ElementsAre("gone"));
+        } else {
+          EXPECT_THAT(notes, ElementsAre("create 8 x 8", "release", "gone"));
+        }
+      }
+    }
+  }
+}
+
+TEST(Drawables, OutliveTheRenderThread) {
+  RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
+  PenDataManager manager(&queue);
+  CanvasLayer layer(queue, 8, 8);
+  PenCanvas canvas(&queue, &layer);
+  Notes notes;
+  {
+    PlainGL drawable(&manager, new NotingRT(notes));
+    drawable.SetCanvas(&canvas);
+    queue.shutDown();
+  }
+  EXPECT_THAT(notes, ElementsAre("create 8 x 8", "release", "gone"));
+}
+
+TEST(Drawables, HandOversAreShownToTheObserver) {
+  Notes notes;
+  NotingRT stroke(notes);
+  Qelt::PenOutlineDrawableRT outline(nullptr);
+  std::vector<QeltDesktop::Batch> seen;
+  QeltDesktop::setBatchObserver([&](QeltDesktop::Batch batch) { seen.push_back(std::move(batch)); });
+  std::vector<float> first{1, 2}, second{3}, empty;
+  stroke.SendDataToGPU(&first);
+  EXPECT_TRUE(stroke.hasPendingData());
+  stroke.Clear();
+  EXPECT_FALSE(stroke.hasPendingData());
+  stroke.SetCacheBuffer(&empty);
+  stroke.SendDataToGPU(nullptr);
+  outline.SendDataToGPU(&second, &first);
+  QeltDesktop::setBatchObserver(nullptr);
+  stroke.SendDataToGPU(&first);
+
+  ASSERT_EQ(seen.size(), 3u);
+  EXPECT_EQ(seen[0].drawable, &stroke);
+  EXPECT_FALSE(seen[0].cached);
+  EXPECT_THAT(seen[0].buffers, ElementsAre(first));
+  EXPECT_TRUE(seen[1].cached);
+  EXPECT_THAT(seen[1].buffers, ElementsAre(empty));
+  EXPECT_EQ(seen[2].drawable, &outline);
+  EXPECT_THAT(seen[2].buffers, ElementsAre(second, first));
+}
+
+TEST(Drawables, ThePenColourIsSplitIntoShares) {
+  Notes notes;
+  NotingRT stroke(notes);
+  stroke.SetPenData(3.0f, static_cast<int>(0x80FF3300u));
+  EXPECT_EQ(stroke.color().x, 1.0f);
+  EXPECT_EQ(stroke.color().y, 0.2f);  // 51 / 255
+  EXPECT_EQ(stroke.color().z, 0.0f);
+  EXPECT_EQ(stroke.color().w, 128.0f / 255.0f);
+}
+
+TEST(PenBase, AStrokesRectIsItsPointsGrownByTheSize) {
+  Qelt::Pen pen;
+  Qelt::PointF points[] = {{NAN, 5}, {10, 20}, {4, 30}, {INFINITY, 0}};
+  const Qelt::RectF rect = pen.GetStrokeRect(points, nullptr, nullptr, 4, 2.0f, true, nullptr);
+  EXPECT_EQ(rect.left, 2.0f);
+  EXPECT_EQ(rect.top, 18.0f);
+  EXPECT_EQ(rect.right, 12.0f);
+  EXPECT_EQ(rect.bottom, 32.0f);
+  EXPECT_EQ(pen.GetStrokeRect(nullptr, nullptr, nullptr, 4, 2.0f, true, nullptr).right, 0.0f);
+  EXPECT_EQ(pen.GetStrokeRect(points, nullptr, nullptr, 1, 2.0f, true, nullptr).right, 0.0f);
+}
+
+}  // namespace

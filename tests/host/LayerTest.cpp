@@ -1,0 +1,467 @@
+#include <GLES3/gl3.h>
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+#include "desktop/gl/RenderQueue.h"
+#include "desktop/graphics/CanvasLayer.h"
+#include "gl/GraphicsFactory.h"
+#include "gl/GraphicsObject.h"
+#include "gl/ManagedObject.h"
+#include "gl/OpenGLRenderer.h"
+#include "gl/OpenGLShaderProgram.h"
+#include "gl/VertexDescriptor.h"
+#include "graphics/ISPBitmap.h"
+#include "graphics/ISPCanvas.h"
+#include "graphics/SPGraphicsFactory.h"
+#include "math/Matrix4.h"
+#include "support/LogCapture.h"
+
+namespace {
+
+using QeltDesktop::CanvasLayer;
+using QeltDesktop::RenderQueue;
+using testing::HasSubstr;
+
+constexpr const char* kVertexShader = R"(#version 300 es
+layout(location = 0) in vec2 position;
+layout(location = 1) in vec2 extra;
+uniform mat4 projection;
+out vec2 passed;
+void main() {
+  gl_Position = projection * vec4(position, 0.0, 1.0);
+  passed = extra;
+}
+)";
+
+// Writes where the pixel lies in the window, so that each byte can be foretold.
+constexpr const char* kWindowShader = R"(#version 300 es
+precision highp float;
+in vec2 passed;
+uniform vec4 tint;
+uniform vec2 offset;
+uniform float strength;
+out vec4 FragColor;
+void main() {
+  vec2 at = floor(gl_FragCoord.xy - offset);
+  FragColor = vec4(mod(at.x, 256.0) / 255.0, mod(at.y, 256.0) / 255.0, passed.x, strength) * tint;
+}
+)";
+
+constexpr const char* kTextureShader = R"(#version 300 es
+precision highp float;
+in vec2 passed;
+uniform sampler2D picture;
+uniform vec3 unused;
+out vec4 FragColor;
+void main() {
+  FragColor = texture(picture, passed) + vec4(unused, 0.0);
+}
+)";
+
+// A quad over a rectangle, with the texture coordinates 0 to 1 or one value everywhere.
+Qelt::GraphicsObject* makeQuad() {
+  Qelt::VertexDescriptor layout;
+  layout.addAttribute(Qelt::AttributeType::Float, 2, -1);
+  layout.addAttribute(Qelt::AttributeType::Float, 2, -1);
+  return Qelt::GraphicsFactory::createGraphicsObject(1, Qelt::GraphicsFactory::kTriangles, layout, 0, 0);
+}
+
+void setQuad(Qelt::GraphicsObject& quad, float left, float top, float right, float bottom) {
+  const std::vector<float> vertices{left,  top, 0, 0, left, bottom, 0, 1, right, top,    1, 0,
+                                    right, top, 1, 0, left, bottom, 0, 1, right, bottom, 1, 1};
+  quad.updateBuffer(0, vertices.data(), 6);
+}
+
+// A small drawing of the window shader, kept over context losses as a pen keeps its own.
+class WindowPainter {
+ public:
+  WindowPainter() {
+    program = Qelt::GraphicsFactory::createOpenGLShaderProgram(kVertexShader, kWindowShader, nullptr);
+    projection = program->getBindingIntf("projection", 0);
+    tint = program->getBindingIntf("tint", 0);
+    offset = program->getBindingIntf("offset", 0);
+    strength = program->getBindingIntf("strength", 0);
+    quad = makeQuad();
+  }
+  ~WindowPainter() {
+    program->release();
+    for (Qelt::IParameterBinding* binding : {projection, tint, offset, strength}) binding->release();
+    quad->release();
+  }
+  WindowPainter(const WindowPainter&) = delete;
+  WindowPainter& operator=(const WindowPainter&) = delete;
+
+  void draw(Qelt::ISPBitmap& bitmap) {
+    Qelt::OpenGLRenderer::disableState(GL_BLEND);
+    for (int i = 0; i < bitmap.GetTileCount(); ++i) {
+      Qelt::ISPSubBitmap& tile = *bitmap.GetSubBitmap(i);
+      tile.BeginRender(0);
+      program->activate();
+      projection->set(tile.GetProjection());
+      tint->set(Qelt::Vector4<float>{1, 1, 1, 1});
+      offset->set(Qelt::Vector2<float>{0, 0});
+      strength->set(1.0f);
+      quad->draw(0, -1, true, 0);
+      tile.EndRender(0);
+    }
+  }
+
+  Qelt::OpenGLShaderProgram* program;
+  Qelt::IParameterBinding *projection, *tint, *offset, *strength;
+  Qelt::GraphicsObject* quad;
+};
+
+const std::uint8_t* pixelAt(const std::vector<std::uint8_t>& pixels, int width, int x, int y) {
+  return &pixels[(static_cast<std::size_t>(y) * static_cast<std::size_t>(width) +
+                  static_cast<std::size_t>(x)) *
+                 4];
+}
+
+class Layer : public testing::TestWithParam<RenderQueue::Mode> {
+ protected:
+  // GL errors and the like are failures wherever they come from.
+  void TearDown() override {
+    for (const QeltTests::LogLine& line : log.take()) ADD_FAILURE() << "logged: " << line.text;
+  }
+
+  QeltTests::LogCapture log;
+  RenderQueue queue{GetParam(), RenderQueue::GL::Context};
+};
+
+INSTANTIATE_TEST_SUITE_P(Modes, Layer, testing::Values(RenderQueue::Mode::Thread, RenderQueue::Mode::Caller),
+                         [](const auto& mode) {
+                           return mode.param == RenderQueue::Mode::Thread ? "OwnThread" : "CallersThread";
+                         });
+
+TEST_P(Layer, TilesCoverThePageOnceAndMapTheirPixels) {
+  CanvasLayer layer(queue, 1030, 600);
+  Qelt::ISPBitmap& bitmap = *layer.GetBitmap();
+  ASSERT_EQ(bitmap.GetTileCount(), 6);
+  int area = 0;
+  for (int i = 0; i < 6; ++i) {
+    const Qelt::ISPSubBitmap& tile = *bitmap.GetSubBitmap(i);
+    EXPECT_EQ(tile.GetX(), (i % 3) * 512);
+    EXPECT_EQ(tile.GetY(), (i / 3) * 512);
+    area += tile.GetWidth() * tile.GetHeight();
+    // The first row lies at clip y = -1, and clip space leads back to the pixel.
+    const Qelt::Matrix4<float>& m = tile.GetProjection();
+    for (const float inside : {0.0f, 0.5f, 1.0f}) {
+      const auto x = static_cast<float>(tile.GetX()) + inside * static_cast<float>(tile.GetWidth());
+      const float clip = m[0] * x + m[12];
+      EXPECT_NEAR(
+          (clip + 1.0f) * 0.5f * static_cast<float>(tile.GetWidth()) + static_cast<float>(tile.GetX()), x,
+          1e-3f);
+      const auto y = static_cast<float>(tile.GetY()) + inside * static_cast<float>(tile.GetHeight());
+      EXPECT_NEAR(m[5] * y + m[13], 2.0f * inside - 1.0f, 1e-5f);
+    }
+  }
+  EXPECT_EQ(area, 1030 * 600);
+  EXPECT_EQ(bitmap.GetSubBitmap(6), nullptr);
+  EXPECT_EQ(bitmap.GetSubBitmap(-1), nullptr);
+}
+
+TEST_P(Layer, WindowCoordinatesRunOnAcrossTilesAndTheFirstRowIsTheTop) {
+  constexpr int kWidth = 150, kHeight = 90;
+  CanvasLayer layer(queue, kWidth, kHeight, 64);
+  queue.run([&] {
+    WindowPainter painter;
+    // Over every border between tiles, one pixel short of the page's edges.
+    setQuad(*painter.quad, 1, 1, kWidth - 1, kHeight - 1);
+    painter.draw(*layer.GetBitmap());
+  });
+  const std::vector<std::uint8_t> pixels = layer.readPixels();
+  ASSERT_EQ(pixels.size(), static_cast<std::size_t>(kWidth * kHeight * 4));
+  for (int y = 0; y < kHeight; ++y) {
+    for (int x = 0; x < kWidth; ++x) {
+      const std::uint8_t* const pixel = pixelAt(pixels, kWidth, x, y);
+      const bool inside = x > 0 && y > 0 && x < kWidth - 1 && y < kHeight - 1;
+      ASSERT_EQ(pixel[3], inside ? 255 : 0) << x << ", " << y;
+      ASSERT_EQ(pixel[0], inside ? x : 0) << x << ", " << y;
+      ASSERT_EQ(pixel[1], inside ? y : 0) << x << ", " << y;
+    }
+  }
+  layer.clear();
+  EXPECT_EQ(layer.readPixels(), std::vector<std::uint8_t>(pixels.size()));
+}
+
+TEST_P(Layer, KeepsItsPixelsAndEveryWrapperWorksOnAfterEachOfTwoLosses) {
+  constexpr int kSize = 100;
+  CanvasLayer layer(queue, kSize, kSize, 64);
+  std::unique_ptr<WindowPainter> painter;
+  queue.run([&] {
+    painter = std::make_unique<WindowPainter>();
+    setQuad(*painter->quad, 0, 0, 50, 100);
+    painter->draw(*layer.GetBitmap());
+  });
+  const std::vector<std::uint8_t> left = layer.readPixels();
+  for (int round = 0; round < 2; ++round) {
+    queue.loseContext();
+    queue.loseContext();
+    EXPECT_THROW(layer.readPixels(), std::runtime_error);
+    // Whatever is done meanwhile has no effect and does no harm.
+    queue.run([&] {
+      painter->draw(*layer.GetBitmap());
+      EXPECT_EQ(Qelt::OpenGLRenderer::getViewport().z, 0);
+    });
+    queue.restoreContext();
+    queue.restoreContext();
+    EXPECT_EQ(layer.readPixels(), left);
+    // The vertices uploaded before the loss are still there.
+    layer.clear();
+    queue.run([&] { painter->draw(*layer.GetBitmap()); });
+    EXPECT_EQ(layer.readPixels(), left);
+  }
+  queue.loseContext();
+  queue.run([&] { setQuad(*painter->quad, 0, 0, kSize, kSize); });
+  queue.restoreContext();
+  queue.run([&] { painter->draw(*layer.GetBitmap()); });
+  EXPECT_EQ(pixelAt(layer.readPixels(), kSize, 99, 99)[0], 99);
+  queue.run([&] { painter.reset(); });
+}
+
+TEST_P(Layer, SaysClearlyWhatCannotBeDrawn) {
+  try {
+    const CanvasLayer layer(queue, 1 << 20, 10);
+    FAIL();
+  } catch (const std::runtime_error& error) {
+    EXPECT_THAT(error.what(), HasSubstr("1048576 x 10"));
+  }
+  EXPECT_THROW(CanvasLayer(queue, 0, 10), std::runtime_error);
+  EXPECT_THROW(CanvasLayer(queue, 10, 10, 0), std::runtime_error);
+  RenderQueue blind(GetParam(), RenderQueue::GL::None);
+  EXPECT_THROW(CanvasLayer(blind, 10, 10), std::runtime_error);
+}
+
+TEST_P(Layer, MayOutliveTheRenderThread) {
+  CanvasLayer layer(queue, 10, 10);
+  std::unique_ptr<WindowPainter> painter;
+  queue.run([&] { painter = std::make_unique<WindowPainter>(); });
+  queue.shutDown();
+  EXPECT_THROW(layer.readPixels(), std::runtime_error);
+}
+
+// A bitmap's owner, filling it again when told to, as pens do.
+class PatternOwner : public Qelt::ManagedObject {
+ public:
+  PatternOwner() {
+    bitmap = Qelt::SPGraphicsFactory::CreateBitmap(nullptr, 4, 4, nullptr, false, 0);
+    fill();
+    Register(this);
+    Register(this);
+  }
+  ~PatternOwner() override {
+    Unregister(this);
+    Qelt::SPGraphicsFactory::ReleaseBitmap(bitmap);
+    Qelt::SPGraphicsFactory::ReleaseBitmap(bitmap);  // a second time does nothing
+    Qelt::SPGraphicsFactory::ReleaseBitmap(nullptr);
+  }
+  void OnRelease() override { ++released; }
+  void OnRestore() override {
+    ++restored;
+    if (refill) fill();
+  }
+  void fill() {
+    std::vector<std::uint8_t> pixels(4 * 4 * 4);
+    for (std::size_t i = 0; i < 16; ++i) pixels[4 * i] = static_cast<std::uint8_t>(10 * i + 1);
+    bitmap->SetPixels(pixels.data(), 4, 4);
+  }
+
+  Qelt::ISPBitmap* bitmap;
+  bool refill = true;
+  int released = 0;
+  int restored = 0;
+};
+
+// Draws a bitmap over the whole layer, pixel for pixel.
+std::vector<std::uint8_t> pictureOf(RenderQueue& queue, CanvasLayer& layer, Qelt::ISPBitmap& bitmap) {
+  queue.run([&] {
+    Qelt::OpenGLShaderProgram* const program =
+        Qelt::GraphicsFactory::createOpenGLShaderProgram(kVertexShader, kTextureShader, nullptr);
+    Qelt::IParameterBinding* const projection = program->getBindingIntf("projection", Qelt::kBindingMatrix4);
+    Qelt::IParameterBinding* const picture = program->getBindingIntf("picture", Qelt::kBindingInt);
+    Qelt::GraphicsObject* const quad = makeQuad();
+    setQuad(*quad, 0, 0, static_cast<float>(layer.width()), static_cast<float>(layer.height()));
+    Qelt::OpenGLRenderer::disableState(GL_BLEND);
+    bitmap.GetTexture()->SetFilter(Qelt::ISPTexture::kMinFilter, GL_NEAREST);
+    bitmap.GetTexture()->SetFilter(Qelt::ISPTexture::kMagFilter, GL_NEAREST);
+    bitmap.GetTexture()->Bind(1);
+    Qelt::ISPSubBitmap& tile = *layer.GetBitmap()->GetSubBitmap(0);
+    tile.BeginRender(0);
+    program->activate();
+    projection->set(tile.GetProjection());
+    picture->set(1);
+    quad->draw(0, -1, true, 0);
+    Qelt::OpenGLRenderer::discardFramebuffer(6);
+    tile.EndRender(0);
+    quad->release();
+    program->release();
+    projection->release();
+    picture->release();
+  });
+  return layer.readPixels();
+}
+
+TEST_P(Layer, BitmapsComeBackEmptyAndTheirOwnersFillThem) {
+  CanvasLayer layer(queue, 4, 4);
+  std::unique_ptr<PatternOwner> owner;
+  queue.run([&] { owner = std::make_unique<PatternOwner>(); });
+  const std::vector<std::uint8_t> filled = pictureOf(queue, layer, *owner->bitmap);
+  // First row, first column of the upload is texture coordinate 0, and the page's top left.
+  for (int i = 0; i < 16; ++i) EXPECT_EQ(filled[static_cast<std::size_t>(4 * i)], 10 * i + 1);
+  for (int round = 1; round <= 2; ++round) {
+    queue.loseContext();
+    queue.restoreContext();
+    EXPECT_EQ(owner->released, round);
+    EXPECT_EQ(owner->restored, round);
+    EXPECT_EQ(pictureOf(queue, layer, *owner->bitmap), filled);
+  }
+  owner->refill = false;
+  queue.loseContext();
+  queue.restoreContext();
+  EXPECT_EQ(pictureOf(queue, layer, *owner->bitmap), std::vector<std::uint8_t>(4 * 4 * 4));
+  queue.run([&] { owner.reset(); });
+}
+
+TEST_P(Layer, PartOfABitmapIsReplacedFromItsTopLeft) {
+  CanvasLayer layer(queue, 4, 4);
+  Qelt::ISPBitmap* bitmap = nullptr;
+  queue.run([&] {
+    bitmap = Qelt::SPGraphicsFactory::CreateBitmap(nullptr, 4, 4, nullptr, false, 0);
+    // Wider than the bitmap: what does not fit is left out, and rows keep their stride.
+    std::vector<std::uint8_t> pixels(6 * 2 * 4);
+    for (std::size_t i = 0; i < 12; ++i) pixels[4 * i] = static_cast<std::uint8_t>(i + 1);
+    bitmap->SetPixels(pixels.data(), 6, 2);
+    bitmap->SetPixels(nullptr, 4, 4);
+    bitmap->SetPixels(pixels.data(), 0, 4);
+    EXPECT_EQ(bitmap->GetTileCount(), 0);
+    EXPECT_EQ(Qelt::SPGraphicsFactory::CreateBitmap(nullptr, 0, 4, nullptr, false, 0), nullptr);
+    EXPECT_EQ(Qelt::SPGraphicsFactory::CreateBitmap(nullptr, 1 << 20, 4, nullptr, false, 0), nullptr);
+  });
+  const std::vector<std::uint8_t> picture = pictureOf(queue, layer, *bitmap);
+  std::vector<int> reds;
+  for (std::size_t i = 0; i < 16; ++i) reds.push_back(picture[4 * i]);
+  EXPECT_THAT(reds, testing::ElementsAre(1, 2, 3, 4, 7, 8, 9, 10, 0, 0, 0, 0, 0, 0, 0, 0));
+  queue.run([&] { Qelt::SPGraphicsFactory::ReleaseBitmap(bitmap); });
+}
+
+TEST_P(Layer, TheHostShapeFillsItsSquare) {
+  CanvasLayer layer(queue, 200, 200);
+  Qelt::ISPBitmap* bitmap = nullptr;
+  Qelt::ISPCanvas* canvas = nullptr;
+  Qelt::SPPaint paint;
+  paint.SetColor(0xFF000000u);
+  paint.SetStyle(Qelt::SPPaint::kFill);
+  paint.SetAntiAlias(true);
+  queue.run([&] {
+    bitmap = Qelt::SPGraphicsFactory::CreateBitmap(nullptr, 200, 200, nullptr, false, 0);
+    canvas = Qelt::SPGraphicsFactory::CreateCanvas(nullptr, bitmap, 0);
+    canvas->Clear(0);
+    canvas->DrawShape(0.0f, 0.0f, 200.0f, paint);
+  });
+  const std::vector<std::uint8_t> whole = pictureOf(queue, layer, *bitmap);
+  for (std::size_t i = 3; i < whole.size(); i += 4) ASSERT_EQ(whole[i], 255);
+  // Half a pixel at the rim is half covered; the colour is premultiplied.
+  paint.SetColor(0xFFFF0000u);
+  queue.run([&] {
+    canvas->Clear(0);
+    canvas->DrawShape(10.5f, 20.0f, 2.0f, paint);
+    canvas->DrawShape(std::nanf(""), 0.0f, 200.0f, paint);
+    canvas->DrawShape(0.0f, 0.0f, INFINITY, paint);
+    canvas->DrawShape(0.0f, 0.0f, -5.0f, paint);
+    canvas->DrawShape(1e30f, 0.0f, 5.0f, paint);
+  });
+  const std::vector<std::uint8_t> square = pictureOf(queue, layer, *bitmap);
+  EXPECT_NEAR(pixelAt(square, 200, 10, 20)[0], 128, 1);
+  EXPECT_NEAR(pixelAt(square, 200, 10, 20)[3], 128, 1);
+  EXPECT_EQ(pixelAt(square, 200, 11, 21)[0], 255);
+  EXPECT_NEAR(pixelAt(square, 200, 12, 21)[3], 128, 1);
+  EXPECT_EQ(pixelAt(square, 200, 9, 20)[3], 0);
+  EXPECT_EQ(pixelAt(square, 200, 11, 22)[3], 0);
+  queue.run([&] {
+    Qelt::SPGraphicsFactory::ReleaseCanvas(canvas);
+    Qelt::SPGraphicsFactory::ReleaseBitmap(bitmap);
+    EXPECT_EQ(Qelt::SPGraphicsFactory::CreateCanvas(nullptr, nullptr, 0), nullptr);
+    Qelt::SPGraphicsFactory::ReleaseCanvas(nullptr);
+  });
+}
+
+TEST_P(Layer, UniformsTellTheirTypeAndOutliveTheirProgram) {
+  queue.run([&] {
+    WindowPainter painter;
+    EXPECT_EQ(painter.projection->getType(), Qelt::kBindingMatrix4);
+    EXPECT_EQ(painter.tint->getType(), Qelt::kBindingVector4);
+    EXPECT_EQ(painter.offset->getType(), Qelt::kBindingVector2);
+    EXPECT_EQ(painter.strength->getType(), Qelt::kBindingFloat);
+    EXPECT_EQ(painter.program->getBindingIntf("tint", Qelt::kBindingFloat), nullptr);
+    EXPECT_EQ(painter.program->getBindingIntf("nowhere", 0), nullptr);
+    EXPECT_EQ(painter.program->getBindingIntf(nullptr, 0), nullptr);
+    painter.tint->set(3.0f);  // of another type: dropped, no GL error
+
+    Qelt::OpenGLShaderProgram* const program =
+        Qelt::GraphicsFactory::createOpenGLShaderProgram(kVertexShader, kTextureShader, nullptr);
+    Qelt::IParameterBinding* const sampler = program->getBindingIntf("picture", 0);
+    Qelt::IParameterBinding* const other = program->getBindingIntf("unused", 0);
+    EXPECT_EQ(sampler->getType(), Qelt::kBindingInt);
+    EXPECT_THAT(static_cast<int>(other->getType()), testing::Not(testing::AnyOf(0, 3, 4, 6, 7, 9)));
+    program->release();
+    sampler->set(1);
+    sampler->release();
+    other->release();
+  });
+}
+
+TEST_P(Layer, BrokenShadersAreLoggedAndAnswerNull) {
+  queue.run([&] {
+    EXPECT_EQ(Qelt::GraphicsFactory::createOpenGLShaderProgram("nonsense", kWindowShader, nullptr), nullptr);
+    EXPECT_EQ(Qelt::GraphicsFactory::createOpenGLShaderProgram(kVertexShader, nullptr, nullptr), nullptr);
+    EXPECT_EQ(Qelt::GraphicsFactory::createGraphicsObject(0, 4, Qelt::VertexDescriptor(), 0, 0), nullptr);
+  });
+  const auto lines = log.take();
+  ASSERT_EQ(lines.size(), 1u);
+  EXPECT_EQ(lines[0].priority, 6);
+  EXPECT_THAT(lines[0].text, HasSubstr("vertex shader does not compile"));
+}
+
+TEST_P(Layer, VertexCountsAreHeldToWhatWasUploaded) {
+  CanvasLayer layer(queue, 8, 8);
+  queue.run([&] {
+    WindowPainter painter;
+    setQuad(*painter.quad, 0, 0, 8, 8);
+    painter.quad->updateBuffer(1, nullptr, 3);
+    painter.quad->updateBuffer(-1, nullptr, 3);
+    layer.GetBitmap()->GetSubBitmap(0)->BeginRender(0);
+    painter.program->activate();
+    painter.quad->draw(100, 5, true, 0);
+    painter.quad->draw(-3, 1000000, true, 0);
+    layer.GetBitmap()->GetSubBitmap(0)->EndRender(0);
+    layer.clear();
+    painter.quad->updateBuffer(0, nullptr, 6);
+    painter.draw(*layer.GetBitmap());
+  });
+  EXPECT_EQ(layer.readPixels(), std::vector<std::uint8_t>(8 * 8 * 4));
+}
+
+TEST(LayerQueues, TwoQueuesOnOneThreadKeepTheirContextsApart) {
+  RenderQueue one(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
+  CanvasLayer first(one, 16, 16);
+  RenderQueue two(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
+  CanvasLayer second(two, 16, 16);
+  one.run([&] {
+    WindowPainter painter;
+    setQuad(*painter.quad, 0, 0, 16, 16);
+    EXPECT_EQ(second.readPixels(), std::vector<std::uint8_t>(16 * 16 * 4));  // inside the other's task
+    painter.draw(*first.GetBitmap());
+  });
+  EXPECT_EQ(pixelAt(first.readPixels(), 16, 5, 6)[0], 5);
+  EXPECT_EQ(second.readPixels(), std::vector<std::uint8_t>(16 * 16 * 4));
+}
+
+}  // namespace

@@ -1,0 +1,174 @@
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <memory>
+#include <stdexcept>
+#include <string>
+#include <thread>
+#include <typeinfo>
+#include <vector>
+
+#include "desktop/gl/CallTask.h"
+#include "desktop/gl/RenderQueue.h"
+#include "gl/ITask.h"
+#include "support/LogCapture.h"
+
+namespace {
+
+using QeltDesktop::postCall;
+using QeltDesktop::RenderQueue;
+
+class Queue : public testing::TestWithParam<RenderQueue::Mode> {};
+
+INSTANTIATE_TEST_SUITE_P(Modes, Queue, testing::Values(RenderQueue::Mode::Thread, RenderQueue::Mode::Caller),
+                         [](const auto& mode) {
+                           return mode.param == RenderQueue::Mode::Thread ? "OwnThread" : "CallersThread";
+                         });
+
+// Counts the tasks alive, to see each one deleted once.
+class CountedTask final : public Qelt::ITask {
+ public:
+  CountedTask(std::atomic<int>& alive, std::atomic<int>& ran) : mAlive(alive), mRan(ran) { ++mAlive; }
+  ~CountedTask() override { --mAlive; }
+  void run() override { ++mRan; }
+
+ private:
+  std::atomic<int>& mAlive;
+  std::atomic<int>& mRan;
+};
+
+TEST_P(Queue, RunsTasksInPostingOrder) {
+  RenderQueue queue(GetParam(), RenderQueue::GL::None);
+  std::vector<int> ran;
+  for (int i = 0; i < 1000; ++i) EXPECT_TRUE(postCall(queue, [&ran, i] { ran.push_back(i); }));
+  queue.finish();
+  ASSERT_EQ(ran.size(), 1000u);
+  for (int i = 0; i < 1000; ++i) EXPECT_EQ(ran[static_cast<std::size_t>(i)], i);
+}
+
+TEST_P(Queue, TasksMayPostTasks) {
+  RenderQueue queue(GetParam(), RenderQueue::GL::None);
+  std::string order;
+  postCall(queue, [&] {
+    order += 'a';
+    postCall(queue, [&] { order += 'c'; });
+    queue.finish();  // returns at once instead of waiting for itself
+    EXPECT_TRUE(queue.run([&] { order += '!'; }));
+  });
+  postCall(queue, [&] { order += 'b'; });
+  queue.finish();
+  queue.finish();
+  EXPECT_EQ(order, "a!bc");
+}
+
+TEST_P(Queue, RefusesWithoutTakingOwnershipAndIgnoresNull) {
+  std::atomic<int> alive{0}, ran{0};
+  RenderQueue queue(GetParam(), RenderQueue::GL::None);
+  EXPECT_TRUE(queue.Post(nullptr));
+  queue.accept = [](const Qelt::ITask&) { return false; };
+  int accepted = 0;
+  queue.onAccepted = [&](const Qelt::ITask&) { ++accepted; };
+  auto task = std::make_unique<CountedTask>(alive, ran);
+  EXPECT_FALSE(queue.Post(task.get()));
+  EXPECT_EQ(alive, 1);
+  // The host's own calls get through.
+  bool called = false;
+  EXPECT_TRUE(queue.run([&] { called = true; }));
+  EXPECT_TRUE(called);
+  EXPECT_EQ(accepted, 0);
+  queue.accept = nullptr;
+  EXPECT_TRUE(queue.Post(task.release()));
+  queue.finish();
+  EXPECT_EQ(ran, 1);
+  EXPECT_EQ(alive, 0);
+  EXPECT_EQ(accepted, 1);
+}
+
+TEST_P(Queue, ShuttingDownRunsWhatWasPostedAndTakesNoMore) {
+  std::atomic<int> alive{0}, ran{0};
+  RenderQueue queue(GetParam(), RenderQueue::GL::None);
+  for (int i = 0; i < 50; ++i) queue.Post(new CountedTask(alive, ran));
+  queue.shutDown();
+  EXPECT_EQ(ran, 50);
+  EXPECT_EQ(alive, 0);
+  const auto late = std::make_unique<CountedTask>(alive, ran);
+  EXPECT_FALSE(queue.Post(late.get()));
+  EXPECT_FALSE(queue.run([] { FAIL(); }));
+  queue.finish();
+  queue.shutDown();
+}
+
+TEST_P(Queue, DestructionDrains) {
+  std::atomic<int> alive{0}, ran{0};
+  {
+    RenderQueue queue(GetParam(), RenderQueue::GL::None);
+    for (int i = 0; i < 50; ++i) queue.Post(new CountedTask(alive, ran));
+  }
+  EXPECT_EQ(ran, 50);
+  EXPECT_EQ(alive, 0);
+}
+
+TEST_P(Queue, ATaskThatThrowsIsLoggedAndDropped) {
+  const auto capture = std::make_unique<QeltTests::LogCapture>();
+  RenderQueue queue(GetParam(), RenderQueue::GL::None);
+  bool next = false;
+  postCall(queue, [] { throw std::runtime_error("pencil broke"); });
+  postCall(queue, [] { throw 5; });
+  postCall(queue, [&] { next = true; });
+  queue.finish();
+  EXPECT_TRUE(next);
+  const auto lines = capture->take();
+  ASSERT_EQ(lines.size(), 2u);
+  EXPECT_EQ(lines[0].priority, 6);
+  EXPECT_EQ(lines[0].tag, "qel_log");
+  EXPECT_THAT(lines[0].text, testing::HasSubstr("pencil broke"));
+  EXPECT_EQ(lines[1].priority, 6);
+}
+
+TEST_P(Queue, RunHandsBackWhatTheCallThrows) {
+  RenderQueue queue(GetParam(), RenderQueue::GL::None);
+  EXPECT_THROW(queue.run([] { throw std::logic_error("no"); }), std::logic_error);
+  EXPECT_TRUE(queue.run([] {}));
+}
+
+TEST_P(Queue, WithoutGLThereIsNoContextToLose) {
+  RenderQueue queue(GetParam(), RenderQueue::GL::None);
+  EXPECT_EQ(queue.rendererName(), "none");
+  queue.loseContext();
+  queue.restoreContext();
+}
+
+TEST(QueueThreads, ManyPostersKeepTheirOwnOrder) {
+  constexpr int kThreads = 4, kTasks = 2000;
+  RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::None);
+  std::vector<std::vector<int>> seen(kThreads);
+  std::atomic<int> accepted{0};
+  queue.onAccepted = [&](const Qelt::ITask&) { ++accepted; };
+  std::vector<std::thread> posters;
+  for (int who = 0; who < kThreads; ++who) {
+    posters.emplace_back([&, who] {
+      auto& mine = seen[static_cast<std::size_t>(who)];
+      for (int i = 0; i < kTasks; ++i) postCall(queue, [&mine, i] { mine.push_back(i); });
+    });
+  }
+  for (std::thread& poster : posters) poster.join();
+  queue.finish();
+  EXPECT_EQ(accepted, kThreads * kTasks);
+  for (const auto& mine : seen) {
+    ASSERT_EQ(mine.size(), static_cast<std::size_t>(kTasks));
+    for (int i = 0; i < kTasks; ++i) ASSERT_EQ(mine[static_cast<std::size_t>(i)], i);
+  }
+}
+
+TEST(QueueThreads, TasksRunOnOneThreadThatIsNotThePosters) {
+  RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::None);
+  std::thread::id first, second;
+  postCall(queue, [&] { first = std::this_thread::get_id(); });
+  queue.finish();
+  queue.run([&] { second = std::this_thread::get_id(); });
+  EXPECT_NE(first, std::this_thread::get_id());
+  EXPECT_EQ(first, second);
+}
+
+}  // namespace

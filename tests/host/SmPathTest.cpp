@@ -1,0 +1,344 @@
+#include "graphics/SmPath.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <array>
+#include <cmath>
+#include <cstddef>
+#include <limits>
+#include <random>
+#include <string>
+#include <vector>
+
+namespace {
+
+using Qelt::SmPath;
+using Qelt::SmPoint;
+
+constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
+constexpr float kInfinity = std::numeric_limits<float>::infinity();
+
+struct Quad {
+  float x0, y0, cx, cy, x1, y1;
+};
+
+void build(SmPath& path, const Quad& q) {
+  path.rewind();
+  path.moveTo(q.x0, q.y0);
+  path.quadTo(q.cx, q.cy, q.x1, q.y1);
+  path.resetPath(0);
+}
+
+// Arc length by brute force: five-point Gauss sums over a grid that closes in on the vertex.
+class Reference {
+ public:
+  explicit Reference(const Quad& q)
+      : mPx(q.x0), mPy(q.y0), mBx(2.0 * (double{q.cx} - q.x0)), mBy(2.0 * (double{q.cy} - q.y0)) {
+    mAx = double{q.x0} - 2.0 * q.cx + q.x1;
+    mAy = double{q.y0} - 2.0 * q.cy + q.y1;
+    for (int i = 0; i <= 256; ++i) mTimes.push_back(i / 256.0);
+    const double square = mAx * mAx + mAy * mAy;
+    if (square > 0.0) {
+      const double vertex = -(mAx * mBx + mAy * mBy) / (2.0 * square);
+      addTime(vertex);
+      for (int i = 0; i < 60; ++i) {
+        addTime(vertex + std::ldexp(1.0, -i));
+        addTime(vertex - std::ldexp(1.0, -i));
+      }
+    }
+    std::sort(mTimes.begin(), mTimes.end());
+    mLengths.push_back(0.0);
+    for (std::size_t i = 1; i < mTimes.size(); ++i) {
+      mLengths.push_back(mLengths.back() + lengthBetween(mTimes[i - 1], mTimes[i]));
+    }
+  }
+
+  double length() const { return mLengths.back(); }
+  double lengthTo(double t) const {
+    const auto above = std::upper_bound(mTimes.begin(), mTimes.end(), t);
+    const auto below = static_cast<std::size_t>(above - mTimes.begin()) - 1;
+    return mLengths[below] + lengthBetween(mTimes[below], t);
+  }
+  double x(double t) const { return mPx + t * (mBx + t * mAx); }
+  double y(double t) const { return mPy + t * (mBy + t * mAy); }
+
+ private:
+  void addTime(double t) {
+    if (t > 0.0 && t < 1.0) mTimes.push_back(t);
+  }
+  double speed(double t) const { return std::hypot(mBx + 2.0 * t * mAx, mBy + 2.0 * t * mAy); }
+  double lengthBetween(double from, double to) const {
+    constexpr double kAt[] = {0.0, 0.5384693101056831, 0.9061798459386640};
+    constexpr double kWeight[] = {0.5688888888888889, 0.4786286704993665, 0.2369268850561891};
+    const double middle = 0.5 * (from + to);
+    const double half = 0.5 * (to - from);
+    double sum = kWeight[0] * speed(middle);
+    for (int i = 1; i < 3; ++i) {
+      sum += kWeight[i] * (speed(middle - half * kAt[i]) + speed(middle + half * kAt[i]));
+    }
+    return sum * half;
+  }
+
+  double mPx, mPy, mBx, mBy, mAx = 0.0, mAy = 0.0;
+  std::vector<double> mTimes;
+  std::vector<double> mLengths;
+};
+
+// Quadratics of one kind, `size` units long or less, anywhere within `size` of the origin.
+class QuadSource {
+ public:
+  explicit QuadSource(double size) : mSize(size) {}
+
+  Quad wild() { return place(u(), u(), u(), u()); }
+  // Turns back on itself, the more sharply the smaller the exponent drawn.
+  Quad nearlyBackAndForth() {
+    const double width = std::pow(10.0, -3.0 + 3.0 * u());
+    return place(1.0, width * u(), 0.5 * u(), width * u());
+  }
+  Quad onALine() {
+    const double slopeX = u(), slopeY = u(), first = u(), second = u();
+    return place(first * slopeX, first * slopeY, second * slopeX, second * slopeY);
+  }
+  Quad gentle() {
+    const double bend = 0.2 * u();
+    return place(0.3, 0.3 + bend, 0.6 - bend, 0.6);
+  }
+  Quad withDoubledPoints() {
+    const double x = u(), y = u();
+    switch (mCount++ % 4) {
+      case 0:
+        return place(0, 0, x, y);
+      case 1:
+        return place(x, y, x, y);
+      case 2:
+        return place(x, y, 0, 0);
+      default:
+        return place(0, 0, 0, 0);
+    }
+  }
+
+ private:
+  double u() { return mUniform(mBits); }
+  Quad place(double cx, double cy, double x, double y) {
+    const double half = 0.5 * mSize;
+    const auto ox = static_cast<float>(mSize * u()), oy = static_cast<float>(mSize * u());
+    return {ox,
+            oy,
+            ox + static_cast<float>(half * cx),
+            oy + static_cast<float>(half * cy),
+            ox + static_cast<float>(half * x),
+            oy + static_cast<float>(half * y)};
+  }
+
+  double mSize;
+  int mCount = 0;
+  std::mt19937 mBits{20240229};
+  std::uniform_real_distribution<double> mUniform{-1.0, 1.0};
+};
+
+std::string textOf(const Quad& q) {
+  std::string text;
+  for (float value : {q.x0, q.y0, q.cx, q.cy, q.x1, q.y1}) text += std::to_string(value) + " ";
+  return text;
+}
+
+// Positions, tangents and length of one quadratic against the reference.
+void expectExact(const Quad& q, double positionTolerance, double lengthTolerance) {
+  SmPath path;
+  build(path, q);
+  const Reference reference(q);
+  ASSERT_NEAR(path.getLength(), reference.length(), lengthTolerance) << textOf(q);
+  constexpr int kPositions = 37;
+  for (int i = 0; i <= kPositions; ++i) {
+    const double t = static_cast<double>(i) / kPositions;
+    const double s = reference.lengthTo(t);
+    const float asked = std::min(static_cast<float>(s), path.getLength());
+    SmPoint at;
+    ASSERT_TRUE(path.getPosTan(asked, &at, nullptr)) << textOf(q) << "at " << asked;
+    const double off = std::hypot(at.x - reference.x(t), at.y - reference.y(t)) - std::abs(asked - s);
+    ASSERT_LE(off, positionTolerance) << textOf(q) << "at " << asked << " of " << path.getLength();
+  }
+}
+
+TEST(SmPath, FollowsAnyQuadraticWithinItsTolerance) {
+  for (const double size : {1.0, 10.0, 100.0, 1000.0}) {
+    QuadSource source(size);
+    // The closed form in doubles, then one rounding to float; half a unit in the last place at 2048
+    // is 1.2e-4.
+    for (int i = 0; i < 200; ++i) {
+      expectExact(source.wild(), 0.002, 0.0002);
+      expectExact(source.nearlyBackAndForth(), 0.002, 0.0002);
+      expectExact(source.onALine(), 0.002, 0.0002);
+      expectExact(source.gentle(), 0.002, 0.0002);
+      expectExact(source.withDoubledPoints(), 0.002, 0.0002);
+    }
+  }
+}
+
+TEST(SmPath, FarOutAndTinyPathsKeepTheTolerancesThatFloatsAllow) {
+  for (const double size : {1e-30, 1e-6, 1e6, 1e12}) {
+    QuadSource source(size);
+    const double position = std::max(std::min(size, 0.002), 4e-6 * size);
+    for (int i = 0; i < 100; ++i) {
+      expectExact(source.wild(), position, 4e-7 * size);
+      expectExact(source.nearlyBackAndForth(), position, 4e-7 * size);
+      expectExact(source.onALine(), position, 4e-7 * size);
+    }
+  }
+}
+
+TEST(SmPath, ACuspGoesThereAndBack) {
+  SmPath path;
+  // y = 0; x runs 0, up to 25 at t = 1/2, back to 0.
+  build(path, {0, 0, 50, 0, 0, 0});
+  EXPECT_FLOAT_EQ(path.getLength(), 50.0f);
+  for (const auto& [distance, x, direction] : {std::array{0.0f, 0.0f, 1.0f},
+                                               {10.0f, 10.0f, 1.0f},
+                                               {24.0f, 24.0f, 1.0f},
+                                               {25.0f, 25.0f, 1.0f},
+                                               {26.0f, 24.0f, -1.0f},
+                                               {50.0f, 0.0f, -1.0f}}) {
+    SmPoint at, along;
+    ASSERT_TRUE(path.getPosTan(distance, &at, &along));
+    EXPECT_NEAR(at.x, x, 1e-4f);
+    EXPECT_EQ(at.y, 0.0f);
+    EXPECT_FLOAT_EQ(along.x, direction);
+  }
+}
+
+TEST(SmPath, TangentsAreUnitVectorsAlongTheWay) {
+  SmPath path;
+  build(path, {0, 0, 30, 0, 30, 40});
+  SmPoint at, along;
+  ASSERT_TRUE(path.getPosTan(0.0f, &at, &along));
+  EXPECT_NEAR(along.x, 1.0f, 1e-6f);
+  EXPECT_NEAR(along.y, 0.0f, 1e-6f);
+  ASSERT_TRUE(path.getPosTan(path.getLength(), nullptr, &along));
+  EXPECT_NEAR(along.x, 0.0f, 1e-5f);
+  EXPECT_NEAR(along.y, 1.0f, 1e-5f);
+}
+
+TEST(SmPath, QueriesInAnyOrderAnswerTheSame) {
+  SmPath path;
+  path.moveTo(0, 0);
+  path.lineTo(30, 40);
+  path.quadTo(60, 80, 0, 120);
+  path.quadTo(0, 120, 0, 120);
+  path.quadTo(-200, 120, 10, 119);
+  path.lineTo(10, 0);
+  path.resetPath(0);
+  constexpr int kCount = 400;
+  const float step = path.getLength() / kCount;
+  std::vector<SmPoint> rising;
+  for (int i = 0; i <= kCount; ++i) {
+    SmPoint at;
+    ASSERT_TRUE(path.getPosTan(static_cast<float>(i) * step, &at, nullptr));
+    rising.push_back(at);
+  }
+  EXPECT_NEAR(rising.back().x, 10.0f, 1e-3f);
+  EXPECT_NEAR(rising.back().y, 0.0f, 1e-3f);
+  std::mt19937 bits(7);
+  for (int i = 0; i < 2000; ++i) {
+    const auto index = bits() % (kCount + 1);
+    SmPoint at;
+    ASSERT_TRUE(path.getPosTan(static_cast<float>(index) * step, &at, nullptr));
+    ASSERT_EQ(at.x, rising[index].x) << index;
+    ASSERT_EQ(at.y, rising[index].y) << index;
+  }
+  // No step is longer than the way along the path.
+  for (std::size_t i = 1; i < rising.size(); ++i) {
+    ASSERT_LE(std::hypot(rising[i].x - rising[i - 1].x, rising[i].y - rising[i - 1].y), step + 0.002f);
+  }
+}
+
+TEST(SmPath, DistancesOutsideAreRefusedAndRoundingIsForgiven) {
+  SmPath path;
+  SmPoint at{-1, -1};
+  EXPECT_FALSE(path.getPosTan(0.0f, &at, nullptr));  // nothing measured yet
+  build(path, {0, 0, 3, 1, 7, 0});
+  const float length = path.getLength();
+  EXPECT_TRUE(path.getPosTan(std::nextafter(std::nextafter(length, kInfinity), kInfinity), &at, nullptr));
+  EXPECT_NEAR(at.x, 7.0f, 1e-5f);
+  for (const float outside : {length * 1.0001f, -1e-3f, kNaN, kInfinity, -kInfinity}) {
+    EXPECT_FALSE(path.getPosTan(outside, &at, nullptr)) << outside;
+  }
+  path.rewind();
+  EXPECT_FALSE(path.getPosTan(0.0f, &at, nullptr));
+  EXPECT_EQ(path.getLength(), 0.0f);
+}
+
+TEST(SmPath, APathWithoutLengthHasOnePosition) {
+  SmPath path;
+  path.moveTo(3, 4);
+  path.resetPath(0);
+  SmPoint at;
+  ASSERT_TRUE(path.getPosTan(0.0f, &at, nullptr));
+  EXPECT_EQ(at.x, 3.0f);
+  EXPECT_EQ(at.y, 4.0f);
+  EXPECT_FALSE(path.getPosTan(0.01f, &at, nullptr));
+
+  build(path, {5, 6, 5, 6, 5, 6});
+  EXPECT_EQ(path.getLength(), 0.0f);
+  SmPoint along{9, 9};
+  ASSERT_TRUE(path.getPosTan(0.0f, &at, &along));
+  EXPECT_EQ(at.x, 5.0f);
+  EXPECT_EQ(along.x, 0.0f);
+  EXPECT_FALSE(path.getPosTan(1e-6f, &at, nullptr));
+}
+
+TEST(SmPath, MeasuresTheContourThatWasAskedFor) {
+  SmPath path;
+  path.moveTo(0, 0);
+  path.lineTo(1, 0);
+  path.moveTo(10, 10);
+  path.lineTo(10, 15);
+  path.resetPath(1);
+  EXPECT_EQ(path.getLength(), 5.0f);
+  SmPoint at;
+  ASSERT_TRUE(path.getPosTan(2.0f, &at, nullptr));
+  EXPECT_EQ(at.x, 10.0f);
+  EXPECT_EQ(at.y, 12.0f);
+  path.resetPath(0);
+  EXPECT_EQ(path.getLength(), 1.0f);
+  for (const int missing : {2, -1}) {
+    path.resetPath(missing);
+    EXPECT_FALSE(path.getPosTan(0.0f, &at, nullptr));
+  }
+}
+
+TEST(SmPath, CoordinatesThatAreNoNumbersAreNoWay) {
+  for (const float bad : {kNaN, kInfinity, -kInfinity}) {
+    for (int place = 0; place < 6; ++place) {
+      float values[6] = {0, 0, 5, 5, 10, 0};
+      values[place] = bad;
+      SmPath path;
+      build(path, {values[0], values[1], values[2], values[3], values[4], values[5]});
+      EXPECT_FALSE(std::isfinite(path.getLength()));
+      SmPoint at;
+      EXPECT_FALSE(path.getPosTan(0.0f, &at, nullptr));
+      EXPECT_FALSE(path.getPosTan(1.0f, &at, nullptr));
+    }
+  }
+  const float huge = std::numeric_limits<float>::max();
+  SmPath path;
+  build(path, {-huge, -huge, huge, huge, -huge, huge});
+  SmPoint at;
+  path.getPosTan(1e38f, &at, nullptr);
+  EXPECT_GT(path.getLength(), 0.0f);
+}
+
+TEST(SmPath, RoomMayBeAskedForFreedAndUsedAgain) {
+  SmPath path;
+  path.incReserve(std::numeric_limits<int>::max());
+  path.incReserve(-1);
+  path.incReserve(3);
+  build(path, {0, 0, 1, 1, 2, 0});
+  path.freeMemory();
+  EXPECT_EQ(path.getLength(), 0.0f);
+  path.resetPath(0);
+  build(path, {0, 0, 1, 0, 2, 0});
+  EXPECT_EQ(path.getLength(), 2.0f);
+}
+
+}  // namespace

@@ -1,0 +1,110 @@
+#include <gtest/gtest.h>
+
+#include <memory>
+#include <vector>
+
+#include "base/RefCount.h"
+#include "desktop/graphics/PenCanvas.h"
+#include "desktop/model/StoredStroke.h"
+#include "math/Matrix3.h"
+#include "model/ObjectBase.h"
+#include "pencommon/PenStrokeDataManager.h"
+
+namespace {
+
+using Qelt::PenStrokeData;
+using Qelt::PenStrokeDataManager;
+using Qelt::PenStrokePointData;
+
+PenStrokePointData* pointsOf(std::vector<float> floats) {
+  auto* const points = new PenStrokePointData;
+  points->mBuffer = new std::vector<float>(std::move(floats));
+  return points;
+}
+
+class StrokeCache : public testing::Test {
+ protected:
+  void SetUp() override { manager.SetInverseScale({1.0f, 1.0f}); }
+  void TearDown() override { manager.DropStrokeData(kHandle); }
+
+  static constexpr int kHandle = 1 << 30;  // no living object's
+  PenStrokeDataManager& manager = *PenStrokeDataManager::GetInstance();
+};
+
+TEST_F(StrokeCache, OnlyThePageMakesEntries) {
+  EXPECT_EQ(manager.GetStrokeData(kHandle), nullptr);
+  manager.ReleaseStrokeData(kHandle);
+  manager.CreateStrokeData(kHandle);
+  PenStrokeData* const data = manager.GetStrokeData(kHandle);
+  ASSERT_NE(data, nullptr);
+  manager.CreateStrokeData(kHandle);
+  EXPECT_EQ(manager.GetStrokeData(kHandle), data);
+  manager.ReleaseStrokeData(kHandle);
+  manager.ReleaseStrokeData(kHandle);
+}
+
+// Under AddressSanitizer this is the test that the last use frees, and no sooner.
+TEST_F(StrokeCache, ADroppedEntryGoesWithItsLastUse) {
+  manager.CreateStrokeData(kHandle);
+  PenStrokeData* const data = manager.GetStrokeData(kHandle);
+  PenStrokePointData* const points = pointsOf({1, 2, 3});
+  EXPECT_TRUE(data->SetPointData(points));
+  points->Unref();
+  manager.DropStrokeData(kHandle);
+  EXPECT_EQ(manager.GetStrokeData(kHandle), nullptr);
+  PenStrokePointData* const counted = data->GetPointData();
+  manager.ReleaseStrokeData(kHandle);
+  EXPECT_EQ(counted->mBuffer->size(), 3u);
+  counted->Unref();
+  manager.ReleaseStrokeData(kHandle);
+}
+
+TEST_F(StrokeCache, AnEntryMadeAnewInUseStartsOverEmpty) {
+  manager.CreateStrokeData(kHandle);
+  PenStrokeData* const data = manager.GetStrokeData(kHandle);
+  PenStrokePointData* const points = pointsOf({1});
+  data->SetPointData(points);
+  points->Unref();
+  manager.DropStrokeData(kHandle);
+  manager.CreateStrokeData(kHandle);
+  EXPECT_EQ(manager.GetStrokeData(kHandle), data);
+  EXPECT_EQ(data->GetPointData(), nullptr);
+  manager.ReleaseStrokeData(kHandle);
+  manager.ReleaseStrokeData(kHandle);
+}
+
+TEST_F(StrokeCache, PointsRecordTheScaleOfTheViewThatTheyWereStoredIn) {
+  QeltDesktop::PenCanvas canvas(nullptr, nullptr);
+  Qelt::Matrix3<float> zoom;
+  zoom.setScale(4.0f, 2.0f);
+  canvas.setMatrix(zoom);
+  PenStrokeData data;
+  PenStrokePointData* const points = pointsOf({1});
+  EXPECT_TRUE(data.SetPointData(points));
+  EXPECT_TRUE(points->hasSameInverseScale({0.25f, 0.5f}));
+  EXPECT_FALSE(points->hasSameInverseScale({0.5f, 0.5f}));
+  EXPECT_FALSE(points->hasSameInverseScale({0.25f, 0.25f}));
+  canvas.setMatrix(Qelt::Matrix3<float>());
+  EXPECT_TRUE(points->hasSameInverseScale({0.25f, 0.5f}));
+  points->Unref();
+}
+
+TEST_F(StrokeCache, PointsWithoutABufferAreNotKept) {
+  PenStrokeData data;
+  auto* const empty = new PenStrokePointData;
+  EXPECT_FALSE(data.SetPointData(empty));
+  EXPECT_EQ(data.GetPointData(), nullptr);
+  empty->Unref();
+}
+
+TEST(PageObjects, AreFoundByHandleWhileTheyLive) {
+  auto stroke = std::make_unique<QeltDesktop::StoredStroke>(2);
+  const int handle = stroke->GetRuntimeHandle();
+  const QeltDesktop::StoredStroke other(1);
+  EXPECT_NE(other.GetRuntimeHandle(), handle);
+  EXPECT_EQ(Qelt::ObjectBase::FindObjectBase(handle), stroke.get());
+  stroke.reset();
+  EXPECT_EQ(Qelt::ObjectBase::FindObjectBase(handle), nullptr);
+}
+
+}  // namespace
