@@ -1,0 +1,290 @@
+// The program from the outside, as scripts see it.
+
+#include <gtest/gtest.h>
+#include <spng.h>
+#include <sys/wait.h>
+
+#include <algorithm>
+#include <cstddef>
+#include <cstdint>
+#include <cstdio>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <memory>
+#include <nlohmann/json.hpp>
+#include <sstream>
+#include <string>
+#include <vector>
+
+namespace {
+
+namespace fs = std::filesystem;
+using Json = nlohmann::json;
+
+std::string contentsOf(const fs::path& path) {
+  std::ifstream file(path, std::ios::binary);
+  return std::string(std::istreambuf_iterator<char>(file), {});
+}
+
+struct Ran {
+  int status;
+  std::string out, err;
+};
+
+struct Rgba {
+  std::uint32_t width = 0, height = 0;
+  std::vector<std::uint8_t> bytes;
+
+  const std::uint8_t* at(std::uint32_t x, std::uint32_t y) const { return &bytes[(y * width + x) * 4]; }
+};
+
+Rgba decoded(const fs::path& path) {
+  const std::string png = contentsOf(path);
+  const std::unique_ptr<spng_ctx, void (*)(spng_ctx*)> decoder(spng_ctx_new(0), &spng_ctx_free);
+  spng_set_png_buffer(decoder.get(), png.data(), png.size());
+  spng_ihdr header{};
+  Rgba picture;
+  if (spng_get_ihdr(decoder.get(), &header) != 0) {
+    ADD_FAILURE() << path << " is no PNG picture";
+    return picture;
+  }
+  picture.width = header.width;
+  picture.height = header.height;
+  picture.bytes.resize(std::size_t{header.width} * header.height * 4);
+  EXPECT_EQ(spng_decode_image(decoder.get(), picture.bytes.data(), picture.bytes.size(), SPNG_FMT_RGBA8, 0),
+            0);
+  return picture;
+}
+
+class Program : public testing::Test {
+ protected:
+  Program() {
+    const testing::TestInfo* const test = testing::UnitTest::GetInstance()->current_test_info();
+    mFolder = fs::path(testing::TempDir()) / ("qelt-sketch-" + std::string(test->name()));
+    fs::remove_all(mFolder);
+    fs::create_directories(mFolder);
+  }
+  ~Program() override { fs::remove_all(mFolder); }
+
+  fs::path path(const std::string& name) const { return mFolder / name; }
+
+  std::string write(const std::string& name, const std::string& text) const {
+    std::ofstream(path(name), std::ios::binary) << text;
+    return path(name).string();
+  }
+
+  // A slanted line of 11 points from (20.1, 20.1) to (70.1, 45.1), and a dot at (90.1, 30.1).
+  std::string writeInk() const {
+    std::string line;
+    for (int i = 0; i <= 10; ++i) {
+      line += (i > 0 ? ", " : "") + std::to_string(20.1 + 5.0 * i) + " " + std::to_string(20.1 + 2.5 * i);
+    }
+    return write(
+        "ink.inkml",
+        "<ink><brush><brushProperty name='width' value='5'/><brushProperty name='color' value='#203040'/>"
+        "</brush><trace>" +
+            line + "</trace><trace>90.1 30.1</trace></ink>");
+  }
+
+  Ran run(const std::string& arguments) const {
+    // The GL driver leaves a few caches behind as it is unloaded; the threaded tests look for leaks.
+    const std::string command = "ASAN_OPTIONS=detect_leaks=0 '" QELT_SKETCH_PATH "' " + arguments + " >'" +
+                                path("stdout").string() + "' 2>'" + path("stderr").string() + "'";
+    const int status = std::system(command.c_str());
+    return {WIFEXITED(status) ? WEXITSTATUS(status) : -1, contentsOf(path("stdout")),
+            contentsOf(path("stderr"))};
+  }
+
+  std::vector<Json> trace(const std::string& arguments) const {
+    const Ran ran = run("trace '" + writeInk() + "' -o - " + arguments);
+    EXPECT_EQ(ran.status, 0) << ran.err;
+    EXPECT_EQ(ran.err, "");
+    std::vector<Json> lines;
+    std::istringstream stream(ran.out);
+    for (std::string line; std::getline(stream, line);) lines.push_back(Json::parse(line));
+    return lines;
+  }
+
+  // Names of what is in the folder that no test put there.
+  bool holds(const std::string& name) const { return fs::exists(path(name)); }
+  bool holdsUnfinished() const {
+    for (const auto& entry : fs::directory_iterator(mFolder)) {
+      if (entry.path().string().find(".part") != std::string::npos) return true;
+    }
+    return false;
+  }
+
+ private:
+  fs::path mFolder;
+};
+
+TEST_F(Program, TracesEveryLiveCall) {
+  const std::vector<Json> lines = trace("");
+  // down, moves of 4, 4 and 2, up; then down and up of the dot.
+  ASSERT_EQ(lines.size(), 1u + 5u + 2u);
+  EXPECT_EQ(lines[0], Json::parse(R"({"kind":"header","renderingVersion":8,"size":5.0,"color":"#FF203040",
+                                      "curve":true,"mode":"live","drawable":"stroke"})"));
+  const int strokes[] = {0, 0, 0, 0, 0, 1, 1};
+  const int actions[] = {0, 2, 2, 2, 1, 0, 1};
+  for (std::size_t i = 1; i < lines.size(); ++i) {
+    const Json& line = lines[i];
+    EXPECT_EQ(line["kind"], "call");
+    EXPECT_EQ(line["op"], "Draw");
+    EXPECT_EQ(line["stroke"], strokes[i - 1]);
+    EXPECT_EQ(line["action"], actions[i - 1]);
+    EXPECT_EQ(line["result"], true);
+    EXPECT_EQ(line["rect"].size(), 4u);
+    ASSERT_EQ(line["buffers"].size(), 1u);
+    EXPECT_EQ(line["buffers"][0]["stride"], 11);
+    EXPECT_EQ(line["buffers"][0]["cached"], false);
+    EXPECT_EQ(line["buffers"][0]["data"].size() % 66, 0u);
+  }
+  // A down event places no stamp, a tap places one: six vertices of eleven floats.
+  EXPECT_EQ(lines[1]["buffers"][0]["data"].size(), 0u);
+  EXPECT_GT(lines[2]["buffers"][0]["data"].size(), 66u);
+  EXPECT_EQ(lines[7]["buffers"][0]["data"].size(), 66u);
+  // A tap's rectangle is about its point: size / 4 for the stamp and the closing growth of 6 at least.
+  EXPECT_NEAR(lines[7]["rect"][0].get<float>(), 90.1f - 6.25f, 2.0f);
+  // The batch, the order to draw it, and its deletion close every call.
+  const Json& posted = lines[2]["posted"];
+  ASSERT_GE(posted.size(), 3u);
+  const auto fromEnd = [&](std::size_t i) { return posted[posted.size() - i].get<std::string>(); };
+  EXPECT_TRUE(fromEnd(3).starts_with("Member1<")) << fromEnd(3);
+  EXPECT_EQ(fromEnd(2), "PenGLRenderMsg");
+  EXPECT_TRUE(fromEnd(1).starts_with("Delete<")) << fromEnd(1);
+}
+
+TEST_F(Program, TracesStoredStrokesTwiceAndTheCacheWithThem) {
+  const std::vector<Json> lines = trace("--mode stroke --repeat 2 --rendering-version 3 --size nan");
+  ASSERT_EQ(lines.size(), 1u + 4u);
+  EXPECT_EQ(lines[0]["size"], "NaN");
+  for (std::size_t i = 1; i < lines.size(); ++i) {
+    EXPECT_EQ(lines[i]["op"], "RedrawPen");
+    EXPECT_EQ(lines[i]["action"], nullptr);
+    EXPECT_EQ(lines[i]["stroke"], (i - 1) % 2);
+  }
+  const std::vector<Json> drawn = trace("--mode stroke --repeat 2 --rendering-version 3");
+  EXPECT_EQ(drawn[1]["buffers"][0]["cached"], false);
+  EXPECT_EQ(drawn[1]["buffers"][0]["stride"], 9);
+  EXPECT_EQ(drawn[3]["buffers"][0]["cached"], true);
+  EXPECT_EQ(drawn[3]["buffers"][0]["data"], drawn[1]["buffers"][0]["data"]);
+  EXPECT_EQ(drawn[3]["rect"], drawn[1]["rect"]);
+}
+
+TEST_F(Program, TracesWhatTheOptionsChange) {
+  // Every point of a recorded event reaches the pen: as many stamps as live, or one closing stamp more.
+  const std::vector<Json> recorded = trace("--mode event --color '#80FFFFFF' --no-curve");
+  ASSERT_EQ(recorded.size(), 3u);
+  EXPECT_EQ(recorded[0]["curve"], false);
+  EXPECT_EQ(recorded[0]["mode"], "event");
+  EXPECT_EQ(recorded[0]["color"], "#80FFFFFF");
+  EXPECT_EQ(recorded[1]["op"], "RedrawPen");
+  // Half the inverse scale reaches version 8's vertices.
+  EXPECT_NE(trace("--zoom 2")[2]["buffers"], trace("")[2]["buffers"]);
+  // The pen stays down after one point of the last trace.
+  EXPECT_EQ(trace("--points 1").size(), 1u + 5u + 1u);
+  EXPECT_EQ(trace("--batch 10").size(), 1u + 3u + 2u);
+}
+
+TEST_F(Program, DrawsInkWhereTheInkIs) {
+  const std::string ink = writeInk();
+  const std::string out = path("out.png").string();
+  const Ran ran = run("draw '" + ink + "' -o '" + out + "' --page 120x60 --background '#FFEEDD'");
+  ASSERT_EQ(ran.status, 0) << ran.err;
+  EXPECT_EQ(ran.out + ran.err, "");
+  EXPECT_FALSE(holdsUnfinished());
+  const Rgba picture = decoded(out);
+  ASSERT_EQ(picture.width, 120u);
+  ASSERT_EQ(picture.height, 60u);
+  int inside = 0, outside = 0;
+  for (std::uint32_t y = 0; y < picture.height; ++y) {
+    for (std::uint32_t x = 0; x < picture.width; ++x) {
+      const std::uint8_t* const pixel = picture.at(x, y);
+      EXPECT_EQ(pixel[3], 255);
+      const bool inked = pixel[0] != 0xFF || pixel[1] != 0xEE || pixel[2] != 0xDD;
+      const bool near = (x > 10 && x < 100 && y > 10 && y < 55);
+      (near ? inside : outside) += inked ? 1 : 0;
+    }
+  }
+  EXPECT_GT(inside, 100);
+  EXPECT_EQ(outside, 0);
+
+  const Ran clear =
+      run("draw '" + ink + "' -o '" + out + "' --zoom 0.5 --rotate 90 --background transparent");
+  ASSERT_EQ(clear.status, 0) << clear.err;
+  const Rgba turned = decoded(out);
+  // (25 + 2 * 26) / 2 and (70 + 2 * 26) / 2, rounded up.
+  EXPECT_EQ(turned.width, 39u);
+  EXPECT_EQ(turned.height, 61u);
+  EXPECT_EQ(turned.at(0, 0)[3], 0);
+}
+
+TEST_F(Program, DrawsAPageAlikeHoweverOftenItIsRepeated) {
+  const std::string ink = writeInk();
+  const std::string once = path("once.png").string(), twice = path("twice.png").string();
+  EXPECT_EQ(run("draw '" + ink + "' --mode stroke -o '" + once + "'").status, 0);
+  EXPECT_EQ(run("draw '" + ink + "' --mode stroke --repeat 2 -o '" + twice + "'").status, 0);
+  EXPECT_EQ(decoded(once).bytes, decoded(twice).bytes);
+}
+
+TEST_F(Program, LeavesNothingBehindWhenThePageIsMalformed) {
+  const std::string bad = write("bad.inkml", "<ink>\n<trace>1 2, 3 four</trace>\n</ink>");
+  for (const std::string command : {"draw", "trace", "sheet"}) {
+    const Ran ran = run(command + " '" + bad + "' -o '" + path("out").string() + "'");
+    EXPECT_EQ(ran.status, 1) << command;
+    EXPECT_EQ(ran.err, bad + ":2: not a number: four\n");
+    EXPECT_EQ(ran.out, "");
+    EXPECT_FALSE(holds("out"));
+    EXPECT_FALSE(holdsUnfinished());
+  }
+}
+
+TEST_F(Program, LeavesAnOlderFileAloneWhenItFails) {
+  const std::string ink = writeInk();
+  const std::string out = write("out.png", "older");
+  const Ran large = run("draw '" + ink + "' --zoom 1e6 -o '" + out + "'");
+  EXPECT_EQ(large.status, 1);
+  EXPECT_NE(large.err.find("too large"), std::string::npos) << large.err;
+  EXPECT_EQ(contentsOf(out), "older");
+  // Where it succeeds it follows a link instead of replacing it.
+  fs::create_symlink("out.png", path("link.png"));
+  EXPECT_EQ(run("draw '" + ink + "' -o '" + path("link.png").string() + "'").status, 0);
+  EXPECT_TRUE(fs::is_symlink(path("link.png")));
+  EXPECT_GT(decoded(out).width, 0u);
+}
+
+TEST_F(Program, SaysInOneLineWhatCannotBeDone) {
+  const std::string ink = writeInk();
+  for (const std::string& arguments :
+       {"draw '" + path("none.inkml").string() + "' -o '" + path("a.png").string() + "'",
+        "draw '" + ink + "' -o '" + path("no/folder/a.png").string() + "'",
+        "trace '" + ink + "' -o /dev/full", "draw '" + ink + "' -o /dev/full",
+        "draw '" + ink + "' -o '" + path("").string() + "'", "info --plugin '" + ink + "'"}) {
+    const Ran ran = run(arguments);
+    EXPECT_EQ(ran.status, 1) << arguments;
+    EXPECT_EQ(std::count(ran.err.begin(), ran.err.end(), '\n'), 1) << ran.err;
+    EXPECT_EQ(ran.out, "");
+  }
+  EXPECT_TRUE(fs::exists("/dev/full"));
+}
+
+TEST_F(Program, TellsWrongUsageFromHelp) {
+  EXPECT_EQ(run("draw").status, 2);
+  EXPECT_EQ(run("trace -o - --batch none").status, 2);
+  const Ran help = run("--help");
+  EXPECT_EQ(help.status, 0);
+  EXPECT_EQ(help.err, "");
+  EXPECT_NE(help.out.find("trace"), std::string::npos);
+}
+
+TEST_F(Program, InformsAboutThePlugIn) {
+  const Ran ran = run("info");
+  ASSERT_EQ(ran.status, 0) << ran.err;
+  for (const char* part : {"libQeltPencil2.so", "OpenGL ES 3", "0.477", "6.571", "rendering version"}) {
+    EXPECT_NE(ran.out.find(part), std::string::npos) << part << " in\n" << ran.out;
+  }
+}
+
+}  // namespace

@@ -1,0 +1,142 @@
+#include "StrokeFeeder.h"
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <string>
+#include <vector>
+
+#include "Ink.h"
+
+namespace QeltDesktop {
+namespace {
+
+// Points at x = 0, 1, 2, ..., each different in everything.
+Trace line(int points) {
+  Trace trace;
+  for (int i = 0; i < points; ++i) {
+    const auto number = static_cast<float>(i);
+    trace.samples.push_back({.x = number,
+                             .y = 10.0f * number,
+                             .pressure = 0.01f * number,
+                             .tilt = 0.002f * number,
+                             .orientation = -0.03f * number,
+                             .time = 4.0 * i});
+  }
+  return trace;
+}
+
+constexpr Pointer kStylus{2, 16386};
+
+// "down 0; move 1 2 3; up 3": what each event holds, by x.
+std::string described(const Trace& trace, int batch, bool penStaysDown = false) {
+  std::string text;
+  feedLive(trace, kStylus, batch, penStaysDown, [&](LiveEvent& live) {
+    const Qelt::MotionEvent& event = live.event;
+    const char* const names[] = {"down", "up", "move"};
+    text += std::string(text.empty() ? "" : "; ") + names[event.GetAction()];
+    for (int i = 0; i < event.GetHistorySize(); ++i) {
+      text += " " + std::to_string(std::lround(event.GetHistoricalX(i)));
+    }
+    text += " " + std::to_string(std::lround(event.GetX(0)));
+    EXPECT_EQ(event.GetX(0), trace.samples[live.sample].x);
+  });
+  return text;
+}
+
+TEST(StrokeFeeder, BatchesLiveSamples) {
+  EXPECT_EQ(described(line(10), 4), "down 0; move 1 2 3 4; move 5 6 7 8; move 9; up 9");
+  EXPECT_EQ(described(line(9), 4), "down 0; move 1 2 3 4; move 5 6 7 8; up 8");
+  EXPECT_EQ(described(line(3), 1), "down 0; move 1; move 2; up 2");
+  EXPECT_EQ(described(line(3), 1000), "down 0; move 1 2; up 2");
+  EXPECT_EQ(described(line(1), 4), "down 0; up 0");
+  EXPECT_EQ(described(line(6), 4, true), "down 0; move 1 2 3 4; move 5");
+}
+
+TEST(StrokeFeeder, UpEventRepeatsTheLastPointWhole) {
+  const Trace trace = line(4);
+  feedLive(trace, {1, 77}, 4, false, [&](LiveEvent& live) {
+    EXPECT_EQ(live.event.GetToolType(0), 1);
+    EXPECT_EQ(live.event.GetSource(), 77);
+    EXPECT_EQ(live.event.GetDownTime(), 0);
+    if (live.event.GetAction() != Qelt::kActionUp) return;
+    EXPECT_EQ(live.event.GetPressure(0), trace.samples[3].pressure);
+    EXPECT_EQ(live.event.GetTilt(0), trace.samples[3].tilt);
+    EXPECT_EQ(live.event.GetOrientation(0), trace.samples[3].orientation);
+    EXPECT_EQ(live.event.GetEventTime(), 12);
+  });
+}
+
+TEST(StrokeFeeder, RecordedEventHoldsEveryPointInItsHistory) {
+  const Trace trace = line(3);
+  const Qelt::MotionEvent event = recordedEvent(trace, kStylus);
+  ASSERT_EQ(event.GetHistorySize(), 3);
+  for (int i = 0; i < 3; ++i) {
+    const Sample& sample = trace.samples[static_cast<std::size_t>(i)];
+    EXPECT_EQ(event.GetHistoricalX(i), sample.x);
+    EXPECT_EQ(event.GetHistoricalY(i), sample.y);
+    EXPECT_EQ(event.GetHistoricalPressure(i), sample.pressure);
+    EXPECT_EQ(event.GetHistoricalTilt(i), sample.tilt);
+    EXPECT_EQ(event.GetHistoricalOrientation(i), sample.orientation);
+  }
+  EXPECT_EQ(event.GetX(0), 2.0f);
+  EXPECT_EQ(event.GetPressure(0), trace.samples[2].pressure);
+  EXPECT_EQ(recordedEvent(line(1), kStylus).GetHistorySize(), 1);
+}
+
+TEST(StrokeFeeder, StoredStrokeHoldsEveryPoint) {
+  const Trace trace = line(3);
+  const auto stroke = storedStroke(trace, kStylus);
+  ASSERT_EQ(stroke->GetPointCount(), 3);
+  EXPECT_EQ(stroke->GetToolType(), 2);
+  EXPECT_EQ(stroke->GetPoint()[2].y, 20.0f);
+  EXPECT_EQ(stroke->GetTimeStamp()[2], 8);
+  EXPECT_EQ(stroke->GetPressure()[2], trace.samples[2].pressure);
+  EXPECT_EQ(stroke->GetTilt()[2], trace.samples[2].tilt);
+  EXPECT_EQ(stroke->GetOrientation()[2], trace.samples[2].orientation);
+}
+
+TEST(StrokeFeeder, PredictionGoesOnInEqualSteps) {
+  const Sample previous{.x = 10.0f, .y = 5.0f}, last{.x = 12.0f, .y = 4.0f};
+  const Qelt::MotionEvent event = predictedEvent(previous, last, kStylus, 3);
+  EXPECT_EQ(event.GetAction(), Qelt::kActionMove);
+  ASSERT_EQ(event.GetHistorySize(), 2);
+  EXPECT_EQ(event.GetHistoricalX(0), 14.0f);
+  EXPECT_EQ(event.GetHistoricalY(0), 3.0f);
+  EXPECT_EQ(event.GetHistoricalX(1), 16.0f);
+  EXPECT_EQ(event.GetX(0), 18.0f);
+  EXPECT_EQ(event.GetY(0), 1.0f);
+  EXPECT_EQ(predictedEvent(previous, last, kStylus, 1).GetHistorySize(), 0);
+}
+
+TEST(StrokeFeeder, ToolsHaveTheirSources) {
+  Trace trace = line(1);
+  EXPECT_EQ(pointerFor(trace, {}, {}).tool, 2);
+  EXPECT_EQ(pointerFor(trace, {}, {}).source, 16386);
+  trace.tool = 1;
+  EXPECT_EQ(pointerFor(trace, {}, {}).tool, 1);
+  EXPECT_EQ(pointerFor(trace, {}, {}).source, 4098);
+  EXPECT_EQ(pointerFor(trace, 3, {}).source, 8194);
+  EXPECT_EQ(pointerFor(trace, 2, 4098).tool, 2);
+  EXPECT_EQ(pointerFor(trace, 2, 4098).source, 4098);
+}
+
+TEST(StrokeFeeder, CutsTheLastTraceOnly) {
+  Page page{{line(5), line(5)}};
+  cutLastTrace(page, 9);
+  EXPECT_EQ(page.traces[1].samples.size(), 5u);
+  cutLastTrace(page, 2);
+  EXPECT_EQ(page.traces[0].samples.size(), 5u);
+  EXPECT_EQ(page.traces[1].samples.size(), 2u);
+}
+
+TEST(StrokeFeeder, TakesTimesThatNoClockShows) {
+  Trace trace = line(2);
+  trace.samples[0].time = -1e300;
+  trace.samples[1].time = 1e300;
+  EXPECT_LT(recordedEvent(trace, kStylus).GetDownTime(), 0);
+  EXPECT_GT(recordedEvent(trace, kStylus).GetEventTime(), 0);
+}
+
+}  // namespace
+}  // namespace QeltDesktop
