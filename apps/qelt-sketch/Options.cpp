@@ -89,13 +89,12 @@ std::optional<OutlineOptions> outline(const std::string& text) {
   return OutlineOptions{*size, *argb};
 }
 
-// The outer value says that the text was understood, the inner one is the colour or none for transparent.
-std::optional<std::optional<std::uint32_t>> background(const std::string& text) {
-  if (text == "white") return std::optional<std::uint32_t>(0xFFFFFF);
-  if (text == "transparent") return std::optional<std::uint32_t>();
+std::optional<Background> background(const std::string& text) {
+  if (text == "white") return Background{};
+  if (text == "transparent") return Background{.transparent = true};
   const std::optional<unsigned int> rgb = parseRgb(text);
   if (!rgb) return std::nullopt;
-  return std::optional<std::uint32_t>(*rgb);
+  return Background{.rgb = *rgb};
 }
 
 template <typename Value>
@@ -168,8 +167,8 @@ void addDrawing(CLI::App& app, Options& options) {
                   "turn clockwise about the page's centre (default 0)");
   addValue<PageSize>(app, "--page", options.page, pageSize, "WxH",
                      "page in stroke units, from (0, 0) (default: the file's extent plus a margin)");
-  addValue<std::optional<std::uint32_t>>(app, "--background", options.background, background,
-                                         "white|transparent|'#RRGGBB'", "default white");
+  addValue<Background>(app, "--background", options.background, background, "white|transparent|'#RRGGBB'",
+                       "default white");
   addValue<OutlineOptions>(app, "--outline", options.outline, outline, "SIZE,'#AARRGGBB'",
                            "draw every stroke's outline under the strokes");
   addValue<int>(app, "--predict", options.predict, countOrNone, "K",

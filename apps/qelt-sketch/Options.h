@@ -16,6 +16,11 @@ struct PageSize {
   float width, height;  // stroke units, above 0
 };
 
+struct Background {
+  std::uint32_t rgb = 0xFFFFFF;  // 0xRRGGBB
+  bool transparent = false;
+};
+
 struct OutlineOptions {
   float size;  // stroke units; any float
   std::uint32_t argb;
@@ -46,7 +51,7 @@ struct Options {
   float zoom = 1.0f;    // finite, above 0
   float rotate = 0.0f;  // degrees clockwise, finite
   std::optional<PageSize> page;
-  std::optional<std::uint32_t> background = 0xFFFFFF;  // 0xRRGGBB; none: transparent
+  Background background;
 
   DrawableKind drawable = DrawableKind::Stroke;
 };

@@ -140,9 +140,10 @@ Picture drawPage(const PluginLibrary& plugin, RenderQueue& queue, const Page& pa
     PagePlayer(session, page, options, drawing.canvases()).play(drawing);
   }
   std::optional<std::array<std::uint8_t, 3>> background;
-  if (const std::optional<std::uint32_t> rgb = options.background) {
-    background = {static_cast<std::uint8_t>(*rgb >> 16), static_cast<std::uint8_t>(*rgb >> 8),
-                  static_cast<std::uint8_t>(*rgb)};
+  if (!options.background.transparent) {
+    const std::uint32_t rgb = options.background.rgb;
+    background = {static_cast<std::uint8_t>(rgb >> 16), static_cast<std::uint8_t>(rgb >> 8),
+                  static_cast<std::uint8_t>(rgb)};
   }
   return Picture(size.width, size.height, composeLayers(drawing.readLayers(), background));
 }

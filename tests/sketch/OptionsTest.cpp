@@ -52,7 +52,7 @@ TEST(Options, ReadsEveryDrawingOption) {
   ASSERT_TRUE(options.page);
   EXPECT_EQ(options.page->width, 800.0f);
   EXPECT_EQ(options.page->height, 600.5f);
-  EXPECT_EQ(options.background, 0xA0B0C0u);
+  EXPECT_EQ(options.background.rgb, 0xA0B0C0u);
   ASSERT_TRUE(options.outline);
   EXPECT_EQ(options.outline->size, 3.0f);
   EXPECT_EQ(options.outline->argb, 0xFF00FF00u);
@@ -72,9 +72,10 @@ TEST(Options, HasTheDefaultsThatTheHelpTells) {
   EXPECT_TRUE(options.curve);
   EXPECT_EQ(options.mode, Mode::Live);
   EXPECT_EQ(options.batch, 4);
-  EXPECT_EQ(options.background, 0xFFFFFFu);
+  EXPECT_EQ(options.background.rgb, 0xFFFFFFu);
+  EXPECT_FALSE(options.background.transparent);
   EXPECT_EQ(options.opacity, 0.5f);
-  EXPECT_FALSE(parsed("draw -o a.png --background transparent").background);
+  EXPECT_TRUE(parsed("draw -o a.png --background transparent").background.transparent);
 }
 
 TEST(Options, TakesAnyFloatAsAPenSize) {

@@ -34,11 +34,14 @@ std::string described(const Trace& trace, int batch, bool penStaysDown = false) 
   feedLive(trace, kStylus, batch, penStaysDown, [&](LiveEvent& live) {
     const Qelt::MotionEvent& event = live.event;
     const char* const names[] = {"down", "up", "move"};
-    text += std::string(text.empty() ? "" : "; ") + names[event.GetAction()];
-    for (int i = 0; i < event.GetHistorySize(); ++i) {
-      text += " " + std::to_string(std::lround(event.GetHistoricalX(i)));
-    }
-    text += " " + std::to_string(std::lround(event.GetX(0)));
+    if (!text.empty()) text += "; ";
+    text += names[event.GetAction()];
+    const auto add = [&](float x) {
+      text += ' ';
+      text += std::to_string(std::lround(x));
+    };
+    for (int i = 0; i < event.GetHistorySize(); ++i) add(event.GetHistoricalX(i));
+    add(event.GetX(0));
     EXPECT_EQ(event.GetX(0), trace.samples[live.sample].x);
   });
   return text;
