@@ -1,5 +1,6 @@
 #include <benchmark/benchmark.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <cstring>
 #include <exception>
@@ -19,7 +20,10 @@ class RatioReporter : public benchmark::ConsoleReporter {
     for (const auto& run : runs) {
       const auto found = run.counters.find("ns/stamp");
       // A rate's inverse, in units of 1e-9 s already.
-      if (found != run.counters.end()) mNanoseconds[run.benchmark_name()] = found->second.value;
+      if (found == run.counters.end() || run.run_type != Run::RT_Iteration) continue;
+      // Other programs only ever add: the fastest repetition is the truest.
+      const auto known = mNanoseconds.try_emplace(run.run_name.str(), found->second.value).first;
+      known->second = std::min(known->second, static_cast<double>(found->second.value));
     }
   }
 
@@ -39,8 +43,12 @@ class RatioReporter : public benchmark::ConsoleReporter {
 
 int main(int argc, char** argv) {
   std::string ink = QELT_SAMPLE_INK;
-  std::vector<char*> rest;
-  for (int i = 0; i < argc; ++i) {
+  // Short repetitions, mixed, so that what disturbs them disturbs all alike; later options win.
+  char repetitions[] = "--benchmark_repetitions=9";
+  char interleaving[] = "--benchmark_enable_random_interleaving=true";
+  char shortRuns[] = "--benchmark_min_time=0.05";
+  std::vector<char*> rest = {argv[0], repetitions, interleaving, shortRuns};
+  for (int i = 1; i < argc; ++i) {
     if (std::strncmp(argv[i], "--ink=", 6) == 0) {
       ink = argv[i] + 6;
     } else {

@@ -83,6 +83,9 @@ class StampRenderer : public HostBase {
     one.flush();
   }
 
+  // Makes room for stamps to come. Throws std::bad_alloc.
+  void reserve(std::size_t stamps) { reserveStamps(this->mWriteBuffer, stamps, kFloatsPerStamp); }
+
   UnclaimedBatch* unclaimedBatch() { return &mUnclaimed; }
 
   void Init() final {

@@ -19,9 +19,9 @@ namespace Qelt {
 
 // What every vertex of a stamp carries besides its corner.
 struct StampLook {
-  float alpha;      // opacity factor
+  float alpha;      // opacity factor; an outline's has none
   float tiltBlend;  // narrowing: 0 none
-  float tile;       // stamp shape 0, 1 or 2
+  float tile;       // stamp shape 0, 1 or 2; an outline's has none
   Vector2<float> direction;
 };
 
@@ -69,15 +69,30 @@ inline void reserveStamps(std::vector<float>* buffer, std::size_t count, std::si
 }
 
 // Writes the vertices of a stamp, 6 * Stride floats: 9 a vertex (corner x, y, u, v; alpha, blend, tile;
-// direction) or 11 (then inner radius and alpha by width). In 16-byte stores that overlap from vertex to
-// vertex: twice as fast here as float by float, see docs/performance.md.
+// direction), 11 (then inner radius and alpha by width), or an outline's 7 (corner x, y, u, v; blend;
+// direction). In 16-byte stores that overlap from vertex to vertex: twice as fast here as float by float, see
+// docs/performance.md.
 template <std::size_t Stride>
 void writeStamp(float* out, const StampQuad& q, const StampLook& look) {
-  static_assert(Stride == 9 || Stride == 11);
+  static_assert(Stride == 7 || Stride == 9 || Stride == 11);
   using Four [[gnu::vector_size(16), gnu::aligned(4), gnu::may_alias]] = float;
   const Four corners[6] = {{q.left, q.top, 0.0f, 1.0f},    {q.left, q.bottom, 0.0f, 0.0f},
                            {q.right, q.top, 1.0f, 1.0f},   {q.right, q.top, 1.0f, 1.0f},
                            {q.left, q.bottom, 0.0f, 0.0f}, {q.right, q.bottom, 1.0f, 0.0f}};
+  if constexpr (Stride == 7) {
+    const Four rest = {look.tiltBlend, look.direction.x, look.direction.y, 0.0f};
+    for (int i = 0; i < 6; ++i, out += Stride) {
+      *reinterpret_cast<Four*>(out) = corners[i];
+      if (i < 5) {
+        *reinterpret_cast<Four*>(out + 4) = rest;  // its last lane is where the next vertex begins
+      } else {
+        out[4] = rest[0];
+        out[5] = rest[1];
+        out[6] = rest[2];
+      }
+    }
+    return;
+  }
   const Four common = {look.alpha, look.tiltBlend, look.tile, look.direction.x};
   const Four rest = {look.direction.y, q.innerRadius, q.alphaByWidth, 0.0f};
   for (int i = 0; i < 6; ++i, out += Stride) {

@@ -1,10 +1,6 @@
 #include "stroke/Pencil2StrokeDrawableGL.h"
 
-#include <cmath>
-
-#include "pen/Pencil2Data.h"
-#include "pencommon/PenSettingData.h"
-#include "stroke/StrokeRules.h"
+#include "stroke/parts/SampleCleaner.h"
 
 namespace Qelt {
 
@@ -17,34 +13,28 @@ bool Pencil2StrokeDrawableGL::RedrawPen(const List*, RectF*) {
   return true;
 }
 
-bool Pencil2StrokeDrawableGL::hasSettings() const {
-  return mPenData != nullptr && mPenData->mSettingData != nullptr;
+PenSettings Pencil2StrokeDrawableGL::settings() const {
+  return PenSettings(mPenData);
 }
 
 float Pencil2StrokeDrawableGL::getSize() const {
-  return hasSettings() ? mPenData->mSettingData->size : 0.0f;
-}
-
-std::uint32_t Pencil2StrokeDrawableGL::getColor() const {
-  return hasSettings() ? mPenData->mSettingData->color : 0u;
+  return settings().size();
 }
 
 float Pencil2StrokeDrawableGL::getPixelScale() const {
-  if (!hasSettings()) return 1.0f;
-  return rules::pixelScale(mPenData->mSettingData->screenWidth, mPenData->mSettingData->screenHeight);
+  return settings().pixelScale();
 }
 
 float Pencil2StrokeDrawableGL::getSpeedScale() const {
-  if (!hasSettings()) return 1.0f;
-  return rules::speedScale(mPenData->mSettingData->screenWidth, mPenData->mSettingData->screenHeight, 1.0f);
+  return settings().speedScale(1.0f);
 }
 
 void Pencil2StrokeDrawableGL::checkNan(float* value, float fallback) {
-  if (std::isnan(*value)) *value = fallback;
+  Qelt::checkNan(value, fallback);
 }
 
 float Pencil2StrokeDrawableGL::checkPressure(float pressure) {
-  return pressure > 1.0f ? 1.0f : pressure;
+  return Qelt::checkPressure(pressure);
 }
 
 }  // namespace Qelt

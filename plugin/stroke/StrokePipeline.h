@@ -44,6 +44,9 @@ namespace Qelt {
 template <typename Version>
 class StrokePipeline : public Pencil2StrokeDrawableGL {
   static constexpr const StrokeProfile& kProfile = Version::profile;
+  // A fixed spacing, or so many stamps a segment. (Asked of the number: under UndefinedBehaviorSanitizer GCC
+  // 12 takes no comparison of a function with null for a constant.)
+  static constexpr bool kSpaced = kProfile.stampSpacing > 0.0f;
 
  public:
   using RenderDrawable = typename Version::RenderDrawable;
@@ -174,6 +177,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
       writable(event).SetPressure(kProfile.unknownPressure);
     }
     setToJoint(rect);
+    reserveFor(event);
 
     const float currentTilt = cleanTilt(event);
     EventSource source(event);
@@ -189,6 +193,25 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
              rect, smoothing);
     rect->IncreaseRect(kMoveGrowth);
     return true;
+  }
+
+  // Makes room for the stamps of a whole move at once: a batch that grows from segment to segment is copied
+  // again and again. Curves are no longer than the way from point to point.
+  void reserveFor(const MotionEvent& event) {
+    if constexpr (kSpaced) {
+      constexpr float kMostAtOnce = 8192.0f;  // stamps, 2 MB; what is beyond grows by doubling
+      const int history = event.GetHistorySize();
+      PointF from = mPath.last();
+      float way = distanceBetween(mPath.mid(), from);
+      for (int i = 0; i <= history; ++i) {
+        const PointF to = i < history ? PointF{event.GetHistoricalX(i), event.GetHistoricalY(i)}
+                                      : PointF{event.GetX(0), event.GetY(0)};
+        way += distanceBetween(from, to);
+        from = to;
+      }
+      const float stamps = way / kProfile.stampSpacing + 2.0f * static_cast<float>(history + 1);
+      mRender->reserve(static_cast<std::size_t>(stamps < kMostAtOnce ? stamps : kMostAtOnce));
+    }
   }
 
   // Ends a stroke at the event's point. A point that is not finite leaves the closing segment out.
@@ -345,7 +368,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     const float width = kProfile.pointSize(size, blend);
 
     const int before = mStamps.count();
-    if constexpr (kProfile.stampCount == nullptr) {
+    if constexpr (kSpaced) {
       placeSpaced(length, width, alpha, blend, rect);
     } else {
       placeEvenly(length, size, width, alpha, blend, rect);
@@ -362,9 +385,10 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     const float first = mCarried;
     // The ramps' count is worked out apart from the walk, and may differ from it by one.
     const int count = rules::incremented(rules::saturatedCount((length - first) / kProfile.stampSpacing));
-    StampRun run(*this, width, alpha, blend, count, spacedStamps(first, kProfile.stampSpacing, length));
+    Appender appender(*mRender, spacedStamps(first, kProfile.stampSpacing, length));
+    StampRun run(*this, appender, width, alpha, blend, count);
     const WalkResult walk = walkSpaced(mPath.path(), first, kProfile.stampSpacing, length, run);
-    run.finish(rect);
+    run.finish(*this, rect);
     mCarried = walk.carry;
     if (walk.cutShort) logCut(length);
   }
@@ -379,25 +403,27 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
       }
     }
     const int most = std::min(count, kMostStampsPerSegment);
-    StampRun run(*this, width, alpha, blend, count, static_cast<std::size_t>(most));
+    Appender appender(*mRender, static_cast<std::size_t>(most));
+    StampRun run(*this, appender, width, alpha, blend, count);
     const bool cutShort = walkEvenly(mPath.path(), count, length, run);
-    run.finish(rect);
+    run.finish(*this, rect);
     if (cutShort) logCut(length);
   }
 
   // The stamps of one segment, with width and alpha on their way to the targets. Local state, so that the
   // walk runs in registers.
+  using Appender = typename RenderDrawable::Appender;
+
   class StampRun {
    public:
-    // `steps`: of the ramps; `stamps`: at the most.
-    StampRun(StrokePipeline& pen, float width, float alpha, float blend, int steps, std::size_t stamps)
-        : mPen(pen),
-          mAppender(*pen.mRender, stamps),
+    // `steps`: of the ramps.
+    StampRun(const StrokePipeline& pen, Appender& appender, float width, float alpha, float blend, int steps)
+        : mAppender(appender),
           mWidth(pen.mWidth),
           mAlpha(pen.mAlpha),
           mWidthStep(rules::rampStep(pen.mWidth, width, steps)),
-          mAlphaStep(kProfile.stampCount == nullptr ? (alpha - pen.mAlpha) / static_cast<float>(steps)
-                                                    : rules::rampStep(pen.mAlpha, alpha, steps)),
+          mAlphaStep(kSpaced ? (alpha - pen.mAlpha) / static_cast<float>(steps)
+                             : rules::rampStep(pen.mAlpha, alpha, steps)),
           mBlend(blend),
           mStamps(pen.mStamps) {
       mStamp[1] = pen.direction();
@@ -413,17 +439,16 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
       mAlpha += mAlphaStep;
     }
 
-    void finish(RectF* rect) {
+    void finish(StrokePipeline& pen, RectF* rect) {
       mAppender.flush();
       mBox.uniteInto(rect);
-      mPen.mStamps = mStamps;
-      mPen.mLastStamp = mStamp[0];
-      mPen.mLastStampAlpha = mLastAlpha;
+      pen.mStamps = mStamps;
+      pen.mLastStamp = mStamp[0];
+      pen.mLastStampAlpha = mLastAlpha;
     }
 
    private:
-    StrokePipeline& mPen;
-    typename RenderDrawable::Appender mAppender;
+    Appender& mAppender;
     float mWidth, mAlpha;
     float mWidthStep, mAlphaStep;
     float mBlend;

@@ -62,8 +62,8 @@ class PenAttitude {
   // May leave (-pi, pi] by the unwrapping.
   float meanOrientation() const { return mMeanOrientation; }
 
- protected:
-  // Sets the mean alone; the outline keeps the old one when it drops a segment.
+  // Puts an earlier mean back, the history untouched: an outline that drops a segment goes on unwrapping
+  // against the mean before it.
   void setMeanOrientation(float orientation) { mMeanOrientation = orientation; }
 
  private:

@@ -6,6 +6,16 @@
 
 namespace Qelt {
 
+// Replaces a NaN.
+inline void checkNan(float* value, float fallback) {
+  if (std::isnan(*value)) *value = fallback;
+}
+
+// At most 1; a NaN stays.
+inline float checkPressure(float pressure) {
+  return pressure > 1.0f ? 1.0f : pressure;
+}
+
 // Replaces what is not a number and caps what is too large, by one version's numbers, before any geometry
 // sees it.
 struct SampleCleaner {
@@ -14,7 +24,7 @@ struct SampleCleaner {
 
   float pressure(float reported, int toolType) const {
     if (toolType == kToolFinger || toolType == kToolMouse || std::isnan(reported)) return unknownPressure;
-    return reported > 1.0f ? 1.0f : reported;
+    return checkPressure(reported);
   }
 
   // Tilt before the cap.

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "base/PointF.h"
+#include "base/RectF.h"
 #include "graphics/SmPath.h"
 
 namespace Qelt {
@@ -43,6 +44,12 @@ class SegmentPath {
   }
 
   const SmPath& path() const { return mPath; }
+
+  // Where the stroke stands: from the mid point to the last point.
+  void setToJoint(RectF* rect) const {
+    rect->Set(mMid.x, mMid.y, mMid.x, mMid.y);
+    rect->MakeRect(&mLast);
+  }
 
  private:
   float curve(PointF to) {

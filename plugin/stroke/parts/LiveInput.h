@@ -1,0 +1,91 @@
+#pragma once
+
+#include "base/RectF.h"
+#include "engine/MotionEvent.h"
+#include "stroke/parts/PenSample.h"
+#include "stroke/parts/Replay.h"
+#include "stroke/parts/SampleCleaner.h"
+#include "stroke/parts/SegmentPath.h"
+#include "stroke/parts/StrokeState.h"
+
+// Live events, turned into the samples that pens draw from. Corrections are written back into the events.
+// Main thread.
+namespace Qelt {
+
+inline void substituteTouchPressure(const MotionEvent& event, const SampleCleaner& cleaner) {
+  if (isTouchStylus(event.GetToolType(0), event.GetSource()))
+    writable(event).SetPressure(cleaner.unknownPressure);
+}
+
+inline PenSample currentSample(const MotionEvent& event, const SampleCleaner& cleaner) {
+  EventSource(event).prepare(cleaner);
+  return {{event.GetX(0), event.GetY(0)},
+          cleaner.pressure(event.GetPressure(0), event.GetToolType(0)),
+          cleaner.tilt(event.GetTilt(0)),
+          SampleCleaner::orientation(event.GetOrientation(0))};
+}
+
+// Hands the samples of a move to take(sample), oldest first, the current one last.
+template <typename Take>
+void takeMove(const MotionEvent& event, const SampleCleaner& cleaner, Take&& take) {
+  const int history = event.GetHistorySize();
+  const int toolType = event.GetToolType(0);
+  if (isTouchStylus(toolType, event.GetSource())) {
+    for (int i = 0; i < history; ++i) writable(event).SetHistoricalPressure(i, cleaner.unknownPressure);
+    writable(event).SetPressure(cleaner.unknownPressure);
+  }
+  const PenSample current = currentSample(event, cleaner);
+  EventSource source(event);
+  for (int i = 0; i < history; ++i) {
+    take(PenSample{source.point(i), cleaner.pressure(source.pressure(i), toolType), source.tilt(i, cleaner),
+                   SampleCleaner::orientation(source.orientation(i))});
+  }
+  take(current);
+}
+
+// The sample that ends a stroke. `rect` becomes where the stroke stands and that sample, grown by `growth`.
+inline PenSample endSample(const MotionEvent& event, const SampleCleaner& cleaner, const SegmentPath& path,
+                           float growth, RectF* rect) {
+  substituteTouchPressure(event, cleaner);
+  const PenSample sample = currentSample(event, cleaner);
+  path.setToJoint(rect);
+  if (isFinite(sample.at)) rect->MakeRect(&sample.at);
+  rect->IncreaseRect(growth);
+  return sample;
+}
+
+// Feeds one live event to a pen, which besides what `replay` asks for has
+//   pen.path()                                   its SegmentPath
+//   pen.beginLive(start, coarseTool, smoothing)  the pen goes down; its pressure places no stamp
+//   pen.forgetAlpha()                            the closing segment has no ramp
+// `rect` becomes what the event changed; a move grows it by `moveGrowth`.
+template <typename Pen>
+bool drawLive(const MotionEvent& event, Pen& pen, StrokeState& state, RectF* rect, Smoothing smoothing,
+              float moveGrowth) {
+  switch (event.GetAction()) {
+    case kActionDown: {
+      const PointF at{event.GetX(0), event.GetY(0)};
+      if (!isFinite(at)) return false;
+      state.down();
+      substituteTouchPressure(event, pen.cleaner());
+      pen.beginLive(currentSample(event, pen.cleaner()), isCoarseTool(event.GetToolType(0), event.GetSource()),
+                    smoothing);
+      rect->Set(at.x, at.y, at.x, at.y);
+      return true;
+    }
+    case kActionMove:
+      if (!state.move()) return false;
+      pen.path().setToJoint(rect);
+      takeMove(event, pen.cleaner(), [&](const PenSample& sample) { pen.drawLine(sample, rect, smoothing); });
+      rect->IncreaseRect(moveGrowth);
+      return true;
+    case kActionUp:
+      if (!state.up()) return false;
+      pen.forgetAlpha();
+      return pen.endPen(&event, rect, smoothing);
+    default:
+      return false;
+  }
+}
+
+}  // namespace Qelt
