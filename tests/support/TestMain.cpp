@@ -15,8 +15,10 @@ void keepDriverLoaded() {
 
 }  // namespace
 
-// Read by the sanitizers' runtimes before main; plain builds never call them.
+// Read by the sanitizers' runtimes before main; plain builds never call them. They look for them among what the
+// program exports.
 extern "C" {
+#pragma GCC visibility push(default)
 const char* __asan_default_options() {
   // A request for too much memory answers null to new (std::nothrow), as it does without the sanitizer.
   return "allocator_may_return_null=1:detect_stack_use_after_return=1:strict_string_checks=1";
@@ -27,6 +29,7 @@ const char* __ubsan_default_options() {
 const char* __tsan_default_options() {
   return "second_deadlock_stack=1:suppressions=" QELT_SOURCE_DIR "/tests/support/tsan.supp";
 }
+#pragma GCC visibility pop
 }
 
 int main(int argc, char** argv) {
