@@ -15,8 +15,8 @@ void keepDriverLoaded() {
 
 }  // namespace
 
-// Read by the sanitizers' runtimes before main; plain builds never call them. They look for them among what the
-// program exports.
+// Read by the sanitizers' runtimes before main; plain builds never call them. They look for them among what
+// the program exports.
 extern "C" {
 #pragma GCC visibility push(default)
 const char* __asan_default_options() {
