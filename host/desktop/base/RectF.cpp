@@ -6,15 +6,32 @@ namespace Qelt {
 
 namespace {
 
-// Whichever is a number wins over one that is not.
+// Each is one instruction, and keeps the edge when `other` is not a number. Pens grow rectangles once a
+// stamp.
 float smaller(float edge, float other) {
-  if (other < edge) return other;
-  return edge != edge ? other : edge;
+  return other < edge ? other : edge;
 }
 
 float larger(float edge, float other) {
-  if (other > edge) return other;
-  return edge != edge ? other : edge;
+  return other > edge ? other : edge;
+}
+
+// An edge that is not a number gives way to one that is.
+float numberOf(float edge, float other) {
+  return std::isnan(edge) ? other : edge;
+}
+
+void grow(RectF& rect, float left, float top, float right, float bottom) {
+  if (std::isunordered(rect.left, rect.top) || std::isunordered(rect.right, rect.bottom)) [[unlikely]] {
+    rect.left = numberOf(rect.left, left);
+    rect.top = numberOf(rect.top, top);
+    rect.right = numberOf(rect.right, right);
+    rect.bottom = numberOf(rect.bottom, bottom);
+  }
+  rect.left = smaller(rect.left, left);
+  rect.top = smaller(rect.top, top);
+  rect.right = larger(rect.right, right);
+  rect.bottom = larger(rect.bottom, bottom);
 }
 
 }  // namespace
@@ -31,17 +48,11 @@ void RectF::MakeRect(const PointF* point) {
 }
 
 void RectF::MakeRect(float x, float y) {
-  left = smaller(left, x);
-  top = smaller(top, y);
-  right = larger(right, x);
-  bottom = larger(bottom, y);
+  grow(*this, x, y, x, y);
 }
 
 void RectF::Union(const RectF& other) {
-  left = smaller(left, other.left);
-  top = smaller(top, other.top);
-  right = larger(right, other.right);
-  bottom = larger(bottom, other.bottom);
+  grow(*this, other.left, other.top, other.right, other.bottom);
 }
 
 void RectF::IncreaseRect(float amount) {

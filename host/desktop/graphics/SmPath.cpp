@@ -290,8 +290,9 @@ struct SmPath::Measure {
     limit = length * (1.0 + kLengthRounding);
   }
 
-  // Finds the piece that holds a distance other than the last one's.
-  const Piece& seek(double distance) {
+  // Finds the piece that holds a distance other than the last one's. Out of line, to keep the usual query
+  // short.
+  [[gnu::noinline]] const Piece& seek(double distance) {
     if (first != last) {
       const Segment& now = segments[cut];
       if (distance < now.begin || (distance > now.end && cut + 1 < last)) {
