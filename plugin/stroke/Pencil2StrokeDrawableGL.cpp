@@ -1,5 +1,6 @@
 #include "stroke/Pencil2StrokeDrawableGL.h"
 
+#include "stroke/parts/PenSettings.h"
 #include "stroke/parts/SampleCleaner.h"
 
 namespace Qelt {
@@ -13,20 +14,24 @@ bool Pencil2StrokeDrawableGL::RedrawPen(const List*, RectF*) {
   return true;
 }
 
-PenSettings Pencil2StrokeDrawableGL::settings() const {
-  return PenSettings(mPenData);
+bool Pencil2StrokeDrawableGL::hasSettings() const {
+  return PenSettings(mPenData).exist();
 }
 
 float Pencil2StrokeDrawableGL::getSize() const {
-  return settings().size();
+  return PenSettings(mPenData).size();
+}
+
+std::uint32_t Pencil2StrokeDrawableGL::getColor() const {
+  return PenSettings(mPenData).color();
 }
 
 float Pencil2StrokeDrawableGL::getPixelScale() const {
-  return settings().pixelScale();
+  return PenSettings(mPenData).pixelScale();
 }
 
 float Pencil2StrokeDrawableGL::getSpeedScale() const {
-  return settings().speedScale(1.0f);
+  return PenSettings(mPenData).speedScale(1.0f);
 }
 
 void Pencil2StrokeDrawableGL::checkNan(float* value, float fallback) {

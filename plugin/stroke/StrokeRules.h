@@ -106,6 +106,10 @@ inline float stampAlphaV1(float alpha) {
 inline float stampAlphaV8(float alpha) {
   return alpha / 6.0f;
 }
+// Kept: twice as dense as the live stroke, before the prediction's opacity.
+inline float stampAlphaPrediction(float alpha) {
+  return alpha / 3.0f;
+}
 
 // How far the dirty rectangle reaches from a stamp's centre.
 inline float stampReachV1(float width) {

@@ -68,8 +68,8 @@ bool drawLive(const MotionEvent& event, Pen& pen, StrokeState& state, RectF* rec
       if (!isFinite(at)) return false;
       state.down();
       substituteTouchPressure(event, pen.cleaner());
-      pen.beginLive(currentSample(event, pen.cleaner()), isCoarseTool(event.GetToolType(0), event.GetSource()),
-                    smoothing);
+      pen.beginLive(currentSample(event, pen.cleaner()),
+                    isCoarseTool(event.GetToolType(0), event.GetSource()), smoothing);
       rect->Set(at.x, at.y, at.x, at.y);
       return true;
     }

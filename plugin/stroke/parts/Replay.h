@@ -118,7 +118,7 @@ int firstUsablePoint(const Source& source) {
 //   pen.cleaner()                                  the version's SampleCleaner
 //   pen.beginReplay(start, coarseTool, smoothing)  the first sample
 //   pen.drawLine(sample, rect, smoothing)          every later one
-//   pen.endPen(upEvent, rect, smoothing)           the end
+//   pen.endPen(upEvent, rect, smoothing)           the end; false when it leaves the rectangle alone
 // `rect` becomes the start point and takes in what the pen reports; a straight replay also takes in every
 // point and grows by `straightGrowth` at the end. False with error 7 when there is no point to start from.
 template <typename Source, typename Pen>
@@ -148,8 +148,7 @@ bool replay(Source source, Pen& pen, RectF* rect, Smoothing smoothing, float str
 
   const MotionEvent up = source.upEvent(cleaner);
   RectF endRect;
-  pen.endPen(&up, &endRect, smoothing);
-  rect->Union(endRect);
+  if (pen.endPen(&up, &endRect, smoothing)) rect->Union(endRect);
   if (smoothing == Smoothing::Straight) rect->IncreaseRect(straightGrowth);
   return true;
 }
