@@ -1,0 +1,170 @@
+#include "outline/Pencil2OutlineDrawableRTV1.h"
+
+#include <GLES3/gl3.h>
+
+#include <utility>
+
+#include "gl/GraphicsFactory.h"
+#include "gl/GraphicsObject.h"
+#include "gl/ManagedObject.h"
+#include "gl/OpenGLRenderer.h"
+#include "gl/VertexDescriptor.h"
+#include "graphics/ISPBitmap.h"
+#include "graphics/ISPCanvas.h"
+#include "graphics/SPGraphicsFactory.h"
+#include "log/Log.h"
+#include "math/Matrix4.h"
+#include "pencommon/PenGLDataManager.h"
+#include "render/DrawablePosts.h"
+#include "shaders/Pencil2OutlineShader.h"
+#include "shaders/ShaderRegistry.h"
+
+namespace Qelt {
+namespace {
+
+constexpr int kPointSide = 200;  // pixels
+constexpr unsigned int kOpaqueBlack = 0xFF000000u;
+constexpr int kDepthAndStencil = 6;
+
+void log(const char* signature) {
+  __android_log_print(kLogDebug, kLogTag, "%s", signature);
+}
+
+GraphicsObject* createStampObject() {
+  VertexDescriptor descriptor;
+  descriptor.addAttribute(AttributeType::Float, 4, -1);
+  descriptor.addAttribute(AttributeType::Float, 1, -1);
+  descriptor.addAttribute(AttributeType::Float, 2, -1);
+  return GraphicsFactory::createGraphicsObject(1, GraphicsFactory::kTriangles, descriptor, 0, 0);
+}
+
+Vector4<float> colorOf(unsigned int argb) {
+  const auto channel = [argb](int shift) { return static_cast<float>((argb >> shift) & 0xFFu) / 255.0f; };
+  return {channel(16), channel(8), channel(0), channel(24)};
+}
+
+bool hasFloats(const std::vector<float>* batch) {
+  return batch != nullptr && !batch->empty();
+}
+
+}  // namespace
+
+Pencil2OutlineDrawableRTV1::Pencil2OutlineDrawableRTV1(PenGLDataManager* manager)
+    : Pencil2OutlineDrawableRT(manager) {}
+
+void Pencil2OutlineDrawableRTV1::AddPoint(Vector2<float>, float) {}
+
+void Pencil2OutlineDrawableRTV1::AddPoint(const Vector2<float>* point, float size, float tiltFactor) {
+  Appender one(*this, 1);
+  one.AddPoint(point, size, tiltFactor);
+  one.flush();
+}
+
+void Pencil2OutlineDrawableRTV1::SetInverseScale(const Vector2<float>& inverseScale) {
+  mInverseScale = inverseScale;
+}
+
+void Pencil2OutlineDrawableRTV1::Init() {
+  if (mInnerObject == nullptr) mInnerObject = createStampObject();
+  if (mOuterObject == nullptr) mOuterObject = createStampObject();
+  if (mShader == nullptr) mShader = ShaderManager::GetInstance()->GetShader<Pencil2OutlineShader>();
+  ManagedObject::Register(this);
+}
+
+void Pencil2OutlineDrawableRTV1::Release() {
+  log("virtual void Qelt::Pencil2OutlineDrawableRTV1::Release()");
+  ManagedObject::Unregister(this);
+  ShaderManager::GetInstance()->ReleaseShader(std::exchange(mShader, nullptr));
+  if (mInnerObject != nullptr) std::exchange(mInnerObject, nullptr)->release();
+  if (mOuterObject != nullptr) std::exchange(mOuterObject, nullptr)->release();
+  SPGraphicsFactory::ReleaseBitmap(std::exchange(mPointTextureBitmap, nullptr));
+  mHasPendingData = false;
+}
+
+// Kept: the point texture is not drawn again; what a bitmap that was drawn into holds after a context loss is
+// the host's affair.
+void Pencil2OutlineDrawableRTV1::RestoreGLObject() {
+  log("virtual void Qelt::Pencil2OutlineDrawableRTV1::RestoreGLObject()");
+}
+
+void Pencil2OutlineDrawableRTV1::CreatePenCanvas(int, int, IGLMsgQueue*) {
+  Init();
+  if (mPointTextureBitmap == nullptr) buildPointTexture();
+}
+
+// A square full of alpha: the shader only asks where there is any.
+void Pencil2OutlineDrawableRTV1::buildPointTexture() {
+  IGLMsgQueue* queue = queueOf(mDataManager);
+  mPointTextureBitmap = SPGraphicsFactory::CreateBitmap(queue, kPointSide, kPointSide, nullptr, false, 0);
+  if (mPointTextureBitmap == nullptr) return;
+  // Kept: another drawable's name.
+  mPointTextureBitmap->SetDebugName("Marker4OutlineDrawableRTV1::CreatePenCanvas mPointTextureBitmap");
+  ISPCanvas* canvas = SPGraphicsFactory::CreateCanvas(queue, mPointTextureBitmap, 0);
+  if (canvas == nullptr) {
+    SPGraphicsFactory::ReleaseBitmap(std::exchange(mPointTextureBitmap, nullptr));
+    return;
+  }
+  canvas->Clear(0);
+  SPPaint paint;
+  paint.SetColor(kOpaqueBlack);
+  paint.SetStyle(SPPaint::kFill);
+  paint.SetAntiAlias(true);
+  canvas->DrawShape(0.0f, 0.0f, static_cast<float>(kPointSide), paint);
+  SPGraphicsFactory::ReleaseCanvas(canvas);
+}
+
+void Pencil2OutlineDrawableRTV1::Clear() {
+  mHasPendingData = false;
+  // The vectors themselves are freed by their own tasks.
+  if (mInnerRenderBuffer != nullptr) std::exchange(mInnerRenderBuffer, nullptr)->clear();
+  if (mOuterRenderBuffer != nullptr) std::exchange(mOuterRenderBuffer, nullptr)->clear();
+}
+
+void Pencil2OutlineDrawableRTV1::Update(bool) {
+  constexpr const char* kSignature = "virtual void Qelt::Pencil2OutlineDrawableRTV1::Update(bool)";
+  log(kSignature);
+  const auto upload = [](const std::vector<float>* batch, GraphicsObject* object) {
+    if (!hasFloats(batch)) return;
+    // Kept: both streams say 1.
+    __android_log_print(kLogDebug, kLogTag, "%s 1 size %lu", kSignature,
+                        static_cast<unsigned long>(batch->size()));
+    if (object != nullptr) {
+      object->updateBuffer(0, batch->data(), static_cast<int>(batch->size() / kFloatsPerVertex));
+    }
+  };
+  upload(mInnerRenderBuffer, mInnerObject);
+  upload(mOuterRenderBuffer, mOuterObject);
+}
+
+void Pencil2OutlineDrawableRTV1::Draw(ISPSubBitmap* target, Matrix4<float>& matrix) {
+  if (target == nullptr || !hasFloats(mInnerRenderBuffer) || !hasFloats(mOuterRenderBuffer)) return;
+  if (mInnerObject == nullptr || mOuterObject == nullptr || mPointTextureBitmap == nullptr) return;
+  if (mShader == nullptr || !mShader->isLinked()) return;
+
+  OpenGLRenderer::disableState(GL_DEPTH_TEST);
+  OpenGLRenderer::enableState(GL_BLEND);
+  OpenGLRenderer::setBlendFuncFactors(GL_SRC_ALPHA, GL_ONE_MINUS_SRC_ALPHA, GL_ONE, GL_ONE_MINUS_SRC_ALPHA);
+  target->BeginRender(0);
+  const Matrix4<float> projection = target->GetProjection() * matrix;
+  drawPass(projection, colorOf(GetOutlineColor()), 0.0f, mOuterObject);
+
+  // What is there keeps the share that the stamps leave uncovered.
+  OpenGLRenderer::setBlendFuncFactors(GL_ZERO, GL_ONE_MINUS_SRC_ALPHA, GL_ZERO, GL_ONE_MINUS_SRC_ALPHA);
+  drawPass(projection, {}, 1.0f, mInnerObject);
+
+  OpenGLRenderer::discardFramebuffer(kDepthAndStencil);
+  target->EndRender(0);
+}
+
+void Pencil2OutlineDrawableRTV1::drawPass(const Matrix4<float>& projection, const Vector4<float>& color,
+                                          float outlineCase, GraphicsObject* object) {
+  mShader->activate();
+  mShader->uProjectionMatrix = projection;
+  mPointTextureBitmap->GetTexture()->Bind(0);
+  mShader->pointTexture = 0;
+  mShader->uInputColor = color;
+  mShader->outlineCase = outlineCase;
+  object->draw(0, -1, true, 0);
+}
+
+}  // namespace Qelt

@@ -1,0 +1,93 @@
+#pragma once
+
+#include <cstddef>
+#include <vector>
+
+#include "base/Vector.h"
+#include "outline/Pencil2OutlineDrawableRT.h"
+#include "render/StampVertices.h"
+#include "render/UnclaimedBatch.h"
+
+namespace Qelt {
+
+class GraphicsObject;
+class ISPBitmap;
+class Pencil2OutlineShader;
+
+// The render-thread half of every outline version. Each stamp becomes two quads in two streams: one as large
+// as the stamp, one larger by the outline size. The large ones are drawn in the outline's colour, then the
+// small ones erase, so that a rim is left.
+//
+// Main thread: AddPoint, Appender, SetInverseScale, unclaimedBatch. Render thread: the rest.
+class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
+ public:
+  static constexpr std::size_t kFloatsPerVertex = 7;
+
+  explicit Pencil2OutlineDrawableRTV1(PenGLDataManager* manager);
+
+  void AddPoint(Vector2<float> point, float size) override;
+
+  // Appends stamps to both write buffers, each where there is one. Every stamp has a centre and a direction
+  // (-sin a, cos a), two vectors in a row; a width in stroke units; and a tilt factor. Lives while the
+  // buffers and the outline size stay as they are.
+  class Appender {
+   public:
+    // Makes room for so many stamps, so that appending them does not allocate. Throws std::bad_alloc.
+    Appender(Pencil2OutlineDrawableRTV1& renderer, std::size_t stamps)
+        : mInner(renderer.mInnerWriteBuffer, stamps),
+          mOuter(renderer.mOuterWriteBuffer, stamps),
+          mOutlineSize(renderer.GetOutlineSize()) {}
+
+    void AddPoint(const Vector2<float>* point, float size, float tiltFactor) {
+      const StampLook look{0.0f, tiltFactor, 0.0f, point[1]};
+      const float half = size * 0.5f;
+      mInner.add(quad(point[0], half), look);
+      mOuter.add(quad(point[0], half + mOutlineSize), look);
+    }
+
+    // The buffers hold all stamps from here on.
+    void flush() {
+      mInner.flush();
+      mOuter.flush();
+    }
+
+   private:
+    static StampQuad quad(Vector2<float> centre, float half) {
+      return {centre.x - half, centre.y - half, centre.x + half, centre.y + half, 0.0f, 1.0f};
+    }
+
+    StampAppender<kFloatsPerVertex> mInner;
+    StampAppender<kFloatsPerVertex> mOuter;
+    float mOutlineSize;
+  };
+
+  // Appends one stamp. Throws std::bad_alloc where a buffer cannot grow.
+  void AddPoint(const Vector2<float>* point, float size, float tiltFactor);
+
+  UnclaimedBatch* unclaimedBatch() { return &mUnclaimed; }
+
+  void Init() override;
+  void Release() override;
+  void RestoreGLObject() override;
+  void CreatePenCanvas(int width, int height, IGLMsgQueue* queue) override;
+  void Clear() override;
+  void Update(bool useCacheBuffer) override;
+  void Draw(ISPSubBitmap* target, Matrix4<float>& matrix) override;
+
+  // Kept: stored, and used by nothing.
+  void SetInverseScale(const Vector2<float>& inverseScale);
+
+ private:
+  void buildPointTexture();
+  void drawPass(const Matrix4<float>& projection, const Vector4<float>& color, float outlineCase,
+                GraphicsObject* object);
+
+  GraphicsObject* mInnerObject = nullptr;  // stamp-sized quads
+  GraphicsObject* mOuterObject = nullptr;  // enlarged by the outline size
+  ISPBitmap* mPointTextureBitmap = nullptr;
+  Pencil2OutlineShader* mShader = nullptr;
+  Vector2<float> mInverseScale;
+  UnclaimedBatch mUnclaimed;
+};
+
+}  // namespace Qelt

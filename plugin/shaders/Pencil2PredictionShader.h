@@ -1,0 +1,29 @@
+#pragma once
+
+#include "shaders/ParameterBinding.h"
+#include "shaders/ShaderProgram.h"
+#include "shaders/StampUniforms.h"
+
+namespace Qelt {
+
+// Draws the prediction's stamps: version 2 of the stroke shaders with an overall opacity. Render thread.
+class Pencil2PredictionShader : public StampUniforms {
+ public:
+  // Throws InvalidArgumentException when a uniform has another type than its binding.
+  Pencil2PredictionShader();
+
+  // False when the host could not make the program; nothing can be drawn then.
+  bool isLinked() const { return mProgram.get() != nullptr; }
+  void activate() { mProgram.get()->activate(); }
+
+  ParameterBinding<kBindingFloat> inputOpacity;  // 0 to 1; bound after the others
+
+  // GLSL ES 3.00, zero-terminated. Exported.
+  __attribute__((visibility("default"))) static const char szVertexShader[];
+  __attribute__((visibility("default"))) static const char szFragmentShader[];
+
+ private:
+  ShaderProgram mProgram;
+};
+
+}  // namespace Qelt
