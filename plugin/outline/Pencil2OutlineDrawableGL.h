@@ -1,0 +1,36 @@
+#pragma once
+
+#include "pencommon/PenOutlineDrawableGL.h"
+#include "stroke/parts/PenSettings.h"
+
+namespace Qelt {
+
+struct Pencil2Data;
+
+// The base of every outline version: the link to the pen's record, and mappings from settings to numbers.
+// Main thread.
+class Pencil2OutlineDrawableGL : public PenOutlineDrawableGL {
+ public:
+  ~Pencil2OutlineDrawableGL() override;
+
+  // The pen size, stroke units, read live.
+  float getSize() const;
+  // Shorter side of the screen over 360; 1 without a screen.
+  float getPixelScale() const;
+  // 1440 over the shorter side of the screen. Kept: 0 without a screen, where a stroke answers 1.
+  float getSpeedScale() const;
+  // Replaces a NaN.
+  static void checkNan(float* value, float fallback);
+  // At most 1; a NaN stays.
+  static float checkPressure(float pressure);
+
+ protected:
+  Pencil2OutlineDrawableGL(Pencil2Data* penData, PenGLDataManager* manager);
+
+  PenSettings settings() const;
+
+ private:
+  Pencil2Data* mPenData;  // the pen's; may be null when its allocation failed
+};
+
+}  // namespace Qelt
