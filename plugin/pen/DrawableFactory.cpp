@@ -2,6 +2,11 @@
 
 #include <new>
 
+#include "outline/Pencil2OutlineDrawableGLV1.h"
+#include "outline/Pencil2OutlineDrawableGLV2.h"
+#include "outline/Pencil2OutlineDrawableGLV3.h"
+#include "outline/Pencil2OutlineDrawableGLV4.h"
+#include "outline/Pencil2OutlineDrawableGLV5.h"
 #include "stroke/Pencil2StrokeDrawableGLV1.h"
 #include "stroke/Pencil2StrokeDrawableGLV2.h"
 #include "stroke/Pencil2StrokeDrawableGLV3.h"
@@ -30,6 +35,22 @@ Pencil2StrokeDrawableGL* createStrokeDrawable(std::int32_t strokeVersion, Pencil
       return new (std::nothrow) Pencil2StrokeDrawableGLV8(penData, manager);
     default:
       return new (std::nothrow) Pencil2StrokeDrawableGLV1(penData, manager);
+  }
+}
+
+Pencil2OutlineDrawableGL* createOutlineDrawable(std::int32_t outlineVersion, Pencil2Data* penData,
+                                                PenGLDataManager* manager) {
+  switch (outlineVersion) {
+    case 2:
+      return new (std::nothrow) Pencil2OutlineDrawableGLV2(penData, manager);
+    case 3:
+      return new (std::nothrow) Pencil2OutlineDrawableGLV3(penData, manager);
+    case 4:
+      return new (std::nothrow) Pencil2OutlineDrawableGLV4(penData, manager);
+    case 5:
+      return new (std::nothrow) Pencil2OutlineDrawableGLV5(penData, manager);
+    default:
+      return new (std::nothrow) Pencil2OutlineDrawableGLV1(penData, manager);
   }
 }
 

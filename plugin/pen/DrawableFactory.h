@@ -5,6 +5,7 @@
 namespace Qelt {
 
 class PenGLDataManager;
+class Pencil2OutlineDrawableGL;
 class Pencil2StrokeDrawableGL;
 struct Pencil2Data;
 
@@ -13,5 +14,9 @@ struct Pencil2Data;
 // Version 6 is drawn by version 4; unknown versions by version 1.
 Pencil2StrokeDrawableGL* createStrokeDrawable(std::int32_t strokeVersion, Pencil2Data* penData,
                                               PenGLDataManager* manager);
+
+// Unknown versions by version 1.
+Pencil2OutlineDrawableGL* createOutlineDrawable(std::int32_t outlineVersion, Pencil2Data* penData,
+                                                PenGLDataManager* manager);
 
 }  // namespace Qelt

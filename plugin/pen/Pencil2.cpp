@@ -5,12 +5,15 @@
 #include <utility>
 
 #include "base/String.h"
+#include "log/Log.h"
+#include "outline/Pencil2OutlineDrawableGL.h"
 #include "pen/DrawableFactory.h"
 #include "pen/Pencil2Data.h"
 #include "pen/VersionTable.h"
 #include "pencommon/PenGLDataManager.h"
 #include "pencommon/PenManager.h"
-#include "pencommon/PenPredictionDrawableGL.h"
+#include "prediction/Pencil2PredictionDrawableGL.h"
+#include "preview/Pencil2PreviewDrawableGL.h"
 #include "render/Posting.h"
 #include "stroke/Pencil2StrokeDrawableGL.h"
 
@@ -21,6 +24,7 @@ constexpr float kMinSize = 0.477f;  // stroke units
 constexpr float kMaxSize = 6.571f;
 constexpr std::uint32_t kOpaqueBlack = 0xFF000000u;
 constexpr int kAdvancedSettingVersion = 8;
+constexpr std::int32_t kPredictionVersion = 8;  // the stroke version that predictions continue
 
 // The name of a pen whose queue took the release that reads it, but not its deletion.
 std::atomic<String*> unclaimedName{nullptr};
@@ -45,6 +49,9 @@ Pencil2::Pencil2() : mData(new (std::nothrow) Pencil2Data{}) {
 // still read it.
 Pencil2::~Pencil2() {
   delete std::exchange(mStrokeDrawable, nullptr);
+  delete std::exchange(mPredictionDrawable, nullptr);
+  delete std::exchange(mOutlineDrawable, nullptr);
+  delete std::exchange(mPreviewDrawable, nullptr);
   releasePenData();
   delete mData;
 }
@@ -95,15 +102,41 @@ PenStrokeDrawableGL* Pencil2::GetStrokeDrawableGL() {
 }
 
 IPenPredictionDrawableGL* Pencil2::GetPredictionStrokeDrawableGL() {
-  return nullptr;
+  const std::int32_t version = versionTable[versionRow(getVersion())][0];
+  // Kept: stored although no stroke drawable is made here, so that the next getter of strokes may keep one of
+  // another version.
+  mStrokeVersion = version;
+  if (version != kPredictionVersion) {
+    // Kept: the two versions are named the wrong way round.
+    __android_log_print(
+        kLogError, kLogTag, "%s - Stroke drawble version (%d) does not match prediction drawable(%d).",
+        "virtual Qelt::IPenPredictionDrawableGL *Qelt::Pencil2::GetPredictionStrokeDrawableGL()",
+        static_cast<int>(kPredictionVersion), static_cast<int>(version));
+    __android_log_print(kLogError, kLogTag, "%s",
+                        "Please, update prediction drawable to last stroke drawable and update "
+                        "PEN_PREDICTION_CURRENT_VERSION");
+    return nullptr;
+  }
+  if (mPredictionDrawable == nullptr) {
+    mPredictionDrawable = new (std::nothrow) Pencil2PredictionDrawableGL(mData, getPenDataManager());
+  }
+  return mPredictionDrawable;
 }
 
 PenOutlineDrawableGL* Pencil2::GetOutlineDrawableGL() {
-  return nullptr;
+  const std::int32_t version = versionTable[versionRow(getVersion())][1];
+  if (mOutlineDrawable != nullptr && mOutlineVersion == version) return mOutlineDrawable;
+  delete std::exchange(mOutlineDrawable, nullptr);
+  mOutlineDrawable = createOutlineDrawable(version, mData, getPenDataManager());
+  mOutlineVersion = version;
+  return mOutlineDrawable;
 }
 
 PenPreviewDrawableGL* Pencil2::GetPreviewDrawableGL() {
-  return nullptr;
+  if (mPreviewDrawable == nullptr) {
+    mPreviewDrawable = new (std::nothrow) Pencil2PreviewDrawableGL(mData, getPenDataManager());
+  }
+  return mPreviewDrawable;
 }
 
 IPenMorphable* Pencil2::GetMorphable() {
