@@ -4,6 +4,7 @@
 
 #include <cmath>
 #include <cstddef>
+#include <limits>
 #include <utility>
 #include <vector>
 
@@ -57,23 +58,30 @@ class StampRenderer : public HostBase {
         : mStamps(renderer.mWriteBuffer, stamps), mInverseScale(renderer.mInverseScale) {}
 
     void AddPoint(const Vector2<float>* point, float size, float alpha, float tiltBlend, int tile) {
-      mStamps.add(quad(point[0], size), {alpha, tiltBlend, static_cast<float>(tile), point[1]});
+      // Most stamps are as large as the one before; the divisions of an extent cost a third of a stamp.
+      if (size != mSize) {
+        mExtent = extent(size);
+        mSize = size;
+      }
+      mStamps.add(stampQuad(point[0], mExtent), {alpha, tiltBlend, static_cast<float>(tile), point[1]});
     }
 
     // The buffer holds all stamps from here on.
     void flush() { mStamps.flush(); }
 
    private:
-    StampQuad quad(Vector2<float> centre, float size) const {
+    StampExtent extent(float size) const {
       if constexpr (kAntialiased) {
-        return antialiasedQuad(centre, size, mInverseScale);
+        return antialiasedExtent(size, mInverseScale);
       } else {
-        return squareQuad(centre, size);
+        return squareExtent(size);
       }
     }
 
     StampAppender<kFloatsPerVertex> mStamps;
     Vector2<float> mInverseScale;
+    float mSize = std::numeric_limits<float>::quiet_NaN();  // that mExtent belongs to
+    StampExtent mExtent{};
   };
 
   // Appends one stamp. Throws std::bad_alloc where the buffer cannot grow; without a buffer nothing happens.

@@ -32,16 +32,22 @@ struct StampQuad {
   float alphaByWidth;  // what a stamp widened to half a pixel is dimmed by; version 3 vertices only
 };
 
+// How far a stamp's square reaches from its centre, and how its rim is smoothed: all that its size decides.
+struct StampExtent {
+  float x, y;
+  float innerRadius, alphaByWidth;
+};
+
 // A square of side `width`.
-inline StampQuad squareQuad(Vector2<float> centre, float width) {
+inline StampExtent squareExtent(float width) {
   const float half = width * 0.5f;
-  return {centre.x - half, centre.y - half, centre.x + half, centre.y + half, 0.0f, 1.0f};
+  return {half, half, 0.0f, 1.0f};
 }
 
 // A square of the given half width, with a margin of half a device pixel for the rim. A stamp thinner than
 // half a pixel is widened to that and dimmed in proportion. `inverseScale`: stroke units a device pixel,
 // positive.
-inline StampQuad antialiasedQuad(Vector2<float> centre, float halfWidth, Vector2<float> inverseScale) {
+inline StampExtent antialiasedExtent(float halfWidth, Vector2<float> inverseScale) {
   float a = halfWidth / inverseScale.x;
   float b = halfWidth / inverseScale.y;
   const float thinner = a < b ? a : b;
@@ -56,9 +62,12 @@ inline StampQuad antialiasedQuad(Vector2<float> centre, float halfWidth, Vector2
   b += 0.5f;
   const float m = std::max(a, b);
   const float innerRadius = (m - 1.0f) / m * 0.5f;
-  const float halfX = inverseScale.x * a;
-  const float halfY = inverseScale.y * b;
-  return {centre.x - halfX, centre.y - halfY, centre.x + halfX, centre.y + halfY, innerRadius, alphaByWidth};
+  return {inverseScale.x * a, inverseScale.y * b, innerRadius, alphaByWidth};
+}
+
+inline StampQuad stampQuad(Vector2<float> centre, const StampExtent& extent) {
+  return {centre.x - extent.x, centre.y - extent.y, centre.x + extent.x,
+          centre.y + extent.y, extent.innerRadius,  extent.alphaByWidth};
 }
 
 // Makes room for `count` stamps more, at least doubling so that a long redraw stays linear.

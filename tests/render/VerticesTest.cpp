@@ -13,14 +13,14 @@ using testing::ElementsAre;
 using testing::ElementsAreArray;
 
 TEST(SquareQuadTest, IsCentredAndAsWideAsTheStamp) {
-  const StampQuad quad = squareQuad({10.0f, 20.0f}, 4.0f);
+  const StampQuad quad = stampQuad({10.0f, 20.0f}, squareExtent(4.0f));
   EXPECT_THAT((std::vector<float>{quad.left, quad.top, quad.right, quad.bottom}),
               ElementsAre(8.0f, 18.0f, 12.0f, 22.0f));
 }
 
 TEST(AntialiasedQuadTest, AddsHalfAPixelOfMargin) {
   // a' = 10 + 0.5; inner radius (10.5 - 1) / 10.5 / 2.
-  const StampQuad quad = antialiasedQuad({100.0f, 50.0f}, 10.0f, {1.0f, 1.0f});
+  const StampQuad quad = stampQuad({100.0f, 50.0f}, antialiasedExtent(10.0f, {1.0f, 1.0f}));
   EXPECT_THAT((std::vector<float>{quad.left, quad.top, quad.right, quad.bottom}),
               ElementsAre(89.5f, 39.5f, 110.5f, 60.5f));
   EXPECT_FLOAT_EQ(quad.innerRadius, 9.5f / 10.5f * 0.5f);
@@ -29,7 +29,7 @@ TEST(AntialiasedQuadTest, AddsHalfAPixelOfMargin) {
 
 TEST(AntialiasedQuadTest, WidensThinStampsAndDimsThem) {
   // k = 0.5 / 0.2 = 2.5: half a pixel wide, 0.4 as strong, all of it rim.
-  const StampQuad quad = antialiasedQuad({0.0f, 0.0f}, 0.2f, {1.0f, 1.0f});
+  const StampQuad quad = stampQuad({0.0f, 0.0f}, antialiasedExtent(0.2f, {1.0f, 1.0f}));
   EXPECT_FLOAT_EQ(quad.alphaByWidth, 0.4f);
   EXPECT_FLOAT_EQ(quad.right, 1.0f);
   EXPECT_FLOAT_EQ(quad.bottom, 1.0f);
@@ -39,28 +39,28 @@ TEST(AntialiasedQuadTest, WidensThinStampsAndDimsThem) {
 TEST(AntialiasedQuadTest, CountsInDevicePixelsOfEachAxis) {
   // 4 units are 8 pixels in x (half a unit a pixel) and 2 in y: a' = 8.5, b' = 2.5, the inner radius by the
   // larger: 7.5 / 8.5 / 2; half extents 0.5 * 8.5 and 2 * 2.5.
-  const StampQuad wide = antialiasedQuad({0.0f, 0.0f}, 4.0f, {0.5f, 2.0f});
+  const StampQuad wide = stampQuad({0.0f, 0.0f}, antialiasedExtent(4.0f, {0.5f, 2.0f}));
   EXPECT_FLOAT_EQ(wide.right, 4.25f);
   EXPECT_FLOAT_EQ(wide.bottom, 5.0f);
   EXPECT_FLOAT_EQ(wide.innerRadius, 7.5f / 8.5f * 0.5f);
   EXPECT_EQ(wide.alphaByWidth, 1.0f);
 
   // 0.5 units are 1 pixel in x and 0.25 in y. The thinner axis decides: k = 2, so a' = 2.5 and b' = 1.
-  const StampQuad thin = antialiasedQuad({0.0f, 0.0f}, 0.5f, {0.5f, 2.0f});
+  const StampQuad thin = stampQuad({0.0f, 0.0f}, antialiasedExtent(0.5f, {0.5f, 2.0f}));
   EXPECT_FLOAT_EQ(thin.alphaByWidth, 0.5f);
   EXPECT_FLOAT_EQ(thin.right, 1.25f);
   EXPECT_FLOAT_EQ(thin.bottom, 2.0f);
   EXPECT_FLOAT_EQ(thin.innerRadius, 1.5f / 2.5f * 0.5f);
 
   // The same with the axes exchanged.
-  const StampQuad other = antialiasedQuad({0.0f, 0.0f}, 0.5f, {2.0f, 0.5f});
+  const StampQuad other = stampQuad({0.0f, 0.0f}, antialiasedExtent(0.5f, {2.0f, 0.5f}));
   EXPECT_FLOAT_EQ(other.alphaByWidth, 0.5f);
   EXPECT_FLOAT_EQ(other.right, 2.0f);
   EXPECT_FLOAT_EQ(other.bottom, 1.25f);
 }
 
 TEST(AntialiasedQuadTest, TakesExactlyHalfAPixelAsItIs) {
-  const StampQuad quad = antialiasedQuad({0.0f, 0.0f}, 0.5f, {1.0f, 1.0f});
+  const StampQuad quad = stampQuad({0.0f, 0.0f}, antialiasedExtent(0.5f, {1.0f, 1.0f}));
   EXPECT_EQ(quad.alphaByWidth, 1.0f);
   EXPECT_EQ(quad.right, 1.0f);
 }
@@ -104,7 +104,7 @@ TEST(StampAppenderTest, AppendsEveryStampInOrderWhateverTheCount) {
     StampAppender<9> stamps(&batch, count);
     for (std::size_t i = 0; i < count; ++i) {
       const auto x = static_cast<float>(i);
-      stamps.add(squareQuad({x, 0.0f}, 2.0f), {x, 0.0f, 1.0f, {0.0f, 1.0f}});
+      stamps.add(stampQuad({x, 0.0f}, squareExtent(2.0f)), {x, 0.0f, 1.0f, {0.0f, 1.0f}});
     }
     stamps.flush();
     ASSERT_EQ(batch.size(), 1 + count * 54) << count;
