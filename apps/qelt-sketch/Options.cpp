@@ -135,6 +135,7 @@ void addOutput(CLI::App& app, Options& options, const char* help) {
 
 void addPlugin(CLI::App& app, Options& options) {
   app.add_option("--plugin", options.plugin, "pen plug-in to load")->type_name("FILE")->group("");
+  app.add_flag("--log", options.log, "show what plug-in and host log, on standard error");
 }
 
 void addPen(CLI::App& app, Options& options) {

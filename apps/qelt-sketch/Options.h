@@ -32,6 +32,7 @@ struct Options {
   std::optional<std::string> input;   // none: the sample page
   std::string output;                 // "-": standard output
   std::optional<std::string> plugin;  // none: the one built with the program
+  bool log = false;                   // show the platform log
 
   int renderingVersion = 8;
   std::optional<float> size;  // any float: the pen has its own opinion of NaN

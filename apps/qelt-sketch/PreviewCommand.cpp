@@ -16,15 +16,16 @@ namespace QeltDesktop {
 namespace {
 
 // The panel, in stroke units and pixels a unit.
-constexpr float kPanelWidth = 240.0f;
-constexpr float kPanelHeight = 80.0f;
-constexpr float kPanelZoom = 3.0f;
+constexpr float kPanelWidth = 480.0f;
+constexpr float kPanelHeight = 160.0f;
+constexpr float kPanelZoom = 1.0f;
 constexpr int kSamples = 160;
 
-// A lying S, drawn upright and light, then heavier and leaning, then light again.
+// A lying S that swells: pressed harder and leant further towards its middle.
 Page samplePanel() {
-  constexpr double kInset = 30.0, kSwing = 20.0;
-  constexpr double kLightest = 0.15, kHeaviest = 0.85;  // pressure
+  constexpr double kInset = 50.0, kSwing = 42.0;        // stroke units
+  constexpr double kLightest = 0.15, kHeaviest = 0.75;  // pressure
+  constexpr double kMostTilt = 0.55;                    // radians
   Trace trace;
   for (int i = 0; i < kSamples; ++i) {
     const double along = static_cast<double>(i) / (kSamples - 1);
@@ -33,6 +34,7 @@ Page samplePanel() {
     sample.x = static_cast<float>(kInset + along * (kPanelWidth - 2.0 * kInset));
     sample.y = static_cast<float>(kPanelHeight / 2.0 - kSwing * std::sin(along * 2.0 * std::numbers::pi));
     sample.pressure = static_cast<float>(kLightest + (kHeaviest - kLightest) * swell);
+    sample.tilt = static_cast<float>(kMostTilt * swell);
     sample.time = i * 1000.0 / 240.0;
     trace.samples.push_back(sample);
   }

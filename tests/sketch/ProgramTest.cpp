@@ -229,6 +229,101 @@ TEST_F(Program, DrawsAPageAlikeHoweverOftenItIsRepeated) {
   EXPECT_EQ(decoded(once).bytes, decoded(twice).bytes);
 }
 
+TEST_F(Program, TracesOutlinesPreviewsAndPredictions) {
+  const std::vector<Json> outlines = trace("--drawable outline --outline 3,#FF00FF00");
+  ASSERT_EQ(outlines.size(), 3u);
+  for (std::size_t i = 1; i < outlines.size(); ++i) {
+    EXPECT_EQ(outlines[i]["op"], "DrawOutline");
+    ASSERT_EQ(outlines[i]["buffers"].size(), 2u);
+    for (const Json& buffer : outlines[i]["buffers"]) {
+      EXPECT_EQ(buffer["stride"], 7);
+      EXPECT_GT(buffer["data"].size(), 0u);
+      EXPECT_EQ(buffer["data"].size() % 42, 0u);
+    }
+    // The outer quads are the enlarged ones: their first corner lies further out.
+    EXPECT_LT(outlines[i]["buffers"][1]["data"][0], outlines[i]["buffers"][0]["data"][0]);
+  }
+  EXPECT_EQ(trace("--drawable outline --mode stroke")[1]["action"], nullptr);
+
+  const std::vector<Json> previews = trace("--drawable preview --mode event");
+  ASSERT_EQ(previews.size(), 3u);
+  EXPECT_EQ(previews[1]["op"], "RedrawPen");
+  EXPECT_EQ(previews[1]["buffers"][0]["data"].size() % 54, 0u);
+  EXPECT_EQ(trace("--drawable preview").size(), 1u + 5u + 2u);
+
+  // One prediction a move event, from where the live stroke is: on the line from (20, 20) to (70, 45), step
+  // (5, 2.5).
+  const std::vector<Json> predictions = trace("--drawable prediction --predict 3");
+  ASSERT_EQ(predictions.size(), 1u + 3u);
+  for (std::size_t i = 1; i < predictions.size(); ++i) {
+    EXPECT_EQ(predictions[i]["op"], "Draw");
+    EXPECT_EQ(predictions[i]["action"], 2);
+    EXPECT_EQ(predictions[i]["result"], true);
+    EXPECT_GT(predictions[i]["buffers"][0]["data"].size(), 66u);
+  }
+  EXPECT_NEAR(predictions[1]["rect"][2].get<float>(), 55.1f, 4.0f);  // 40 + 3 * 5
+  EXPECT_NEAR(predictions[3]["rect"][2].get<float>(), 85.1f, 4.0f);  // 70 + 3 * 5
+}
+
+TEST_F(Program, LaysOutlinesUnderAndPredictionsOverTheStrokes) {
+  const std::string ink =
+      write("line.inkml",
+            "<ink><brush><brushProperty name='width' value='6'/></brush>"
+            "<trace>10.3 20.3,20.3 20.3,30.3 20.3,40.3 20.3,50.3 20.3,60.3 20.3</trace></ink>");
+  const auto draw = [&](const std::string& options) {
+    const std::string out = path("out.png").string();
+    const Ran ran = run("draw '" + ink + "' --page 120x40 -o '" + out + "' " + options);
+    EXPECT_EQ(ran.status, 0) << ran.err;
+    return decoded(out);
+  };
+  // Darkest red and brightest green in a part of the picture.
+  const auto darkest = [](const Rgba& picture, std::uint32_t left, std::uint32_t right) {
+    int red = 255;
+    for (std::uint32_t y = 0; y < picture.height; ++y) {
+      for (std::uint32_t x = left; x < right; ++x) red = std::min<int>(red, picture.at(x, y)[0]);
+    }
+    return red;
+  };
+  const Rgba plain = draw("");
+  EXPECT_EQ(darkest(plain, 70, 120), 255);
+  EXPECT_LT(darkest(plain, 30, 40), 100);
+
+  // The stroke stays dark over its outline; the outline reaches further, in its own colour.
+  const Rgba outlined = draw("--outline 6,#FFFF0000");
+  EXPECT_LT(darkest(outlined, 30, 40), 120);
+  const std::uint8_t* const rim = outlined.at(35, 26);
+  EXPECT_EQ(rim[0], 255);
+  EXPECT_LT(rim[1], 100);
+  EXPECT_EQ(plain.at(35, 26)[1], 255);
+
+  // Predicted ink is there while the pen is down, and gone once it is lifted.
+  EXPECT_LT(darkest(draw("--predict 3 --opacity 1 --points 6"), 70, 120), 255);
+  EXPECT_EQ(darkest(draw("--predict 3 --opacity 0 --points 6"), 70, 120), 255);
+  EXPECT_EQ(draw("--predict 3 --opacity 1").bytes, plain.bytes);
+
+  const Ran refused =
+      run("draw '" + ink + "' --predict 3 --rendering-version 7 -o '" + path("no.png").string() + "'");
+  EXPECT_EQ(refused.status, 1);
+  EXPECT_EQ(refused.err, "the pen has no prediction drawable in rendering version 7\n");
+  EXPECT_FALSE(holds("no.png"));
+}
+
+TEST_F(Program, DrawsThePreviewAndTheSheet) {
+  const std::string out = path("out.png").string();
+  ASSERT_EQ(run("preview --size 6 --color '#FF0000FF' -o '" + out + "'").status, 0);
+  const Rgba preview = decoded(out);
+  std::size_t blue = 0;
+  for (std::size_t i = 0; i < preview.bytes.size(); i += 4) blue += preview.bytes[i] < 128 ? 1 : 0;
+  EXPECT_GT(blue, preview.width);  // the stroke runs across most of the panel, several pixels wide
+
+  const std::string ink = writeInk();
+  ASSERT_EQ(run("sheet '" + ink + "' --size 4 -o '" + out + "'").status, 0);
+  const Rgba sheet = decoded(out);
+  // Eight cells in two columns, each the page of 70 x 25 and its margins of 24 on every side.
+  EXPECT_EQ(sheet.width, 2u * (118 + 16) + 16);
+  EXPECT_GT(sheet.height, 4u * 73);
+}
+
 TEST_F(Program, LeavesNothingBehindWhenThePageIsMalformed) {
   const std::string bad = write("bad.inkml", "<ink>\n<trace>1 2, 3 four</trace>\n</ink>");
   for (const std::string command : {"draw", "trace", "sheet"}) {
