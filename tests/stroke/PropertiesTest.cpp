@@ -210,13 +210,13 @@ TEST_P(StrokesByLot, StayInsideTheAreasTheyReport) {
   }
 }
 
+std::string nameOf(const testing::TestParamInfo<std::tuple<int, bool, Hand>>& stroke) {
+  const auto& [version, curve, hand] = stroke.param;
+  return "Version" + std::to_string(version) + (curve ? "Curve" : "Straight") + hand.name;
+}
+
 INSTANTIATE_TEST_SUITE_P(All, StrokesByLot,
-                         Combine(ValuesIn(allVersions()), testing::Bool(), ValuesIn(kHands)),
-                         [](const auto& stroke) {
-                           const auto& [version, curve, hand] = stroke.param;
-                           return "Version" + std::to_string(version) + (curve ? "Curve" : "Straight") +
-                                  hand.name;
-                         });
+                         Combine(ValuesIn(allVersions()), testing::Bool(), ValuesIn(kHands)), nameOf);
 
 }  // namespace
 }  // namespace QeltTests
