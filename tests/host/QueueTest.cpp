@@ -12,6 +12,7 @@
 #include "desktop/gl/CallTask.h"
 #include "desktop/gl/RenderQueue.h"
 #include "gl/ITask.h"
+#include "support/Allocations.h"
 #include "support/LogCapture.h"
 
 namespace {
@@ -83,6 +84,18 @@ TEST_P(Queue, RefusesWithoutTakingOwnershipAndIgnoresNull) {
   EXPECT_EQ(ran, 1);
   EXPECT_EQ(alive, 0);
   EXPECT_EQ(accepted, 1);
+}
+
+TEST_P(Queue, PostingAsksForNoMemory) {
+  if (!QeltTests::countsAllocations()) GTEST_SKIP();
+  std::atomic<int> alive{0}, ran{0};
+  RenderQueue queue(GetParam(), RenderQueue::GL::None);
+  auto* const task = new CountedTask(alive, ran);
+  const QeltTests::FailingAllocation first(0);
+  EXPECT_TRUE(queue.Post(task));
+  queue.finish();
+  EXPECT_FALSE(first.hasFailed());
+  EXPECT_EQ(alive, 0);
 }
 
 TEST_P(Queue, ShuttingDownRunsWhatWasPostedAndTakesNoMore) {

@@ -11,6 +11,8 @@
 #include <string>
 #include <vector>
 
+#include "support/Allocations.h"
+
 namespace {
 
 using Qelt::SmPath;
@@ -339,6 +341,34 @@ TEST(SmPath, RoomMayBeAskedForFreedAndUsedAgain) {
   path.resetPath(0);
   build(path, {0, 0, 1, 0, 2, 0});
   EXPECT_EQ(path.getLength(), 2.0f);
+}
+
+TEST(SmPath, AsksForNoMemoryOnceItHasItsRoom) {
+  if (!QeltTests::countsAllocations()) GTEST_SKIP();
+  SmPath path;
+  path.incReserve(3);
+  const QeltTests::FailingAllocation first(0);
+  for (int i = 0; i < 3; ++i) {
+    build(path, {0, 0, 1000, static_cast<float>(i), 0, 1});
+    SmPoint at;
+    for (float s = 0.0f; s < path.getLength(); s += 1.0f) EXPECT_TRUE(path.getPosTan(s, &at, nullptr));
+  }
+  EXPECT_FALSE(first.hasFailed());
+}
+
+TEST(SmPath, OutOfMemoryItLeavesOutWhatItCannotHold) {
+  if (!QeltTests::countsAllocations()) GTEST_SKIP();
+  // The path itself, and the room for segments and contours.
+  for (long number = 0; number < 3; ++number) {
+    const QeltTests::FailingAllocation failing(number);
+    SmPath path;
+    path.incReserve(3);
+    build(path, {0, 0, 1, 0, 2, 0});
+    SmPoint at;
+    path.getPosTan(0.0f, &at, nullptr);
+    EXPECT_LE(path.getLength(), 2.0f);
+    EXPECT_TRUE(failing.hasFailed());
+  }
 }
 
 }  // namespace

@@ -210,20 +210,32 @@ struct SmPath::Measure {
     limit = -1.0;
   }
 
-  void addSegment(double controlX, double controlY, double toX, double toY) {
-    if (contours.empty()) contours.push_back({0, x, y});
-    const Curve curve{
-        x, y, 2.0 * (controlX - x), 2.0 * (controlY - y), x - 2.0 * controlX + toX, y - 2.0 * controlY + toY};
-    segments.push_back({curve, 0.0, 0.0});
-    x = toX;
-    y = toY;
+  void addQuad(double controlX, double controlY, double toX, double toY) {
+    addCurve({x, y, 2.0 * (controlX - x), 2.0 * (controlY - y), x - 2.0 * controlX + toX,
+              y - 2.0 * controlY + toY},
+             toX, toY);
   }
 
-  void addLine(double toX, double toY) {
-    if (contours.empty()) contours.push_back({0, x, y});
-    segments.push_back({{x, y, toX - x, toY - y, 0.0, 0.0}, 0.0, 0.0});
-    x = toX;
-    y = toY;
+  void addLine(double toX, double toY) { addCurve({x, y, toX - x, toY - y, 0.0, 0.0}, toX, toY); }
+
+  // What memory has no room for is left out.
+  void addContour(double atX, double atY) {
+    try {
+      contours.push_back({segments.size(), atX, atY});
+      x = atX;
+      y = atY;
+    } catch (const std::bad_alloc&) {
+    }
+  }
+
+  void addCurve(const Curve& curve, double toX, double toY) {
+    if (contours.empty()) addContour(x, y);
+    try {
+      segments.push_back({curve, 0.0, 0.0});
+      x = toX;
+      y = toY;
+    } catch (const std::bad_alloc&) {
+    }
   }
 
   // Cuts a segment into pieces and returns its length.
@@ -345,10 +357,7 @@ void SmPath::freeMemory() {
 
 void SmPath::moveTo(float x, float y) {
   if (mMeasure == nullptr) mMeasure.reset(new (std::nothrow) Measure);
-  if (mMeasure == nullptr) return;
-  mMeasure->contours.push_back({mMeasure->segments.size(), x, y});
-  mMeasure->x = x;
-  mMeasure->y = y;
+  if (mMeasure != nullptr) mMeasure->addContour(x, y);
 }
 
 void SmPath::lineTo(float x, float y) {
@@ -358,7 +367,7 @@ void SmPath::lineTo(float x, float y) {
 
 void SmPath::quadTo(float controlX, float controlY, float x, float y) {
   if (mMeasure == nullptr) mMeasure.reset(new (std::nothrow) Measure);
-  if (mMeasure != nullptr) mMeasure->addSegment(controlX, controlY, x, y);
+  if (mMeasure != nullptr) mMeasure->addQuad(controlX, controlY, x, y);
 }
 
 void SmPath::resetPath(int contour) {
