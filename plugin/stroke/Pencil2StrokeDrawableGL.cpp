@@ -1,6 +1,5 @@
 #include "stroke/Pencil2StrokeDrawableGL.h"
 
-#include "stroke/parts/PenSettings.h"
 #include "stroke/parts/SampleCleaner.h"
 
 namespace Qelt {
@@ -14,24 +13,16 @@ bool Pencil2StrokeDrawableGL::RedrawPen(const List*, RectF*) {
   return true;
 }
 
-bool Pencil2StrokeDrawableGL::hasSettings() const {
-  return PenSettings(mPenData).exist();
-}
-
 float Pencil2StrokeDrawableGL::getSize() const {
-  return PenSettings(mPenData).size();
-}
-
-std::uint32_t Pencil2StrokeDrawableGL::getColor() const {
-  return PenSettings(mPenData).color();
+  return settings().size();
 }
 
 float Pencil2StrokeDrawableGL::getPixelScale() const {
-  return PenSettings(mPenData).pixelScale();
+  return settings().pixelScale();
 }
 
 float Pencil2StrokeDrawableGL::getSpeedScale() const {
-  return PenSettings(mPenData).speedScale(1.0f);
+  return settings().speedScale(1.0f);
 }
 
 void Pencil2StrokeDrawableGL::checkNan(float* value, float fallback) {

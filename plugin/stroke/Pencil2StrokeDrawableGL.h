@@ -1,8 +1,7 @@
 #pragma once
 
-#include <cstdint>
-
 #include "pencommon/PenStrokeDrawableGL.h"
+#include "stroke/parts/PenSettings.h"
 
 namespace Qelt {
 
@@ -38,9 +37,7 @@ class Pencil2StrokeDrawableGL : public PenStrokeDrawableGL {
   virtual bool redrawPen_NoCurve(const MotionEvent* event, RectF* rect) = 0;
   virtual bool redrawPen_NoCurve(const ObjectStroke* stroke, RectF* rect) = 0;
 
-  std::uint32_t getColor() const;  // ARGB
-  // True when there are settings to draw by.
-  bool hasSettings() const;
+  PenSettings settings() const { return PenSettings(mPenData); }
 
   Pencil2Data* mPenData;  // the pen's; may be null when its allocation failed
 };

@@ -1,7 +1,6 @@
 #pragma once
 
 #include <algorithm>
-#include <cmath>
 #include <cstddef>
 #include <new>
 
@@ -13,13 +12,14 @@
 #include "model/ObjectStroke.h"
 #include "pen/Pencil2Data.h"
 #include "pencommon/PenGLDataManager.h"
-#include "pencommon/PenSettingData.h"
+#include "render/DrawablePosts.h"
 #include "render/Posting.h"
 #include "stroke/Pencil2StrokeDrawableGL.h"
 #include "stroke/StrokeCache.h"
 #include "stroke/StrokeRules.h"
 #include "stroke/StrokeVersions.h"
-#include "stroke/parts/DirtyBox.h"
+#include "stroke/parts/CutLog.h"
+#include "stroke/parts/LiveInput.h"
 #include "stroke/parts/MoveFilter.h"
 #include "stroke/parts/PatternShift.h"
 #include "stroke/parts/PenAttitude.h"
@@ -28,6 +28,7 @@
 #include "stroke/parts/SampleCleaner.h"
 #include "stroke/parts/SegmentPath.h"
 #include "stroke/parts/StampCounter.h"
+#include "stroke/parts/StampRun.h"
 #include "stroke/parts/StampWalk.h"
 #include "stroke/parts/StrokeState.h"
 #include "stroke/parts/ViewScale.h"
@@ -67,9 +68,9 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
 
     typename Version::ReturnGuard guard(mRender, mCanvas, mRender->unclaimedBatch());
     passInverseScale();
-    const bool result = drawEvent(*event, rect);
+    const bool result = drawLive(*event, *this, mState, rect, settings().smoothing(), kMoveGrowth);
     guard.setRect(*rect);
-    postRect(*rect);
+    postRect(queue(), mRender, *rect);
     return result;
   }
 
@@ -130,89 +131,26 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
  private:
   template <typename Source, typename Pen>
   friend bool replay(Source, Pen&, RectF*, Smoothing, float);
+  template <typename Pen>
+  friend bool drawLive(const MotionEvent&, Pen&, StrokeState&, RectF*, Smoothing, float);
 
-  // --- Live input ------------------------------------------------------------------------------------------
+  // --- Live input ---
 
-  bool drawEvent(const MotionEvent& event, RectF* rect) {
-    const Smoothing smoothing = currentSmoothing();
-    switch (event.GetAction()) {
-      case kActionDown:
-        if (!isFinite(PointF{event.GetX(0), event.GetY(0)})) return false;
-        mState.down();
-        mMoves.setMinimumMove(getSize() / 5.0f);
-        return startPen(event, rect, smoothing);
-      case kActionMove:
-        return mState.move() && movePen(event, rect, smoothing);
-      case kActionUp:
-        if (!mState.up()) return false;
-        mAlpha = kNoAlpha;  // the closing segment has no ramp
-        return endPen(&event, rect, smoothing);
-      default:
-        return false;
-    }
-  }
-
-  // The start pressure places no stamp; all the same it is written back for a stylus that reports none.
-  bool startPen(const MotionEvent& event, RectF* rect, Smoothing smoothing) {
-    substituteTouchPressure(event);
-    const PointF at{event.GetX(0), event.GetY(0)};
-    const PenSample start{at, kCleaner.unknownPressure, cleanTilt(event),
-                          SampleCleaner::orientation(event.GetOrientation(0))};
-    begin(start, isCoarseTool(event.GetToolType(0), event.GetSource()));
-
+  void beginLive(const PenSample& start, bool coarseTool, Smoothing smoothing) {
+    mMoves.setMinimumMove(getSize() / 5.0f);
+    begin(start, coarseTool);
     if (smoothing == Smoothing::Curve) {
-      postStartPoint(at);
+      postStartPoint(queue(), mRender, start.at);
       publishStart();
     }
-    rect->Set(at.x, at.y, at.x, at.y);
-    postPenData();
-    return true;
+    postPenData(queue(), mRender, getSize(), settings().color());
   }
 
-  bool movePen(const MotionEvent& event, RectF* rect, Smoothing smoothing) {
-    const int history = event.GetHistorySize();
-    const int toolType = event.GetToolType(0);
-    if (isTouchStylus(toolType, event.GetSource())) {
-      for (int i = 0; i < history; ++i) writable(event).SetHistoricalPressure(i, kProfile.unknownPressure);
-      writable(event).SetPressure(kProfile.unknownPressure);
-    }
-    setToJoint(rect);
-    reserveFor(event);
-
-    const float currentTilt = cleanTilt(event);
-    EventSource source(event);
-    for (int i = 0; i < history; ++i) {
-      drawLine({source.point(i), kCleaner.pressure(source.pressure(i), toolType), source.tilt(i, kCleaner),
-                SampleCleaner::orientation(source.orientation(i))},
-               rect, smoothing);
-    }
-    drawLine({{event.GetX(0), event.GetY(0)},
-              kCleaner.pressure(event.GetPressure(0), toolType),
-              currentTilt,
-              SampleCleaner::orientation(event.GetOrientation(0))},
-             rect, smoothing);
-    rect->IncreaseRect(kMoveGrowth);
-    return true;
+  void beginMove(const MotionEvent& event) {
+    if constexpr (kSpaced) mRender->reserve(stampsOfMove(event, mPath, kProfile.stampSpacing));
   }
 
-  // Makes room for the stamps of a whole move at once: a batch that grows from segment to segment is copied
-  // again and again. Curves are no longer than the way from point to point.
-  void reserveFor(const MotionEvent& event) {
-    if constexpr (kSpaced) {
-      constexpr float kMostAtOnce = 8192.0f;  // stamps, 2 MB; what is beyond grows by doubling
-      const int history = event.GetHistorySize();
-      PointF from = mPath.last();
-      float way = distanceBetween(mPath.mid(), from);
-      for (int i = 0; i <= history; ++i) {
-        const PointF to = i < history ? PointF{event.GetHistoricalX(i), event.GetHistoricalY(i)}
-                                      : PointF{event.GetX(0), event.GetY(0)};
-        way += distanceBetween(from, to);
-        from = to;
-      }
-      const float stamps = way / kProfile.stampSpacing + 2.0f * static_cast<float>(history + 1);
-      mRender->reserve(static_cast<std::size_t>(stamps < kMostAtOnce ? stamps : kMostAtOnce));
-    }
-  }
+  void forgetAlpha() { mAlpha = kNoAlpha; }
 
   // Ends a stroke at the event's point. A point that is not finite leaves the closing segment out.
   bool endPen(const MotionEvent* event, RectF* rect, Smoothing smoothing) {
@@ -220,28 +158,20 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
       Error::SetError(Error::kInvalidArgument);
       return false;
     }
-    substituteTouchPressure(*event);
-    const PointF at{event->GetX(0), event->GetY(0)};
-    setToJoint(rect);
-    if (isFinite(at)) rect->MakeRect(&at);
-    rect->IncreaseRect(kMoveGrowth);
-
-    const PenSample sample{at, kCleaner.pressure(event->GetPressure(0), event->GetToolType(0)),
-                           cleanTilt(*event), SampleCleaner::orientation(event->GetOrientation(0))};
+    const PenSample sample = endSample(*event, kCleaner, mPath, kMoveGrowth, rect);
     mAttitude.push(sample.tilt, sample.orientation);
-    if (!hasUsableSize()) return true;
+    if (!settings().hasUsableSize()) return true;
 
     if (mFirstSegment) {
       placeTap(sample.pressure, rect);
-    } else if (isFinite(at)) {
-      placeSegment(mPath.close(at, smoothing), sample.pressure, rect);
+    } else if (isFinite(sample.at)) {
+      placeSegment(mPath.close(sample.at, smoothing), sample.pressure, rect);
       rect->IncreaseRect(kCloseGrowth);
     }
     return true;
   }
 
-  // --- Replay
-  // ------------------------------------------------------------------------------------------------
+  // --- Replay ---
 
   template <typename Input>
   bool replayChecked(const Input* input, RectF* rect, Smoothing smoothing) {
@@ -256,10 +186,11 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
   static StrokeSource sourceOf(const ObjectStroke& stroke) { return StrokeSource(stroke); }
 
   SampleCleaner cleaner() const { return kCleaner; }
+  const SegmentPath& path() const { return mPath; }
 
   void beginReplay(const PenSample& start, bool coarseTool, Smoothing smoothing) {
     // Kept: a straight replay posts no start point; the grain stays where the stroke before it had it.
-    if (smoothing == Smoothing::Curve) postStartPoint(start.at);
+    if (smoothing == Smoothing::Curve) postStartPoint(queue(), mRender, start.at);
     begin(start, coarseTool);
   }
 
@@ -267,7 +198,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
   template <typename Input>
   bool redrawInto(typename Version::ReturnGuard& guard, const Input* input, RectF* rect) {
     bool result;
-    if (currentSmoothing() == Smoothing::Curve) {
+    if (settings().smoothing() == Smoothing::Curve) {
       redraw(input, rect);
       rect->IncreaseRect(kMoveGrowth);
       result = true;  // Kept: whatever the replay answered; the straight one's answer counts
@@ -275,14 +206,14 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
       result = redrawPen_NoCurve(input, rect);
     }
     guard.setRect(*rect);
-    postRect(*rect);
+    postRect(queue(), mRender, *rect);
     return result;
   }
 
   bool presentCached(StrokeCache& cache, const ObjectStroke& stroke, RectF* rect) {
     const StrokeSource source(stroke);
     const int first = firstUsablePoint(source);
-    postStartPoint(first < 0 ? PointF{} : source.point(first));
+    postStartPoint(queue(), mRender, first < 0 ? PointF{} : source.point(first));
     *rect = cache.rect();
     UnclaimedBatch* unclaimed = mRender->unclaimedBatch();
     bool handedOver = false;
@@ -306,7 +237,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
   // Kept: the entry's use ends after the batch on the curve path, always; before it on the straight path, and
   // only where there is an entry.
   bool redrawAndStore(StrokeCache& cache, const ObjectStroke* stroke, RectF* rect) {
-    const bool curve = currentSmoothing() == Smoothing::Curve;
+    const bool curve = settings().smoothing() == Smoothing::Curve;
     bool result;
     {
       mMoves.setMinimumMove(getSize() / 5.0f);
@@ -320,8 +251,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     return result;
   }
 
-  // --- Segments
-  // ----------------------------------------------------------------------------------------------
+  // --- Segments ---
 
   // Resets everything that a stroke carries along.
   void begin(const PenSample& start, bool coarseTool) {
@@ -334,7 +264,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     mAttitude.fill(start.tilt, start.orientation);
     mStamps.restart();
     mPatternShift.restart();
-    mLoggedCut = false;
+    mCutLog.restart();
   }
 
   // Takes one sample into the stroke; true when it placed a stamp.
@@ -345,7 +275,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     mAttitude.push(sample.tilt, sample.orientation);
 
     bool placed = false;
-    if (hasUsableSize()) {
+    if (settings().hasUsableSize()) {
       // A segment too short for its version leaves the last point where it is.
       if (length < kProfile.shortestSegment) return false;
       placed = placeSegment(length, sample.pressure, rect);
@@ -362,7 +292,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
   bool placeSegment(float length, float pressure, RectF* rect) {
     if (length < kProfile.shortestSegment) return false;
     const float size = getSize();
-    const float alpha = kProfile.pressureAlpha(pressure, rules::colorAlpha(getColor()), size);
+    const float alpha = kProfile.pressureAlpha(pressure, rules::colorAlpha(settings().color()), size);
     if (mAlpha < 0.0f) mAlpha = alpha;
     const float blend = kProfile.tiltBlend(mAttitude.meanTilt());
     const float width = kProfile.pointSize(size, blend);
@@ -386,11 +316,11 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     // The ramps' count is worked out apart from the walk, and may differ from it by one.
     const int count = rules::incremented(rules::saturatedCount((length - first) / kProfile.stampSpacing));
     Appender appender(*mRender, spacedStamps(first, kProfile.stampSpacing, length));
-    StampRun run(*this, appender, width, alpha, blend, count);
+    StampRun<Version> run = runTo(appender, width, alpha, blend, count);
     const WalkResult walk = walkSpaced(mPath.path(), first, kProfile.stampSpacing, length, run);
-    run.finish(*this, rect);
+    finish(run, rect);
     mCarried = walk.carry;
-    if (walk.cutShort) logCut(length);
+    if (walk.cutShort) mCutLog.note(Version::name, length);
   }
 
   // So many stamps a segment; the next one begins with a stamp at its own start.
@@ -404,133 +334,53 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     }
     const int most = std::min(count, kMostStampsPerSegment);
     Appender appender(*mRender, static_cast<std::size_t>(most));
-    StampRun run(*this, appender, width, alpha, blend, count);
+    StampRun<Version> run = runTo(appender, width, alpha, blend, count);
     const bool cutShort = walkEvenly(mPath.path(), count, length, run);
-    run.finish(*this, rect);
-    if (cutShort) logCut(length);
+    finish(run, rect);
+    if (cutShort) mCutLog.note(Version::name, length);
   }
 
-  // The stamps of one segment, with width and alpha on their way to the targets. Local state, so that the
-  // walk runs in registers.
   using Appender = typename RenderDrawable::Appender;
 
-  class StampRun {
-   public:
-    // `steps`: of the ramps.
-    StampRun(const StrokePipeline& pen, Appender& appender, float width, float alpha, float blend, int steps)
-        : mAppender(appender),
-          mWidth(pen.mWidth),
-          mAlpha(pen.mAlpha),
-          mWidthStep(rules::rampStep(pen.mWidth, width, steps)),
-          mAlphaStep(kSpaced ? (alpha - pen.mAlpha) / static_cast<float>(steps)
-                             : rules::rampStep(pen.mAlpha, alpha, steps)),
-          mBlend(blend),
-          mStamps(pen.mStamps) {
-      mStamp[1] = pen.direction();
-    }
+  // Width and alpha on their way to a segment's targets.
+  StampRun<Version> runTo(Appender& appender, float width, float alpha, float blend, int steps) const {
+    const SegmentRamps ramps{mWidth, mAlpha, rules::rampStep(mWidth, width, steps),
+                             rules::rampStep(mAlpha, alpha, steps)};
+    return {appender, ramps, blend, stampDirection(mAttitude.meanOrientation()), mStamps};
+  }
 
-    void operator()(SmPoint at) {
-      mStamp[0] = {at.x, at.y};
-      mBox.add(at.x, at.y, kProfile.stampReach(mWidth));
-      mAppender.AddPoint(mStamp, kProfile.stampSize(mWidth), kProfile.stampAlpha(mAlpha), mBlend,
-                         mStamps.next());
-      mLastAlpha = mAlpha;
-      mWidth += mWidthStep;
-      mAlpha += mAlphaStep;
-    }
-
-    void finish(StrokePipeline& pen, RectF* rect) {
-      mAppender.flush();
-      mBox.uniteInto(rect);
-      pen.mStamps = mStamps;
-      pen.mLastStamp = mStamp[0];
-      pen.mLastStampAlpha = mLastAlpha;
-    }
-
-   private:
-    Appender& mAppender;
-    float mWidth, mAlpha;
-    float mWidthStep, mAlphaStep;
-    float mBlend;
-    float mLastAlpha = 0.0f;
-    StampCounter mStamps;
-    DirtyBox mBox;
-    Vector2<float> mStamp[2];  // centre, direction
-  };
+  void finish(StampRun<Version>& run, RectF* rect) {
+    run.finish(rect);
+    mStamps = run.counter();
+    mLastStamp = run.lastStamp();
+    mLastStampAlpha = run.lastAlpha();
+  }
 
   // A tap, or a stroke whose moves were all dropped: one stamp where the pen went down.
   void placeTap(float pressure, RectF* rect) {
-    const float alpha = kProfile.pressureAlpha(pressure, rules::colorAlpha(getColor()), getSize());
+    const float alpha = kProfile.pressureAlpha(pressure, rules::colorAlpha(settings().color()), getSize());
     if (mAlpha < 0.0f) mAlpha = alpha;
     const float blend = kProfile.tiltBlend(mAttitude.meanTilt());
-    drawPoint(mPath.last(), kProfile.pointSize(mWidth, blend), alpha, blend, rect);
+    Appender appender(*mRender, 1);
+    StampRun<Version> run(appender, {kProfile.pointSize(mWidth, blend), alpha, 0.0f, 0.0f}, blend,
+                          stampDirection(mAttitude.meanOrientation()), mStamps);
+    run({mPath.last().x, mPath.last().y});
+    finish(run, rect);
   }
 
-  void drawPoint(PointF at, float width, float alpha, float blend, RectF* rect) {
-    const Vector2<float> stamp[2] = {{at.x, at.y}, direction()};
-    mRender->AddPoint(stamp, kProfile.stampSize(width), kProfile.stampAlpha(alpha), blend, mStamps.next());
-    DirtyBox box;
-    box.add(at.x, at.y, kProfile.stampReach(width));
-    box.uniteInto(rect);
-  }
+  // --- Small things ---
 
-  // --- Small things
-  // ------------------------------------------------------------------------------------------
-
-  bool canDraw() const { return mRender != nullptr && mCanvas != nullptr && hasSettings(); }
-
-  Smoothing currentSmoothing() const {
-    return mPenData->mCurveEnabled ? Smoothing::Curve : Smoothing::Straight;
-  }
-
-  // A pen without a sensible size places nothing.
-  bool hasUsableSize() const { return std::isfinite(getSize()) && getSize() > 0.0f; }
-
-  // The stamps' rotation axis.
-  Vector2<float> direction() const {
-    float sine, cosine;
-    sincosf(mAttitude.meanOrientation(), &sine, &cosine);
-    return {-sine, cosine};
-  }
-
-  // The current tilt, capped in the event too.
-  static float cleanTilt(const MotionEvent& event) {
-    EventSource(event).prepare(kCleaner);
-    return kCleaner.tilt(event.GetTilt(0));
-  }
-
-  static void substituteTouchPressure(const MotionEvent& event) {
-    if (isTouchStylus(event.GetToolType(0), event.GetSource()))
-      writable(event).SetPressure(kProfile.unknownPressure);
-  }
-
-  // Where the stroke stands: from the mid point to the last point.
-  void setToJoint(RectF* rect) const {
-    rect->Set(mPath.mid().x, mPath.mid().y, mPath.mid().x, mPath.mid().y);
-    const PointF last = mPath.last();
-    rect->MakeRect(&last);
-  }
+  bool canDraw() const { return mRender != nullptr && mCanvas != nullptr && settings().exist(); }
 
   void passInverseScale() {
     if constexpr (kProfile.followsViewScale) mRender->SetInverseScale(getInverseScale());
   }
 
-  IGLMsgQueue* queue() const { return mDataManager != nullptr ? mDataManager->GetMsgQueue() : nullptr; }
-
-  void postStartPoint(PointF at) { post(queue(), mRender, &RenderDrawable::SetStartPoint, at.x, at.y); }
-
-  void postPenData() {
-    post(queue(), mRender, &PenDrawableRT::SetPenData, getSize(), static_cast<int>(getColor()));
-  }
+  IGLMsgQueue* queue() const { return queueOf(mDataManager); }
 
   void postRedrawBegin() {
-    post(queue(), mRender, &PenDrawableRT::SetRedrawState, true);
-    postPenData();
-  }
-
-  void postRect(RectF rect) {
-    rect.ExtendRect();
-    post(queue(), mRender, &PenDrawableRT::SetRect, rect);
+    postRedrawState(queue(), mRender);
+    postPenData(queue(), mRender, getSize(), settings().color());
   }
 
   void publishStart() {
@@ -562,14 +412,6 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     mPenData->mHasLastStroke = true;
   }
 
-  // Once a stroke.
-  void logCut(float length) {
-    if (mLoggedCut) return;
-    mLoggedCut = true;
-    __android_log_print(kLogError, kLogTag, "%s: a segment of length %f was cut short", Version::name,
-                        static_cast<double>(length));
-  }
-
   static constexpr SampleCleaner kCleaner{kProfile.unknownPressure, kProfile.tiltCap};
   static constexpr float kNoAlpha = -1.0f;
   static constexpr float kMoveGrowth = 5.0f;   // stroke units around what a call changed
@@ -582,9 +424,9 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
   StrokeState mState;
   StampCounter mStamps;
   PatternShift mPatternShift;
+  CutLog mCutLog;
   ViewScale mViewScale;
   bool mFirstSegment = true;  // no segment since the pen went down
-  bool mLoggedCut = false;
   float mCarried = 0.0f;      // where the next stamp lies on the next segment
   float mWidth = 0.0f;        // reached at the end of the last segment
   float mAlpha = kNoAlpha;    // likewise; below 0: none yet

@@ -20,8 +20,7 @@ inline int incremented(int count) {
   return count == std::numeric_limits<int>::max() ? count : count + 1;
 }
 
-// --- Tilt (radians from upright, mean of a history) to tilt blend, 0 to about 1
-// -----------------------------
+// --- Tilt (radians from upright, mean of a history) to tilt blend, 0 to about 1 ---
 
 inline float tiltBlendV1(float tilt) {
   if (!(tilt > 0.0f) || tilt < 0.75f) return 0.0f;
@@ -34,7 +33,7 @@ inline float tiltBlendV5(float tilt) {
   return (tilt - 0.05f) / 1.9f;
 }
 
-// --- Pen size and tilt blend to stamp width, stroke units --------------------------------------------------
+// --- Pen size and tilt blend to stamp width, stroke units ---
 
 inline float pointSizeV1(float size, float blend) {
   return size * 3.5f * blend + size * (1.0f - 2.0f * blend);
@@ -44,7 +43,7 @@ inline float pointSizeV5(float size, float blend) {
   return size * 5.0f * blend + size;
 }
 
-// --- Pressure to alpha -------------------------------------------------------------------------------------
+// --- Pressure to alpha ---
 
 // The colour's alpha byte as a factor. Kept: 0 and 1 count as 2, so that a transparent colour still draws
 // faint stamps.
@@ -71,7 +70,7 @@ inline float pressureAlphaV8(float pressure, float colorAlpha, float size) {
   return clampedSquare(pressure, 0.25f, 0.7f) * (colorAlpha / 80.0f) * 15.0f / size;
 }
 
-// --- Stamps on a segment (`length` and `size` in stroke units) ---------------------------------------------
+// --- Stamps on a segment (`length` and `size` in stroke units) ---
 
 // 0 below a length of 1: such a segment is dropped.
 inline int stampCountV1(float length, float size) {
@@ -87,7 +86,7 @@ inline int stampCountV3(float length, float size) {
   return count > 1 ? count : 1;
 }
 
-// --- What a stamp is handed over with ----------------------------------------------------------------------
+// --- What a stamp is handed over with ---
 
 // Stamps up to 1 unit wide are drawn 1.3 wide.
 inline float stampWidthV1(float width) {
@@ -123,7 +122,7 @@ inline float stampReachV8(float width) {
   return width / 4.0f;
 }
 
-// --- Ramps -------------------------------------------------------------------------------------------------
+// --- Ramps ---
 
 // The change a step, over `steps` steps; exactly 0 between equal values.
 inline float rampStep(float from, float to, int steps) {
@@ -132,8 +131,7 @@ inline float rampStep(float from, float to, int steps) {
   return to < from ? -step : step;
 }
 
-// --- The screen
-// ----------------------------------------------------------------------------------------------
+// --- The screen ---
 
 // Shorter side of the screen over 360; 1 without a screen.
 inline float pixelScale(int width, int height) {

@@ -1,7 +1,11 @@
 #pragma once
 
+#include <cstddef>
+
+#include "base/PointF.h"
 #include "base/RectF.h"
 #include "engine/MotionEvent.h"
+#include "stroke/parts/MoveFilter.h"
 #include "stroke/parts/PenSample.h"
 #include "stroke/parts/Replay.h"
 #include "stroke/parts/SampleCleaner.h"
@@ -23,6 +27,23 @@ inline PenSample currentSample(const MotionEvent& event, const SampleCleaner& cl
           cleaner.pressure(event.GetPressure(0), event.GetToolType(0)),
           cleaner.tilt(event.GetTilt(0)),
           SampleCleaner::orientation(event.GetOrientation(0))};
+}
+
+// How many stamps a move will place at a spacing, at the most; for making room at once, as a batch that grows
+// from segment to segment is copied again and again. Curves are no longer than the way from point to point.
+inline std::size_t stampsOfMove(const MotionEvent& event, const SegmentPath& path, float spacing) {
+  constexpr float kMostAtOnce = 8192.0f;  // 2 MB; what is beyond grows by doubling
+  const int history = event.GetHistorySize();
+  PointF from = path.last();
+  float way = distanceBetween(path.mid(), from);
+  for (int i = 0; i <= history; ++i) {
+    const PointF to = i < history ? PointF{event.GetHistoricalX(i), event.GetHistoricalY(i)}
+                                  : PointF{event.GetX(0), event.GetY(0)};
+    way += distanceBetween(from, to);
+    from = to;
+  }
+  const float stamps = way / spacing + 2.0f * static_cast<float>(history + 1);
+  return static_cast<std::size_t>(stamps < kMostAtOnce ? stamps : kMostAtOnce);
 }
 
 // Hands the samples of a move to take(sample), oldest first, the current one last.
@@ -56,7 +77,8 @@ inline PenSample endSample(const MotionEvent& event, const SampleCleaner& cleane
 
 // Feeds one live event to a pen, which besides what `replay` asks for has
 //   pen.path()                                   its SegmentPath
-//   pen.beginLive(start, coarseTool, smoothing)  the pen goes down; its pressure places no stamp
+//   pen.beginLive(start, coarseTool, smoothing)  the pen goes down; the pressure places no stamp
+//   pen.beginMove(event)                         a move is about to be taken sample by sample
 //   pen.forgetAlpha()                            the closing segment has no ramp
 // `rect` becomes what the event changed; a move grows it by `moveGrowth`.
 template <typename Pen>
@@ -76,6 +98,7 @@ bool drawLive(const MotionEvent& event, Pen& pen, StrokeState& state, RectF* rec
     case kActionMove:
       if (!state.move()) return false;
       pen.path().setToJoint(rect);
+      pen.beginMove(event);
       takeMove(event, pen.cleaner(), [&](const PenSample& sample) { pen.drawLine(sample, rect, smoothing); });
       rect->IncreaseRect(moveGrowth);
       return true;
