@@ -84,6 +84,11 @@ void Pencil2PreviewDrawableGL::beginLive(const PenSample& start, bool coarseTool
   postPenData(queue, mRender, settings().size(), settings().color());
 }
 
+void Pencil2PreviewDrawableGL::beginMove(const MotionEvent& event) {
+  const bool spaced = settings().smoothing() == Smoothing::Curve && mRepeatDistance > 0.0f;
+  if (spaced) mRender->reserve(stampsOfMove(event, mPath, mRepeatDistance));
+}
+
 void Pencil2PreviewDrawableGL::beginReplay(const PenSample& start, bool coarseTool, Smoothing smoothing) {
   // Kept: a straight replay posts no start point; the grain stays where the stroke before it had it.
   if (smoothing == Smoothing::Curve) postStartPoint(queueOf(mDataManager), mRender, start.at);

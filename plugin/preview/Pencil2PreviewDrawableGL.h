@@ -47,6 +47,7 @@ class Pencil2PreviewDrawableGL final : public PenPreviewDrawableGL {
   SampleCleaner cleaner() const;
   const SegmentPath& path() const { return mPath; }
   void beginLive(const PenSample& start, bool coarseTool, Smoothing smoothing);
+  void beginMove(const MotionEvent& event);
   void beginReplay(const PenSample& start, bool coarseTool, Smoothing smoothing);
   void forgetAlpha();
   bool drawLine(const PenSample& sample, RectF* rect, Smoothing smoothing);
