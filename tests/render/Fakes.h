@@ -1,0 +1,121 @@
+#pragma once
+
+#include <functional>
+#include <memory>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "gl/IGLMsgQueue.h"
+#include "gl/ITask.h"
+#include "graphics/ISPBitmap.h"
+#include "graphics/ISPPenCanvas.h"
+#include "math/Matrix3.h"
+#include "math/Matrix4.h"
+#include "pencommon/PenStrokeDrawableRT.h"
+
+namespace QeltTests {
+
+// What happened, in order.
+using Events = std::vector<std::string>;
+
+// Keeps what is posted until `run`; refuses what `refuses` says.
+class FakeQueue : public Qelt::IGLMsgQueue {
+ public:
+  bool Post(Qelt::ITask* task) override {
+    if (task == nullptr) return true;
+    if (refuses && refuses(*task)) return false;
+    tasks.emplace_back(task);
+    return true;
+  }
+  void run() {
+    for (const auto& task : std::exchange(tasks, {})) task->run();
+  }
+
+  std::function<bool(const Qelt::ITask&)> refuses;
+  std::vector<std::unique_ptr<Qelt::ITask>> tasks;
+};
+
+class FakeTile : public Qelt::ISPSubBitmap {
+ public:
+  FakeTile(int left, int top, int width, int height) : mX(left), mY(top), mWidth(width), mHeight(height) {}
+  int GetX() const override { return mX; }
+  int GetY() const override { return mY; }
+  int GetWidth() const override { return mWidth; }
+  int GetHeight() const override { return mHeight; }
+  const Qelt::Matrix4<float>& GetProjection() const override { return mProjection; }
+  void BeginRender(int) override {}
+  void EndRender(int) override {}
+
+ private:
+  int mX, mY, mWidth, mHeight;
+  Qelt::Matrix4<float> mProjection;
+};
+
+class FakeBitmap : public Qelt::ISPBitmap {
+ public:
+  int GetWidth() const override { return 0; }
+  int GetHeight() const override { return 0; }
+  Qelt::ISPTexture* GetTexture() override { return nullptr; }
+  void SetDebugName(const char*) override {}
+  void SetPixels(const void*, int, int) override {}
+  int GetTileCount() const override { return static_cast<int>(tiles.size()); }
+  Qelt::ISPSubBitmap* GetSubBitmap(int index) override { return &tiles[static_cast<std::size_t>(index)]; }
+
+  std::vector<FakeTile> tiles;
+};
+
+class FakeLayer : public Qelt::ISPLayer {
+ public:
+  Qelt::ISPBitmap* GetBitmap() override { return bitmap; }
+
+  FakeBitmap* bitmap = nullptr;
+};
+
+class FakeCanvas : public Qelt::ISPPenCanvas {
+ public:
+  explicit FakeCanvas(Events& log) : events(log) {}
+  Qelt::IGLMsgQueue* GetMsgQueue() override { return queue; }
+  const Qelt::Matrix3<float>& GetMatrix() override { return matrix; }
+  Qelt::ISPLayer* GetLayer() override { return layer; }
+  void BeginTile(int index) override { events.push_back("begin " + std::to_string(index)); }
+  void EndTile(int index) override { events.push_back("end " + std::to_string(index)); }
+
+  Events& events;
+  Qelt::IGLMsgQueue* queue = nullptr;
+  FakeLayer* layer = nullptr;
+  Qelt::Matrix3<float> matrix;
+};
+
+// A render drawable that draws nothing and tells what it was asked to.
+class FakeDrawable : public Qelt::PenStrokeDrawableRT, public Qelt::IReferenceBitmapSettable {
+ public:
+  explicit FakeDrawable(Events& log) : PenStrokeDrawableRT(nullptr), events(log) {}
+  void SetBuffer(std::vector<float>* buffer) override {
+    events.push_back(buffer != nullptr ? "buffer" : "no buffer");
+    PenStrokeDrawableRT::SetBuffer(buffer);
+  }
+  void SendDataToGPU(std::vector<float>* buffer) override {
+    events.push_back("send " + std::to_string(buffer->size()));
+    PenStrokeDrawableRT::SendDataToGPU(buffer);
+  }
+  void SetCacheBuffer(std::vector<float>* buffer) override {
+    events.push_back("cache " + std::to_string(buffer->size()));
+    PenStrokeDrawableRT::SetCacheBuffer(buffer);
+  }
+  void Update(bool useCache) override { events.emplace_back(useCache ? "update cache" : "update"); }
+  void Draw(Qelt::ISPSubBitmap* tile, Qelt::Matrix4<float>&) override {
+    events.push_back("draw at " + std::to_string(tile->GetX()));
+  }
+  void Clear() override { events.emplace_back("clear"); }
+  Qelt::IReferenceBitmapSettable* GetReferenceBitmapSettable() override {
+    return takesReference ? this : nullptr;
+  }
+  void SetReferenceBitmap(Qelt::ISPBitmap*) override { events.emplace_back("reference"); }
+  std::vector<float>* writeBuffer() { return mWriteBuffer; }
+
+  Events& events;
+  bool takesReference = false;
+};
+
+}  // namespace QeltTests

@@ -1,0 +1,316 @@
+#include "render/Tasks.h"
+
+#include <gmock/gmock.h>
+
+#include <memory>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "base/RefCount.h"
+#include "base/String.h"
+#include "gl/ITask.h"
+#include "pencommon/PenOutlineDrawableRT.h"
+#include "render/BatchGuard.h"
+#include "render/Fakes.h"
+#include "render/PenGLRenderMsg.h"
+#include "render/Posting.h"
+#include "render/UnclaimedBatch.h"
+#include "stroke/DrawingBoard.h"
+#include "stroke/StrokeGuards.h"
+#include "support/Allocations.h"
+
+namespace QeltTests {
+namespace {
+
+using namespace Qelt;
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+// --- Tasks
+// ------------------------------------------------------------------------------------------------------
+
+struct Base {
+  virtual ~Base() = default;
+  virtual void nothing() { heard = "base"; }
+  int one(int a) { return last = a; }
+  virtual void two(float a, int b) { heard = std::to_string(a) + " " + std::to_string(b); }
+  std::string heard;
+  int last = 0;
+};
+
+struct Derived : Base {
+  void nothing() override { heard = "derived"; }
+};
+
+TEST(TasksTest, CallTheirMemberOnceAndThroughTheObjectsOwnOverride) {
+  FakeQueue queue;
+  Derived object;
+  EXPECT_TRUE(post(&queue, &object, &Base::nothing));
+  EXPECT_TRUE(post(&queue, &object, &Base::one, 7));  // the result is ignored
+  EXPECT_EQ(object.heard, "");
+  queue.run();
+  EXPECT_EQ(object.heard, "derived");
+  EXPECT_EQ(object.last, 7);
+  EXPECT_TRUE(post(&queue, &object, &Base::two, 1.5f, 3));
+  queue.run();
+  EXPECT_EQ(object.heard, "1.500000 3");
+}
+
+TEST(TasksTest, AreLinkedToNothingAndAllowTheGlobalLock) {
+  FakeQueue queue;
+  Derived object;
+  post(&queue, &object, &Base::nothing);
+  ASSERT_EQ(queue.tasks.size(), 1u);
+  EXPECT_EQ(queue.tasks[0]->mNext, nullptr);
+  EXPECT_TRUE(queue.tasks[0]->isGlobalLockAllowed());
+}
+
+struct CountedString : String {
+  explicit CountedString(int& deaths) : mDeaths(deaths) {}
+  ~CountedString() override { ++mDeaths; }
+  int& mDeaths;
+};
+
+TEST(TasksTest, DeleteThroughTheVirtualDestructorAndOnlyWhenRun) {
+  FakeQueue queue;
+  int deaths = 0;
+  auto kept = std::make_unique<CountedString>(deaths);
+  queue.refuses = [](const ITask&) { return true; };
+  EXPECT_FALSE(postDelete<String>(&queue, kept.get()));  // refused: still the caller's
+  EXPECT_EQ(deaths, 0);
+  queue.refuses = nullptr;
+  EXPECT_TRUE(postDelete<String>(&queue, kept.release()));
+  EXPECT_EQ(deaths, 0);
+  queue.run();
+  EXPECT_EQ(deaths, 1);
+  EXPECT_TRUE(postDelete<String>(&queue, nullptr));
+  queue.run();
+}
+
+struct CountedTask : ITask {
+  explicit CountedTask(int& deaths) : mDeaths(deaths) {}
+  ~CountedTask() override { ++mDeaths; }
+  void run() override {}
+  int& mDeaths;
+};
+
+TEST(PostingTest, DestroysWhatTheQueueRefusesAtOnceAndOnce) {
+  FakeQueue queue;
+  int deaths = 0;
+  EXPECT_TRUE(postTask(&queue, new CountedTask(deaths)));
+  EXPECT_EQ(deaths, 0);
+  queue.run();
+  EXPECT_EQ(deaths, 1);
+  queue.refuses = [](const ITask&) { return true; };
+  EXPECT_FALSE(postTask(&queue, new CountedTask(deaths)));
+  EXPECT_EQ(deaths, 2);
+  EXPECT_FALSE(postTask(nullptr, new CountedTask(deaths)));  // no queue at all
+  EXPECT_EQ(deaths, 3);
+  EXPECT_FALSE(postTask(&queue, nullptr));  // no memory for the task
+}
+
+// --- Guards
+// -----------------------------------------------------------------------------------------------------
+
+class Guards : public testing::Test {
+ protected:
+  Guards() {
+    canvas.queue = &queue;
+    layer.bitmap = &bitmap;
+    bitmap.tiles.emplace_back(0, 0, 64, 64);
+    canvas.layer = &layer;
+  }
+
+  // One call that collects `floats` floats.
+  void draw(std::size_t floats) {
+    Pencil2V8ReturnCallback guard(&drawable, &canvas, &unclaimed);
+    if (drawable.writeBuffer() != nullptr) drawable.writeBuffer()->resize(floats);
+    RectF rect;
+    rect.Set(1.0f, 2.0f, 3.0f, 4.0f);
+    guard.setRect(rect);
+  }
+  Events take() { return std::exchange(events, {}); }
+  std::vector<std::string> posted() const {
+    std::vector<std::string> names;
+    for (const auto& task : queue.tasks) names.push_back(taskName(*task));
+    return names;
+  }
+  // The post of that number, from 0 on, is refused.
+  void refuse(int number) {
+    queue.refuses = [number](const ITask&) mutable { return number-- == 0; };
+  }
+
+  Events events;
+  FakeQueue queue;
+  FakeBitmap bitmap;
+  FakeLayer layer;
+  FakeCanvas canvas{events};
+  FakeDrawable drawable{events};
+  UnclaimedBatch unclaimed;
+};
+
+TEST_F(Guards, HandABatchOverWithItsMessageAndItsDeletion) {
+  draw(66);
+  // The drawable appends nowhere before anything is posted.
+  EXPECT_THAT(take(), ElementsAre("buffer", "no buffer"));
+  EXPECT_THAT(posted(), ElementsAre("Batch", "Render", "DeleteBatch"));
+  const auto& message = dynamic_cast<const PenGLRenderMsg&>(*queue.tasks[1]);
+  EXPECT_EQ(message.mRect.bottom, 4.0f);
+  EXPECT_EQ(message.mDrawable, &drawable);
+  EXPECT_EQ(message.mCanvas, &canvas);
+  EXPECT_FALSE(message.mUseCacheBuffer);
+  EXPECT_EQ(message.mReferenceBitmap, nullptr);
+  EXPECT_EQ(message.mDepthMapBitmap, nullptr);
+  queue.run();
+  EXPECT_THAT(take(), ElementsAre("send 66", "update", "begin 0", "draw at 0", "end 0", "clear"));
+}
+
+TEST_F(Guards, HandAnEmptyBatchOverAllTheSame) {
+  draw(0);
+  EXPECT_THAT(posted(), ElementsAre("Batch", "Render", "DeleteBatch"));
+}
+
+TEST_F(Guards, HandABatchOverWhenAnExceptionLeaves) {
+  try {
+    const Pencil2V1ReturnCallback guard(&drawable, &canvas, &unclaimed);
+    throw 1;
+  } catch (int) {
+    EXPECT_THAT(posted(), ElementsAre("Batch", "Render", "DeleteBatch"));
+  }
+}
+
+// Refused: the batch, its message, or its deletion. The next call puts it right before its own batch.
+TEST_F(Guards, LoseNothingToARefusal) {
+  const long before = liveAllocations();
+  refuse(0);
+  draw(1);
+  EXPECT_THAT(posted(), IsEmpty());  // the guard frees what nobody took
+  draw(2);
+  EXPECT_THAT(posted(), ElementsAre("Batch", "Render", "DeleteBatch"));
+  queue.run();
+
+  refuse(1);
+  draw(3);
+  EXPECT_THAT(posted(), ElementsAre("Batch"));
+  draw(4);  // first the one that was never drawn is forgotten and freed
+  EXPECT_THAT(posted(), ElementsAre("Batch", "Clear", "DeleteBatch", "Batch", "Render", "DeleteBatch"));
+  queue.run();
+
+  refuse(2);
+  draw(5);
+  EXPECT_THAT(posted(), ElementsAre("Batch", "Render"));
+  draw(6);
+  EXPECT_THAT(posted(), ElementsAre("Batch", "Render", "DeleteBatch", "Batch", "Render", "DeleteBatch"));
+  queue.run();
+
+  // While the old one cannot be freed, no new batch is handed over.
+  refuse(2);
+  draw(7);
+  queue.run();
+  refuse(0);
+  draw(8);
+  EXPECT_THAT(posted(), IsEmpty());
+  draw(9);
+  EXPECT_THAT(posted(), ElementsAre("DeleteBatch", "Batch", "Render", "DeleteBatch"));
+  queue.run();
+  take();
+  EXPECT_EQ(liveAllocations(), before);
+}
+
+TEST_F(Guards, FreeWhatIsLeftWithTheDrawable) {
+  const long before = liveAllocations();
+  {
+    UnclaimedBatch left;
+    left.keep(new std::vector<float>(5), true);
+    left.keep(new std::vector<float>(6), true);
+    left.keep(new RefCount);
+  }
+  EXPECT_EQ(liveAllocations(), before);
+}
+
+TEST_F(Guards, WithoutAQueueFreeTheBatch) {
+  canvas.queue = nullptr;
+  const long before = liveAllocations();
+  draw(66);
+  take();
+  EXPECT_EQ(liveAllocations(), before);
+  EXPECT_THAT(posted(), IsEmpty());
+}
+
+TEST_F(Guards, StayInertWithoutMemoryForTheBatch) {
+  if (!countsAllocations()) GTEST_SKIP() << "allocations are the sanitizer's";
+  {
+    const FailingAllocation first(0);
+    const Pencil2V8ReturnCallback guard(&drawable, &canvas, &unclaimed);
+    EXPECT_EQ(guard.buffer(), nullptr);
+  }
+  EXPECT_THAT(posted(), IsEmpty());
+}
+
+TEST_F(Guards, OfACachedBatchBorrowIt) {
+  std::vector<float> cached(54, 1.0f);
+  RectF rect;
+  rect.Set(1.0f, 2.0f, 3.0f, 4.0f);
+  bool handedOver = false;
+  { const Pencil2V7CacheRedrawCallback guard(&drawable, &canvas, rect, &cached, &unclaimed, &handedOver); }
+  EXPECT_TRUE(handedOver);
+  EXPECT_THAT(posted(), ElementsAre("Batch", "Render"));
+  EXPECT_TRUE(dynamic_cast<const PenGLRenderMsg&>(*queue.tasks[1]).mUseCacheBuffer);
+  queue.run();
+  EXPECT_THAT(take(), ElementsAre("cache 54", "update cache", "begin 0", "draw at 0", "end 0", "clear"));
+  EXPECT_EQ(cached.size(), 54u);
+
+  handedOver = false;
+  { const Pencil2V7CacheRedrawCallback guard(&drawable, &canvas, rect, nullptr, &unclaimed, &handedOver); }
+  EXPECT_FALSE(handedOver);
+  EXPECT_THAT(posted(), IsEmpty());
+
+  refuse(0);
+  { const Pencil2V7CacheRedrawCallback guard(&drawable, &canvas, rect, &cached, &unclaimed, &handedOver); }
+  EXPECT_FALSE(handedOver);
+  EXPECT_THAT(posted(), IsEmpty());  // no message that would draw the batch before
+}
+
+// An outline hands two buffers over at once.
+class OutlineGuard final : public BatchGuard<PenOutlineDrawableRT, 2> {
+ public:
+  using BatchGuard::BatchGuard;
+};
+
+TEST_F(Guards, OfTwoBuffersFreeBothWhateverIsRefused) {
+  class Outline : public PenOutlineDrawableRT {
+   public:
+    using PenOutlineDrawableRT::PenOutlineDrawableRT;
+    void SendDataToGPU(std::vector<float>* inner, std::vector<float>* outer) override {
+      PenOutlineDrawableRT::SendDataToGPU(inner, outer);
+      ++batches;
+    }
+    int batches = 0;
+  } outline(nullptr);
+  UnclaimedBatch ofOutline;
+  { const OutlineGuard guard(&outline, &canvas, &ofOutline); }
+  ASSERT_EQ(queue.tasks.size(), 4u);
+  EXPECT_EQ(taskName(*queue.tasks[1]), "Render");
+  EXPECT_EQ(taskName(*queue.tasks[2]), "DeleteBatch");
+  EXPECT_EQ(taskName(*queue.tasks[3]), "DeleteBatch");
+  queue.run();
+  EXPECT_EQ(outline.batches, 1);
+
+  queue.tasks.shrink_to_fit();
+  take();
+  const long before = liveAllocations();
+  for (int refused = 0; refused < 4; ++refused) {
+    refuse(refused);
+    { const OutlineGuard guard(&outline, &canvas, &ofOutline); }
+    queue.run();
+    { const OutlineGuard guard(&outline, &canvas, &ofOutline); }  // puts it right
+    queue.run();
+    take();
+  }
+  queue.refuses = nullptr;
+  EXPECT_EQ(liveAllocations(), before);
+}
+
+}  // namespace
+}  // namespace QeltTests
