@@ -2,6 +2,9 @@
 find_package(GTest REQUIRED)
 include(GoogleTest)
 
+# All that ThreadSanitizer is asked about.
+add_custom_target(qelt_threaded_tests)
+
 # qelt_add_tests(TARGET SOURCES ... [LIBRARIES ...] [LABEL ...]): one executable of GoogleTest cases, each of
 # them a test of ctest's. The label "threaded" marks what ./check runs under ThreadSanitizer.
 function(qelt_add_tests target)
@@ -11,8 +14,12 @@ function(qelt_add_tests target)
   endif()
   add_executable(${target} ${arg_SOURCES})
   target_link_libraries(${target} PRIVATE qelt_test_support ${arg_LIBRARIES})
+  if(arg_LABEL STREQUAL threaded)
+    add_dependencies(qelt_threaded_tests ${target})
+  endif()
   # A test that needs a GL context takes the software renderer; a loaded machine may need minutes to start it.
   gtest_discover_tests(${target}
+    NO_PRETTY_VALUES
     DISCOVERY_TIMEOUT 120
     PROPERTIES TIMEOUT 300 LABELS ${arg_LABEL} ENVIRONMENT "EGL_PLATFORM=surfaceless")
 endfunction()
