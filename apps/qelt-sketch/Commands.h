@@ -9,8 +9,8 @@ namespace QeltDesktop {
 
 void drawCommand(const Options& options);
 void traceCommand(const Options& options);
-void previewCommand(const Options& options);
-void sheetCommand(const Options& options);
+void previewCommand(const Options& asked);
+void sheetCommand(const Options& asked);
 void infoCommand(const Options& options);
 
 void runCommand(const Options& options);

@@ -41,8 +41,11 @@ std::optional<int> countFrom(int least, const std::string& text) {
 std::optional<int> count(const std::string& text) {
   return countFrom(1, text);
 }
-std::optional<int> countOrNone(const std::string& text) {
-  return countFrom(0, text);
+// More predicted samples than this are a slip of the finger, and would fill the memory.
+std::optional<int> predictionCount(const std::string& text) {
+  constexpr int kMost = 10000;
+  const std::optional<int> samples = countFrom(0, text);
+  return samples && *samples <= kMost ? samples : std::nullopt;
 }
 std::optional<int> integer(const std::string& text) {
   return parseInt(text);
@@ -172,7 +175,7 @@ void addDrawing(CLI::App& app, Options& options) {
                        "default white");
   addValue<OutlineOptions>(app, "--outline", options.outline, outline, "SIZE,'#AARRGGBB'",
                            "draw every stroke's outline under the strokes");
-  addValue<int>(app, "--predict", options.predict, countOrNone, "K",
+  addValue<int>(app, "--predict", options.predict, predictionCount, "K",
                 "live: K predicted samples after every move event");
   addValue<float>(app, "--opacity", options.opacity, share, "O", "of the prediction, 0 to 1 (default 0.5)");
   addValue<int>(app, "--points", options.points, count, "N",

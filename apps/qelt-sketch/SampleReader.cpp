@@ -21,7 +21,8 @@ float wrappedAngle(double radians) {
   const double wrapped = std::remainder(radians, 2.0 * std::numbers::pi);
   const auto angle = static_cast<float>(wrapped);
   // The lower end is open: half a turn has one name.
-  return angle <= -std::numbers::pi_v<float> ? std::numbers::pi_v<float> : angle;
+  constexpr float kHalfTurn = std::numbers::pi_v<float>;
+  return angle <= -kHalfTurn ? kHalfTurn : angle;
 }
 
 // Tilt and orientation, each on its own; the tilts along the axes count where neither elevation nor azimuth

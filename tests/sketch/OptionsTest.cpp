@@ -104,7 +104,8 @@ INSTANTIATE_TEST_SUITE_P(
                     "draw -o a.png --repeat 0", "draw -o a.png --zoom 0", "draw -o a.png --zoom inf",
                     "draw -o a.png --rotate nan", "draw -o a.png --page 800", "draw -o a.png --page 0x600",
                     "draw -o a.png --background grey", "draw -o a.png --outline 3",
-                    "draw -o a.png --predict -1", "draw -o a.png --opacity 1.5", "draw -o a.png --points 0",
+                    "draw -o a.png --predict -1", "draw -o a.png --predict 2000000000",
+                    "draw -o a.png --opacity 1.5", "draw -o a.png --points 0",
                     "draw -o a.png --drawable stroke", "draw -o a.png --rendering-version 99999999999",
                     "trace -o - --drawable line", "trace -o - --drawable prediction",
                     "trace -o - --drawable preview --mode stroke", "info -o a.txt"));
