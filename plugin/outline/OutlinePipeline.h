@@ -47,6 +47,9 @@ class OutlinePipeline : public Pencil2OutlineDrawableGL {
 
   ~OutlinePipeline() override { destroy(); }
 
+  // False when memory ran out for the render-thread half.
+  bool hasPartner() const { return mRender != nullptr; }
+
   bool DrawOutline(const MotionEvent* event, RectF* rect) override { return drawChecked(event, rect); }
   bool DrawOutline(const ObjectStroke* stroke, RectF* rect) override { return drawChecked(stroke, rect); }
 

@@ -1,12 +1,11 @@
 #include "pen/DrawableFactory.h"
 
-#include <new>
-
 #include "outline/Pencil2OutlineDrawableGLV1.h"
 #include "outline/Pencil2OutlineDrawableGLV2.h"
 #include "outline/Pencil2OutlineDrawableGLV3.h"
 #include "outline/Pencil2OutlineDrawableGLV4.h"
 #include "outline/Pencil2OutlineDrawableGLV5.h"
+#include "pen/WholeDrawable.h"
 #include "stroke/Pencil2StrokeDrawableGLV1.h"
 #include "stroke/Pencil2StrokeDrawableGLV2.h"
 #include "stroke/Pencil2StrokeDrawableGLV3.h"
@@ -21,20 +20,20 @@ Pencil2StrokeDrawableGL* createStrokeDrawable(std::int32_t strokeVersion, Pencil
                                               PenGLDataManager* manager) {
   switch (strokeVersion) {
     case 2:
-      return new (std::nothrow) Pencil2StrokeDrawableGLV2(penData, manager);
+      return makeWhole<Pencil2StrokeDrawableGLV2>(penData, manager);
     case 3:
-      return new (std::nothrow) Pencil2StrokeDrawableGLV3(penData, manager);
+      return makeWhole<Pencil2StrokeDrawableGLV3>(penData, manager);
     case 4:
     case 6:
-      return new (std::nothrow) Pencil2StrokeDrawableGLV4(penData, manager);
+      return makeWhole<Pencil2StrokeDrawableGLV4>(penData, manager);
     case 5:
-      return new (std::nothrow) Pencil2StrokeDrawableGLV5(penData, manager);
+      return makeWhole<Pencil2StrokeDrawableGLV5>(penData, manager);
     case 7:
-      return new (std::nothrow) Pencil2StrokeDrawableGLV7(penData, manager);
+      return makeWhole<Pencil2StrokeDrawableGLV7>(penData, manager);
     case 8:
-      return new (std::nothrow) Pencil2StrokeDrawableGLV8(penData, manager);
+      return makeWhole<Pencil2StrokeDrawableGLV8>(penData, manager);
     default:
-      return new (std::nothrow) Pencil2StrokeDrawableGLV1(penData, manager);
+      return makeWhole<Pencil2StrokeDrawableGLV1>(penData, manager);
   }
 }
 
@@ -42,15 +41,15 @@ Pencil2OutlineDrawableGL* createOutlineDrawable(std::int32_t outlineVersion, Pen
                                                 PenGLDataManager* manager) {
   switch (outlineVersion) {
     case 2:
-      return new (std::nothrow) Pencil2OutlineDrawableGLV2(penData, manager);
+      return makeWhole<Pencil2OutlineDrawableGLV2>(penData, manager);
     case 3:
-      return new (std::nothrow) Pencil2OutlineDrawableGLV3(penData, manager);
+      return makeWhole<Pencil2OutlineDrawableGLV3>(penData, manager);
     case 4:
-      return new (std::nothrow) Pencil2OutlineDrawableGLV4(penData, manager);
+      return makeWhole<Pencil2OutlineDrawableGLV4>(penData, manager);
     case 5:
-      return new (std::nothrow) Pencil2OutlineDrawableGLV5(penData, manager);
+      return makeWhole<Pencil2OutlineDrawableGLV5>(penData, manager);
     default:
-      return new (std::nothrow) Pencil2OutlineDrawableGLV1(penData, manager);
+      return makeWhole<Pencil2OutlineDrawableGLV1>(penData, manager);
   }
 }
 

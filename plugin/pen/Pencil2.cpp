@@ -10,6 +10,7 @@
 #include "pen/DrawableFactory.h"
 #include "pen/Pencil2Data.h"
 #include "pen/VersionTable.h"
+#include "pen/WholeDrawable.h"
 #include "pencommon/PenGLDataManager.h"
 #include "pencommon/PenManager.h"
 #include "prediction/Pencil2PredictionDrawableGL.h"
@@ -26,17 +27,40 @@ constexpr std::uint32_t kOpaqueBlack = 0xFF000000u;
 constexpr int kAdvancedSettingVersion = 8;
 constexpr std::int32_t kPredictionVersion = 8;  // the stroke version that predictions continue
 
-// The name of a pen whose queue took the release that reads it, but not its deletion.
-std::atomic<String*> unclaimedName{nullptr};
+// The name that a dying pen has its data released by.
+class ReleasedName final : public String {
+ public:
+  explicit ReleasedName(IGLMsgQueue* queue) : String(PenManager::QELT_PENCIL2_NAME), mQueue(queue) {}
+
+  // Of names whose release a queue took, and refused their deletion: the release may yet read them. The next
+  // pen that dies by that queue has them deleted, after it.
+  static void keep(ReleasedName* name) {
+    name->mNext = unclaimed.load();
+    while (!unclaimed.compare_exchange_weak(name->mNext, name)) {
+    }
+  }
+
+  static void settle(IGLMsgQueue* queue) {
+    ReleasedName* name = unclaimed.exchange(nullptr);
+    while (name != nullptr) {
+      ReleasedName* const next = name->mNext;
+      if (name->mQueue != queue || !postDelete<String>(queue, name)) keep(name);
+      name = next;
+    }
+  }
+
+ private:
+  // Of all pens: several may die at once, each on its own host's thread.
+  static inline std::atomic<ReleasedName*> unclaimed{nullptr};
+
+  IGLMsgQueue* mQueue;
+  ReleasedName* mNext = nullptr;
+};
 
 }  // namespace
 
-Pencil2::Pencil2() : mData(new (std::nothrow) Pencil2Data{}) {
-  if (mData != nullptr) {
-    mData->mSettingData = getSettingData();
-    mData->mCurveEnabled = true;
-    mData->mLastAlpha = -1.0f;
-  }
+Pencil2::Pencil2() {
+  record();
   String setting;
   setting.Append(kAdvancedSettingVersion);
   setting.Append(';');
@@ -61,15 +85,25 @@ void Pencil2::releasePenData() {
   if (manager == nullptr) return;
   IGLMsgQueue* queue = manager->GetMsgQueue();
   if (queue != nullptr) {
-    auto* name = new (std::nothrow) String(PenManager::QELT_PENCIL2_NAME);
+    ReleasedName::settle(queue);
+    auto* name = new (std::nothrow) ReleasedName(queue);
     if (name != nullptr && !post(queue, manager, &PenGLDataManager::ReleasePenData, name)) {
       delete name;
-    } else if (name != nullptr && !postDelete(queue, name) && !postDelete(queue, name)) {
-      // The release was taken and may yet read the name; it goes with the next one.
-      delete unclaimedName.exchange(name);
+    } else if (name != nullptr && !postDelete<String>(queue, name)) {
+      ReleasedName::keep(name);
     }
   }
   setPenDataManager(nullptr);
+}
+
+Pencil2Data* Pencil2::record() {
+  if (mData != nullptr) return mData;
+  mData = new (std::nothrow) Pencil2Data{};
+  if (mData == nullptr) return nullptr;
+  mData->mSettingData = getSettingData();
+  mData->mCurveEnabled = true;
+  mData->mLastAlpha = -1.0f;
+  return mData;
 }
 
 float Pencil2::GetMinSize() {
@@ -96,7 +130,7 @@ PenStrokeDrawableGL* Pencil2::GetStrokeDrawableGL() {
   const std::int32_t version = versionTable[versionRow(getVersion())][0];
   if (mStrokeDrawable != nullptr && mStrokeVersion == version) return mStrokeDrawable;
   delete std::exchange(mStrokeDrawable, nullptr);
-  mStrokeDrawable = createStrokeDrawable(version, mData, getPenDataManager());
+  mStrokeDrawable = createStrokeDrawable(version, record(), getPenDataManager());
   mStrokeVersion = version;
   return mStrokeDrawable;
 }
@@ -118,7 +152,7 @@ IPenPredictionDrawableGL* Pencil2::GetPredictionStrokeDrawableGL() {
     return nullptr;
   }
   if (mPredictionDrawable == nullptr) {
-    mPredictionDrawable = new (std::nothrow) Pencil2PredictionDrawableGL(mData, getPenDataManager());
+    mPredictionDrawable = makeWhole<Pencil2PredictionDrawableGL>(record(), getPenDataManager());
   }
   return mPredictionDrawable;
 }
@@ -127,14 +161,14 @@ PenOutlineDrawableGL* Pencil2::GetOutlineDrawableGL() {
   const std::int32_t version = versionTable[versionRow(getVersion())][1];
   if (mOutlineDrawable != nullptr && mOutlineVersion == version) return mOutlineDrawable;
   delete std::exchange(mOutlineDrawable, nullptr);
-  mOutlineDrawable = createOutlineDrawable(version, mData, getPenDataManager());
+  mOutlineDrawable = createOutlineDrawable(version, record(), getPenDataManager());
   mOutlineVersion = version;
   return mOutlineDrawable;
 }
 
 PenPreviewDrawableGL* Pencil2::GetPreviewDrawableGL() {
   if (mPreviewDrawable == nullptr) {
-    mPreviewDrawable = new (std::nothrow) Pencil2PreviewDrawableGL(mData, getPenDataManager());
+    mPreviewDrawable = makeWhole<Pencil2PreviewDrawableGL>(record(), getPenDataManager());
   }
   return mPreviewDrawable;
 }
@@ -149,16 +183,16 @@ IGLMsgQueue* Pencil2::GetMsgQueue() {
 }
 
 bool Pencil2::SetCurveEnabled(bool enabled) {
-  if (mData != nullptr) mData->mCurveEnabled = enabled;
+  if (Pencil2Data* data = record(); data != nullptr) data->mCurveEnabled = enabled;
   return true;
 }
 
 bool Pencil2::IsCurveEnabled() {
-  return mData != nullptr && mData->mCurveEnabled;
+  return record() != nullptr && mData->mCurveEnabled;
 }
 
 bool Pencil2::SetFixedWidthEnabled(bool enabled) {
-  if (mData != nullptr) mData->mFixedWidthEnabled = enabled;
+  if (Pencil2Data* data = record(); data != nullptr) data->mFixedWidthEnabled = enabled;
   return true;
 }
 
@@ -167,7 +201,7 @@ bool Pencil2::IsFixedWidthEnabled() {
 }
 
 bool Pencil2::SetFixedWidth(float width) {
-  if (mData != nullptr) mData->mFixedWidth = width;
+  if (Pencil2Data* data = record(); data != nullptr) data->mFixedWidth = width;
   return true;
 }
 

@@ -43,13 +43,15 @@ class Pencil2 final : public Pen, public IPenMorphable {
 
  private:
   void releasePenData();
+  // The record, made now where memory ran out for it before; null when it still does.
+  Pencil2Data* record();
 
   Pencil2StrokeDrawableGL* mStrokeDrawable = nullptr;
   Pencil2PredictionDrawableGL* mPredictionDrawable = nullptr;
   Pencil2OutlineDrawableGL* mOutlineDrawable = nullptr;
   Pencil2PreviewDrawableGL* mPreviewDrawable = nullptr;
   void* mSpareDrawable = nullptr;     // Kept: never filled
-  Pencil2Data* mData;                 // null when its allocation failed
+  Pencil2Data* mData = nullptr;       // see `record`
   std::int32_t mStrokeVersion = -1;   // that the stroke drawable was made for
   std::int32_t mOutlineVersion = -1;  // that the outline drawable was made for
   IGLMsgQueue* mMsgQueue = nullptr;   // last one the data manager gave

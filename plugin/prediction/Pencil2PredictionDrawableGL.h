@@ -22,6 +22,9 @@ class Pencil2PredictionDrawableGL final : public PenPredictionDrawableGL {
   Pencil2PredictionDrawableGL(Pencil2Data* penData, PenGLDataManager* manager);
   ~Pencil2PredictionDrawableGL() override;
 
+  // False when memory ran out for the render-thread half.
+  bool hasPartner() const { return mRender != nullptr; }
+
   // 0 to 1; what is no finite number changes nothing.
   void SetOpacity(float opacity) override;
   // Predicts from a move event, once from each state of the live stroke. Any other event uses that state up

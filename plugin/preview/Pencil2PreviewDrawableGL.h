@@ -28,6 +28,9 @@ class Pencil2PreviewDrawableGL final : public PenPreviewDrawableGL {
   Pencil2PreviewDrawableGL(Pencil2Data* penData, PenGLDataManager* manager);
   ~Pencil2PreviewDrawableGL() override;
 
+  // False when memory ran out for the render-thread half.
+  bool hasPartner() const { return mRender != nullptr; }
+
   bool Draw(const MotionEvent* event, RectF* rect) override;
   bool RedrawPen(const MotionEvent* event, RectF* rect) override;
   // Does nothing and answers true.

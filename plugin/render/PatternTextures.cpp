@@ -52,23 +52,24 @@ void PatternTextures::build(IGLMsgQueue* queue, int width, int height, const cha
   }
 }
 
-void PatternTextures::upload(int width, int height, PointSource points) {
-  if (mReleased || width < 0 || height < 0 || width > kGrainSide || height > kGrainSide) return;
+bool PatternTextures::upload(int width, int height, PointSource points) {
+  if (mReleased || width < 0 || height < 0 || width > kGrainSide || height > kGrainSide) return true;
   const int grainPixels = width * height;
   // A pattern byte becomes a word: red in memory, the other channels 0.
   Pixels grain = allocatePixels(static_cast<std::size_t>(grainPixels));
-  if (grain == nullptr) return;
+  if (grain == nullptr) return false;
   for (int i = 0; i < grainPixels; ++i) grain[i] = g_backgroundPtn[i];
   if (mPatternsTexture != nullptr) mPatternsTexture->SetPixels(grain.get(), width, height);
   grain.reset();
 
   Pixels shapes = allocatePixels(kTiles * kTilePixels);
-  if (shapes == nullptr) return;
+  if (shapes == nullptr) return false;
   for (int i = 0; i < kTiles * kTilePixels; ++i) {
     shapes[i] = points == PointSource::StampShapes ? g_pointPtn[i] : g_backgroundPtn[i % kTilePixels];
   }
   if (mPointTexture != nullptr) mPointTexture->SetPixels(shapes.get(), kTileSide, kTiles * kTileSide);
   mTexturesReady = true;
+  return true;
 }
 
 void PatternTextures::release() {

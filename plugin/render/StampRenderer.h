@@ -128,7 +128,8 @@ class StampRenderer : public HostBase {
 
   void CreatePenCanvas(int, int, IGLMsgQueue*) final {
     if (kProfile.logsSetup) log("CreatePenCanvas(int, int, Qelt::IGLMsgQueue *)");
-    if (!mTextures.ready()) this->Init();
+    // All but the first only where memory ran out, here or as the context came back.
+    if (!mTextures.ready() || !mUploaded || mGraphicsObject == nullptr || mShader == nullptr) this->Init();
   }
 
   void buildTextures(int width, int height) {
@@ -136,7 +137,7 @@ class StampRenderer : public HostBase {
     mTextures.build(queue, width, height, kProfile.className);
   }
 
-  void setTextures(int width, int height) { mTextures.upload(width, height, kProfile.points); }
+  void setTextures(int width, int height) { mUploaded = mTextures.upload(width, height, kProfile.points); }
 
   void Clear() final {
     this->mHasPendingData = false;
@@ -237,6 +238,7 @@ class StampRenderer : public HostBase {
   GraphicsObject* mGraphicsObject = nullptr;
   typename Version::Shader* mShader = nullptr;
   PatternTextures mTextures;
+  bool mUploaded = false;  // the last time their pixels were wanted
   GrainOrigin mGrainOrigin;
   Vector2<float> mInverseScale{1.0f, 1.0f};
   UnclaimedBatch mUnclaimed;

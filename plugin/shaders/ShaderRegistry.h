@@ -1,5 +1,6 @@
 #pragma once
 
+#include <memory>
 #include <new>
 #include <typeinfo>
 
@@ -18,9 +19,18 @@ T* ShaderManager::GetShader() {
   auto found = mShaders.find(key);
   if (found == mShaders.end()) {
     __android_log_print(kLogDebug, kLogTag, "ShaderManager::GetShader, New %s is added", typeid(T).name());
-    found = mShaders.emplace(key, Entry{new (std::nothrow) T, 0}).first;
+    std::unique_ptr<T> made(new (std::nothrow) T);
+    try {
+      found = mShaders.emplace(key, Entry{made.get(), 0}).first;
+    } catch (const std::bad_alloc&) {
+      return nullptr;
+    }
+    made.release();
+  } else if (found->second.shader == nullptr) {
+    // Memory ran out for it once; nobody holds it.
+    found->second.shader = new (std::nothrow) T;
   }
-  ++found->second.references;
+  if (found->second.shader != nullptr) ++found->second.references;
   return static_cast<T*>(found->second.shader);
 }
 

@@ -59,6 +59,9 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
 
   ~StrokePipeline() override { destroy(); }
 
+  // False when memory ran out for the render-thread half.
+  bool hasPartner() const { return mRender != nullptr; }
+
   bool Draw(const MotionEvent* event, RectF* rect) override {
     if (event == nullptr || rect == nullptr) {
       Error::SetError(Error::kInvalidArgument);
