@@ -1,0 +1,57 @@
+// Every allocation of the plug-in's own fails once, and all from it on fail, one after the other, until a run
+// meets no failure.
+
+#include <gtest/gtest.h>
+
+#include <string>
+
+#include "AllocationGate.h"
+#include "Sweep.h"
+#include "support/Versions.h"
+
+namespace QeltTests {
+namespace {
+
+struct Case {
+  Scenario scenario;
+  bool picture;
+};
+
+std::vector<Case> cases() {
+  std::vector<Case> all;
+  for (const Scenario& scenario : scenarios()) all.push_back({scenario, false});
+  for (const Scenario& scenario : pictureScenarios()) all.push_back({scenario, true});
+  return all;
+}
+
+class AllocationSweep : public testing::TestWithParam<Case> {};
+
+TEST_P(AllocationSweep, LeavesThePenAsGoodAsNew) {
+  const auto& [scenario, picture] = GetParam();
+  SweepGround ground(picture);
+  int total = 0;
+  for (const int version : allVersions()) {
+    if (version != 8 && !scenario.everyVersion) continue;
+    for (const bool andAllAfter : {false, true}) {
+      int failures = 0;
+      for (long number = 1;; ++number) {
+        const bool failed = ground.survives(
+            scenario, version,
+            "allocation " + std::to_string(number) + (andAllAfter ? " and all after it" : " alone"),
+            [&] { AllocationGate::fail(number, andAllAfter); },
+            [&] { return AllocationGate::open() >= number; });
+        if (!failed) break;
+        ++failures;
+      }
+      EXPECT_GT(failures, 0) << "the plug-in allocates nothing: the sweep sees it no longer";
+      total += failures;
+    }
+  }
+  RecordProperty("failures", total);
+}
+
+INSTANTIATE_TEST_SUITE_P(Scenarios, AllocationSweep, testing::ValuesIn(cases()),
+                         [](const auto& test) { return std::string(test.param.scenario.name); });
+
+}  // namespace
+}  // namespace QeltTests

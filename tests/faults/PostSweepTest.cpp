@@ -1,0 +1,116 @@
+// Every post is refused once, and all from it on are, one after the other, until a run meets no refusal; then
+// refusals without a pattern.
+
+#include <gtest/gtest.h>
+
+#include <cstdint>
+#include <random>
+#include <string>
+
+#include "AllocationGate.h"
+#include "Sweep.h"
+#include "gl/ITask.h"
+#include "support/Versions.h"
+
+namespace QeltTests {
+namespace {
+
+struct Case {
+  Scenario scenario;
+  bool picture;
+};
+
+std::vector<Case> cases() {
+  std::vector<Case> all;
+  for (const Scenario& scenario : scenarios()) all.push_back({scenario, false});
+  for (const Scenario& scenario : pictureScenarios()) all.push_back({scenario, true});
+  return all;
+}
+
+// Answers for the queue, and holds a poster to its word: a refused task is gone by the next post.
+class Doorman {
+ public:
+  template <typename Refuses>
+  void watch(QeltDesktop::RenderQueue& queue, Refuses refuses) {
+    queue.accept = [this, refuses](const Qelt::ITask& task) {
+      check();
+      ++mPosts;
+      if (!refuses(mPosts)) return true;
+      ++mRefusals;
+      // Tasks begin where their block does. Those of the host's own have no number.
+      mRefused = dynamic_cast<const void*>(&task);
+      mNumber = AllocationGate::numberOf(mRefused);
+      return false;
+    };
+  }
+
+  // Answers the number of refusals.
+  long leave(QeltDesktop::RenderQueue& queue) {
+    queue.accept = nullptr;
+    check();
+    return std::exchange(mRefusals, 0);
+  }
+
+ private:
+  void check() {
+    if (mNumber != 0 && AllocationGate::numberOf(mRefused) == mNumber)
+      ADD_FAILURE() << "a refused task lives on";
+    mNumber = 0;
+  }
+
+  long mPosts = 0;
+  long mRefusals = 0;
+  const void* mRefused = nullptr;
+  long mNumber = 0;
+};
+
+class PostSweep : public testing::TestWithParam<Case> {};
+
+TEST_P(PostSweep, LeavesThePenAsGoodAsNew) {
+  const auto& [scenario, picture] = GetParam();
+  SweepGround ground(picture);
+  int total = 0;
+  for (const int version : allVersions()) {
+    if (version != 8 && !scenario.everyVersion) continue;
+    for (const bool andAllAfter : {false, true}) {
+      int runs = 0;
+      for (long number = 1;; ++number) {
+        Doorman doorman;
+        const bool refused = ground.survives(
+            scenario, version,
+            "post " + std::to_string(number) + (andAllAfter ? " and all after it" : " alone"),
+            [&] {
+              doorman.watch(ground.queue(),
+                            [=](long post) { return andAllAfter ? post >= number : post == number; });
+            },
+            [&] { return doorman.leave(ground.queue()) > 0; });
+        if (!refused) break;
+        ++runs;
+      }
+      EXPECT_GT(runs, 0) << "nothing is posted: the sweep sees the queue no longer";
+      total += runs;
+    }
+  }
+  RecordProperty("refusals", total);
+}
+
+TEST_P(PostSweep, SurvivesRefusalsWithoutAPattern) {
+  const auto& [scenario, picture] = GetParam();
+  SweepGround ground(picture);
+  for (std::uint32_t seed = 1; seed <= (picture ? 8u : 60u); ++seed) {
+    // From one in sixteen to fifteen in sixteen.
+    const std::uint32_t sixteenths = 1 + seed % 15;
+    std::mt19937 random(seed);
+    Doorman doorman;
+    ground.survives(
+        scenario, 8, "pattern " + std::to_string(seed),
+        [&] { doorman.watch(ground.queue(), [&](long) { return random() % 16 < sixteenths; }); },
+        [&] { return doorman.leave(ground.queue()) > 0; });
+  }
+}
+
+INSTANTIATE_TEST_SUITE_P(Scenarios, PostSweep, testing::ValuesIn(cases()),
+                         [](const auto& test) { return std::string(test.param.scenario.name); });
+
+}  // namespace
+}  // namespace QeltTests

@@ -1,0 +1,100 @@
+#pragma once
+
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "base/RectF.h"
+#include "desktop/engine/PluginLibrary.h"
+#include "desktop/gl/RenderQueue.h"
+#include "desktop/graphics/CanvasLayer.h"
+#include "desktop/graphics/PenCanvas.h"
+#include "desktop/model/StoredStroke.h"
+#include "desktop/pencommon/PenDataManager.h"
+#include "engine/MotionEvent.h"
+#include "pencommon/Pen.h"
+#include "pencommon/PenStrokeDrawableGL.h"
+#include "support/LiveStroke.h"
+
+namespace QeltTests {
+
+// What a pen made of the same input: compared between a pen that went through a fault and a fresh one.
+struct Drawn {
+  struct Step {
+    bool answer;
+    Qelt::RectF rect;
+    bool operator==(const Step&) const;
+  };
+  std::vector<Step> steps;
+  std::vector<std::vector<float>> batches;  // as they reached the render drawables
+  std::vector<std::uint8_t> pixels;         // only where there is a layer
+
+  bool operator==(const Drawn&) const = default;
+};
+
+// The first difference, for people.
+std::string difference(const Drawn& drawn, const Drawn& expected);
+
+// A host's end of one pen: queue, canvas, data manager, page; and the things that a host does with them. None
+// of it minds that the pen or a drawable could not be made. Main thread. One at a time.
+class Stage {
+ public:
+  // Without a layer the canvas has one tile without GL, enough for render messages to run through their
+  // batch.
+  Stage(QeltDesktop::RenderQueue& queue, QeltDesktop::CanvasLayer* layer, int version);
+  ~Stage();
+  Stage(const Stage&) = delete;
+  Stage& operator=(const Stage&) = delete;
+
+  static const QeltDesktop::PluginLibrary& library();
+
+  void makePen();
+  void deletePen();
+  Qelt::Pen* pen() { return mPen.get(); }
+
+  // A stroke, live: `finishes` has the render thread keep up, otherwise all of it stays queued.
+  void live(bool finishes = true);
+  // Part of one, the pen still down.
+  void beginLive();
+  // Stored strokes and recorded events, smooth and straight, from the cache and not.
+  void redraw(bool finishes = true);
+  // Two outlines each of a stored stroke and of a recorded one.
+  void outline(bool finishes = true);
+  void preview(bool finishes = true);
+  // A prediction from the middle of a live stroke.
+  void predict(bool finishes = true);
+  // Every drawable there is, on the canvas, nothing drawn.
+  void prepareAll();
+  void zoom(float factor);
+  void loseAndRestoreContext();
+
+  // Draws one of everything, in a state that every stroke begins in, and tells what came of it.
+  Drawn drawEverything();
+
+  // How many calls let a std::bad_alloc out: calls that may.
+  int refusedBatches() const { return mRefusedBatches; }
+
+ private:
+  class Canvas;
+
+  // Runs a call that hands over a batch: it may run out of memory while the batch grows.
+  template <typename Call>
+  void drawing(Call&& call);
+  Qelt::PenStrokeDrawableGL* strokeDrawable();
+  QeltDesktop::StoredStroke& newStroke();
+  void drawStroke(Qelt::PenStrokeDrawableGL* drawable, bool finishes, bool ends);
+  template <typename Drawable, typename Input>
+  void redrawTwice(Drawable* drawable, const Input& input);
+
+  const int mVersion;
+  QeltDesktop::RenderQueue& mQueue;
+  QeltDesktop::CanvasLayer* mLayer;
+  std::unique_ptr<QeltDesktop::PenCanvas> mCanvas;
+  QeltDesktop::PenDataManager mData;
+  std::unique_ptr<Qelt::Pen> mPen;
+  std::vector<std::unique_ptr<QeltDesktop::StoredStroke>> mPage;
+  int mRefusedBatches = 0;
+  Drawn* mRecord = nullptr;  // where steps are noted, if anywhere
+};
+
+}  // namespace QeltTests

@@ -1,0 +1,81 @@
+#pragma once
+
+#include <gtest/gtest.h>
+
+#include <string>
+
+#include "AllocationGate.h"
+#include "Scenarios.h"
+#include "Stage.h"
+#include "support/LogCapture.h"
+
+namespace QeltTests {
+
+// Where the sweeps run: a queue on the test's own thread, so that a number always means the same allocation
+// or post, and a layer where there is a picture.
+class SweepGround {
+ public:
+  explicit SweepGround(bool picture);
+  ~SweepGround();
+
+  QeltDesktop::RenderQueue& queue() { return mQueue; }
+  QeltDesktop::CanvasLayer* layer() { return mLayer.get(); }
+  // What a fresh pen of a version draws.
+  const Drawn& fresh(int version);
+
+  // Runs a scenario between `arm` and `disarm`, then draws with the same pen and compares; `disarm` answers
+  // false when nothing failed. Checks that nothing threw, leaked or was deleted twice. Answers `disarm`'s.
+  template <typename Arm, typename Disarm>
+  bool survives(const Scenario& scenario, int version, const std::string& what, Arm&& arm, Disarm&& disarm);
+
+ private:
+  struct Counts {
+    long plugIn, all, bad;
+  };
+  Counts settle();
+
+  LogCapture mLog;
+  QeltDesktop::RenderQueue mQueue;
+  std::unique_ptr<QeltDesktop::CanvasLayer> mLayer;
+  std::vector<Drawn> mFresh;
+};
+
+template <typename Arm, typename Disarm>
+bool SweepGround::survives(const Scenario& scenario, int version, const std::string& what, Arm&& arm,
+                           Disarm&& disarm) {
+  const std::string where = std::string(scenario.name) + ", version " + std::to_string(version) + ", " + what;
+  fresh(version);
+  const Counts before = settle();
+  const long number = AllocationGate::plugInAllocations();
+  bool failed = false;
+  {
+    Stage stage(mQueue, mLayer.get(), version);
+    arm();
+    try {
+      scenario.run(stage);
+      mQueue.finish();
+    } catch (const std::exception& error) {
+      disarm();
+      ADD_FAILURE() << where << ": let out " << error.what();
+    }
+    failed = disarm();
+    for (const LogLine& line : mLog.take()) {
+      if (line.text.find("threw") != std::string::npos) ADD_FAILURE() << where << ": " << line.text;
+    }
+    // Whatever the scenario left, the same drawable draws as a fresh one.
+    if (stage.pen() != nullptr) stage.pen()->setVersion(version);
+    const std::string differs = difference(stage.drawEverything(), fresh(version));
+    if (!differs.empty()) ADD_FAILURE() << where << ": draws differently afterwards: " << differs;
+  }
+  const Counts after = settle();
+  if (after.plugIn != before.plugIn) {
+    ADD_FAILURE() << where << ": " << after.plugIn - before.plugIn << " blocks of the plug-in's left,"
+                  << AllocationGate::livingSince(number);
+  } else if (mLayer == nullptr && !testing::Test::HasFailure() && after.all != before.all) {
+    ADD_FAILURE() << where << ": " << after.all - before.all << " blocks of the host's left";
+  }
+  EXPECT_EQ(after.bad, before.bad) << where << ": deleted twice";
+  return failed;
+}
+
+}  // namespace QeltTests
