@@ -48,8 +48,9 @@ class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
   void shutDown();
 
   // Loses the GL context and makes another: managed objects hear of both, and the host's GL wrappers come
-  // back: buffers with their data, programs with their bindings, bitmaps zeroed, layers with their pixels.
-  // Each waits, and throws std::runtime_error when there is no context to be had. Without GL they do nothing.
+  // back: buffers with their data, programs with their bindings, layers and what a canvas drew into with
+  // their pixels, other bitmaps zeroed. Each waits, and throws std::runtime_error when there is no context to
+  // be had. Without GL they do nothing.
   void loseContext();
   void restoreContext();
 

@@ -66,6 +66,8 @@ class QELT_HOST_API GlBitmap final : public Qelt::ISPBitmap, public GlResource {
   int GetTileCount() const override { return static_cast<int>(mTiles.size()); }
   Qelt::ISPSubBitmap* GetSubBitmap(int index) override;
 
+  // From here on the pixels outlive a context loss: nobody would draw them again.
+  void keepPixels() { mOnLoss = OnLoss::Keep; }
   // True when the texture and a framebuffer around it exist in the current context.
   bool isRenderable();
   // Makes a rectangle the render target: framebuffer, viewport and scissor. False without a context.
@@ -89,7 +91,7 @@ class QELT_HOST_API GlBitmap final : public Qelt::ISPBitmap, public GlResource {
 
   const int mWidth;
   const int mHeight;
-  const OnLoss mOnLoss;
+  OnLoss mOnLoss;
   GlTexture mTextureInterface;
   std::vector<std::unique_ptr<GlTile>> mTiles;
   std::vector<std::pair<GLenum, GLint>> mParameters;  // set again in the next context

@@ -60,6 +60,7 @@ Qelt::Vector4<float> premultiplied(unsigned int argb) {
 }  // namespace
 
 GlCanvas::GlCanvas(GlBitmap& bitmap) : mBitmap(bitmap) {
+  mBitmap.keepPixels();
   mProgram = Qelt::GraphicsFactory::createOpenGLShaderProgram(kVertexShader, kFragmentShader, nullptr);
   if (mProgram != nullptr) {
     mEdges = mProgram->getBindingIntf("edges", Qelt::kBindingVector4);

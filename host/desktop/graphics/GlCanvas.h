@@ -12,7 +12,8 @@ namespace QeltDesktop {
 
 class GlBitmap;
 
-// Draws shapes into a bitmap, which holds premultiplied colours afterwards. Render thread.
+// Draws shapes into a bitmap, which holds premultiplied colours afterwards, over a context loss too. Render
+// thread.
 class GlCanvas final : public Qelt::ISPCanvas {
  public:
   // `bitmap` outlives the canvas.
