@@ -22,9 +22,12 @@ void keep(const __android_logger_data* about, const char* message) {
 LogCapture::LogCapture() {
   take();
   __android_log_set_logger(keep);
+  // By itself the log drops what is below info.
+  mMinimumPriority = __android_log_set_minimum_priority(ANDROID_LOG_VERBOSE);
 }
 
 LogCapture::~LogCapture() {
+  __android_log_set_minimum_priority(mMinimumPriority);
   __android_log_set_logger(__android_log_stderr_logger);
 }
 

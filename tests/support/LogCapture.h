@@ -21,6 +21,9 @@ class LogCapture {
 
   // What was logged since the last call, in order.
   std::vector<LogLine> take();
+
+ private:
+  int mMinimumPriority;
 };
 
 }  // namespace QeltTests

@@ -1,0 +1,364 @@
+#include <gmock/gmock.h>
+
+#include <algorithm>
+#include <cmath>
+#include <cstddef>
+#include <cstdint>
+#include <cstdlib>
+#include <string>
+#include <vector>
+
+#include "math/Matrix4.h"
+#include "pencommon/PenStrokeDataManager.h"
+#include "render/Pencil2StrokeDrawableRTV3.h"
+#include "stroke/DrawingBoard.h"
+#include "support/Stamps.h"
+
+// Pictures, by way of a layer. Renderers differ in their last bits: what is compared here was drawn by one
+// and the same, and even so a shifted picture is allowed a pixel here and there.
+namespace QeltTests {
+namespace {
+
+using namespace Qelt;
+using QeltDesktop::RenderQueue;
+
+constexpr int kSide = 256;
+
+// A picture of kSide x kSide pixels.
+using Picture = std::vector<std::uint8_t>;
+
+int alphaAt(const Picture& picture, int x, int y) {
+  return picture[(static_cast<std::size_t>(y) * kSide + static_cast<std::size_t>(x)) * 4 + 3];
+}
+
+int inked(const Picture& picture) {
+  int count = 0;
+  for (std::size_t i = 3; i < picture.size(); i += 4) count += picture[i] != 0 ? 1 : 0;
+  return count;
+}
+
+// How many pixels of `a` differ from those of `b` that lie (dx, dy) further, by more than 8 of 255.
+int differing(const Picture& a, const Picture& b, int dx = 0, int dy = 0) {
+  int count = 0;
+  for (int y = std::max(0, -dy); y < std::min(kSide, kSide - dy); ++y) {
+    for (int x = std::max(0, -dx); x < std::min(kSide, kSide - dx); ++x)
+      count += std::abs(alphaAt(a, x, y) - alphaAt(b, x + dx, y + dy)) > 8 ? 1 : 0;
+  }
+  return count;
+}
+
+BoardOptions paper(int version) {
+  BoardOptions options;
+  options.version = version;
+  options.size = 9.0f;
+  options.width = options.height = kSide;
+  return options;
+}
+
+// A wave across some 120 x 60 units, off the grid of quarter pixels.
+std::vector<Sample> wave(float left, float top) {
+  std::vector<Sample> samples;
+  for (int i = 0; i <= 24; ++i) {
+    const auto t = static_cast<float>(i);
+    samples.push_back(
+        {left + 5.0f * t, top + 30.0f - 28.0f * std::cos(t * 0.4f), 0.3f + 0.02f * t, 0.03f * t, 0.8f});
+  }
+  return samples;
+}
+
+constexpr float kLeft = 31.37f, kTop = 23.61f;
+
+// The versions that bring something of their own to the render thread: RTV1, RTV2, RTV3.
+class Draw : public testing::TestWithParam<int> {};
+
+TEST_P(Draw, HasTheGrainFixedToTheStartPoint) {
+  DrawingBoard board(paper(GetParam()));
+  board.stroke(wave(kLeft, kTop));
+  const Picture first = board.pixels();
+  ASSERT_GT(inked(first), 1500);
+  board.layer->clear();
+  board.stroke(wave(kLeft + 64.0f, kTop + 96.0f));
+  const Picture shifted = board.pixels();
+  EXPECT_LE(differing(first, shifted, 64, 96), inked(first) / 200);
+  // A shift by any other way shows other grain.
+  EXPECT_GT(differing(first, shifted, 63, 96), inked(first) / 5);
+}
+
+// A straight stroke posts no start point: its grain is that of the stroke before.
+TEST_P(Draw, StraightStrokesKeepTheGrainWhereItWas) {
+  DrawingBoard board(paper(GetParam()));
+  const auto straightAfterTapAt = [&](float x, float y) {
+    board.shared.mCurveEnabled = true;
+    board.stroke({{x, y}, {x, y}});
+    board.queue.finish();
+    board.layer->clear();
+    board.shared.mCurveEnabled = false;
+    board.stroke(wave(kLeft, kTop));
+    return board.pixels();
+  };
+  const Picture a = straightAfterTapAt(40.37f, 40.61f);
+  const Picture b = straightAfterTapAt(51.37f, 47.61f);
+  EXPECT_GT(differing(a, b), inked(a) / 5);
+  EXPECT_EQ(differing(a, straightAfterTapAt(40.37f, 40.61f)), 0);
+
+  // The grain repeats: every 150 stroke units in the first render version, every 75 in the others.
+  const Picture further = straightAfterTapAt(40.37f + 75.0f, 40.61f);
+  if (GetParam() == 1) {
+    EXPECT_GT(differing(a, further), inked(a) / 5);
+    EXPECT_LE(differing(a, straightAfterTapAt(40.37f + 150.0f, 40.61f)), inked(a) / 200);
+  } else {
+    EXPECT_LE(differing(a, further), inked(a) / 200);
+  }
+}
+
+// The grain is paper, not screen: it zooms with the view. What repeats every 150 stroke units repeats every
+// 75 pixels at zoom 0.5; what repeats every 75, every 150 pixels at zoom 2.
+TEST_P(Draw, GrainZoomsWithTheView) {
+  const float zoom = GetParam() == 1 ? 0.5f : 2.0f;
+  const float period = GetParam() == 1 ? 150.0f : 75.0f;
+  BoardOptions options = paper(GetParam());
+  options.size = 18.0f / zoom;
+  DrawingBoard board(options);
+  board.canvas.setMatrix(viewOf(zoom));
+  const auto drawAfterTapAt = [&](float x) {
+    board.shared.mCurveEnabled = true;
+    board.stroke({{x, 20.31f}, {x, 20.31f}});
+    board.queue.finish();
+    board.layer->clear();
+    board.shared.mCurveEnabled = false;
+    board.stroke({{40.38f / zoom, 80.62f / zoom, 0.7f},
+                  {120.0f / zoom, 180.0f / zoom, 0.7f},
+                  {220.0f / zoom, 90.0f / zoom, 0.7f}});
+    return board.pixels();
+  };
+  const Picture a = drawAfterTapAt(20.19f);
+  EXPECT_LE(differing(a, drawAfterTapAt(20.19f + period)), inked(a) / 200);
+  EXPECT_GT(differing(a, drawAfterTapAt(20.19f + 0.5f * period)), inked(a) / 5);
+}
+
+TEST_P(Draw, IsSeamlessAcrossTiles) {
+  Picture whole;
+  {
+    DrawingBoard board(paper(GetParam()));
+    board.stroke(wave(kLeft, kTop));
+    whole = board.pixels();
+  }
+  BoardOptions tiled = paper(GetParam());
+  tiled.tile = 64;
+  DrawingBoard board(tiled);
+  board.stroke(wave(kLeft, kTop));
+  EXPECT_LE(differing(whole, board.pixels()), inked(whole) / 500);
+}
+
+TEST_P(Draw, OfTheCacheIsThePictureThatComputingGave) {
+  DrawingBoard board(paper(GetParam()));
+  const auto stroke = board.stored(wave(kLeft, kTop));
+  PenStrokeDataManager::GetInstance()->CreateStrokeData(stroke->GetRuntimeHandle());
+  board.redraw(*stroke);
+  const Picture computed = board.pixels();
+  ASSERT_GT(inked(computed), 1500);
+  board.layer->clear();
+  board.takePosts();
+  board.redraw(*stroke);
+  EXPECT_THAT(board.takePosts(), testing::Contains("Unref"));
+  EXPECT_EQ(board.pixels(), computed);
+  PenStrokeDataManager::GetInstance()->DropStrokeData(stroke->GetRuntimeHandle());
+}
+
+TEST_P(Draw, OfNothingLeavesThePictureAlone) {
+  DrawingBoard board(paper(GetParam()));
+  board.stroke(wave(kLeft, kTop));
+  const Picture before = board.pixels();
+  board.down({50.0f, 50.0f});
+  board.move({{50.5f, 50.0f}});
+  EXPECT_EQ(board.pixels(), before);
+}
+
+// The layer holds premultiplied colour: wherever there is ink, it is the pen's.
+TEST_P(Draw, InksInThePensColour) {
+  BoardOptions options = paper(GetParam());
+  options.color = 0xFF00FF40u;  // red 0, green 255, blue 64
+  DrawingBoard board(options);
+  board.stroke(wave(kLeft, kTop));
+  const Picture picture = board.pixels();
+  for (std::size_t i = 0; i < picture.size(); i += 4) {
+    const int alpha = picture[i + 3];
+    ASSERT_EQ(picture[i], 0);
+    // Some renderers round every blend up.
+    ASSERT_NEAR(picture[i + 1], alpha, 16);
+    ASSERT_NEAR(picture[i + 2], alpha * 64 / 255, 16);
+  }
+}
+
+TEST_P(Draw, GoesOnAfterTheContextIsLostAndRestored) {
+  const std::vector<Sample> samples = wave(kLeft, kTop);
+  const std::vector<Sample> half(samples.begin() + 1, samples.begin() + 12),
+      rest(samples.begin() + 12, samples.end());
+  Picture undisturbed;
+  {
+    DrawingBoard board(paper(GetParam()));
+    board.down(samples.front());
+    board.move(half);
+    board.move(rest);
+    undisturbed = board.pixels();
+  }
+  DrawingBoard board(paper(GetParam()));
+  board.down(samples.front());
+  board.move(half);
+  board.queue.loseContext();
+  board.move(rest);  // no context: what was posted draws nothing
+  board.queue.finish();
+  board.queue.restoreContext();
+  const int inkedBefore = inked(board.pixels());
+  EXPECT_GT(inkedBefore, 100);
+  EXPECT_LT(inkedBefore, inked(undisturbed));
+
+  // What is drawn from now on looks as ever.
+  board.layer->clear();
+  board.down(samples.front());
+  board.move(half);
+  board.move(rest);
+  EXPECT_EQ(differing(undisturbed, board.pixels()), 0);
+}
+
+// A drawable that dies in the middle of a stroke: what it handed over is drawn first.
+TEST_P(Draw, FinishesWhatADyingDrawableHandedOver) {
+  DrawingBoard board(paper(GetParam()));
+  board.stroke(wave(kLeft, kTop));
+  board.deleteDrawable();
+  EXPECT_GT(inked(board.pixels()), 1500);
+}
+
+INSTANTIATE_TEST_SUITE_P(RenderVersions, Draw, testing::Values(1, 7, 8),
+                         [](const auto& version) { return "Version" + std::to_string(version.param); });
+
+// --- The render drawable by itself
+// ------------------------------------------------------------------------------
+
+class RenderDrawable : public testing::Test {
+ protected:
+  RenderDrawable() {
+    queue.run([this] { drawable.Init(); });
+  }
+  ~RenderDrawable() override {
+    queue.run([this] { drawable.Release(); });
+  }
+
+  // A batch of one stamp of half width 20 in the middle of (x, 128).
+  std::vector<float> stampAt(float x) {
+    std::vector<float> batch;
+    const Vector2<float> stamp[2] = {{x, 128.37f}, {0.0f, 1.0f}};
+    drawable.SetInverseScale({1.0f, 1.0f});
+    drawable.SetBuffer(&batch);
+    drawable.AddPoint(stamp, 20.0f, 1.0f, 0.0f, 0);
+    drawable.AddPoint({1.0f, 1.0f}, 5.0f);  // the host's own operation does nothing
+    drawable.SetBuffer(nullptr);
+    EXPECT_THAT(batch, BatchOf(1, 11));
+    return batch;
+  }
+  void drawAll() {
+    ISPBitmap* const bitmap = layer.GetBitmap();
+    for (int i = 0; i < bitmap->GetTileCount(); ++i) drawable.Draw(bitmap->GetSubBitmap(i), identity);
+  }
+
+  RenderQueue queue{RenderQueue::Mode::Caller, RenderQueue::GL::Context};
+  QeltDesktop::CanvasLayer layer{queue, kSide, kSide, 64};
+  QeltDesktop::PenDataManager data{&queue};
+  Pencil2StrokeDrawableRTV3 drawable{&data};
+  Matrix4<float> identity;
+};
+
+TEST_F(RenderDrawable, DrawsTheBufferThatItsUpdateChose) {
+  std::vector<float> live = stampAt(60.37f), cached = stampAt(190.37f);
+  queue.run([&] {
+    drawable.SetPenData(9.0f, static_cast<int>(0xFF000000u));
+    drawable.SetStartPoint(60.37f, 128.37f);
+    drawable.SendDataToGPU(&live);
+    drawable.SetCacheBuffer(&cached);
+    drawable.Update(true);
+    drawAll();
+  });
+  Picture picture = layer.readPixels();
+  EXPECT_EQ(alphaAt(picture, 60, 120), 0);
+  EXPECT_GT(inked(picture), 500);
+
+  layer.clear();
+  queue.run([&] {
+    drawable.Update(false);
+    drawAll();
+    drawable.Clear();
+  });
+  picture = layer.readPixels();
+  EXPECT_GT(inked(picture), 500);
+  EXPECT_EQ(alphaAt(picture, 190, 120), 0);
+  // Cleared: emptied, its room kept, and forgotten.
+  EXPECT_TRUE(live.empty());
+  EXPECT_GE(live.capacity(), 66u);
+  EXPECT_EQ(cached.size(), 66u);
+
+  layer.clear();
+  queue.run([&] {
+    drawable.Update(false);
+    drawAll();
+    drawable.Clear();
+  });
+  EXPECT_EQ(inked(layer.readPixels()), 0);
+}
+
+// The window pixel of the start point: tiles are windows into one framebuffer, so it is the same in every
+// tile, and the first one drawn settles it. A zoom afterwards changes nothing.
+TEST_F(RenderDrawable, SettlesTheGrainOriginWithTheFirstTileDrawn) {
+  std::vector<float> live = stampAt(60.37f);
+  queue.run([&] {
+    drawable.SetStartPoint(60.25f, 130.5f);
+    drawable.SendDataToGPU(&live);
+    drawable.Update(false);
+    EXPECT_EQ(drawable.grainOrigin().x, 60.25f);  // still in stroke units
+    Matrix4<float> twice;
+    twice[0] = twice[5] = 2.0f;
+    drawable.Draw(layer.GetBitmap()->GetSubBitmap(6), twice);
+    EXPECT_NEAR(drawable.grainOrigin().x, 120.5f, 1e-3f);
+    EXPECT_NEAR(drawable.grainOrigin().y, 261.0f, 1e-3f);
+    drawable.Draw(layer.GetBitmap()->GetSubBitmap(1), identity);
+    EXPECT_NEAR(drawable.grainOrigin().x, 120.5f, 1e-3f);
+    drawable.Clear();
+  });
+}
+
+TEST_F(RenderDrawable, DrawsNothingWithoutATileOrABatch) {
+  std::vector<float> live = stampAt(60.37f), empty;
+  queue.run([&] {
+    drawable.SendDataToGPU(&live);
+    drawable.Update(false);
+    drawable.Draw(nullptr, identity);
+    drawable.SendDataToGPU(&empty);
+    drawable.Update(false);
+    drawAll();
+    drawable.Clear();
+    drawable.Update(true);
+    drawAll();
+  });
+  EXPECT_EQ(inked(layer.readPixels()), 0);
+}
+
+TEST_F(RenderDrawable, CanBeReleasedTwiceAndDrawsNothingAfterwards) {
+  std::vector<float> live = stampAt(60.37f);
+  queue.run([&] {
+    drawable.CreatePenCanvas(1, 1, nullptr);  // ready already
+    drawable.Release();
+    drawable.Release();
+    drawable.SendDataToGPU(&live);
+    drawable.Update(false);
+    drawAll();
+    drawable.Clear();
+    drawable.Init();
+    drawable.SendDataToGPU(&live);
+    drawable.Update(false);
+    drawAll();
+    drawable.Clear();
+  });
+  EXPECT_EQ(inked(layer.readPixels()), 0);
+}
+
+}  // namespace
+}  // namespace QeltTests
