@@ -1,0 +1,215 @@
+#include <gmock/gmock.h>
+
+#include <cmath>
+#include <cstddef>
+#include <cstdint>
+#include <fstream>
+#include <iterator>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "desktop/gl/RenderQueue.h"
+#include "desktop/graphics/CanvasLayer.h"
+#include "desktop/pencommon/PenDataManager.h"
+#include "graphics/ISPBitmap.h"
+#include "math/Matrix4.h"
+#include "outline/Outliner.h"
+#include "outline/Pencil2OutlineDrawableGLV4.h"
+#include "outline/Pencil2OutlineDrawableRTV1.h"
+#include "support/LogCapture.h"
+
+namespace QeltTests {
+namespace {
+
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+using V4 = Qelt::Pencil2OutlineDrawableGLV4;
+
+constexpr int kSide = 120;
+
+std::vector<std::uint8_t> outlinePicture(float outlineSize, const std::vector<Sample>& samples,
+                                         float zoom = 1.0f) {
+  BoardOptions options = outlinePaper(30.0f, false);
+  options.width = kSide;
+  options.height = kSide;
+  options.tile = 64;
+  Outliner<V4> board(options);
+  board.outline({{0.0f, 0.0f}, {60.0f, 0.0f}});  // brings the size up to 30
+  board.queue.finish();
+  board.layer->clear();
+  board.canvas.setMatrix(viewOf(zoom));
+  board.drawable->SetOutlineSize(outlineSize);
+  board.drawable->SetOutlineColor(static_cast<int>(0x40FF8000u));
+  board.outline(samples);
+  return board.layer->readPixels();
+}
+
+// How covered a pixel is: 0 to 255, taking colour and alpha together.
+int alphaAt(const std::vector<std::uint8_t>& pixels, int column, int row) {
+  return pixels[static_cast<std::size_t>(row * kSide + column) * 4 + 3];
+}
+
+TEST(OutlinePicture, OnlyARimIsLeftInTheOutlinesColour) {
+  for (const float zoom : {1.0f, 0.5f}) {
+    const float side = static_cast<float>(kSide) / zoom;
+    const auto pixels = outlinePicture(6.0f / zoom, {{side / 2.0f, side / 2.0f}}, zoom);
+    // A stamp of 31 across, in units, around the middle.
+    const float inner = 15.5f * zoom;
+    const float outer = inner + 6.0f;
+    for (int row = 0; row < kSide; ++row) {
+      for (int column = 0; column < kSide; ++column) {
+        const float dx = static_cast<float>(column) + 0.5f - 60.0f;
+        const float dy = static_cast<float>(row) + 0.5f - 60.0f;
+        const float distance = std::sqrt(dx * dx + dy * dy);
+        const int alpha = alphaAt(pixels, column, row);
+        if (distance < inner - 2.0f || distance > outer + 2.0f) {
+          ASSERT_EQ(alpha, 0) << column << ", " << row;
+        }
+        if (distance > inner + 2.0f && distance < outer - 2.0f) {
+          const std::uint8_t* pixel = &pixels[static_cast<std::size_t>(row * kSide + column) * 4];
+          ASSERT_THAT(std::vector<int>(pixel, pixel + 4), ElementsAre(255, 128, 0, 255))
+              << column << ", " << row;
+        }
+      }
+    }
+  }
+}
+
+// Stamps that cover each other are erased together: the rim runs round the whole stroke.
+TEST(OutlinePicture, WithoutASizeTheInsideIsErasedToNothing) {
+  const std::vector<Sample> stroke = {{30.3f, 60.0f}, {90.3f, 60.0f}};
+  const auto rimmed = outlinePicture(6.0f, stroke);
+  EXPECT_EQ(alphaAt(rimmed, 60, 60), 0);
+  EXPECT_EQ(alphaAt(rimmed, 60, 41), 255);
+  EXPECT_EQ(alphaAt(rimmed, 60, 79), 255);
+  const auto erased = outlinePicture(0.0f, stroke);
+  for (int row = 0; row < kSide; ++row) {
+    for (int column = 0; column < kSide; ++column) {
+      // c * (1 - c) is left where the rim is half covered.
+      ASSERT_LE(alphaAt(erased, column, row), 70) << column << ", " << row;
+      if (row > 47 && row < 73 && column > 30 && column < 90) {
+        ASSERT_EQ(alphaAt(erased, column, row), 0) << column << ", " << row;
+      }
+    }
+  }
+}
+
+TEST(OutlinePicture, ATiltedPenLeavesASlabThatIsErasedThinner) {
+  // Factor 0.5: half a quarter of the stamp's width to each side in colour, 1 / 6.5 erased.
+  const Sample tilted{60.3f, 60.0f, 0.5f, 0.79f, 0.0f};
+  const auto pixels = outlinePicture(0.0f, {tilted});
+  // Along the y axis, the stamp is (30 * 1.75 + 1) across: 1 / 4 of it to each side is coloured, 2 / 13
+  // erased.
+  EXPECT_EQ(alphaAt(pixels, 60 + 10, 60), 255);
+  EXPECT_EQ(alphaAt(pixels, 60 + 4, 60), 0);
+  EXPECT_EQ(alphaAt(pixels, 60 + 18, 60), 0);
+  EXPECT_EQ(alphaAt(pixels, 60, 60 + 20), 0);
+}
+
+// The drawable alone, on a queue of its own.
+class OutlineRenderer : public testing::Test {
+ protected:
+  OutlineRenderer()
+      : mQueue(QeltDesktop::RenderQueue::Mode::Caller, QeltDesktop::RenderQueue::GL::Context),
+        mLayer(mQueue, kSide, kSide),
+        mData(&mQueue) {
+    mDrawable = std::make_unique<Qelt::Pencil2OutlineDrawableRTV1>(&mData);
+    const Qelt::Vector2<float> stamp[2] = {{60.0f, 60.0f}, {0.0f, 1.0f}};
+    mDrawable->SetOutlineSize(5.0f);
+    mDrawable->SetOutlineColor(0xFF00FF00u);
+    mDrawable->SetBuffer(&mInner, &mOuter);
+    mDrawable->AddPoint(stamp, 40.0f, 0.0f);
+    mDrawable->SetBuffer(nullptr, nullptr);
+    mDrawable->AddPoint(stamp, 40.0f, 0.0f);  // goes nowhere
+  }
+  ~OutlineRenderer() override {
+    mQueue.run([this] { mDrawable.reset(); });
+  }
+
+  void draw() {
+    mQueue.run([this] {
+      Qelt::Matrix4<float> identity;
+      mDrawable->Draw(mLayer.GetBitmap()->GetSubBitmap(0), identity);
+    });
+  }
+  int rim() { return alphaAt(mLayer.readPixels(), 60 + 22, 60); }
+
+  std::vector<float> mInner, mOuter;
+  QeltDesktop::RenderQueue mQueue;
+  QeltDesktop::CanvasLayer mLayer;
+  QeltDesktop::PenDataManager mData;
+  std::unique_ptr<Qelt::Pencil2OutlineDrawableRTV1> mDrawable;
+};
+
+TEST_F(OutlineRenderer, DrawsOnlyWhenThereIsSomethingToDrawWith) {
+  EXPECT_EQ(mInner.size(), 42u);
+  EXPECT_EQ(mOuter[0], mInner[0] - 5.0f);
+  mQueue.run([this] { mDrawable->SendDataToGPU(&mInner, &mOuter); });
+  draw();  // before Init
+  EXPECT_EQ(rim(), 0);
+  mQueue.run([this] {
+    mDrawable->CreatePenCanvas(0, 0, nullptr);
+    mDrawable->CreatePenCanvas(0, 0, nullptr);
+    mDrawable->Update(true);
+    Qelt::Matrix4<float> identity;
+    mDrawable->Draw(nullptr, identity);
+  });
+  EXPECT_EQ(rim(), 0);
+  draw();
+  EXPECT_EQ(rim(), 255);
+
+  mLayer.clear();
+  std::vector<float> none;
+  mQueue.run([&] { mDrawable->SendDataToGPU(&mInner, &none); });
+  draw();
+  mQueue.run([&] { mDrawable->SendDataToGPU(nullptr, &mOuter); });
+  draw();
+  EXPECT_EQ(rim(), 0);  // one stream alone draws nothing
+
+  mQueue.run([&] {
+    mDrawable->SendDataToGPU(&mInner, &mOuter);
+    mDrawable->Clear();
+    mDrawable->Update(false);
+  });
+  EXPECT_THAT(mInner, IsEmpty());
+  EXPECT_THAT(mOuter, IsEmpty());
+  draw();
+  EXPECT_EQ(rim(), 0);
+  mQueue.run([this] { mDrawable->Release(); });
+  draw();
+  mQueue.run([this] { mDrawable->Release(); });
+}
+
+TEST_F(OutlineRenderer, NotesWhatItDoes) {
+  LogCapture log;
+  mQueue.run([this] {
+    mDrawable->CreatePenCanvas(0, 0, nullptr);
+    mDrawable->SendDataToGPU(&mInner, &mOuter);
+    mDrawable->Update(false);
+    mDrawable->RestoreGLObject();
+    mDrawable->Release();
+  });
+  std::vector<std::string> lines;
+  for (const LogLine& line : log.take()) {
+    EXPECT_EQ(line.priority, 3);
+    if (line.text.find("Pencil2OutlineDrawableRTV1::") != std::string::npos) lines.push_back(line.text);
+  }
+  const std::string name = "virtual void Qelt::Pencil2OutlineDrawableRTV1::";
+  // Kept: both streams say 1.
+  EXPECT_THAT(lines,
+              ElementsAre(name + "Update(bool)", name + "Update(bool) 1 size 42",
+                          name + "Update(bool) 1 size 42", name + "RestoreGLObject()", name + "Release()"));
+}
+
+// Kept: tools that show bitmaps by name find the outline's texture under another drawable's.
+TEST(Outline, TheTexturesDebugNameNamesAnotherDrawable) {
+  std::ifstream file(QELT_PLUGIN_PATH, std::ios::binary);
+  const std::string library{std::istreambuf_iterator<char>(file), {}};
+  EXPECT_NE(library.find("Marker4OutlineDrawableRTV1::CreatePenCanvas mPointTextureBitmap"),
+            std::string::npos);
+}
+
+}  // namespace
+}  // namespace QeltTests

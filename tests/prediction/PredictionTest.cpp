@@ -1,0 +1,350 @@
+#include <gmock/gmock.h>
+
+#include <cstddef>
+#include <limits>
+#include <memory>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "base/Error.h"
+#include "desktop/pencommon/PenDataManager.h"
+#include "engine/MotionEvent.h"
+#include "pen/Pencil2.h"
+#include "pencommon/PenPredictionDrawableGL.h"
+#include "prediction/Pencil2PredictionDrawableGL.h"
+#include "stroke/DrawingBoard.h"
+#include "support/DrawableBoard.h"
+#include "support/LogCapture.h"
+#include "support/StampPicture.h"
+#include "support/Stamps.h"
+
+namespace QeltTests {
+namespace {
+
+using Qelt::Error;
+using Qelt::MotionEvent;
+using Qelt::Pencil2PredictionDrawableGL;
+using Qelt::RectF;
+using testing::ElementsAre;
+using testing::IsEmpty;
+using testing::SizeIs;
+
+using Board = DrawableBoard<Pencil2PredictionDrawableGL>;
+
+constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
+constexpr float kInfinity = std::numeric_limits<float>::infinity();
+
+// What a live stroke along the x axis might have left.
+void leaveStroke(Qelt::Pencil2Data& shared) {
+  shared.mStartX = 3.3f;
+  shared.mStartY = 2.7f;
+  shared.mLastStampX = 10.0f;
+  shared.mLastStampY = 0.0f;
+  shared.mLastX = 20.0f;
+  shared.mLastY = 0.0f;
+  shared.mLastWidth = 4.0f;
+  shared.mLastAlpha = 0.6f;
+  shared.mLastOrientation = 0.0f;
+  shared.mStampCount = 7;
+  shared.mTiltBlend = 0.25f;
+  shared.mHasLastStroke = true;
+}
+
+std::vector<Stamp> stamps(Board& board) {
+  return stampsOf(board.takeFloats(), 11);
+}
+
+TEST(Prediction, GoesOnFromTheLastStampWithItsLooks) {
+  Board board;
+  leaveStroke(board.shared);
+  EXPECT_TRUE(board.move({{30.5f, 0.0f, 0.1f, 0.7f, 2.0f}}));  // only the position counts
+  const std::vector<Stamp> placed = stamps(board);
+  ASSERT_THAT(placed, SizeIs(20));  // from 10 to 30.5, one a unit
+  for (std::size_t i = 0; i < placed.size(); ++i) {
+    EXPECT_THAT(placed[i], StampNear(11.0f + static_cast<float>(i), 0.0f, 0.02f)) << i;
+    EXPECT_NEAR(placed[i].halfWidth, 2.5f, 1e-5f);  // half of 4, and half a pixel
+    EXPECT_NEAR(placed[i].alpha, 0.2f, 1e-6f);      // 0.6 / 3
+    EXPECT_EQ(placed[i].tile, static_cast<int>((7 + i) % 3)) << i;
+    EXPECT_EQ(placed[i].narrowing, 0.25f);
+    EXPECT_EQ(placed[i].directionY, 1.0f);
+  }
+  // From the last stamp to the last stamp placed, a quarter of the width and 1 around.
+  EXPECT_FLOAT_EQ(board.rect.left, 9.0f);
+  EXPECT_NEAR(board.rect.right, 32.0f, 0.02f);
+  EXPECT_FLOAT_EQ(board.rect.top, -2.0f);
+  EXPECT_THAT(board.takePosts(),
+              ElementsAre("SetStartPoint", "SetPenData", "SetRect", "Batch", "Render", "DeleteBatch"));
+}
+
+TEST(Prediction, EndsAtTheLastSampleAndPassesTheOthersHalfWay) {
+  Board board;
+  leaveStroke(board.shared);
+  // 10 to 25 through 20; 25 to 35 through 30; 35 to 50.2 through 40.
+  EXPECT_TRUE(board.move({{30.0f, 0.0f}, {40.0f, 0.0f}, {50.2f, 0.0f}}));
+  std::vector<Stamp> placed = stamps(board);
+  ASSERT_THAT(placed, SizeIs(40));
+  EXPECT_THAT(placed.back(), StampNear(50.0f, 0.0f, 0.05f));
+  // A sample that is nowhere is left out.
+  leaveStroke(board.shared);
+  board.move({{30.0f, 0.0f}, {kNaN, 0.0f}, {40.0f, -kInfinity}, {40.0f, 0.0f}, {50.2f, 0.0f}});
+  EXPECT_EQ(stamps(board).size(), placed.size());
+  // Left and right of the way the same: the path bends towards each sample.
+  leaveStroke(board.shared);
+  board.move({{30.0f, 10.0f}});
+  for (const Stamp& stamp : stamps(board)) {
+    EXPECT_LE(stamp.y, 10.0f);
+    EXPECT_GE(stamp.y, 0.0f);
+  }
+}
+
+TEST(Prediction, EveryStateOfTheLiveStrokeIsPredictedFromOnce) {
+  Board board;
+  EXPECT_FALSE(board.move({{30.0f, 0.0f}}));  // no stroke yet
+  EXPECT_THAT(board.takePosts(), IsEmpty());
+  leaveStroke(board.shared);
+  EXPECT_TRUE(board.move({{30.0f, 0.0f}}));
+  const std::vector<float> once = board.takeFloats();
+  EXPECT_FALSE(board.shared.mHasLastStroke);
+  EXPECT_FALSE(board.move({{30.0f, 0.0f}}));
+  EXPECT_THAT(board.takeBatches(), IsEmpty());
+  // Any other event uses the state up and draws nothing.
+  leaveStroke(board.shared);
+  board.takePosts();
+  EXPECT_FALSE(board.up({30.0f, 0.0f}));
+  EXPECT_THAT(board.takePosts(), ElementsAre("SetRect", "Batch", "Render", "DeleteBatch"));
+  EXPECT_THAT(stamps(board), IsEmpty());
+  EXPECT_FALSE(board.shared.mHasLastStroke);
+  // Nothing is carried from one to the next.
+  leaveStroke(board.shared);
+  board.move({{77.7f, 12.0f}});
+  board.takeBatches();
+  leaveStroke(board.shared);
+  board.move({{30.0f, 0.0f}});
+  EXPECT_EQ(board.takeFloats(), once);
+}
+
+TEST(Prediction, TheRimFollowsTheView) {
+  Board board;
+  board.canvas.setMatrix(viewOf(2.0f));
+  leaveStroke(board.shared);
+  board.move({{30.0f, 0.0f}});
+  EXPECT_NEAR(stamps(board)[0].halfWidth, 2.25f, 1e-5f);  // half a pixel is a quarter of a unit
+}
+
+// A live stroke, with predictions between its events or without.
+std::vector<float> liveFloats(bool predicts, std::vector<float>* predicted) {
+  BoardOptions options;
+  options.size = 6.0f;
+  DrawingBoard board(options);
+  Pencil2PredictionDrawableGL prediction(&board.shared, &board.data);
+  prediction.SetCanvas(&board.canvas);
+  std::vector<float> live;
+  const auto collect = [&board](std::vector<float>* floats) {
+    for (const QeltDesktop::Batch& batch : board.takeBatches()) {
+      if (floats != nullptr) {
+        floats->insert(floats->end(), batch.buffers.front().begin(), batch.buffers.front().end());
+      }
+    }
+  };
+  const auto predict = [&](float x, float y) {
+    collect(&live);
+    if (!predicts) return;
+    const MotionEvent event = motionEvent(Qelt::kActionMove, {{x, y}, {x + 9.0f, y + 1.0f}},
+                                          Qelt::kToolStylus, Qelt::kSourceStylus);
+    RectF rect;
+    EXPECT_TRUE(prediction.Draw(&event, &rect));
+    collect(predicted);
+  };
+  board.down({10.0f, 10.0f});
+  board.move({{22.0f, 12.0f, 0.7f, 0.2f, 0.3f}, {30.0f, 15.0f, 0.8f, 0.77f, 0.4f}});
+  predict(40.0f, 20.0f);
+  board.move({{43.0f, 22.0f, 0.6f, 0.78f, 0.4f}});
+  predict(50.0f, 30.0f);
+  board.up({47.0f, 30.0f});
+  collect(&live);
+  board.queue.finish();
+  return live;
+}
+
+TEST(Prediction, ContinuesTheLiveStrokeAndLeavesItAlone) {
+  std::vector<float> predicted;
+  const std::vector<float> alone = liveFloats(false, nullptr);
+  EXPECT_EQ(liveFloats(true, &predicted), alone);
+
+  BoardOptions options;
+  options.size = 6.0f;
+  DrawingBoard board(options);
+  board.down({10.0f, 10.0f});
+  board.move({{22.0f, 12.0f, 0.7f, 0.2f, 0.3f}, {30.0f, 15.0f, 0.8f, 0.77f, 0.4f}});
+  const Stamp last = board.takeStamps().back();
+  const Stamp first = stampsOf(predicted, 11).front();
+  EXPECT_EQ(first.tile, (last.tile + 1) % 3);
+  EXPECT_NEAR(first.alpha, 2.0f * last.alpha, 1e-5f);  // by 3 instead of by 6
+  // The width is the segment's target, which the last stamp has all but reached.
+  EXPECT_NEAR(first.halfWidth, last.halfWidth, 0.1f);
+  EXPECT_THAT(first, StampNear(last.x, last.y, 1.02f));
+}
+
+TEST(Prediction, RefusesWhatIsMissingAndStartsNowhereFromARecordOutOfBounds) {
+  Board board;
+  const MotionEvent event =
+      motionEvent(Qelt::kActionMove, {{30.0f, 0.0f}}, Qelt::kToolStylus, Qelt::kSourceStylus);
+  RectF rect;
+  leaveStroke(board.shared);
+  Error::SetError(0);
+  EXPECT_FALSE(board.drawable->Draw(nullptr, &rect));
+  EXPECT_EQ(Error::GetError(), Error::kInvalidArgument);
+  Error::SetError(0);
+  EXPECT_FALSE(board.drawable->Draw(&event, nullptr));
+  EXPECT_EQ(Error::GetError(), Error::kInvalidArgument);
+  board.drawable->SetCanvas(nullptr);
+  EXPECT_FALSE(board.drawable->Draw(&event, &rect));
+  EXPECT_TRUE(board.shared.mHasLastStroke);
+  EXPECT_THAT(board.takePosts(), IsEmpty());
+  board.drawable->SetCanvas(&board.canvas);
+  Pencil2PredictionDrawableGL orphan(nullptr, nullptr);
+  orphan.SetCanvas(&board.canvas);
+  orphan.SetOpacity(0.5f);
+  EXPECT_FALSE(orphan.Draw(&event, &rect));
+
+  float Qelt::Pencil2Data::*const fields[] = {
+      &Qelt::Pencil2Data::mLastStampX, &Qelt::Pencil2Data::mLastStampY, &Qelt::Pencil2Data::mLastX,
+      &Qelt::Pencil2Data::mLastY,      &Qelt::Pencil2Data::mLastWidth,  &Qelt::Pencil2Data::mLastOrientation,
+      &Qelt::Pencil2Data::mLastAlpha,  &Qelt::Pencil2Data::mTiltBlend};
+  for (const auto field : fields) {
+    for (const float value : {kNaN, kInfinity, -kInfinity}) {
+      leaveStroke(board.shared);
+      board.shared.*field = value;
+      EXPECT_FALSE(board.drawable->Draw(&event, &rect));
+      EXPECT_THAT(stamps(board), IsEmpty());
+    }
+  }
+  // Far away is walked only so far; a count below 0 and a size of 0 do no harm.
+  const LogCapture log;
+  leaveStroke(board.shared);
+  board.shared.mLastStampX = -1e30f;
+  board.shared.mStampCount = -5;
+  EXPECT_TRUE(board.drawable->Draw(&event, &rect));
+  const std::vector<float> far = board.takeFloats();
+  ASSERT_GE(far.size(), 66u);
+  EXPECT_LE(far.size(), 2u * 262144u * 66u);
+  EXPECT_EQ(far[6], 0.0f);  // the first stamp's tile
+  leaveStroke(board.shared);
+  board.settings.size = 0.0f;
+  EXPECT_FALSE(board.drawable->Draw(&event, &rect));
+  EXPECT_THAT(stamps(board), IsEmpty());
+}
+
+struct Picture {
+  std::vector<std::uint8_t> pixels;
+  Stamp stamp;
+};
+
+constexpr int kSide = 420;
+
+// One large predicted stamp.
+Picture predictedStamp(float zoom, float opacity) {
+  BoardOptions options;
+  options.width = kSide;
+  options.height = kSide;
+  Board board(options);
+  board.canvas.setMatrix(viewOf(zoom));
+  leaveStroke(board.shared);
+  board.shared.mLastStampX = board.shared.mLastX = 205.3f / zoom - 1.2f;
+  board.shared.mLastStampY = board.shared.mLastY = 206.7f / zoom;
+  board.shared.mLastWidth = 400.0f / zoom;
+  board.shared.mLastAlpha = 2.4f;
+  board.shared.mLastOrientation = 0.6f;
+  board.shared.mTiltBlend = 0.02f;
+  board.shared.mStampCount = 1;
+  board.drawable->SetOpacity(opacity);
+  board.drawable->SetOpacity(kNaN);  // changes nothing
+  EXPECT_TRUE(board.move({{205.3f / zoom + 0.1f, 206.7f / zoom}}));
+  const std::vector<Stamp> placed = stamps(board);
+  EXPECT_THAT(placed, SizeIs(1));
+  return {board.layer->readPixels(), placed.at(0)};
+}
+
+StampPicture expectedOf(const Picture& picture, float zoom) {
+  StampPicture expected{.stamp = picture.stamp};
+  expected.zoomX = expected.zoomY = zoom;
+  expected.startX = 3.3f * zoom;
+  expected.startY = 2.7f * zoom;
+  expected.grainMask = true;
+  expected.ramp = true;
+  return expected;
+}
+
+// Kept: the grain of a prediction repeats every 150 pixels, whatever the zoom.
+TEST(PredictionPicture, GrainHasOneSizeOnScreen) {
+  for (const float zoom : {1.0f, 2.0f}) {
+    const Picture picture = predictedStamp(zoom, 1.0f);
+    StampPicture expected = expectedOf(picture, zoom);
+    EXPECT_LT(expected.shareOff(picture.pixels, kSide, kSide, 0.5f), 0.02) << zoom;
+    expected.grainX = expected.grainY = 75.0f * zoom;  // the live stroke's
+    EXPECT_GT(expected.shareOff(picture.pixels, kSide, kSide, 0.4f), zoom == 1.0f ? 0.5 : -1.0);
+    expected.grainX = expected.grainY = 150.0f * zoom;
+    EXPECT_GT(expected.shareOff(picture.pixels, kSide, kSide, 0.4f), zoom == 2.0f ? 0.5 : -1.0);
+  }
+}
+
+TEST(PredictionPicture, OpacityFadesEveryFragmentInProportion) {
+  const Picture full = predictedStamp(1.0f, 1.0f);
+  const Picture half = predictedStamp(1.0f, 0.5f);
+  int drawn = 0;
+  for (std::size_t i = 3; i < full.pixels.size(); i += 4) {
+    ASSERT_NEAR(half.pixels[i], full.pixels[i] * 0.5f, 1.0f) << i;
+    drawn += full.pixels[i] > 40 ? 1 : 0;
+  }
+  EXPECT_GT(drawn, 20000);
+}
+
+// --- The getter ------------------------------------------------------------------------------------------
+
+class PredictionGetter : public testing::Test {
+ protected:
+  QeltDesktop::PenDataManager mData{nullptr};
+  Qelt::Pencil2 mPen;
+};
+
+TEST_F(PredictionGetter, AnswersForVersionEightAlone) {
+  mPen.setPenDataManager(&mData);
+  mPen.setVersion(8);
+  Qelt::IPenPredictionDrawableGL* made = mPen.GetPredictionStrokeDrawableGL();
+  EXPECT_NE(dynamic_cast<Pencil2PredictionDrawableGL*>(made), nullptr);
+  for (const auto& [version, stroke] : std::vector<std::pair<int, int>>{{7, 7}, {6, 6}, {0, 1}, {9, 1}}) {
+    mPen.setVersion(version);
+    LogCapture log;
+    EXPECT_EQ(mPen.GetPredictionStrokeDrawableGL(), nullptr);
+    const std::vector<LogLine> lines = log.take();
+    ASSERT_THAT(lines, SizeIs(2));
+    // Kept: the two numbers stand the wrong way round.
+    EXPECT_EQ(lines[0].text,
+              "virtual Qelt::IPenPredictionDrawableGL *Qelt::Pencil2::GetPredictionStrokeDrawableGL() - "
+              "Stroke drawble version (8) does not match prediction drawable(" +
+                  std::to_string(stroke) + ").");
+    EXPECT_EQ(lines[1].text,
+              "Please, update prediction drawable to last stroke drawable and update "
+              "PEN_PREDICTION_CURRENT_VERSION");
+    for (const LogLine& line : lines) {
+      EXPECT_EQ(line.priority, 6);
+      EXPECT_EQ(line.tag, "qel_log");
+    }
+  }
+  mPen.setVersion(8);
+  EXPECT_EQ(mPen.GetPredictionStrokeDrawableGL(), made);  // it was not deleted meanwhile
+}
+
+// Kept: the getter stores the version as if it had made a stroke drawable of it.
+TEST_F(PredictionGetter, MakesTheStrokeGetterKeepADrawableOfAnotherVersion) {
+  mPen.setPenDataManager(&mData);
+  mPen.setVersion(1);
+  Qelt::PenStrokeDrawableGL* first = mPen.GetStrokeDrawableGL();
+  mPen.setVersion(8);
+  mPen.GetPredictionStrokeDrawableGL();
+  EXPECT_EQ(mPen.GetStrokeDrawableGL(), first);
+}
+
+}  // namespace
+}  // namespace QeltTests
