@@ -1,0 +1,124 @@
+#include "golden/Golden.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <charconv>
+#include <cmath>
+#include <cstdlib>
+#include <fstream>
+#include <iterator>
+#include <sstream>
+
+namespace QeltTests {
+
+namespace {
+
+bool isNear(const std::string& word, const std::string& golden) {
+  if (word == golden) return true;
+  double value = 0.0, wanted = 0.0;
+  const auto read = [](const std::string& text, double& number) {
+    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
+    return error == std::errc() && end == text.data() + text.size();
+  };
+  if (!read(word, value) || !read(golden, wanted)) return false;
+  return std::abs(value - wanted) <= 2e-5 * std::max(1.0, std::abs(wanted));
+}
+
+std::vector<std::string> wordsOf(const std::string& line) {
+  std::istringstream words(line);
+  return {std::istream_iterator<std::string>(words), {}};
+}
+
+bool isNearLine(const std::string& line, const std::string& golden) {
+  const std::vector<std::string> words = wordsOf(line), wanted = wordsOf(golden);
+  return std::equal(words.begin(), words.end(), wanted.begin(), wanted.end(), isNear);
+}
+
+GreyPicture readPgm(const std::string& path) {
+  GreyPicture picture;
+  std::ifstream file(path, std::ios::binary);
+  std::string magic;
+  int most = 0;
+  file >> magic >> picture.width >> picture.height >> most;
+  file.get();
+  picture.pixels.assign(std::istreambuf_iterator<char>(file), {});
+  if (magic != "P5" || most != 255) picture = {};
+  return picture;
+}
+
+void writePgm(const std::string& path, const GreyPicture& picture) {
+  std::ofstream file(path, std::ios::binary);
+  file << "P5\n" << picture.width << " " << picture.height << "\n255\n";
+  file.write(reinterpret_cast<const char*>(picture.pixels.data()),
+             static_cast<std::streamsize>(picture.pixels.size()));
+}
+
+}  // namespace
+
+bool recordsGolden() {
+  return std::getenv("QELT_RECORD_GOLDEN") != nullptr;
+}
+
+std::string goldenPath(const std::string& file) {
+  return QELT_SOURCE_DIR "/tests/golden/" + file;
+}
+
+void expectGoldenTrace(const Trace& trace, const std::string& file) {
+  if (recordsGolden()) {
+    std::ofstream out(goldenPath(file));
+    for (const std::string& line : trace) out << line << "\n";
+    return;
+  }
+  std::ifstream in(goldenPath(file));
+  ASSERT_TRUE(in) << file;
+  Trace golden;
+  for (std::string line; std::getline(in, line);) golden.push_back(line);
+  int shown = 0;
+  for (std::size_t i = 0; i < std::min(trace.size(), golden.size()) && shown < 5; ++i) {
+    if (isNearLine(trace[i], golden[i])) continue;
+    ++shown;
+    ADD_FAILURE() << file << ":" << i + 1 << "\n  drawn  " << trace[i] << "\n  golden " << golden[i];
+  }
+  EXPECT_EQ(trace.size(), golden.size()) << file;
+}
+
+Difference differenceOf(const GreyPicture& a, const GreyPicture& b) {
+  double inked = 0.0, sum = 0.0, far = 0.0, inkOfA = 0.0, inkOfB = 0.0;
+  for (std::size_t i = 0; i < std::min(a.pixels.size(), b.pixels.size()); ++i) {
+    if (a.pixels[i] == 255 && b.pixels[i] == 255) continue;
+    const int off = std::abs(a.pixels[i] - b.pixels[i]);
+    inked += 1.0;
+    sum += off;
+    far += off > 40 ? 1.0 : 0.0;
+    inkOfA += 255 - a.pixels[i];
+    inkOfB += 255 - b.pixels[i];
+  }
+  if (inked == 0.0) return {0.0, 0.0, 0.0};
+  return {sum / inked, std::abs(inkOfA - inkOfB) / std::max(inkOfA, inkOfB), far / inked};
+}
+
+void expectGoldenPicture(const GreyPicture& picture, const std::string& file) {
+  if (recordsGolden()) {
+    writePgm(goldenPath(file), picture);
+    return;
+  }
+  const GreyPicture golden = readPgm(goldenPath(file));
+  ASSERT_EQ(picture.width, golden.width) << file;
+  ASSERT_EQ(picture.height, golden.height) << file;
+  ASSERT_EQ(picture.pixels.size(), golden.pixels.size()) << file;
+  const Difference difference = differenceOf(picture, golden);
+  testing::Test::RecordProperty("mean", std::to_string(difference.mean));
+  testing::Test::RecordProperty("ink", std::to_string(difference.ink));
+  testing::Test::RecordProperty("farOff", std::to_string(difference.farOff));
+  EXPECT_LE(difference.mean, 4.0) << file;
+  EXPECT_LE(difference.ink, 0.02) << file;
+  EXPECT_LE(difference.farOff, 0.01) << file;
+  if (testing::Test::HasFailure()) {
+    const std::string drawn = testing::TempDir() + file;
+    writePgm(drawn, picture);
+    ADD_FAILURE() << "what was drawn lies in " << drawn;
+  }
+}
+
+}  // namespace QeltTests
