@@ -111,8 +111,8 @@ void PagePlayer::playRecorded(std::size_t index, PlayObserver& observer) {
   if (live && mOutline == nullptr) return;
   const Trace& trace = mPage.traces[index];
   const auto play = [&](DrawableKind drawable, const char* operation, const auto& draw) {
-    // The pen corrects the event it is given: each drawable gets its own.
-    const Qelt::MotionEvent event = recordedEvent(trace, pointerOf(index));
+    // The pen corrects the event it is given: each drawable gets its own, and none is a constant.
+    Qelt::MotionEvent event = recordedEvent(trace, pointerOf(index));
     observer.call({drawable, index, operation, event.GetAction()},
                   [&](Qelt::RectF* rect) { return draw(&event, rect); });
   };

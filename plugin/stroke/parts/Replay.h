@@ -146,7 +146,7 @@ bool replay(Source source, Pen& pen, RectF* rect, Smoothing smoothing, float str
     if (smoothing == Smoothing::Straight && isFinite(next.at)) rect->MakeRect(&next.at);
   }
 
-  const MotionEvent up = source.upEvent(cleaner);
+  MotionEvent up = source.upEvent(cleaner);  // not const: the end writes its corrections into it
   RectF endRect;
   if (pen.endPen(&up, &endRect, smoothing)) rect->Union(endRect);
   if (smoothing == Smoothing::Straight) rect->IncreaseRect(straightGrowth);
