@@ -20,8 +20,8 @@ class PatternTextures {
   // bitmaps' debug names.
   void build(IGLMsgQueue* queue, int width, int height, const char* owner);
 
-  // Uploads the pixels, the grain's top left width x height of them. False when memory ran out: the upload is
-  // left where it is, and `ready` as it was.
+  // Uploads the pixels; of the grain the first width x height, in rows of `width`. False when memory ran out:
+  // the upload is left where it is, and `ready` as it was.
   bool upload(int width, int height, PointSource points);
 
   // Kept: the fields go on holding the released bitmaps, so that a later `build` creates nothing. From then
