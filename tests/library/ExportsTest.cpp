@@ -27,12 +27,6 @@ const std::vector<std::string> kPromised = {
     "Qelt::Pencil2PreviewShader::szFragmentShader",
     "Qelt::Pencil2PredictionShader::szVertexShader",
     "Qelt::Pencil2PredictionShader::szFragmentShader",
-    "Qelt::Pencil2OutlineShader::szVertexShader",
-    "Qelt::Pencil2OutlineShader::szFragmentShader",
-    "Qelt::Pencil2PreviewShader::szVertexShader",
-    "Qelt::Pencil2PreviewShader::szFragmentShader",
-    "Qelt::Pencil2PredictionShader::szVertexShader",
-    "Qelt::Pencil2PredictionShader::szFragmentShader",
 
     "Qelt::Matrix3<float>::Matrix3()",
     "Qelt::Matrix3<float>::Matrix3(float const&)",
