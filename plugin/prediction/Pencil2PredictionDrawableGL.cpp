@@ -90,7 +90,6 @@ bool Pencil2PredictionDrawableGL::movePen(const MotionEvent& event, RectF* rect)
 bool Pencil2PredictionDrawableGL::drawLine(PointF at, bool last, RectF* rect) {
   if (!isFinite(at)) return false;
   const float length = last ? mPath.close(at, Smoothing::Curve) : mPath.extend(at, Smoothing::Curve);
-  if (last) mPath.setMid(at);
   mPath.setLast(at);
 
   using Run = StampRun<Version>;

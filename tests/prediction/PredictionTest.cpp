@@ -8,12 +8,14 @@
 #include <vector>
 
 #include "base/Error.h"
+#include "desktop/graphics/PenCanvas.h"
 #include "desktop/pencommon/PenDataManager.h"
 #include "engine/MotionEvent.h"
 #include "pen/Pencil2.h"
 #include "pencommon/PenPredictionDrawableGL.h"
 #include "prediction/Pencil2PredictionDrawableGL.h"
 #include "stroke/DrawingBoard.h"
+#include "stroke/Pencil2StrokeDrawableGLV1.h"
 #include "support/DrawableBoard.h"
 #include "support/LogCapture.h"
 #include "support/StampPicture.h"
@@ -312,7 +314,9 @@ TEST_F(PredictionGetter, AnswersForVersionEightAlone) {
   mPen.setPenDataManager(&mData);
   mPen.setVersion(8);
   Qelt::IPenPredictionDrawableGL* made = mPen.GetPredictionStrokeDrawableGL();
-  EXPECT_NE(dynamic_cast<Pencil2PredictionDrawableGL*>(made), nullptr);
+  ASSERT_NE(dynamic_cast<Pencil2PredictionDrawableGL*>(made), nullptr);
+  QeltDesktop::PenCanvas canvas(nullptr, nullptr);
+  made->SetCanvas(&canvas);
   for (const auto& [version, stroke] : std::vector<std::pair<int, int>>{{7, 7}, {6, 6}, {0, 1}, {9, 1}}) {
     mPen.setVersion(version);
     LogCapture log;
@@ -333,17 +337,20 @@ TEST_F(PredictionGetter, AnswersForVersionEightAlone) {
     }
   }
   mPen.setVersion(8);
-  EXPECT_EQ(mPen.GetPredictionStrokeDrawableGL(), made);  // it was not deleted meanwhile
+  made = mPen.GetPredictionStrokeDrawableGL();
+  ASSERT_NE(made, nullptr);
+  EXPECT_EQ(made->GetCanvas(), &canvas);  // it was not made anew
+  made->SetCanvas(nullptr);
 }
 
 // Kept: the getter stores the version as if it had made a stroke drawable of it.
 TEST_F(PredictionGetter, MakesTheStrokeGetterKeepADrawableOfAnotherVersion) {
   mPen.setPenDataManager(&mData);
   mPen.setVersion(1);
-  Qelt::PenStrokeDrawableGL* first = mPen.GetStrokeDrawableGL();
+  mPen.GetStrokeDrawableGL();
   mPen.setVersion(8);
   mPen.GetPredictionStrokeDrawableGL();
-  EXPECT_EQ(mPen.GetStrokeDrawableGL(), first);
+  EXPECT_NE(dynamic_cast<Qelt::Pencil2StrokeDrawableGLV1*>(mPen.GetStrokeDrawableGL()), nullptr);
 }
 
 }  // namespace
