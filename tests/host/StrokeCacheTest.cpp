@@ -1,5 +1,6 @@
 #include <gtest/gtest.h>
 
+#include <limits>
 #include <memory>
 #include <vector>
 
@@ -86,6 +87,9 @@ TEST_F(StrokeCache, PointsRecordTheScaleOfTheViewThatTheyWereStoredIn) {
   EXPECT_FALSE(points->hasSameInverseScale({0.25f, 0.25f}));
   canvas.setMatrix(Qelt::Matrix3<float>());
   EXPECT_TRUE(points->hasSameInverseScale({0.25f, 0.5f}));
+  // Of a view that squeezes everything into a point.
+  constexpr float kInfinity = std::numeric_limits<float>::infinity();
+  EXPECT_FALSE(points->hasSameInverseScale({kInfinity, kInfinity}));
   points->Unref();
 }
 

@@ -6,9 +6,10 @@ namespace Qelt {
 
 namespace {
 
-// Two ways of computing one scale may differ in the last bits; no view changes by so little.
+// Two ways of computing one scale may differ in the last bits; no view changes by so little. An infinite
+// scale is like itself alone: the tolerance must not be reached, or it would take in every other.
 bool isSameScale(float a, float b) {
-  return std::abs(a - b) <= 1e-6f * std::abs(b);
+  return a == b || std::abs(a - b) < 1e-6f * std::abs(b);
 }
 
 }  // namespace
