@@ -51,13 +51,16 @@ TEST_P(Queue, RunsTasksInPostingOrder) {
 TEST_P(Queue, TasksMayPostTasks) {
   RenderQueue queue(GetParam(), RenderQueue::GL::None);
   std::string order;
-  postCall(queue, [&] {
-    order += 'a';
-    postCall(queue, [&] { order += 'c'; });
-    queue.finish();  // returns at once instead of waiting for itself
-    EXPECT_TRUE(queue.run([&] { order += '!'; }));
+  // Both from the render thread: neither can run before both are posted.
+  queue.run([&] {
+    postCall(queue, [&] {
+      order += 'a';
+      postCall(queue, [&] { order += 'c'; });
+      queue.finish();  // returns at once instead of waiting for itself
+      EXPECT_TRUE(queue.run([&] { order += '!'; }));
+    });
+    postCall(queue, [&] { order += 'b'; });
   });
-  postCall(queue, [&] { order += 'b'; });
   queue.finish();
   queue.finish();
   EXPECT_EQ(order, "a!bc");

@@ -30,9 +30,8 @@ bool comesAndGoes() {
   return true;
 }
 
-// In a process of its own: other tests keep the library loaded.
+// In a process of its own, and first, as death tests are: other tests keep the library loaded.
 TEST(LoadDeathTest, EveryNameResolvesAndTheLibraryCanBeUnloadedAndLoadedAgain) {
-  testing::GTEST_FLAG(death_test_style) = "threadsafe";
   EXPECT_EXIT(
       {
         bool well = true;
