@@ -5,6 +5,9 @@
 
 #include "Floor.h"
 #include "base/Vector.h"
+#include "outline/Pencil2OutlineDrawableRTV1.h"
+#include "prediction/Pencil2PredictionDrawableRT.h"
+#include "preview/Pencil2PreviewDrawableRT.h"
 #include "render/Pencil2StrokeDrawableRTV1.h"
 #include "render/Pencil2StrokeDrawableRTV2.h"
 #include "render/Pencil2StrokeDrawableRTV3.h"
@@ -67,6 +70,32 @@ void addPoint(benchmark::State& state) {
 BENCHMARK(addPoint<Qelt::Pencil2StrokeDrawableRTV1>)->Name("b/AddPoint_RTV1");
 BENCHMARK(addPoint<Qelt::Pencil2StrokeDrawableRTV2>)->Name("b/AddPoint_RTV2");
 BENCHMARK(addPoint<Qelt::Pencil2StrokeDrawableRTV3>)->Name("b/AddPoint_RTV3");
+BENCHMARK(addPoint<Qelt::Pencil2PreviewDrawableRT>)->Name("b/AddPoint_preview");
+BENCHMARK(addPoint<Qelt::Pencil2PredictionDrawableRT>)->Name("b/AddPoint_prediction");
+
+// The outline's stamps go into two streams of 42 floats each.
+void addOutlinePoint(benchmark::State& state) {
+  Qelt::Pencil2OutlineDrawableRTV1 renderer(nullptr);
+  std::vector<float> inner, outer;
+  inner.reserve(kStampsPerBatch * 42);
+  outer.reserve(kStampsPerBatch * 42);
+  renderer.SetBuffer(&inner, &outer);
+  renderer.SetOutlineSize(3.0f);
+  Inputs in;
+  for (auto _ : state) {
+    inner.clear();
+    outer.clear();
+    Qelt::Pencil2OutlineDrawableRTV1::Appender stamps(renderer, kStampsPerBatch);
+    for (int i = 0; i < kStampsPerBatch; ++i) {
+      benchmark::DoNotOptimize(in);
+      stamps.AddPoint(in.point, in.size, 0.2f);
+    }
+    stamps.flush();
+    benchmark::ClobberMemory();
+  }
+  countStamps(state);
+}
+BENCHMARK(addOutlinePoint)->Name("b/AddPoint_outline");
 
 // One call a stamp, each appending to the batch at once.
 void addPointOneByOne(benchmark::State& state) {
