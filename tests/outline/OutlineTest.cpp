@@ -202,7 +202,7 @@ TYPED_TEST(OutlineVersions, ARefusingQueueLeavesNothingBehind) {
   EXPECT_FALSE(board.takeStamps().empty());
 }
 
-// --- What tells the versions apart -------------------------------------------------------------------------
+// --- What tells the versions apart ---
 
 TEST(Outline, VersionFourDividesEachSegmentAndRampsToItsTarget) {
   Outliner<V4> board(outlinePaper(4.0f, false));
@@ -302,7 +302,7 @@ TEST(Outline, ScalesComeFromTheScreen) {
   EXPECT_EQ(board.drawable->getPixelScale(), 2.0f);
 }
 
-// --- The getter --------------------------------------------------------------------------------------------
+// --- The getter ---
 
 TEST(OutlineGetter, FollowsTheVersionTable) {
   QeltDesktop::PenDataManager data(nullptr);

@@ -302,7 +302,7 @@ TEST(PredictionPicture, OpacityFadesEveryFragmentInProportion) {
   EXPECT_GT(drawn, 20000);
 }
 
-// --- The getter ------------------------------------------------------------------------------------------
+// --- The getter ---
 
 class PredictionGetter : public testing::Test {
  protected:

@@ -232,8 +232,7 @@ TEST_P(Draw, FinishesWhatADyingDrawableHandedOver) {
 INSTANTIATE_TEST_SUITE_P(RenderVersions, Draw, testing::Values(1, 7, 8),
                          [](const auto& version) { return "Version" + std::to_string(version.param); });
 
-// --- The render drawable by itself
-// ------------------------------------------------------------------------------
+// --- The render drawable by itself ---
 
 class RenderDrawable : public testing::Test {
  protected:

@@ -29,8 +29,7 @@ using QeltDesktop::RenderQueue;
 using testing::IsEmpty;
 using testing::SizeIs;
 
-// --- The registry
-// -----------------------------------------------------------------------------------------------
+// --- The registry ---
 
 struct Alive {
   Alive() { ++count; }
@@ -111,8 +110,7 @@ TEST(ShaderRegistryTest, KeepsNothingOfAShaderThatCouldNotBeMade) {
   EXPECT_EQ(Alive::count, 0);
 }
 
-// --- Bindings
-// ---------------------------------------------------------------------------------------------------
+// --- Bindings ---
 
 // A program with one uniform of a given type.
 class FakeProgram : public OpenGLShaderProgram, public IParameterBinding {
@@ -191,8 +189,7 @@ TEST(ParameterBindingTest, RefusesValuesWhileUnbound) {
   }
 }
 
-// --- Real programs
-// ----------------------------------------------------------------------------------------------
+// --- Real programs ---
 
 // A stamp shader whose colour has no alpha.
 constexpr char kVertex[] = R"(#version 300 es

@@ -27,8 +27,7 @@ using namespace Qelt;
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-// --- Tasks
-// ------------------------------------------------------------------------------------------------------
+// --- Tasks ---
 
 struct Base {
   virtual ~Base() = default;
@@ -110,8 +109,7 @@ TEST(PostingTest, DestroysWhatTheQueueRefusesAtOnceAndOnce) {
   EXPECT_FALSE(postTask(&queue, nullptr));  // no memory for the task
 }
 
-// --- Guards
-// -----------------------------------------------------------------------------------------------------
+// --- Guards ---
 
 class Guards : public testing::Test {
  protected:

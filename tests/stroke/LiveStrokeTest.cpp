@@ -214,8 +214,7 @@ TEST_P(LiveStroke, RefusesNullArgumentsAndStaysSilentWithoutACanvas) {
   EXPECT_THAT(board.takePosts(), IsEmpty());
 }
 
-// --- Bad input
-// -------------------------------------------------------------------------------------------------
+// --- Bad input ---
 
 TEST_P(LiveStroke, DropsPointsThatAreNotFiniteAsIfTheyHadNotBeen) {
   std::vector<Stamp> clean;
@@ -300,8 +299,7 @@ TEST_P(LiveStroke, EndsOnHugeCoordinates) {
   EXPECT_EQ(stamps.size(), fresh.takeStamps().size());
 }
 
-// --- A queue that refuses, memory that runs out
-// --------------------------------------------------------------
+// --- A queue that refuses, memory that runs out ---
 
 // Draws the stroke with the accepting rule given, then takes the rule away and draws a second stroke.
 template <typename Accept>
@@ -401,8 +399,7 @@ TEST_P(LiveStroke, SurvivesEachAllocationFailingAlone) {
 INSTANTIATE_TEST_SUITE_P(Versions, LiveStroke, testing::ValuesIn(allVersions()),
                          [](const auto& version) { return "Version" + std::to_string(version.param); });
 
-// --- What version 8 alone has
-// --------------------------------------------------------------------------------
+// --- What version 8 alone has ---
 
 // At zoom 4 a device pixel is a quarter of a stroke unit: the margin of half a pixel is 0.125.
 TEST(ViewScaleTest, MarginsOfVersion8AreDevicePixels) {

@@ -74,8 +74,7 @@ std::string text(const Qelt::RectF& rect) {
 
 class Redraw : public testing::TestWithParam<int> {};
 
-// --- The order of posts
-// -----------------------------------------------------------------------------------------
+// --- The order of posts ---
 
 TEST_P(Redraw, OfAnEventPostsInOrder) {
   for (const bool curve : {true, false}) {
@@ -130,8 +129,7 @@ TEST_P(Redraw, OfAStrokeWithAnEntryPostsInOrderOnMissAndHit) {
   }
 }
 
-// --- The cache
-// --------------------------------------------------------------------------------------------------
+// --- The cache ---
 
 TEST_P(Redraw, FromTheCacheGivesBitForBitWhatComputingGave) {
   for (const bool curve : {true, false}) {
@@ -247,8 +245,7 @@ TEST_P(Redraw, GivesEveryReferenceAndUseBack) {
   EXPECT_EQ(liveAllocations(), before);
 }
 
-// --- Strokes of few points
-// --------------------------------------------------------------------------------------
+// --- Strokes of few points ---
 
 // No segment: the end places the one stamp. The rectangle begins as the point, takes in what the end covered
 // (5 around, more than the stamp's reach but for the wider stamps of versions 4 to 7: 5.5) and grows by 5.
@@ -301,8 +298,7 @@ TEST_P(Redraw, TakesAnglesThatAreNotStoredForZero) {
   EXPECT_EQ(batchOf(board).buffers, zeros.buffers);
 }
 
-// --- Arguments
-// --------------------------------------------------------------------------------------------------
+// --- Arguments ---
 
 TEST_P(Redraw, RefusesNullArgumentsAndStaysSilentWithoutACanvas) {
   DrawingBoard board(paper(GetParam()));
@@ -342,8 +338,7 @@ TEST_P(Redraw, OfAListDoesNothingAndAnswersTrue) {
   EXPECT_EQ(rect.right, 0.0f);
 }
 
-// --- What goes back into the caller's data
-// ----------------------------------------------------------------------
+// --- What goes back into the caller's data ---
 
 TEST_P(Redraw, CapsTiltsInTheEventButNotInTheStoredStroke) {
   const float cap = GetParam() == 5 ? 1.0f : 0.79f;
