@@ -85,7 +85,7 @@ class StrokeSource {
 
   void prepare(const SampleCleaner&) {}
 
-  // Kept: with the pressure as stored, whatever the tool.
+  // With the pressure as stored, whatever the tool; what ends a stroke substitutes it.
   MotionEvent upEvent(const SampleCleaner& cleaner) const {
     const int last = count() - 1;
     const PointF at = point(last);
