@@ -90,8 +90,9 @@ class Program : public testing::Test {
 
   Ran run(const std::string& arguments) const {
     // The GL driver leaves a few caches behind as it is unloaded; the threaded tests look for leaks.
-    const std::string command = "ASAN_OPTIONS=detect_leaks=0 '" QELT_SKETCH_PATH "' " + arguments + " >'" +
-                                path("stdout").string() + "' 2>'" + path("stderr").string() + "'";
+    const std::string command = "ASAN_OPTIONS=detect_leaks=0 " QELT_EMULATOR " '" QELT_SKETCH_PATH "' " +
+                                arguments + " >'" + path("stdout").string() + "' 2>'" +
+                                path("stderr").string() + "'";
     const int status = std::system(command.c_str());
     return {WIFEXITED(status) ? WEXITSTATUS(status) : -1, contentsOf(path("stdout")),
             contentsOf(path("stderr"))};
