@@ -31,7 +31,7 @@ TEST_P(AllocationSweep, LeavesThePenAsGoodAsNew) {
   SweepGround ground(picture);
   int total = 0;
   for (const int version : allVersions()) {
-    if (version != 8 && !scenario.everyVersion) continue;
+    if (!isSwept(scenario, version)) continue;
     for (const bool andAllAfter : {false, true}) {
       int failures = 0;
       for (long number = 1;; ++number) {

@@ -71,7 +71,7 @@ TEST_P(PostSweep, LeavesThePenAsGoodAsNew) {
   SweepGround ground(picture);
   int total = 0;
   for (const int version : allVersions()) {
-    if (version != 8 && !scenario.everyVersion) continue;
+    if (!isSwept(scenario, version)) continue;
     for (const bool andAllAfter : {false, true}) {
       int runs = 0;
       for (long number = 1;; ++number) {

@@ -128,9 +128,7 @@ Stage::Stage(QeltDesktop::RenderQueue& queue, QeltDesktop::CanvasLayer* layer, i
 Stage::~Stage() {
   mPen.reset();
   mQueue.finish();
-  for (const auto& stroke : mPage) {
-    PenStrokeDataManager::GetInstance()->DropStrokeData(stroke->GetRuntimeHandle());
-  }
+  turnPage();
 }
 
 const QeltDesktop::PluginLibrary& Stage::library() {
@@ -305,6 +303,13 @@ void Stage::prepareAll() {
            mVersion == 8 ? mPen->GetPredictionStrokeDrawableGL() : nullptr}) {
     if (drawable != nullptr) drawable->SetCanvas(mCanvas.get());
   }
+}
+
+void Stage::turnPage() {
+  for (const auto& stroke : mPage) {
+    PenStrokeDataManager::GetInstance()->DropStrokeData(stroke->GetRuntimeHandle());
+  }
+  mPage.clear();
 }
 
 void Stage::zoom(float factor) {

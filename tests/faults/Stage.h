@@ -65,6 +65,8 @@ class Stage {
   void predict(bool finishes = true);
   // Every drawable there is, on the canvas, nothing drawn.
   void prepareAll();
+  // Takes all stored strokes away, whatever the render thread still does with their drawings.
+  void turnPage();
   void zoom(float factor);
   void loseAndRestoreContext();
 

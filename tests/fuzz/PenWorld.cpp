@@ -1,0 +1,489 @@
+#include "PenWorld.h"
+
+#include <cmath>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <string_view>
+#include <typeinfo>
+
+#include "base/List.h"
+#include "base/String.h"
+#include "graphics/ISPBitmap.h"
+#include "math/Matrix3.h"
+#include "math/Matrix4.h"
+#include "pencommon/IPenMorphable.h"
+#include "pencommon/PenDrawableRT.h"
+#include "pencommon/PenOutlineDrawableGL.h"
+#include "pencommon/PenPredictionDrawableGL.h"
+#include "pencommon/PenPreviewDrawableGL.h"
+#include "pencommon/PenStrokeDataManager.h"
+#include "pencommon/PenStrokeDrawableGL.h"
+
+namespace QeltTests {
+
+using Qelt::MotionEvent;
+using Qelt::PenStrokeDataManager;
+using Qelt::RectF;
+
+namespace {
+
+// A run must not take long: a segment is allowed a quarter of a million stamps, so an input may ask for few
+// such. Points far out, and pens so fine that every segment is long for them, are counted.
+constexpr int kMostFarPoints = 2;
+constexpr int kMostHeavyCalls = 3;
+constexpr float kFarOut = 2000.0f;  // stroke units
+constexpr float kFinePen = 0.05f;   // stroke units
+constexpr std::size_t kMostFloats = 60'000'000;
+constexpr std::size_t kMostStrokes = 4;
+
+[[noreturn]] void breakOff(const char* what) {
+  std::fprintf(stderr, "a pen broke its word: %s\n", what);
+  std::abort();
+}
+
+// Floats in one stamp of a render drawable.
+std::size_t floatsPerStamp(const Qelt::PenDrawableRT& drawable) {
+  const std::string_view name = typeid(drawable).name();
+  const auto is = [name](std::string_view part) { return name.find(part) != std::string_view::npos; };
+  if (is("OutlineDrawableRT")) return 6 * 7;
+  if (is("StrokeDrawableRTV3") || is("PredictionDrawableRT")) return 6 * 11;
+  return 6 * 9;
+}
+
+// One tile that nothing is drawn into: enough for a render message to run through its batch.
+class BlindLayer final : public Qelt::ISPLayer, public Qelt::ISPBitmap, public Qelt::ISPSubBitmap {
+ public:
+  Qelt::ISPBitmap* GetBitmap() override { return this; }
+  int GetWidth() const override { return 512; }
+  int GetHeight() const override { return 512; }
+  Qelt::ISPTexture* GetTexture() override { return nullptr; }
+  void SetDebugName(const char*) override {}
+  void SetPixels(const void*, int, int) override {}
+  int GetTileCount() const override { return 1; }
+  Qelt::ISPSubBitmap* GetSubBitmap(int) override { return this; }
+  int GetX() const override { return 0; }
+  int GetY() const override { return 0; }
+  const Qelt::Matrix4<float>& GetProjection() const override { return mProjection; }
+  void BeginRender(int) override {}
+  void EndRender(int) override {}
+
+ private:
+  Qelt::Matrix4<float> mProjection;
+};
+
+}  // namespace
+
+class PenWorld::Canvas final : public QeltDesktop::PenCanvas {
+ public:
+  using PenCanvas::PenCanvas;
+  Qelt::ISPLayer* GetLayer() override {
+    if (layer() != nullptr) return PenCanvas::GetLayer();
+    return isBlank ? nullptr : &mBlindLayer;
+  }
+  bool isBlank = false;
+
+ private:
+  BlindLayer mBlindLayer;
+};
+
+// A stored stroke, any of whose arrays may be missing.
+class PenWorld::Stroke final : public Qelt::ObjectStroke {
+ public:
+  int GetPointCount() const override { return count; }
+  const Qelt::PointF* GetPoint() const override { return (missing & 1) != 0 ? nullptr : points.data(); }
+  const std::int64_t* GetTimeStamp() const override { return (missing & 2) != 0 ? nullptr : times.data(); }
+  const float* GetPressure() const override { return (missing & 4) != 0 ? nullptr : pressures.data(); }
+  const float* GetTilt() const override { return (missing & 8) != 0 ? nullptr : tilts.data(); }
+  const float* GetOrientation() const override { return (missing & 16) != 0 ? nullptr : orientations.data(); }
+  int GetToolType() const override { return tool; }
+
+  int count = 0;  // may be below 0, never more than there are points
+  int missing = 0;
+  int tool = 0;
+  std::vector<Qelt::PointF> points;
+  std::vector<std::int64_t> times;
+  std::vector<float> pressures, tilts, orientations;
+};
+
+PenWorld::PenWorld(const QeltDesktop::PluginLibrary& library, QeltDesktop::RenderQueue& queue,
+                   QeltDesktop::CanvasLayer* layer)
+    : mLibrary(library),
+      mQueue(queue),
+      mCanvas(std::make_unique<Canvas>(&queue, layer)),
+      mBlank(std::make_unique<Canvas>(&queue, nullptr)),
+      mData(&queue),
+      mQueueless(nullptr) {
+  mBlank->isBlank = true;
+  mQueue.accept = [this](const Qelt::ITask&) {
+    const bool refused = (mRefusals & 1) != 0;
+    mRefusals >>= 1;
+    return !refused;
+  };
+  QeltDesktop::setBatchObserver([this](const QeltDesktop::Batch& batch) { note(batch); });
+}
+
+PenWorld::~PenWorld() {
+  for (auto& pen : mPens) pen.reset();
+  mQueue.accept = nullptr;
+  // What dying pens could not post, the next one that dies posts for them.
+  std::unique_ptr<Qelt::Pen> last(mLibrary.createPen());
+  if (last != nullptr) last->setPenDataManager(&mData);
+  last.reset();
+  mQueue.finish();
+}
+
+std::uint64_t PenWorld::play(FuzzInput input) {
+  while (!input.isEmpty() && mFloats < kMostFloats) step(input);
+  for (auto& pen : mPens) pen.reset();
+  mQueue.finish();
+  QeltDesktop::setBatchObserver(nullptr);
+  for (const auto& stroke : mStrokes) {
+    PenStrokeDataManager::GetInstance()->DropStrokeData(stroke->GetRuntimeHandle());
+  }
+  return mHash;
+}
+
+void PenWorld::step(FuzzInput& input) {
+  const int which = input.pick(2);
+  std::unique_ptr<Qelt::Pen>& pen = mPens[which];
+  if (pen == nullptr) {
+    pen.reset(mLibrary.createPen());
+    if (pen == nullptr) breakOff("no pen");
+    pen->setPenDataManager(&mData);
+    pen->setVersion(8);
+    mSizes[which] = pen->GetSize();
+  }
+  switch (input.pick(16)) {
+    case 0:
+      pen.reset();
+      break;
+    case 1:
+    case 2:
+      change(input, *pen);
+      mSizes[which] = pen->GetSize();
+      break;
+    case 3:
+      ask(input, *pen);
+      break;
+    case 4:
+    case 5:
+    case 6:
+    case 7:
+      if (mayDraw(*pen)) draw(input, *pen);
+      break;
+    case 8:
+    case 9:
+      if (mayDraw(*pen)) redraw(input, *pen);
+      break;
+    case 10:
+      if (mayDraw(*pen)) outline(input, *pen);
+      break;
+    case 11:
+      if (mayDraw(*pen)) preview(input, *pen);
+      break;
+    case 12:
+      if (mayDraw(*pen)) predict(input, *pen);
+      break;
+    case 13:
+      changeView(input);
+      break;
+    case 14:
+      changeQueue(input);
+      break;
+    default:
+      mQueue.finish();
+      break;
+  }
+}
+
+bool PenWorld::mayDraw(const Qelt::Pen& pen) {
+  const float size = &pen == mPens[0].get() ? mSizes[0] : mSizes[1];
+  return !(size > 0.0f && size < kFinePen) || ++mHeavyCalls <= kMostHeavyCalls;
+}
+
+void PenWorld::change(FuzzInput& input, Qelt::Pen& pen) {
+  switch (input.pick(11)) {
+    case 0:
+      pen.SetSize(input.any());
+      break;
+    case 1:
+      pen.SetSize(0.5f + std::abs(input.usual()));
+      break;
+    case 2:
+      pen.SetColor(input.word());
+      break;
+    case 3:
+      pen.setVersion(input.flag() ? 1 + input.pick(8) : input.word());
+      break;
+    case 4:
+      pen.GetMorphable()->SetCurveEnabled(input.flag());
+      break;
+    case 5:
+      pen.GetMorphable()->SetFixedWidthEnabled(input.flag());
+      pen.GetMorphable()->SetFixedWidth(input.any());
+      break;
+    case 6:
+      pen.SetScreenResolution(input.word(), input.word());
+      break;
+    case 7: {
+      const char text[] = {static_cast<char>(input.byte()), ';', '\0'};
+      const Qelt::String setting(text);
+      pen.SetAdvancedSetting(input.flag() ? &setting : nullptr);
+      break;
+    }
+    case 8:
+      pen.SetParticleDensity(input.word());
+      pen.SetParticleSize(input.any());
+      pen.SetRenderingLevel(input.word());
+      pen.SetEnhancedAntiAlias(input.flag());
+      break;
+    case 9: {
+      Qelt::PenGLDataManager* const choices[] = {&mData, &mQueueless, nullptr};
+      pen.setPenDataManager(choices[input.pick(3)]);
+      break;
+    }
+    default:
+      pen.GetMorphable()->SetCurveEnabled(true);
+      pen.setPenDataManager(&mData);
+      break;
+  }
+}
+
+void PenWorld::ask(FuzzInput& input, Qelt::Pen& pen) {
+  const float numbers[] = {pen.GetSize(), pen.GetMinSize(), pen.GetMaxSize(),
+                           pen.GetMorphable()->GetFixedWidth()};
+  mix(numbers, sizeof numbers);
+  const bool flags[] = {pen.GetPenAttribute(static_cast<Qelt::IPen::PenAttribute>(input.pick(8))),
+                        pen.GetMorphable()->IsCurveEnabled(),
+                        pen.GetMorphable()->IsFixedWidthEnabled(),
+                        pen.GetMsgQueue() != nullptr,
+                        pen.GetTestDrawableGL() != nullptr,
+                        pen.GetWetDryable() != nullptr};
+  mix(flags, sizeof flags);
+  const std::string_view setting = pen.GetAdvancedSetting()->GetText();
+  mix(setting.data(), setting.size());
+  switch (input.pick(5)) {
+    case 0:
+      if (auto* drawable = pen.GetStrokeDrawableGL()) drawable->SetCanvas(pickCanvas(input));
+      break;
+    case 1:
+      if (auto* drawable = pen.GetOutlineDrawableGL()) drawable->SetCanvas(pickCanvas(input));
+      break;
+    case 2:
+      if (auto* drawable = pen.GetPreviewDrawableGL()) drawable->SetCanvas(pickCanvas(input));
+      break;
+    case 3:
+      if (auto* drawable = pen.GetPredictionStrokeDrawableGL()) drawable->SetCanvas(pickCanvas(input));
+      break;
+    default: {
+      Qelt::PointF points[3];
+      float pressures[3];
+      for (auto& point : points) point = {input.any(), input.any()};
+      for (auto& pressure : pressures) pressure = input.any();
+      note(true,
+           pen.GetStrokeRect(points, pressures, nullptr, input.pick(4), input.any(), input.flag(), nullptr));
+      break;
+    }
+  }
+}
+
+Qelt::ISPPenCanvas* PenWorld::pickCanvas(FuzzInput& input) {
+  Qelt::ISPPenCanvas* const choices[] = {mCanvas.get(), mCanvas.get(), mBlank.get(), nullptr};
+  return choices[input.pick(4)];
+}
+
+float PenWorld::coordinate(FuzzInput& input) {
+  const float value = input.any();
+  if (std::isfinite(value) && std::abs(value) > kFarOut && ++mFarPoints > kMostFarPoints) return 10.0f;
+  return value;
+}
+
+MotionEvent PenWorld::event(FuzzInput& input, int mostHistory) {
+  const int shape = input.byte();
+  const int actions[] = {Qelt::kActionDown, Qelt::kActionMove, Qelt::kActionMove, Qelt::kActionUp};
+  const int action = shape < 240 ? actions[shape % 4] : input.word();
+  const int tool = shape % 7 == 6 ? input.word() : shape % 5;
+  const int sources[] = {Qelt::kSourceStylus, Qelt::kSourceTouchScreen, Qelt::kSourceMouse, 0};
+  const Qelt::PointerProperties pointer{0, tool};
+  const int history = input.pick(mostHistory + 1);
+  const auto coords = [&] {
+    return Qelt::PointerCoords{coordinate(input), coordinate(input), input.any(), input.any(), input.any()};
+  };
+  const Qelt::PointerCoords first = coords();
+  MotionEvent made(0, 1, action, 1, &pointer, &first, 0, sources[shape / 4 % 4], 0);
+  for (int i = 0; i < history; ++i) {
+    const Qelt::PointerCoords next = coords();
+    made.AddBatch(i, &next);
+  }
+  return made;
+}
+
+PenWorld::Stroke& PenWorld::stroke(FuzzInput& input) {
+  const int choice = input.byte();
+  if (!mStrokes.empty() && (choice % 2 == 1 || mStrokes.size() == kMostStrokes)) {
+    Stroke& known = *mStrokes[static_cast<std::size_t>(choice / 2) % mStrokes.size()];
+    if (choice % 8 == 7) known.SetRedrawingCacheDirtyFlag();
+    return known;
+  }
+  auto made = std::make_unique<Stroke>();
+  const int points = input.pick(6);
+  for (int i = 0; i < points; ++i) {
+    made->points.push_back({coordinate(input), coordinate(input)});
+    made->pressures.push_back(input.any());
+    made->tilts.push_back(input.any());
+    made->orientations.push_back(input.any());
+    made->times.push_back(i);
+  }
+  made->missing = input.flag() ? 0 : input.byte();
+  made->count = choice == 128 ? -1 : points;
+  made->tool = choice / 8 % 5;
+  if (choice % 4 == 2) PenStrokeDataManager::GetInstance()->CreateStrokeData(made->GetRuntimeHandle());
+  if (choice % 64 == 4) made->SetOriginalRuntimeHandle(input.word());
+  if (choice % 64 == 6 && !mStrokes.empty()) {
+    made->SetOriginalRuntimeHandle(mStrokes.front()->GetRuntimeHandle());
+  }
+  mStrokes.push_back(std::move(made));
+  return *mStrokes.back();
+}
+
+void PenWorld::draw(FuzzInput& input, Qelt::Pen& pen) {
+  Qelt::PenStrokeDrawableGL* const drawable = pen.GetStrokeDrawableGL();
+  if (drawable == nullptr) breakOff("no stroke drawable");
+  if (drawable->GetCanvas() == nullptr && input.flag()) drawable->SetCanvas(mCanvas.get());
+  const MotionEvent made = event(input, 4);
+  const int nulls = input.byte();
+  RectF rect;
+  const bool answer = drawable->Draw(nulls == 255 ? nullptr : &made, nulls == 254 ? nullptr : &rect);
+  note(answer, rect);
+}
+
+void PenWorld::redraw(FuzzInput& input, Qelt::Pen& pen) {
+  Qelt::PenStrokeDrawableGL* const drawable = pen.GetStrokeDrawableGL();
+  if (drawable == nullptr) breakOff("no stroke drawable");
+  if (drawable->GetCanvas() == nullptr && input.flag()) drawable->SetCanvas(mCanvas.get());
+  const int kind = input.byte();
+  RectF rect;
+  RectF* const into = kind >= 252 ? nullptr : &rect;
+  bool answer = false;
+  if (kind % 3 == 0) {
+    const MotionEvent made = event(input, 5);
+    answer = drawable->RedrawPen(kind == 249 ? nullptr : &made, into);
+  } else if (kind % 16 == 1) {
+    const Qelt::List list;
+    answer = drawable->RedrawPen(kind == 241 ? nullptr : &list, into);
+  } else {
+    const Stroke& made = stroke(input);
+    answer = drawable->RedrawPen(kind == 250 ? nullptr : &made, into);
+  }
+  note(answer, rect);
+}
+
+void PenWorld::outline(FuzzInput& input, Qelt::Pen& pen) {
+  Qelt::PenOutlineDrawableGL* const drawable = pen.GetOutlineDrawableGL();
+  if (drawable == nullptr) breakOff("no outline drawable");
+  if (drawable->GetCanvas() == nullptr && input.flag()) drawable->SetCanvas(mCanvas.get());
+  const int kind = input.byte();
+  if (kind % 4 == 0) drawable->SetOutlineSize(input.any());
+  if (kind % 4 == 1) drawable->SetOutlineColor(input.word());
+  RectF rect;
+  RectF* const into = kind >= 252 ? nullptr : &rect;
+  bool answer = false;
+  if (kind % 3 == 0) {
+    const MotionEvent made = event(input, 5);
+    answer = drawable->DrawOutline(kind == 249 ? nullptr : &made, into);
+  } else {
+    const Stroke& made = stroke(input);
+    answer = drawable->DrawOutline(kind == 250 ? nullptr : &made, into);
+  }
+  note(answer, rect);
+}
+
+void PenWorld::preview(FuzzInput& input, Qelt::Pen& pen) {
+  Qelt::PenPreviewDrawableGL* const drawable = pen.GetPreviewDrawableGL();
+  if (drawable == nullptr) breakOff("no preview drawable");
+  if (drawable->GetCanvas() == nullptr && input.flag()) drawable->SetCanvas(mCanvas.get());
+  const int kind = input.byte();
+  const MotionEvent made = event(input, 4);
+  const MotionEvent* const given = kind == 254 ? nullptr : &made;
+  RectF rect;
+  RectF* const into = kind == 255 ? nullptr : &rect;
+  note(kind % 2 == 0 ? drawable->Draw(given, into) : drawable->RedrawPen(given, into), rect);
+}
+
+void PenWorld::predict(FuzzInput& input, Qelt::Pen& pen) {
+  Qelt::IPenPredictionDrawableGL* const drawable = pen.GetPredictionStrokeDrawableGL();
+  if (drawable == nullptr) return;
+  if (drawable->GetCanvas() == nullptr && input.flag()) drawable->SetCanvas(mCanvas.get());
+  const int kind = input.byte();
+  if (kind % 4 == 0) drawable->SetOpacity(input.any());
+  const MotionEvent made = event(input, 3);
+  RectF rect;
+  note(drawable->Draw(kind == 254 ? nullptr : &made, kind == 255 ? nullptr : &rect), rect);
+}
+
+void PenWorld::changeView(FuzzInput& input) {
+  Qelt::Matrix3<float> matrix;
+  switch (input.pick(3)) {
+    case 0:
+      for (std::size_t i = 0; i < 9; ++i) matrix[i] = input.any();
+      break;
+    case 1:
+      matrix[0] = matrix[4] = 0.25f + std::abs(input.usual()) / 16.0f;
+      break;
+    default:
+      break;
+  }
+  (input.flag() ? mBlank : mCanvas)->setMatrix(matrix);
+}
+
+void PenWorld::changeQueue(FuzzInput& input) {
+  switch (input.pick(3)) {
+    case 0:
+      mRefusals = static_cast<std::uint32_t>(input.word());
+      break;
+    case 1:
+      mRefusals = 0;
+      break;
+    default:
+      mQueue.loseContext();
+      if (input.flag()) mQueue.finish();
+      mQueue.restoreContext();
+      break;
+  }
+}
+
+void PenWorld::note(bool answer, const RectF& rect) {
+  mix(&answer, sizeof answer);
+  const float edges[] = {rect.left, rect.top, rect.right, rect.bottom};
+  // Which of two equal NaNs comes out of an operation is not part of the promise.
+  for (const float edge : edges) {
+    const float comparable = std::isnan(edge) ? 0.5f : edge;
+    mix(&comparable, sizeof comparable);
+  }
+}
+
+void PenWorld::note(const QeltDesktop::Batch& batch) {
+  const std::size_t stamp = floatsPerStamp(*batch.drawable);
+  for (const std::vector<float>& buffer : batch.buffers) {
+    if (buffer.size() % stamp != 0) breakOff("a batch that is not of whole stamps");
+    mFloats += buffer.size();
+    const std::size_t count = buffer.size();
+    mix(&count, sizeof count);
+    mix(buffer.data(), buffer.size() * sizeof(float));
+  }
+}
+
+void PenWorld::mix(const void* bytes, std::size_t count) {
+  // Eight bytes at a time: batches may be long.
+  const auto* at = static_cast<const unsigned char*>(bytes);
+  for (; count >= 8; at += 8, count -= 8) {
+    std::uint64_t chunk;
+    std::memcpy(&chunk, at, 8);
+    mHash = (mHash ^ chunk) * 1099511628211u;
+    mHash ^= mHash >> 29;
+  }
+  for (; count > 0; ++at, --count) mHash = (mHash ^ *at) * 1099511628211u;
+}
+
+}  // namespace QeltTests
