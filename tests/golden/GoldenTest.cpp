@@ -57,12 +57,12 @@ void traceStroke(Trace& trace, const BoardOptions& options, float zoom, const st
 }
 
 // Pressure from below to above every clamp; tilt from one cap over the other down again; the orientation
-// across the wrap; moves of 0.7 and 1.3 among the longer ones, so that some versions drop a segment.
+// across the wrap; moves of 0.45 and 0.9 among the longer ones, so that versions drop a segment or do not.
 const std::vector<Sample> kHand = {
     {10.13f, 10.29f, 0.20f, 0.79f, 2.90f},  {11.93f, 10.61f, 0.20f, 1.20f, -3.00f},
-    {12.61f, 10.77f, 0.55f, 1.20f, -2.80f}, {13.89f, 10.93f, 0.55f, 0.77f, 2.60f},
-    {16.97f, 13.03f, 1.00f, 0.40f, 2.20f},  {14.11f, 15.93f, 0.75f, 0.20f, 1.50f},
-    {12.03f, 16.47f, 0.35f, 0.60f, 0.90f},
+    {12.37f, 10.70f, 0.55f, 1.20f, -2.80f}, {12.82f, 10.75f, 0.55f, 0.77f, 2.60f},
+    {13.89f, 10.93f, 0.55f, 0.77f, 2.60f},  {16.97f, 13.03f, 1.00f, 0.40f, 2.20f},
+    {14.11f, 15.93f, 0.75f, 0.20f, 1.50f},  {12.03f, 16.47f, 0.35f, 0.60f, 0.90f},
 };
 
 // A finger's moves around the skip distance: 0.9 of it is dropped, then taken; 1.1 of it is taken at once.

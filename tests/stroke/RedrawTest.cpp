@@ -1,6 +1,8 @@
 #include <gmock/gmock.h>
 
+#include <cmath>
 #include <cstddef>
+#include <cstdint>
 #include <limits>
 #include <memory>
 #include <string>
@@ -10,6 +12,7 @@
 #include "base/List.h"
 #include "engine/MotionEvent.h"
 #include "gl/ITask.h"
+#include "model/ObjectStroke.h"
 #include "pencommon/PenStrokeDataManager.h"
 #include "stroke/DrawingBoard.h"
 #include "support/Allocations.h"
@@ -286,6 +289,71 @@ TEST_P(Redraw, OfNothingReportsTheErrorAndHandsAnEmptyBatchOver) {
     EXPECT_EQ(Error::GetError(), 7u);
     EXPECT_THAT(batchOf(board).buffers, ElementsAre(IsEmpty()));
   }
+}
+
+// Wherever they stand, points that are not finite are as if they had not been; the stroke begins at the first
+// that is.
+TEST_P(Redraw, DropsPointsThatAreNotFinite) {
+  std::vector<Sample> broken = kStroke;
+  broken.insert(broken.begin() + 2, {kNaN, 3.0f, 0.9f, 0.5f, 1.0f});
+  broken.insert(broken.begin(), {3.0f, -std::numeric_limits<float>::infinity(), 0.9f, 0.5f, 1.0f});
+  for (const bool curve : {true, false}) {
+    SCOPED_TRACE(curve ? "curve" : "straight");
+    DrawingBoard board(paper(GetParam(), curve));
+    board.redraw(*board.stored(kStroke));
+    const Batch clean = batchOf(board);
+    board.redraw(*board.stored(broken));
+    EXPECT_EQ(batchOf(board).buffers, clean.buffers);
+    board.redraw(board.recorded(broken));
+    EXPECT_EQ(batchOf(board).buffers, clean.buffers);
+
+    // At the very end, there is no point to close to.
+    std::vector<Sample> open = kStroke;
+    open.push_back({kNaN, kNaN});
+    board.redraw(*board.stored(open));
+    const Batch unclosed = batchOf(board);
+    ASSERT_FALSE(unclosed.buffers.front().empty());
+    EXPECT_LE(unclosed.buffers.front().size(), clean.buffers.front().size());
+    EXPECT_TRUE(std::isfinite(board.rect.left) && std::isfinite(board.rect.bottom));
+  }
+}
+
+// A stroke that a document has only half of.
+class BareStroke : public Qelt::ObjectStroke {
+ public:
+  int GetPointCount() const override { return count; }
+  const Qelt::PointF* GetPoint() const override { return points; }
+  const std::int64_t* GetTimeStamp() const override { return nullptr; }
+  const float* GetPressure() const override { return nullptr; }
+  const float* GetTilt() const override { return nullptr; }
+  const float* GetOrientation() const override { return nullptr; }
+  int GetToolType() const override { return Qelt::kToolStylus; }
+
+  int count = 0;
+  const Qelt::PointF* points = nullptr;
+};
+
+TEST_P(Redraw, TakesWhateverArraysAreMissing) {
+  DrawingBoard board(paper(GetParam()));
+  BareStroke bare;
+  bare.count = 3;
+  Error::SetError(0);
+  EXPECT_TRUE(board.redraw(bare));  // no points: as if there were none
+  EXPECT_EQ(Error::GetError(), 7u);
+  EXPECT_THAT(batchOf(board).buffers, ElementsAre(IsEmpty()));
+
+  const Qelt::PointF points[] = {{10.0f, 10.0f}, {20.0f, 10.0f}, {30.0f, 20.0f}};
+  bare.points = points;
+  board.redraw(bare);
+  const Batch without = batchOf(board);
+  // No pressure is no number, which is the version's own.
+  const float pressure = GetParam() == 8 ? 0.6f : 0.5f;
+  board.redraw(*board.stored({{10.0f, 10.0f, pressure}, {20.0f, 10.0f, pressure}, {30.0f, 20.0f, pressure}}));
+  EXPECT_EQ(without.buffers, batchOf(board).buffers);
+
+  bare.count = -5;
+  EXPECT_TRUE(board.redraw(bare));
+  EXPECT_THAT(batchOf(board).buffers, ElementsAre(IsEmpty()));
 }
 
 TEST_P(Redraw, TakesAnglesThatAreNotStoredForZero) {
