@@ -62,7 +62,7 @@ bool PatternTextures::upload(int width, int height, PointSource points) {
   if (mPatternsTexture != nullptr) mPatternsTexture->SetPixels(grain.get(), width, height);
   grain.reset();
 
-  Pixels shapes = allocatePixels(kTiles * kTilePixels);
+  Pixels shapes = allocatePixels(static_cast<std::size_t>(kTiles) * kTilePixels);
   if (shapes == nullptr) return false;
   for (int i = 0; i < kTiles * kTilePixels; ++i) {
     shapes[i] = points == PointSource::StampShapes ? g_pointPtn[i] : g_backgroundPtn[i % kTilePixels];

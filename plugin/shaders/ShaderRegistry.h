@@ -25,7 +25,7 @@ T* ShaderManager::GetShader() {
     } catch (const std::bad_alloc&) {
       return nullptr;
     }
-    made.release();
+    static_cast<void>(made.release());  // the entry has it now
   } else if (found->second.shader == nullptr) {
     // Memory ran out for it once; nobody holds it.
     found->second.shader = new (std::nothrow) T;

@@ -106,9 +106,10 @@ class ProgramState final : public GlResource {
     GLint length = 0;
     gl(glGetShaderiv)(shader, GL_INFO_LOG_LENGTH, &length);
     std::string report(static_cast<std::size_t>(std::max(length, 1)), '\0');
-    gl(glGetShaderInfoLog)(shader, static_cast<GLsizei>(report.size()), nullptr, report.data());
+    gl(glGetShaderInfoLog)(shader, static_cast<GLsizei>(report.size()), &length, report.data());
+    report.resize(static_cast<std::size_t>(length));
     logError(std::string(stage == GL_VERTEX_SHADER ? "vertex" : "fragment") +
-             " shader does not compile: " + report.c_str());
+             " shader does not compile: " + report);
     gl(glDeleteShader)(shader);
     return 0;
   }
@@ -129,8 +130,9 @@ class ProgramState final : public GlResource {
     GLint length = 0;
     gl(glGetProgramiv)(program, GL_INFO_LOG_LENGTH, &length);
     std::string report(static_cast<std::size_t>(std::max(length, 1)), '\0');
-    gl(glGetProgramInfoLog)(program, static_cast<GLsizei>(report.size()), nullptr, report.data());
-    logError(std::string("shader program does not link: ") + report.c_str());
+    gl(glGetProgramInfoLog)(program, static_cast<GLsizei>(report.size()), &length, report.data());
+    report.resize(static_cast<std::size_t>(length));
+    logError(std::string("shader program does not link: ") + report);
     gl(glDeleteProgram)(program);
   }
 

@@ -92,6 +92,7 @@ class GlVertexObject final : public Qelt::GraphicsObject, public GlResource {
       for (int i = 0; i < mLayout.getAttributeCount(); ++i) {
         const auto location = static_cast<GLuint>(i);
         gl(glEnableVertexAttribArray)(location);
+        // NOLINTNEXTLINE(performance-no-int-to-ptr): GL takes an offset into the buffer as a pointer
         gl(glVertexAttribPointer)(location, mLayout.getComponents(i), GL_FLOAT, GL_FALSE,
                                   static_cast<GLsizei>(strideBytes()), reinterpret_cast<const void*>(offset));
         offset += static_cast<std::size_t>(mLayout.getComponents(i)) * sizeof(float);
