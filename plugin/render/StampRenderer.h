@@ -192,6 +192,23 @@ class StampRenderer : public HostBase {
 
   Vector2<float> grainOrigin() const { return mGrainOrigin.value(); }
 
+  // The on-screen extent of the grain's 150 texels. Kept: under a rotation it is what the formula gives, the
+  // extent of the diagonal of a 150-unit square in x and in y.
+  static Vector2<float> grainSize(const Matrix4<float>& m) {
+    if constexpr (kProfile.grainFollowsView) {
+      const auto map = [&m](float q) {
+        const float w = m[3] * q + m[7] * q + m[15];
+        return Vector2<float>{(m[0] * q + m[4] * q + m[12]) / w, (m[1] * q + m[5] * q + m[13]) / w};
+      };
+      const Vector2<float> far = map(static_cast<float>(kGrainSide));
+      const Vector2<float> near = map(0.0f);
+      return {(far.x - near.x) * kProfile.grainScale, (far.y - near.y) * kProfile.grainScale};
+    } else {
+      (void)m;
+      return {kGrainSide * kProfile.grainScale, kGrainSide * kProfile.grainScale};
+    }
+  }
+
  protected:
   // Render thread. The final class declares the public operation, so that posted tasks name it.
   void setStartPoint(float x, float y) { mGrainOrigin.set(x, y); }
@@ -211,23 +228,6 @@ class StampRenderer : public HostBase {
       if (mUseCacheBuffer) return this->mCacheBuffer;
     }
     return this->mRenderBuffer;
-  }
-
-  // The on-screen extent of the grain's 150 texels. Kept: under a rotation it is what the formula gives, the
-  // extent of the diagonal of a 150-unit square in x and in y.
-  static Vector2<float> grainSize(const Matrix4<float>& m) {
-    if constexpr (kProfile.grainFollowsView) {
-      const auto map = [&m](float q) {
-        const float w = m[3] * q + m[7] * q + m[15];
-        return Vector2<float>{(m[0] * q + m[4] * q + m[12]) / w, (m[1] * q + m[5] * q + m[13]) / w};
-      };
-      const Vector2<float> far = map(static_cast<float>(kGrainSide));
-      const Vector2<float> near = map(0.0f);
-      return {(far.x - near.x) * kProfile.grainScale, (far.y - near.y) * kProfile.grainScale};
-    } else {
-      (void)m;
-      return {kGrainSide * kProfile.grainScale, kGrainSide * kProfile.grainScale};
-    }
   }
 
   static void log(const char* operation) {
