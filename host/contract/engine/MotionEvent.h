@@ -9,10 +9,10 @@ namespace Qelt {
 
 // One sample of the pointer.
 struct PointerCoords {
-  float x = 0.0f, y = 0.0f;   // stroke units, y down
-  float pressure = 0.0f;      // 0 to 1
-  float tilt = 0.0f;          // radians from upright, 0 to pi / 2
-  float orientation = 0.0f;   // radians, clockwise from up, -pi to pi
+  float x = 0.0f, y = 0.0f;  // stroke units, y down
+  float pressure = 0.0f;     // 0 to 1
+  float tilt = 0.0f;         // radians from upright, 0 to pi / 2
+  float orientation = 0.0f;  // radians, clockwise from up, -pi to pi
 };
 
 struct PointerProperties {

@@ -7,8 +7,8 @@ namespace Qelt {
 // A pen's settings, read live by its drawables. Size and colour lead the record; the rest of the order is
 // chosen here. Main thread.
 struct PenSettingData {
-  float size = 0.0f;            // stroke units
-  std::uint32_t color = 0;      // ARGB, alpha in the top byte
+  float size = 0.0f;        // stroke units
+  std::uint32_t color = 0;  // ARGB, alpha in the top byte
   int particleDensity = 0;
   float particleSize = 0.0f;
   int renderingLevel = 0;

@@ -92,9 +92,10 @@ class GlVertexObject final : public Qelt::GraphicsObject, public GlResource {
       for (int i = 0; i < mLayout.getAttributeCount(); ++i) {
         const auto location = static_cast<GLuint>(i);
         gl(glEnableVertexAttribArray)(location);
-        // NOLINTNEXTLINE(performance-no-int-to-ptr): GL takes an offset into the buffer as a pointer
-        gl(glVertexAttribPointer)(location, mLayout.getComponents(i), GL_FLOAT, GL_FALSE,
-                                  static_cast<GLsizei>(strideBytes()), reinterpret_cast<const void*>(offset));
+        // GL takes an offset into the buffer as a pointer.
+        gl(glVertexAttribPointer)(
+            location, mLayout.getComponents(i), GL_FLOAT, GL_FALSE, static_cast<GLsizei>(strideBytes()),
+            reinterpret_cast<const void*>(offset));  // NOLINT(performance-no-int-to-ptr)
         offset += static_cast<std::size_t>(mLayout.getComponents(i)) * sizeof(float);
       }
       gl(glBindVertexArray)(0);
