@@ -28,10 +28,10 @@ using Qelt::RectF;
 
 namespace {
 
-// A run must not take long: a segment is allowed a quarter of a million stamps, so an input may ask for few
-// such. Points far out, and pens so fine that every segment is long for them, are counted.
-constexpr int kMostFarPoints = 2;
-constexpr int kMostHeavyCalls = 3;
+// A run must not take long: a segment is allowed a quarter of a million stamps, so few inputs may ask for
+// such, and for few. Points far out, and pens so fine that every segment is long for them, are counted.
+constexpr int kMostFarPoints = 1;
+constexpr int kMostHeavyCalls = 2;
 constexpr float kFarOut = 2000.0f;  // stroke units
 constexpr float kFinePen = 0.05f;   // stroke units
 constexpr std::size_t kMostFloats = 60'000'000;
@@ -134,6 +134,9 @@ PenWorld::~PenWorld() {
 }
 
 std::uint64_t PenWorld::play(FuzzInput input) {
+  const int kind = input.pick(16);
+  mFarPoints = kind == 0 ? kMostFarPoints : 0;
+  mHeavyCalls = kind == 1 ? kMostHeavyCalls : 0;
   while (!input.isEmpty() && mFloats < kMostFloats) step(input);
   for (auto& pen : mPens) pen.reset();
   mQueue.finish();
@@ -199,7 +202,7 @@ void PenWorld::step(FuzzInput& input) {
 
 bool PenWorld::mayDraw(const Qelt::Pen& pen) {
   const float size = &pen == mPens[0].get() ? mSizes[0] : mSizes[1];
-  return !(size > 0.0f && size < kFinePen) || ++mHeavyCalls <= kMostHeavyCalls;
+  return !(size > 0.0f && size < kFinePen) || --mHeavyCalls >= 0;
 }
 
 void PenWorld::change(FuzzInput& input, Qelt::Pen& pen) {
@@ -295,7 +298,7 @@ Qelt::ISPPenCanvas* PenWorld::pickCanvas(FuzzInput& input) {
 
 float PenWorld::coordinate(FuzzInput& input) {
   const float value = input.any();
-  if (std::isfinite(value) && std::abs(value) > kFarOut && ++mFarPoints > kMostFarPoints) return 10.0f;
+  if (std::isfinite(value) && std::abs(value) > kFarOut && --mFarPoints < 0) return 10.0f;
   return value;
 }
 

@@ -67,8 +67,8 @@ class PenWorld {
   float mSizes[2] = {};
   std::vector<std::unique_ptr<Stroke>> mStrokes;
   std::uint32_t mRefusals = 0;  // one bit a post, the lowest next
-  int mFarPoints = 0;           // so far
-  int mHeavyCalls = 0;          // so far, of pens that place a great many stamps everywhere
+  int mFarPoints = 0;           // still allowed
+  int mHeavyCalls = 0;          // still allowed, of pens that place a great many stamps everywhere
   std::size_t mFloats = 0;      // of all batches
   std::uint64_t mHash = 14695981039346656037u;
 };

@@ -1,0 +1,227 @@
+// The library as a neighbour: it loads and really unloads a thousand times, and draws beside a second copy of
+// itself.
+
+#include <dlfcn.h>
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <cstdio>
+#include <filesystem>
+#include <functional>
+#include <memory>
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+#include "AllocationGate.h"
+#include "base/RectF.h"
+#include "desktop/gl/RenderQueue.h"
+#include "desktop/graphics/CanvasLayer.h"
+#include "desktop/graphics/PenCanvas.h"
+#include "desktop/pencommon/BatchObserver.h"
+#include "desktop/pencommon/PenDataManager.h"
+#include "engine/MotionEvent.h"
+#include "pencommon/Pen.h"
+#include "pencommon/PenOutlineDrawableGL.h"
+#include "pencommon/PenStrokeDrawableGL.h"
+#include "support/LogCapture.h"
+
+namespace QeltTests {
+namespace {
+
+using QeltDesktop::RenderQueue;
+
+// A library that goes when it is closed; the host's own loader keeps it for good.
+class Loaded {
+ public:
+  explicit Loaded(const std::string& path)
+      : mPath(path), mHandle(dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL)) {
+    if (mHandle == nullptr) throw std::runtime_error(dlerror());
+  }
+  ~Loaded() { close(); }
+  Loaded(const Loaded&) = delete;
+  Loaded& operator=(const Loaded&) = delete;
+
+  void close() {
+    if (mHandle != nullptr) dlclose(mHandle);
+    mHandle = nullptr;
+  }
+  static bool isThere(const std::string& path) {
+    void* const again = dlopen(path.c_str(), RTLD_NOW | RTLD_NOLOAD);
+    if (again != nullptr) dlclose(again);
+    return again != nullptr;
+  }
+  const void* symbol(const char* name) const { return dlsym(mHandle, name); }
+  std::unique_ptr<Qelt::Pen> makePen() const {
+    const auto create = reinterpret_cast<Qelt::Pen* (*)()>(dlsym(mHandle, "createPenInst"));
+    if (create == nullptr) throw std::runtime_error(mPath + ": no createPenInst");
+    return std::unique_ptr<Qelt::Pen>(create());
+  }
+
+ private:
+  std::string mPath;
+  void* mHandle;
+};
+
+// A host with one pen of a library.
+class Desk {
+ public:
+  Desk(const Loaded& library, RenderQueue& queue, QeltDesktop::CanvasLayer* layer)
+      : mQueue(queue), mCanvas(&queue, layer), mData(&queue), mPen(library.makePen()) {
+    mPen->setPenDataManager(&mData);
+    mPen->setVersion(8);
+    mPen->SetSize(5.0f);
+    mPen->GetStrokeDrawableGL()->SetCanvas(&mCanvas);
+    mPen->GetOutlineDrawableGL()->SetCanvas(&mCanvas);
+  }
+  ~Desk() {
+    mPen.reset();
+    mQueue.finish();
+  }
+
+  void event(int action, float x, float y) {
+    const Qelt::PointerProperties pointer{0, Qelt::kToolStylus};
+    const Qelt::PointerCoords coords{x, y, 0.6f, 0.3f, 0.4f};
+    const Qelt::MotionEvent made(0, 1, action, 1, &pointer, &coords, 0, Qelt::kSourceStylus, 0);
+    Qelt::RectF rect;
+    mPen->GetStrokeDrawableGL()->Draw(&made, &rect);
+    mQueue.finish();
+  }
+
+  void stroke() {
+    event(Qelt::kActionDown, 10.3f, 10.4f);
+    event(Qelt::kActionMove, 40.3f, 14.4f);
+    event(Qelt::kActionMove, 60.3f, 44.4f);
+    event(Qelt::kActionUp, 90.3f, 50.4f);
+  }
+
+ private:
+  RenderQueue& mQueue;
+  QeltDesktop::PenCanvas mCanvas;
+  QeltDesktop::PenDataManager mData;
+  std::unique_ptr<Qelt::Pen> mPen;
+};
+
+// A copy of the library under another name, for as long as this lives.
+class Copy {
+ public:
+  Copy() : path(testing::TempDir() + "libAnotherPencil" + std::to_string(getpid()) + ".so") {
+    std::filesystem::copy_file(QELT_PLUGIN_PATH, path, std::filesystem::copy_options::overwrite_existing);
+  }
+  ~Copy() { std::filesystem::remove(path); }
+  Copy(const Copy&) = delete;
+  Copy& operator=(const Copy&) = delete;
+
+  const std::string path;
+};
+
+class Batches {
+ public:
+  Batches() {
+    QeltDesktop::setBatchObserver([this](const QeltDesktop::Batch& batch) {
+      for (const auto& buffer : batch.buffers) mAll.push_back(buffer);
+    });
+  }
+  ~Batches() { QeltDesktop::setBatchObserver(nullptr); }
+  Batches(const Batches&) = delete;
+  Batches& operator=(const Batches&) = delete;
+
+  std::vector<std::vector<float>> take() { return std::exchange(mAll, {}); }
+
+ private:
+  std::vector<std::vector<float>> mAll;
+};
+
+TEST(Loading, AThousandTimesLeavesNothingBehind) {
+  constexpr int kTimes = QELT_SANITIZED ? 100 : 1000;
+  LogCapture log;
+  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
+  long early = 0;
+  for (int i = 0; i < kTimes; ++i) {
+    {
+      const Loaded library(QELT_PLUGIN_PATH);
+      Desk desk(library, queue, nullptr);
+      desk.stroke();
+    }
+    ASSERT_FALSE(Loaded::isThere(QELT_PLUGIN_PATH)) << "still loaded after " << i + 1;
+    log.take();
+    if (i == 4) early = AllocationGate::allBlocks();
+  }
+  EXPECT_EQ(AllocationGate::allBlocks(), early);
+}
+
+TEST(Loading, WithAPictureLeavesNoShaderOfTheLibraryBehind) {
+  LogCapture log;
+  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
+  QeltDesktop::CanvasLayer layer(queue, 128, 64);
+  std::vector<std::uint8_t> first;
+  for (int i = 0; i < 10; ++i) {
+    layer.clear();
+    {
+      const Loaded library(QELT_PLUGIN_PATH);
+      Desk desk(library, queue, &layer);
+      desk.stroke();
+    }
+    ASSERT_FALSE(Loaded::isThere(QELT_PLUGIN_PATH));
+    // Nothing that is restored may be the library's.
+    queue.loseContext();
+    queue.restoreContext();
+    const std::vector<std::uint8_t> pixels = layer.readPixels();
+    if (first.empty()) first = pixels;
+    EXPECT_TRUE(pixels == first) << "load " << i + 1;
+  }
+  EXPECT_NE(first, std::vector<std::uint8_t>(first.size())) << "nothing was drawn";
+}
+
+TEST(Loading, TwoCopiesDrawInTurnsAsOneDoesAlone) {
+  LogCapture log;
+  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
+  const Copy copy;
+  const Loaded one(QELT_PLUGIN_PATH), other(copy.path);
+  ASSERT_NE(one.symbol("versionTable"), other.symbol("versionTable")) << "the same library twice";
+  Batches batches;
+  Desk left(one, queue, nullptr), right(other, queue, nullptr);
+  left.stroke();
+  const auto alone = batches.take();
+  ASSERT_FALSE(alone.empty());
+  const struct {
+    int action;
+    float x, y;
+  } events[] = {{Qelt::kActionDown, 10.3f, 10.4f},
+                {Qelt::kActionMove, 40.3f, 14.4f},
+                {Qelt::kActionMove, 60.3f, 44.4f},
+                {Qelt::kActionUp, 90.3f, 50.4f}};
+  for (std::size_t i = 0; i < std::size(events); ++i) {
+    for (Desk* desk : {&left, &right}) {
+      desk->event(events[i].action, events[i].x, events[i].y);
+      EXPECT_EQ(batches.take(), (std::vector<std::vector<float>>{alone[i]})) << "event " << i;
+    }
+  }
+}
+
+TEST(Loading, ACopyDrawsOnWithTheShadersThatAnotherBrought) {
+  LogCapture log;
+  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
+  QeltDesktop::CanvasLayer layer(queue, 128, 64);
+  const Copy copy;
+  const Loaded other(copy.path);
+  std::vector<std::uint8_t> before;
+  auto one = std::make_unique<Loaded>(QELT_PLUGIN_PATH);
+  auto left = std::make_unique<Desk>(*one, queue, &layer);
+  // The registry knows shaders by their class: this desk's are the left one's.
+  Desk right(other, queue, &layer);
+  left->stroke();
+  before = layer.readPixels();
+  layer.clear();
+  left.reset();
+  one.reset();
+  ASSERT_FALSE(Loaded::isThere(QELT_PLUGIN_PATH));
+  queue.loseContext();
+  queue.restoreContext();
+  right.stroke();
+  EXPECT_TRUE(layer.readPixels() == before);
+  for (const LogLine& line : log.take()) EXPECT_NE(line.priority, 6) << line.text;
+}
+
+}  // namespace
+}  // namespace QeltTests
