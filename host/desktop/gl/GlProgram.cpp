@@ -56,8 +56,8 @@ class ProgramState final : public GlResource {
   ~ProgramState() override { destroy(); }
 
   bool build() {
-    const GLuint vertex = compile(GL_VERTEX_SHADER, mVertexSource);
-    const GLuint fragment = vertex != 0 ? compile(GL_FRAGMENT_SHADER, mFragmentSource) : 0;
+    const GLuint vertex = compile(GL_VERTEX_SHADER, mVertexSource.c_str());
+    const GLuint fragment = vertex != 0 ? compile(GL_FRAGMENT_SHADER, mFragmentSource.c_str()) : 0;
     if (fragment != 0) link(vertex, fragment);
     if (fragment != 0) gl(glDeleteShader)(fragment);
     if (vertex != 0) gl(glDeleteShader)(vertex);
@@ -156,8 +156,9 @@ class ProgramState final : public GlResource {
     }
   }
 
-  const char* mVertexSource;
-  const char* mFragmentSource;
+  // Copies: the program may outlive the library that brought them, and is built again from them.
+  std::string mVertexSource;
+  std::string mFragmentSource;
   GLuint mProgram = 0;
   bool mReleased = false;
   std::vector<Uniform> mUniforms;
