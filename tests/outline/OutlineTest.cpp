@@ -164,10 +164,10 @@ TYPED_TEST(OutlineVersions, WholeStampsWhateverComesIn) {
   const LogCapture log;
   const float bad[] = {kNaN, kInfinity, -kInfinity, 3e38f, -3e38f, 1e-40f, 0.0f, -1.0f, 5.0f};
   Outliner<TypeParam> board(outlinePaper(10.0f));
-  int next = 0;
-  const auto value = [&] { return bad[(next = next * 5 + 3) % 9]; };
+  unsigned next = 0;
+  const auto value = [&] { return bad[(next = next * 5u + 3u) % 9u]; };
   for (int round = 0; round < 10; ++round) {
-    next += round;
+    next += static_cast<unsigned>(round);
     board.shared.mCurveEnabled = round % 2 == 0;
     board.settings.size = round % 3 == 0 ? value() : 10.0f;
     board.drawable->SetOutlineSize(value());

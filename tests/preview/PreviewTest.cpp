@@ -291,10 +291,10 @@ TEST(Preview, WholeStampsWhateverComesIn) {
   const float bad[] = {kNaN, kInfinity, -kInfinity, 3e38f, -3e38f, 1e-40f, 0.0f, -1.0f, 5.0f};
   for (const bool curve : {true, false}) {
     Panel board(panel(10.0f, curve));
-    int next = 0;
-    const auto value = [&] { return bad[(next = next * 5 + 3) % 9]; };
+    unsigned next = 0;
+    const auto value = [&] { return bad[(next = next * 5u + 3u) % 9u]; };
     for (int round = 0; round < 28; ++round) {
-      next += round;
+      next += static_cast<unsigned>(round);
       board.settings.size = round % 2 == 0 ? 10.0f : value();
       const float x = round % 3 == 0 ? value() : static_cast<float>(round);
       const Sample odd{x, 3.0f, value(), value(), value()};
