@@ -134,9 +134,9 @@ PenWorld::~PenWorld() {
 }
 
 std::uint64_t PenWorld::play(FuzzInput input) {
-  const int kind = input.pick(16);
-  mFarPoints = kind == 0 ? kMostFarPoints : 0;
-  mHeavyCalls = kind == 1 ? kMostHeavyCalls : 0;
+  const int kind = input.pick(128);
+  mFarPoints = kind == 101 ? kMostFarPoints : 0;
+  mHeavyCalls = kind == 102 ? kMostHeavyCalls : 0;
   while (!input.isEmpty() && mFloats < kMostFloats) step(input);
   for (auto& pen : mPens) pen.reset();
   mQueue.finish();

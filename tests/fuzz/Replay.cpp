@@ -1,5 +1,5 @@
-// Runs a fuzz target without a fuzzer: over the files and folders named, each also with a few of its bytes
-// changed, then over inputs made up by a fixed rule.
+// Runs a fuzz target without a fuzzer: over the files and folders named, then over inputs made from them by
+// a fixed rule.
 //
 //   REPLAY [--generate COUNT] PATH...
 
@@ -33,16 +33,20 @@ void run(const Bytes& bytes) {
   LLVMFuzzerTestOneInput(bytes.data(), bytes.size());
 }
 
-// A piece of one, a piece of the other, and some bytes by chance.
+// Some bytes changed by chance: in one input, or in a piece of it with a piece of another after it.
 Bytes mixed(const Bytes& one, const Bytes& other, std::mt19937& random) {
   const auto below = [&random](std::size_t bound) { return bound == 0 ? 0 : random() % bound; };
-  Bytes made(one.begin(), one.begin() + static_cast<std::ptrdiff_t>(below(one.size() + 1)));
-  made.insert(made.end(), other.begin() + static_cast<std::ptrdiff_t>(below(other.size() + 1)), other.end());
+  Bytes made = one;
+  if (below(2) == 0) {
+    made.resize(below(one.size() + 1));
+    made.insert(made.end(), other.begin() + static_cast<std::ptrdiff_t>(below(other.size() + 1)),
+                other.end());
+    for (std::size_t more = below(24); more > 0; --more) made.push_back(static_cast<std::uint8_t>(random()));
+  }
   for (std::size_t changes = below(8); changes > 0 && !made.empty(); --changes) {
     made[below(made.size())] = static_cast<std::uint8_t>(random());
   }
-  for (std::size_t more = below(24); more > 0; --more) made.push_back(static_cast<std::uint8_t>(random()));
-  made.resize(std::min<std::size_t>(made.size(), 2000));
+  made.resize(std::min<std::size_t>(made.size(), 4000));
   return made;
 }
 

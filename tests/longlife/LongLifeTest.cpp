@@ -121,7 +121,7 @@ TEST(LongLife, TenThousandStrokesLeaveNothingBehind) {
       queue.finish();
       log.take();
     }
-    if (round + 1 == kRounds / 10) early = Moment();
+    if (round + 1 == kRounds / 5) early = Moment();
     if (round + 1 == kRounds) expectFlat(early, Moment());
   }
 }
