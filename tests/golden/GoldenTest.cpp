@@ -96,7 +96,8 @@ Trace traceOf(int version) {
   return trace;
 }
 
-// A wave under growing pressure, shading with the pen laid down, and a straight hairline.
+// A wave under growing pressure, shading with the pen laid down, and a straight hairline, thinner than a
+// pixel.
 GreyPicture pictureOf(int version) {
   BoardOptions options;
   options.version = version;
@@ -117,7 +118,7 @@ GreyPicture pictureOf(int version) {
   board.stroke(wave);
   board.settings.size = 5.0f;
   board.stroke(shading);
-  board.settings.size = 1.2f;
+  board.settings.size = 0.7f;
   board.shared.mCurveEnabled = false;
   board.stroke(hairline);
 

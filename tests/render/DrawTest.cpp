@@ -10,6 +10,9 @@
 
 #include "math/Matrix4.h"
 #include "pencommon/PenStrokeDataManager.h"
+#include "render/Patterns.h"
+#include "render/Pencil2StrokeDrawableRTV1.h"
+#include "render/Pencil2StrokeDrawableRTV2.h"
 #include "render/Pencil2StrokeDrawableRTV3.h"
 #include "stroke/DrawingBoard.h"
 #include "support/Stamps.h"
@@ -369,6 +372,50 @@ TEST_F(RenderDrawable, CanBeReleasedTwiceAndDrawsNothingAfterwards) {
     drawable.Clear();
   });
   EXPECT_EQ(inked(layer.readPixels()), 0);
+}
+
+// A stamp of 100 x 100 pixels, each on a texel of its shape: where the shape is 0 nothing is drawn, where it
+// is not, inside the rim, something is. So the shapes lie the right way up, and each stamp has its own.
+template <typename RenderDrawableType>
+void expectStampsToHaveTheirShapes(float size) {
+  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
+  QeltDesktop::CanvasLayer layer(queue, kSide, kSide);
+  QeltDesktop::PenDataManager data(&queue);
+  RenderDrawableType drawable(&data);
+  Matrix4<float> identity;
+  for (int tile = 0; tile < 3; ++tile) {
+    layer.clear();
+    std::vector<float> batch;
+    const Vector2<float> stamp[2] = {{120.0f, 130.0f}, {0.0f, 1.0f}};
+    drawable.SetBuffer(&batch);
+    drawable.AddPoint(stamp, size, 200.0f, 0.0f, tile);  // opaque wherever there is any grain
+    queue.run([&] {
+      drawable.CreatePenCanvas(kSide, kSide, &queue);
+      drawable.SetPenData(9.0f, static_cast<int>(0xFF000000u));
+      drawable.SetStartPoint(120.37f, 130.37f);
+      drawable.SendDataToGPU(&batch);
+      drawable.Update(false);
+      drawable.Draw(layer.GetBitmap()->GetSubBitmap(0), identity);
+    });
+    const Picture picture = layer.readPixels();
+    int wrong = 0;
+    for (int y = 0; y < 100; ++y) {
+      for (int x = 0; x < 100; ++x) {
+        const bool isShape = g_pointPtn[tile * 10000 + y * 100 + x] != 0;
+        const float dx = static_cast<float>(x) - 49.5f, dy = static_cast<float>(y) - 49.5f;
+        if (isShape && dx * dx + dy * dy > 47.0f * 47.0f) continue;  // the rim's own affair
+        wrong += (alphaAt(picture, 70 + x, 80 + y) != 0) != isShape ? 1 : 0;
+      }
+    }
+    EXPECT_EQ(wrong, 0) << "shape " << tile;
+  }
+  queue.run([&] { drawable.Release(); });
+}
+
+TEST(StampShapesTest, AreDrawnTexelForTexel) {
+  expectStampsToHaveTheirShapes<Pencil2StrokeDrawableRTV1>(100.0f);
+  expectStampsToHaveTheirShapes<Pencil2StrokeDrawableRTV2>(100.0f);
+  expectStampsToHaveTheirShapes<Pencil2StrokeDrawableRTV3>(49.5f);  // and half a pixel of margin
 }
 
 }  // namespace

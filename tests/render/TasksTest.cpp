@@ -119,6 +119,8 @@ class Guards : public testing::Test {
     bitmap.tiles.emplace_back(0, 0, 64, 64);
     canvas.layer = &layer;
   }
+  // What was handed over frees itself.
+  ~Guards() override { queue.run(); }
 
   // One call that collects `floats` floats.
   void draw(std::size_t floats) {
