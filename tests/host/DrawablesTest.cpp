@@ -87,6 +87,22 @@ TEST(Drawables, OnACanvasWithoutALayerNothingIsPrepared) {
   EXPECT_THAT(notes, ElementsAre("gone"));
 }
 
+TEST(Drawables, APartnerOutlivesWhatWentToTheQueueOfACanvasTakenAway) {
+  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
+  PenDataManager withoutQueue(nullptr);
+  PenCanvas canvas(&queue, nullptr);
+  Notes notes;
+  {
+    PlainGL drawable(&withoutQueue, new NotingRT(notes));
+    drawable.SetCanvas(&canvas);
+    // Batches go by the canvas.
+    drawable.SetCanvas(nullptr);
+  }
+  EXPECT_THAT(notes, ElementsAre()) << "work for the partner may still be queued";
+  queue.finish();
+  EXPECT_THAT(notes, ElementsAre("gone"));
+}
+
 TEST(Drawables, APartnerWithoutAnyQueueIsDeletedAtOnce) {
   Notes notes;
   { const PlainGL drawable(nullptr, new NotingRT(notes)); }

@@ -5,6 +5,7 @@
 namespace Qelt {
 
 class IDepthMapBitmapSettable;
+class IGLMsgQueue;
 class IReferenceBitmapSettable;
 class ISPPenCanvas;
 class PenDrawableRT;
@@ -43,6 +44,8 @@ class QELT_HOST_API PenDrawableGL {
   void prepareDrawableRT();
 
   PenDrawableRT* mDrawableRT = nullptr;
+  // The last canvas's, where batches went: it may still run them when the canvas is long taken away.
+  IGLMsgQueue* mCanvasQueue = nullptr;
   bool mPrepared = false;  // `CreatePenCanvas` has been posted
 };
 

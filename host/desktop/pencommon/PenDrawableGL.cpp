@@ -12,11 +12,10 @@ namespace Qelt {
 
 namespace {
 
-// The way to the render thread: the pens' own, else the canvas's.
-IGLMsgQueue* queueOf(PenGLDataManager* manager, ISPPenCanvas* canvas) {
+// The way to the render thread: the pens' own, else that of the last canvas.
+IGLMsgQueue* queueOf(PenGLDataManager* manager, IGLMsgQueue* ofCanvas) {
   IGLMsgQueue* const queue = manager != nullptr ? manager->GetMsgQueue() : nullptr;
-  if (queue != nullptr || canvas == nullptr) return queue;
-  return canvas->GetMsgQueue();
+  return queue != nullptr ? queue : ofCanvas;
 }
 
 // Runs a call once the queue has run everything it took: there, while it still runs, else here.
@@ -36,6 +35,7 @@ PenDrawableGL::~PenDrawableGL() {
 
 void PenDrawableGL::SetCanvas(ISPPenCanvas* canvas) {
   mCanvas = canvas;
+  if (canvas != nullptr) mCanvasQueue = canvas->GetMsgQueue();
   prepareDrawableRT();
 }
 
@@ -66,7 +66,7 @@ void PenDrawableGL::setDrawableRT(PenDrawableRT* drawable) {
 
 void PenDrawableGL::prepareDrawableRT() {
   if (mCanvas == nullptr || mDrawableRT == nullptr) return;
-  IGLMsgQueue* const queue = queueOf(mDataManager, mCanvas);
+  IGLMsgQueue* const queue = queueOf(mDataManager, mCanvasQueue);
   if (queue == nullptr) return;
   int width = 0;
   int height = 0;
@@ -88,7 +88,7 @@ void PenDrawableGL::destroy() {
   mDrawableRT = nullptr;
   mPrepared = false;
   if (drawable == nullptr) return;
-  IGLMsgQueue* const queue = queueOf(mDataManager, mCanvas);
+  IGLMsgQueue* const queue = queueOf(mDataManager, mCanvasQueue);
   if (queue == nullptr) {
     delete drawable;
     return;
