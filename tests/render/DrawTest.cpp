@@ -339,6 +339,31 @@ TEST_F(RenderDrawable, SettlesTheGrainOriginWithTheFirstTileDrawn) {
   });
 }
 
+// The dimming of thin stamps comes with the vertices, last of all: half of it is half the ink.
+TEST_F(RenderDrawable, DimsStampsByTheirWidth) {
+  const auto inkOf = [this](std::vector<float> batch) {
+    layer.clear();
+    queue.run([&] {
+      drawable.SetPenData(9.0f, static_cast<int>(0xFF000000u));
+      drawable.SetStartPoint(60.37f, 128.37f);
+      drawable.SendDataToGPU(&batch);
+      drawable.Update(false);
+      drawAll();
+      drawable.Clear();
+    });
+    double ink = 0.0;
+    const Picture picture = layer.readPixels();
+    for (std::size_t i = 3; i < picture.size(); i += 4) ink += picture[i];
+    return ink;
+  };
+  const std::vector<float> full = stampAt(60.37f);
+  std::vector<float> half = full;
+  for (std::size_t i = 10; i < half.size(); i += 11) half[i] *= 0.5f;
+  const double ink = inkOf(full);
+  EXPECT_GT(ink, 10000.0);
+  EXPECT_NEAR(inkOf(half) / ink, 0.5, 0.03);
+}
+
 TEST_F(RenderDrawable, DrawsNothingWithoutATileOrABatch) {
   std::vector<float> live = stampAt(60.37f), empty;
   queue.run([&] {
