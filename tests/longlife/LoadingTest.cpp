@@ -3,6 +3,7 @@
 
 #include <dlfcn.h>
 #include <gtest/gtest.h>
+#include <link.h>
 #include <unistd.h>
 
 #include <cstdio>
@@ -51,6 +52,7 @@ class Loaded {
     if (again != nullptr) dlclose(again);
     return again != nullptr;
   }
+  void* handle() const { return mHandle; }
   const void* symbol(const char* name) const { return dlsym(mHandle, name); }
   std::unique_ptr<Qelt::Pen> makePen() const {
     const auto create = reinterpret_cast<Qelt::Pen* (*)()>(dlsym(mHandle, "createPenInst"));
@@ -131,6 +133,23 @@ class Batches {
  private:
   std::vector<std::vector<float>> mAll;
 };
+
+// Bytes of the list of functions that the loader calls before anybody calls the library.
+std::size_t initialiserBytes(void* handle) {
+  link_map* map = nullptr;
+  if (dlinfo(handle, RTLD_DI_LINKMAP, &map) != 0) throw std::runtime_error(dlerror());
+  for (const ElfW(Dyn)* entry = map->l_ld; entry->d_tag != DT_NULL; ++entry) {
+    if (entry->d_tag == DT_INIT_ARRAYSZ) return entry->d_un.d_val;
+  }
+  return 0;
+}
+
+TEST(Loading, RunsNoneOfTheLibrarysCode) {
+  if (QELT_SANITIZED) GTEST_SKIP() << "the sanitizers bring constructors of their own";
+  const Loaded library(QELT_PLUGIN_PATH);
+  // The compiler's own start-up function is one.
+  EXPECT_LE(initialiserBytes(library.handle()), sizeof(void*));
+}
 
 TEST(Loading, AThousandTimesLeavesNothingBehind) {
   constexpr int kTimes = QELT_SANITIZED ? 100 : 1000;
