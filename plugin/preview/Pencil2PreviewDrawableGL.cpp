@@ -1,6 +1,7 @@
 #include "preview/Pencil2PreviewDrawableGL.h"
 
 #include <algorithm>
+#include <cmath>
 #include <cstddef>
 #include <new>
 
@@ -165,6 +166,8 @@ bool Pencil2PreviewDrawableGL::placeSegment(float length, float pressure, RectF*
   if (mAlpha < 0.0f) mAlpha = alpha;
   const float blend = kProfile.tiltBlend(mAttitude.meanTilt());
   const float width = kProfile.pointSize(size, blend);
+  // The stroke began with a size that was none.
+  if (!std::isfinite(mWidth)) mWidth = width;
 
   // Kept: on curves the walk decides how many stamps there are, and the ramps may run past their targets,
   // which are restored below.

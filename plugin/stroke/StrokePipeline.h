@@ -1,6 +1,7 @@
 #pragma once
 
 #include <algorithm>
+#include <cmath>
 #include <cstddef>
 #include <new>
 
@@ -299,6 +300,8 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     if (mAlpha < 0.0f) mAlpha = alpha;
     const float blend = kProfile.tiltBlend(mAttitude.meanTilt());
     const float width = kProfile.pointSize(size, blend);
+    // The stroke began with a size that was none.
+    if (!std::isfinite(mWidth)) mWidth = width;
 
     const int before = mStamps.count();
     if constexpr (kSpaced) {

@@ -1,5 +1,6 @@
 #include <gmock/gmock.h>
 
+#include <cmath>
 #include <cstddef>
 #include <limits>
 #include <new>
@@ -278,6 +279,17 @@ TEST_P(LiveStroke, PlacesNothingAtASizeThatIsNone) {
       EXPECT_THAT(board.takeStamps(), IsEmpty());
     }
   }
+}
+
+TEST_P(LiveStroke, PlacesFiniteStampsOnceTheSizeIsSensible) {
+  DrawingBoard board(paper(GetParam()));
+  board.settings.size = kNaN;
+  board.down(kStroke[0]);
+  board.settings.size = 6.0f;
+  board.move({kStroke.begin() + 1, kStroke.end()});
+  const std::vector<Stamp> placed = board.takeStamps();
+  ASSERT_THAT(placed, Not(IsEmpty()));
+  for (const Stamp& stamp : placed) EXPECT_TRUE(std::isfinite(stamp.halfWidth) && std::isfinite(stamp.alpha));
 }
 
 TEST_P(LiveStroke, EndsOnHugeCoordinates) {

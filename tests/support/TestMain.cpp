@@ -4,8 +4,9 @@
 
 namespace {
 
-// The leak checker looks when the GL driver and the EGL implementation are unloaded: their few caches, held by
-// variables of theirs, would be reported from an "<unknown module>". What stays loaded is seen to still hold them.
+// The leak checker looks when the GL driver and the EGL implementation are unloaded: their few caches, held
+// by variables of theirs, would be reported from an "<unknown module>". What stays loaded is seen to still
+// hold them.
 void keepDriverLoaded() {
   dlopen("libEGL_mesa.so.0", RTLD_NOW | RTLD_NODELETE);
   for (const char* path :
