@@ -18,7 +18,6 @@
 #include "pencommon/PenPredictionDrawableGL.h"
 #include "pencommon/PenPreviewDrawableGL.h"
 #include "pencommon/PenStrokeDataManager.h"
-#include "pencommon/PenStrokeDrawableGL.h"
 
 namespace QeltTests {
 
@@ -361,6 +360,20 @@ void PenWorld::draw(FuzzInput& input, Qelt::Pen& pen) {
   note(answer, rect);
 }
 
+// A page whose stroke gets another version does not offer the drawing of the version before.
+void PenWorld::keepCacheFitting(const Stroke& stroke, const Qelt::PenStrokeDrawableGL& drawable) {
+  const int original = stroke.GetOriginalRuntimeHandle();
+  const int handle = original == -1 ? stroke.GetRuntimeHandle() : original;
+  const auto [known, isNew] = mDrawnBy.try_emplace(handle, &typeid(drawable));
+  if (isNew || *known->second == typeid(drawable)) return;
+  known->second = &typeid(drawable);
+  PenStrokeDataManager* const manager = PenStrokeDataManager::GetInstance();
+  manager->DropStrokeData(handle);
+  for (const auto& other : mStrokes) {
+    if (other->GetRuntimeHandle() == handle) manager->CreateStrokeData(handle);
+  }
+}
+
 void PenWorld::redraw(FuzzInput& input, Qelt::Pen& pen) {
   Qelt::PenStrokeDrawableGL* const drawable = pen.GetStrokeDrawableGL();
   if (drawable == nullptr) breakOff("no stroke drawable");
@@ -377,6 +390,7 @@ void PenWorld::redraw(FuzzInput& input, Qelt::Pen& pen) {
     answer = drawable->RedrawPen(kind == 241 ? nullptr : &list, into);
   } else {
     const Stroke& made = stroke(input);
+    keepCacheFitting(made, *drawable);
     answer = drawable->RedrawPen(kind == 250 ? nullptr : &made, into);
   }
   note(answer, rect);

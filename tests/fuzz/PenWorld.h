@@ -1,7 +1,9 @@
 #pragma once
 
 #include <cstdint>
+#include <map>
 #include <memory>
+#include <typeinfo>
 #include <vector>
 
 #include "FuzzInput.h"
@@ -15,6 +17,7 @@
 #include "engine/MotionEvent.h"
 #include "model/ObjectStroke.h"
 #include "pencommon/Pen.h"
+#include "pencommon/PenStrokeDrawableGL.h"
 
 namespace QeltTests {
 
@@ -55,6 +58,7 @@ class PenWorld {
   Qelt::MotionEvent event(FuzzInput& input, int mostHistory);
   Stroke& stroke(FuzzInput& input);
   bool mayDraw(const Qelt::Pen& pen);
+  void keepCacheFitting(const Stroke& stroke, const Qelt::PenStrokeDrawableGL& drawable);
   void note(bool answer, const Qelt::RectF& rect);
   void note(const QeltDesktop::Batch& batch);
   void mix(const void* bytes, std::size_t count);
@@ -66,10 +70,11 @@ class PenWorld {
   std::unique_ptr<Qelt::Pen> mPens[2];
   float mSizes[2] = {};
   std::vector<std::unique_ptr<Stroke>> mStrokes;
-  std::uint32_t mRefusals = 0;  // one bit a post, the lowest next
-  int mFarPoints = 0;           // still allowed
-  int mHeavyCalls = 0;          // still allowed, of pens that place a great many stamps everywhere
-  std::size_t mFloats = 0;      // of all batches
+  std::map<int, const std::type_info*> mDrawnBy;  // of what handles stand for, the drawable
+  std::uint32_t mRefusals = 0;                    // one bit a post, the lowest next
+  int mFarPoints = 0;                             // still allowed
+  int mHeavyCalls = 0;      // still allowed, of pens that place a great many stamps everywhere
+  std::size_t mFloats = 0;  // of all batches
   std::uint64_t mHash = 14695981039346656037u;
 };
 
