@@ -13,18 +13,14 @@
 namespace Qelt {
 
 template <typename T>
-T* ShaderManager::GetShader() {
+T* ShaderManager::GetShader() try {
   const AutoCriticalSection lock(&mLock);
   const Key key(typeid(T).name());
   auto found = mShaders.find(key);
   if (found == mShaders.end()) {
     __android_log_print(kLogDebug, kLogTag, "ShaderManager::GetShader, New %s is added", typeid(T).name());
     std::unique_ptr<T> made(new (std::nothrow) T);
-    try {
-      found = mShaders.emplace(key, Entry{made.get(), 0}).first;
-    } catch (const std::bad_alloc&) {
-      return nullptr;
-    }
+    found = mShaders.emplace(key, Entry{made.get(), 0}).first;
     static_cast<void>(made.release());  // the entry has it now
   } else if (found->second.shader == nullptr) {
     // Memory ran out for it once; nobody holds it.
@@ -32,6 +28,9 @@ T* ShaderManager::GetShader() {
   }
   if (found->second.shader != nullptr) ++found->second.references;
   return static_cast<T*>(found->second.shader);
+} catch (const std::bad_alloc&) {
+  // No memory for the registry's own: as if there were none for the shader.
+  return nullptr;
 }
 
 template <typename T>
