@@ -147,8 +147,13 @@ std::size_t initialiserBytes(void* handle) {
 TEST(Loading, RunsNoneOfTheLibrarysCode) {
   if (QELT_SANITIZED) GTEST_SKIP() << "the sanitizers bring constructors of their own";
   const Loaded library(QELT_PLUGIN_PATH);
-  // The compiler's own start-up function is one.
-  EXPECT_LE(initialiserBytes(library.handle()), sizeof(void*));
+  // The compiler's own start-up function is one; on 64-bit ARM its probe for atomic instructions is another.
+#if defined(__aarch64__)
+  constexpr std::size_t kCompilersOwn = 2;
+#else
+  constexpr std::size_t kCompilersOwn = 1;
+#endif
+  EXPECT_LE(initialiserBytes(library.handle()), kCompilersOwn * sizeof(void*));
 }
 
 TEST(Loading, AThousandTimesLeavesNothingBehind) {
