@@ -83,6 +83,22 @@ void expectGoldenTrace(const Trace& trace, const std::string& file) {
   EXPECT_EQ(trace.size(), golden.size()) << file;
 }
 
+void expectExactGoldenTrace(const Trace& trace, const std::string& file) {
+#ifdef __GLIBC__
+  if (recordsGolden()) return;  // expectGoldenTrace records it
+  std::ifstream in(goldenPath(file));
+  ASSERT_TRUE(in) << file;
+  std::size_t number = 0;
+  for (std::string line; std::getline(in, line); ++number) {
+    ASSERT_LT(number, trace.size()) << file;
+    ASSERT_EQ(trace[number], line) << file << ":" << number + 1;
+  }
+  EXPECT_EQ(number, trace.size()) << file;
+#else
+  expectGoldenTrace(trace, file);
+#endif
+}
+
 Difference differenceOf(const GreyPicture& a, const GreyPicture& b) {
   double inked = 0.0, sum = 0.0, far = 0.0, inkOfA = 0.0, inkOfB = 0.0;
   for (std::size_t i = 0; i < std::min(a.pixels.size(), b.pixels.size()); ++i) {

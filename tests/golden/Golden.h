@@ -20,6 +20,10 @@ using Trace = std::vector<std::string>;
 // 1); or records it.
 void expectGoldenTrace(const Trace& trace, const std::string& file);
 
+// The same to the last bit: the numbers are the shortest decimals that read back as the same float. On every
+// processor whose C library works out sines as the GNU one does; elsewhere as expectGoldenTrace.
+void expectExactGoldenTrace(const Trace& trace, const std::string& file);
+
 // Ink on paper: 255 minus the alpha of each pixel, row by row.
 struct GreyPicture {
   int width = 0, height = 0;
