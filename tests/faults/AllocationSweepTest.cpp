@@ -12,19 +12,7 @@
 namespace QeltTests {
 namespace {
 
-struct Case {
-  Scenario scenario;
-  bool picture;
-};
-
-std::vector<Case> cases() {
-  std::vector<Case> all;
-  for (const Scenario& scenario : scenarios()) all.push_back({scenario, false});
-  for (const Scenario& scenario : pictureScenarios()) all.push_back({scenario, true});
-  return all;
-}
-
-class AllocationSweep : public testing::TestWithParam<Case> {};
+class AllocationSweep : public testing::TestWithParam<SweepCase> {};
 
 TEST_P(AllocationSweep, LeavesThePenAsGoodAsNew) {
   const auto& [scenario, picture] = GetParam();
@@ -50,7 +38,7 @@ TEST_P(AllocationSweep, LeavesThePenAsGoodAsNew) {
   RecordProperty("failures", total);
 }
 
-INSTANTIATE_TEST_SUITE_P(Scenarios, AllocationSweep, testing::ValuesIn(cases()),
+INSTANTIATE_TEST_SUITE_P(Scenarios, AllocationSweep, testing::ValuesIn(sweepCases()),
                          [](const auto& test) { return std::string(test.param.scenario.name); });
 
 }  // namespace

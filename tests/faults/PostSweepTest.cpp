@@ -15,18 +15,6 @@
 namespace QeltTests {
 namespace {
 
-struct Case {
-  Scenario scenario;
-  bool picture;
-};
-
-std::vector<Case> cases() {
-  std::vector<Case> all;
-  for (const Scenario& scenario : scenarios()) all.push_back({scenario, false});
-  for (const Scenario& scenario : pictureScenarios()) all.push_back({scenario, true});
-  return all;
-}
-
 // Answers for the queue, and holds a poster to its word: a refused task is gone by the next post.
 class Doorman {
  public:
@@ -64,7 +52,7 @@ class Doorman {
   long mNumber = 0;
 };
 
-class PostSweep : public testing::TestWithParam<Case> {};
+class PostSweep : public testing::TestWithParam<SweepCase> {};
 
 TEST_P(PostSweep, LeavesThePenAsGoodAsNew) {
   const auto& [scenario, picture] = GetParam();
@@ -109,7 +97,7 @@ TEST_P(PostSweep, SurvivesRefusalsWithoutAPattern) {
   }
 }
 
-INSTANTIATE_TEST_SUITE_P(Scenarios, PostSweep, testing::ValuesIn(cases()),
+INSTANTIATE_TEST_SUITE_P(Scenarios, PostSweep, testing::ValuesIn(sweepCases()),
                          [](const auto& test) { return std::string(test.param.scenario.name); });
 
 }  // namespace

@@ -6,14 +6,13 @@
 #include <stdexcept>
 
 #include "desktop/pencommon/BatchObserver.h"
-#include "graphics/ISPBitmap.h"
 #include "math/Matrix3.h"
-#include "math/Matrix4.h"
 #include "pencommon/IPenMorphable.h"
 #include "pencommon/PenOutlineDrawableGL.h"
 #include "pencommon/PenPredictionDrawableGL.h"
 #include "pencommon/PenPreviewDrawableGL.h"
 #include "pencommon/PenStrokeDataManager.h"
+#include "support/BlindLayer.h"
 
 namespace QeltTests {
 
@@ -26,27 +25,6 @@ namespace {
 
 constexpr float kSize = 4.0f;
 constexpr int kInk = static_cast<int>(0xFF305090u);
-
-// A layer of one tile that nothing is drawn into.
-class BlindLayer final : public Qelt::ISPLayer, public Qelt::ISPBitmap, public Qelt::ISPSubBitmap {
- public:
-  Qelt::ISPBitmap* GetBitmap() override { return this; }
-  int GetWidth() const override { return 4096; }
-  int GetHeight() const override { return 4096; }
-  Qelt::ISPTexture* GetTexture() override { return nullptr; }
-  void SetDebugName(const char*) override {}
-  void SetPixels(const void*, int, int) override {}
-  int GetTileCount() const override { return 1; }
-  Qelt::ISPSubBitmap* GetSubBitmap(int) override { return this; }
-  int GetX() const override { return 0; }
-  int GetY() const override { return 0; }
-  const Qelt::Matrix4<float>& GetProjection() const override { return mProjection; }
-  void BeginRender(int) override {}
-  void EndRender(int) override {}
-
- private:
-  Qelt::Matrix4<float> mProjection;
-};
 
 std::vector<Sample> samples() {
   std::vector<Sample> made;

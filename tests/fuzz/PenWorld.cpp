@@ -9,15 +9,14 @@
 
 #include "base/List.h"
 #include "base/String.h"
-#include "graphics/ISPBitmap.h"
 #include "math/Matrix3.h"
-#include "math/Matrix4.h"
 #include "pencommon/IPenMorphable.h"
 #include "pencommon/PenDrawableRT.h"
 #include "pencommon/PenOutlineDrawableGL.h"
 #include "pencommon/PenPredictionDrawableGL.h"
 #include "pencommon/PenPreviewDrawableGL.h"
 #include "pencommon/PenStrokeDataManager.h"
+#include "support/BlindLayer.h"
 
 namespace QeltTests {
 
@@ -49,27 +48,6 @@ std::size_t floatsPerStamp(const Qelt::PenDrawableRT& drawable) {
   if (is("StrokeDrawableRTV3") || is("PredictionDrawableRT")) return 6 * 11;
   return 6 * 9;
 }
-
-// One tile that nothing is drawn into: enough for a render message to run through its batch.
-class BlindLayer final : public Qelt::ISPLayer, public Qelt::ISPBitmap, public Qelt::ISPSubBitmap {
- public:
-  Qelt::ISPBitmap* GetBitmap() override { return this; }
-  int GetWidth() const override { return 512; }
-  int GetHeight() const override { return 512; }
-  Qelt::ISPTexture* GetTexture() override { return nullptr; }
-  void SetDebugName(const char*) override {}
-  void SetPixels(const void*, int, int) override {}
-  int GetTileCount() const override { return 1; }
-  Qelt::ISPSubBitmap* GetSubBitmap(int) override { return this; }
-  int GetX() const override { return 0; }
-  int GetY() const override { return 0; }
-  const Qelt::Matrix4<float>& GetProjection() const override { return mProjection; }
-  void BeginRender(int) override {}
-  void EndRender(int) override {}
-
- private:
-  Qelt::Matrix4<float> mProjection;
-};
 
 }  // namespace
 
