@@ -53,75 +53,49 @@ class PlainGL : public Qelt::PenDrawableGL {
   ~PlainGL() override { destroy(); }
 };
 
-TEST(Drawables, PrepareAndReleaseTheirPartnerOnTheRenderThread) {
-  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
-  PenDataManager manager(&queue);
-  CanvasLayer layer(queue, 30, 20);
-  PenCanvas canvas(&queue, &layer);
-  Notes notes;
-  {
-    PlainGL drawable(&manager, new NotingRT(notes));
-    drawable.SetCanvas(&canvas);
-    EXPECT_EQ(drawable.GetCanvas(), &canvas);
-    drawable.SetCanvas(nullptr);
-    EXPECT_THAT(notes, ElementsAre());
-  }
-  EXPECT_THAT(notes, ElementsAre());
-  queue.finish();
-  EXPECT_THAT(notes, ElementsAre("create 30 x 20", "release", "gone"));
-}
-
-TEST(Drawables, OnACanvasWithoutALayerNothingIsPrepared) {
+// Batches go by the canvas's queue, whoever's data manager has one.
+TEST(Drawables, OfACanvasWithoutALayerPrepareNothingAndOutliveWhatIsQueued) {
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
-  PenDataManager manager(&queue);
   PenCanvas canvas(&queue, nullptr);
-  Notes notes;
-  int posts = 0;
-  queue.onAccepted = [&](const Qelt::ITask&) { ++posts; };
-  {
-    PlainGL drawable(&manager, new NotingRT(notes));
-    drawable.SetCanvas(&canvas);
-    EXPECT_EQ(posts, 0);
+  for (RenderQueue* const managersQueue : {&queue, static_cast<RenderQueue*>(nullptr)}) {
+    PenDataManager manager(managersQueue);
+    Notes notes;
+    int posts = 0;
+    queue.onAccepted = [&](const Qelt::ITask&) { ++posts; };
+    {
+      PlainGL drawable(&manager, new NotingRT(notes));
+      drawable.SetCanvas(&canvas);
+      EXPECT_EQ(drawable.GetCanvas(), &canvas);
+      drawable.SetCanvas(nullptr);
+      EXPECT_EQ(posts, 0);
+    }
+    EXPECT_THAT(notes, ElementsAre()) << "work for the partner may still be queued";
+    queue.finish();
+    EXPECT_THAT(notes, ElementsAre("gone"));
   }
-  queue.finish();
-  EXPECT_THAT(notes, ElementsAre("gone"));
-}
-
-TEST(Drawables, APartnerOutlivesWhatWentToTheQueueOfACanvasTakenAway) {
-  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
-  PenDataManager withoutQueue(nullptr);
-  PenCanvas canvas(&queue, nullptr);
-  Notes notes;
-  {
-    PlainGL drawable(&withoutQueue, new NotingRT(notes));
-    drawable.SetCanvas(&canvas);
-    // Batches go by the canvas.
-    drawable.SetCanvas(nullptr);
-  }
-  EXPECT_THAT(notes, ElementsAre()) << "work for the partner may still be queued";
-  queue.finish();
-  EXPECT_THAT(notes, ElementsAre("gone"));
 }
 
 TEST(Drawables, APartnerWithoutAnyQueueIsDeletedAtOnce) {
   Notes notes;
-  { const PlainGL drawable(nullptr, new NotingRT(notes)); }
-  PenDataManager manager(nullptr);
-  { const PlainGL drawable(&manager, new NotingRT(notes)); }
-  { const PlainGL drawable(&manager, nullptr); }
-  EXPECT_THAT(notes, ElementsAre("gone", "gone"));
+  PenDataManager queueless(nullptr);
+  for (PenDataManager* const manager : {&queueless, static_cast<PenDataManager*>(nullptr)}) {
+    { const PlainGL drawable(manager, new NotingRT(notes)); }
+    EXPECT_THAT(notes, ElementsAre("gone"));
+    notes.clear();
+    { const PlainGL drawable(manager, nullptr); }
+  }
 }
 
 // Refusals may come at any post; whatever was taken runs first, and the partner is released if it was
 // prepared and gone exactly once.
-TEST(Drawables, SurviveAQueueThatRefuses) {
+TEST(Drawables, PrepareAndReleaseTheirPartnerThroughAQueueThatMayRefuse) {
   for (const auto mode : {RenderQueue::Mode::Thread, RenderQueue::Mode::Caller}) {
     for (int refusedPost = 0; refusedPost < 4; ++refusedPost) {
       for (const bool fromThereOn : {false, true}) {
         SCOPED_TRACE(std::to_string(refusedPost) + (fromThereOn ? " and after" : ""));
         RenderQueue queue(mode, RenderQueue::GL::Context);
         PenDataManager manager(&queue);
-        CanvasLayer layer(queue, 8, 8);
+        CanvasLayer layer(queue, 30, 20);
         PenCanvas canvas(&queue, &layer);
         int posts = 0;
         queue.accept = [&](const Qelt::ITask&) {
@@ -134,11 +108,8 @@ TEST(Drawables, SurviveAQueueThatRefuses) {
           drawable.SetCanvas(&canvas);
         }
         queue.finish();
-        if (refusedPost == 0) {
-          EXPECT_THAT(notes, ElementsAre("gone"));
-        } else {
-          EXPECT_THAT(notes, ElementsAre("create 8 x 8", "release", "gone"));
-        }
+        const Notes whole{"create 30 x 20", "release", "gone"};
+        EXPECT_EQ(notes, refusedPost == 0 ? Notes{"gone"} : whole);
       }
     }
   }

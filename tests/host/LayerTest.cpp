@@ -5,6 +5,7 @@
 #include <cmath>
 #include <cstddef>
 #include <cstdint>
+#include <map>
 #include <memory>
 #include <stdexcept>
 #include <string>
@@ -66,56 +67,58 @@ void main() {
 }
 )";
 
-// A quad over a rectangle, with the texture coordinates 0 to 1 or one value everywhere.
-Qelt::GraphicsObject* makeQuad() {
-  Qelt::VertexDescriptor layout;
-  layout.addAttribute(Qelt::AttributeType::Float, 2, -1);
-  layout.addAttribute(Qelt::AttributeType::Float, 2, -1);
-  return Qelt::GraphicsFactory::createGraphicsObject(1, Qelt::GraphicsFactory::kTriangles, layout, 0, 0);
-}
-
-void setQuad(Qelt::GraphicsObject& quad, float left, float top, float right, float bottom) {
-  const std::vector<float> vertices{left,  top, 0, 0, left, bottom, 0, 1, right, top,    1, 0,
-                                    right, top, 1, 0, left, bottom, 0, 1, right, bottom, 1, 1};
-  quad.updateBuffer(0, vertices.data(), 6);
-}
-
-// A small drawing of the window shader, kept over context losses as a pen keeps its own.
-class WindowPainter {
+// Draws a quad into a layer with one of the shaders above, kept over context losses as a pen keeps its own.
+class Painter {
  public:
-  WindowPainter() {
-    program = Qelt::GraphicsFactory::createOpenGLShaderProgram(kVertexShader, kWindowShader, nullptr);
-    projection = program->getBindingIntf("projection", 0);
-    tint = program->getBindingIntf("tint", 0);
-    offset = program->getBindingIntf("offset", 0);
-    strength = program->getBindingIntf("strength", 0);
-    quad = makeQuad();
+  explicit Painter(const char* fragmentShader) {
+    program = Qelt::GraphicsFactory::createOpenGLShaderProgram(kVertexShader, fragmentShader, nullptr);
+    for (const char* name : {"projection", "tint", "offset", "strength", "picture", "unused"})
+      uniforms[name] = program->getBindingIntf(name, 0);
+    Qelt::VertexDescriptor layout;
+    layout.addAttribute(Qelt::AttributeType::Float, 2, -1);
+    layout.addAttribute(Qelt::AttributeType::Float, 2, -1);
+    quad = Qelt::GraphicsFactory::createGraphicsObject(1, Qelt::GraphicsFactory::kTriangles, layout, 0, 0);
   }
-  ~WindowPainter() {
+  ~Painter() {
+    // Uniforms may outlive their program.
     program->release();
-    for (Qelt::IParameterBinding* binding : {projection, tint, offset, strength}) binding->release();
+    for (const auto& [name, uniform] : uniforms) {
+      if (uniform != nullptr) uniform->release();
+    }
     quad->release();
   }
-  WindowPainter(const WindowPainter&) = delete;
-  WindowPainter& operator=(const WindowPainter&) = delete;
+  Painter(const Painter&) = delete;
+  Painter& operator=(const Painter&) = delete;
 
-  void draw(Qelt::ISPBitmap& bitmap) {
+  // With the texture coordinates 0 to 1.
+  void setQuad(float left, float top, float right, float bottom) {
+    const std::vector<float> vertices{left,  top, 0, 0, left, bottom, 0, 1, right, top,    1, 0,
+                                      right, top, 1, 0, left, bottom, 0, 1, right, bottom, 1, 1};
+    quad->updateBuffer(0, vertices.data(), 6);
+  }
+
+  void draw(Qelt::ISPBitmap& target, int first = 0, int count = -1) {
     Qelt::OpenGLRenderer::disableState(GL_BLEND);
-    for (int i = 0; i < bitmap.GetTileCount(); ++i) {
-      Qelt::ISPSubBitmap& tile = *bitmap.GetSubBitmap(i);
+    for (int i = 0; i < target.GetTileCount(); ++i) {
+      Qelt::ISPSubBitmap& tile = *target.GetSubBitmap(i);
       tile.BeginRender(0);
       program->activate();
-      projection->set(tile.GetProjection());
-      tint->set(Qelt::Vector4<float>{1, 1, 1, 1});
-      offset->set(Qelt::Vector2<float>{0, 0});
-      strength->set(1.0f);
-      quad->draw(0, -1, true, 0);
+      uniforms["projection"]->set(tile.GetProjection());
+      if (uniforms["tint"] != nullptr) {
+        uniforms["tint"]->set(Qelt::Vector4<float>{1, 1, 1, 1});
+        uniforms["offset"]->set(Qelt::Vector2<float>{0, 0});
+        uniforms["strength"]->set(1.0f);
+      } else {
+        uniforms["picture"]->set(1);
+      }
+      quad->draw(first, count, true, 0);
+      Qelt::OpenGLRenderer::discardFramebuffer(6);
       tile.EndRender(0);
     }
   }
 
   Qelt::OpenGLShaderProgram* program;
-  Qelt::IParameterBinding *projection, *tint, *offset, *strength;
+  std::map<std::string, Qelt::IParameterBinding*> uniforms;
   Qelt::GraphicsObject* quad;
 };
 
@@ -141,42 +144,18 @@ INSTANTIATE_TEST_SUITE_P(Modes, Layer, testing::Values(RenderQueue::Mode::Thread
                            return mode.param == RenderQueue::Mode::Thread ? "OwnThread" : "CallersThread";
                          });
 
-TEST_P(Layer, TilesCoverThePageOnceAndMapTheirPixels) {
-  CanvasLayer layer(queue, 1030, 600);
-  Qelt::ISPBitmap& bitmap = *layer.GetBitmap();
-  ASSERT_EQ(bitmap.GetTileCount(), 6);
-  int area = 0;
-  for (int i = 0; i < 6; ++i) {
-    const Qelt::ISPSubBitmap& tile = *bitmap.GetSubBitmap(i);
-    EXPECT_EQ(tile.GetX(), (i % 3) * 512);
-    EXPECT_EQ(tile.GetY(), (i / 3) * 512);
-    area += tile.GetWidth() * tile.GetHeight();
-    // The first row lies at clip y = -1, and clip space leads back to the pixel.
-    const Qelt::Matrix4<float>& m = tile.GetProjection();
-    for (const float inside : {0.0f, 0.5f, 1.0f}) {
-      const auto x = static_cast<float>(tile.GetX()) + inside * static_cast<float>(tile.GetWidth());
-      const float clip = m[0] * x + m[12];
-      EXPECT_NEAR(
-          (clip + 1.0f) * 0.5f * static_cast<float>(tile.GetWidth()) + static_cast<float>(tile.GetX()), x,
-          1e-3f);
-      const auto y = static_cast<float>(tile.GetY()) + inside * static_cast<float>(tile.GetHeight());
-      EXPECT_NEAR(m[5] * y + m[13], 2.0f * inside - 1.0f, 1e-5f);
-    }
-  }
-  EXPECT_EQ(area, 1030 * 600);
-  EXPECT_EQ(bitmap.GetSubBitmap(6), nullptr);
-  EXPECT_EQ(bitmap.GetSubBitmap(-1), nullptr);
-}
-
 TEST_P(Layer, WindowCoordinatesRunOnAcrossTilesAndTheFirstRowIsTheTop) {
   constexpr int kWidth = 150, kHeight = 90;
   CanvasLayer layer(queue, kWidth, kHeight, 64);
   queue.run([&] {
-    WindowPainter painter;
+    Painter painter(kWindowShader);
     // Over every border between tiles, one pixel short of the page's edges.
-    setQuad(*painter.quad, 1, 1, kWidth - 1, kHeight - 1);
+    painter.setQuad(1, 1, kWidth - 1, kHeight - 1);
     painter.draw(*layer.GetBitmap());
   });
+  EXPECT_EQ(layer.GetBitmap()->GetTileCount(), 6);
+  EXPECT_EQ(layer.GetBitmap()->GetSubBitmap(6), nullptr);
+  EXPECT_EQ(layer.GetBitmap()->GetSubBitmap(-1), nullptr);
   const std::vector<std::uint8_t> pixels = layer.readPixels();
   ASSERT_EQ(pixels.size(), static_cast<std::size_t>(kWidth * kHeight * 4));
   for (int y = 0; y < kHeight; ++y) {
@@ -195,10 +174,10 @@ TEST_P(Layer, WindowCoordinatesRunOnAcrossTilesAndTheFirstRowIsTheTop) {
 TEST_P(Layer, KeepsItsPixelsAndEveryWrapperWorksOnAfterEachOfTwoLosses) {
   constexpr int kSize = 100;
   CanvasLayer layer(queue, kSize, kSize, 64);
-  std::unique_ptr<WindowPainter> painter;
+  std::unique_ptr<Painter> painter;
   queue.run([&] {
-    painter = std::make_unique<WindowPainter>();
-    setQuad(*painter->quad, 0, 0, 50, 100);
+    painter = std::make_unique<Painter>(kWindowShader);
+    painter->setQuad(0, 0, 50, 100);
     painter->draw(*layer.GetBitmap());
   });
   const std::vector<std::uint8_t> left = layer.readPixels();
@@ -220,7 +199,7 @@ TEST_P(Layer, KeepsItsPixelsAndEveryWrapperWorksOnAfterEachOfTwoLosses) {
     EXPECT_EQ(layer.readPixels(), left);
   }
   queue.loseContext();
-  queue.run([&] { setQuad(*painter->quad, 0, 0, kSize, kSize); });
+  queue.run([&] { painter->setQuad(0, 0, kSize, kSize); });
   queue.restoreContext();
   queue.run([&] { painter->draw(*layer.GetBitmap()); });
   EXPECT_EQ(pixelAt(layer.readPixels(), kSize, 99, 99)[0], 99);
@@ -234,6 +213,7 @@ TEST_P(Layer, SaysClearlyWhatCannotBeDrawn) {
   } catch (const std::runtime_error& error) {
     EXPECT_THAT(error.what(), HasSubstr("1048576 x 10"));
   }
+  EXPECT_EQ(CanvasLayer(queue, 1030, 600).GetBitmap()->GetTileCount(), 6) << "tiles are of 512 pixels";
   EXPECT_THROW(CanvasLayer(queue, 0, 10), std::runtime_error);
   EXPECT_THROW(CanvasLayer(queue, 10, 10, 0), std::runtime_error);
   RenderQueue blind(GetParam(), RenderQueue::GL::None);
@@ -242,8 +222,8 @@ TEST_P(Layer, SaysClearlyWhatCannotBeDrawn) {
 
 TEST_P(Layer, MayOutliveTheRenderThread) {
   CanvasLayer layer(queue, 10, 10);
-  std::unique_ptr<WindowPainter> painter;
-  queue.run([&] { painter = std::make_unique<WindowPainter>(); });
+  std::unique_ptr<Painter> painter;
+  queue.run([&] { painter = std::make_unique<Painter>(kWindowShader); });
   queue.shutDown();
   EXPECT_THROW(layer.readPixels(), std::runtime_error);
 }
@@ -283,28 +263,12 @@ class PatternOwner : public Qelt::ManagedObject {
 // Draws a bitmap over the whole layer, pixel for pixel.
 std::vector<std::uint8_t> pictureOf(RenderQueue& queue, CanvasLayer& layer, Qelt::ISPBitmap& bitmap) {
   queue.run([&] {
-    Qelt::OpenGLShaderProgram* const program =
-        Qelt::GraphicsFactory::createOpenGLShaderProgram(kVertexShader, kTextureShader, nullptr);
-    Qelt::IParameterBinding* const projection = program->getBindingIntf("projection", Qelt::kBindingMatrix4);
-    Qelt::IParameterBinding* const picture = program->getBindingIntf("picture", Qelt::kBindingInt);
-    Qelt::GraphicsObject* const quad = makeQuad();
-    setQuad(*quad, 0, 0, static_cast<float>(layer.width()), static_cast<float>(layer.height()));
-    Qelt::OpenGLRenderer::disableState(GL_BLEND);
+    Painter painter(kTextureShader);
+    painter.setQuad(0, 0, static_cast<float>(layer.width()), static_cast<float>(layer.height()));
     bitmap.GetTexture()->SetFilter(Qelt::ISPTexture::kMinFilter, GL_NEAREST);
     bitmap.GetTexture()->SetFilter(Qelt::ISPTexture::kMagFilter, GL_NEAREST);
     bitmap.GetTexture()->Bind(1);
-    Qelt::ISPSubBitmap& tile = *layer.GetBitmap()->GetSubBitmap(0);
-    tile.BeginRender(0);
-    program->activate();
-    projection->set(tile.GetProjection());
-    picture->set(1);
-    quad->draw(0, -1, true, 0);
-    Qelt::OpenGLRenderer::discardFramebuffer(6);
-    tile.EndRender(0);
-    quad->release();
-    program->release();
-    projection->release();
-    picture->release();
+    painter.draw(*layer.GetBitmap());
   });
   return layer.readPixels();
 }
@@ -393,28 +357,20 @@ TEST_P(Layer, TheHostShapeFillsItsSquare) {
   });
 }
 
-TEST_P(Layer, UniformsTellTheirTypeAndOutliveTheirProgram) {
+TEST_P(Layer, UniformsTellTheirTypeAndRefuseAnother) {
   queue.run([&] {
-    WindowPainter painter;
-    EXPECT_EQ(painter.projection->getType(), Qelt::kBindingMatrix4);
-    EXPECT_EQ(painter.tint->getType(), Qelt::kBindingVector4);
-    EXPECT_EQ(painter.offset->getType(), Qelt::kBindingVector2);
-    EXPECT_EQ(painter.strength->getType(), Qelt::kBindingFloat);
-    EXPECT_EQ(painter.program->getBindingIntf("tint", Qelt::kBindingFloat), nullptr);
-    EXPECT_EQ(painter.program->getBindingIntf("nowhere", 0), nullptr);
-    EXPECT_EQ(painter.program->getBindingIntf(nullptr, 0), nullptr);
-    painter.tint->set(3.0f);  // of another type: dropped, no GL error
-
-    Qelt::OpenGLShaderProgram* const program =
-        Qelt::GraphicsFactory::createOpenGLShaderProgram(kVertexShader, kTextureShader, nullptr);
-    Qelt::IParameterBinding* const sampler = program->getBindingIntf("picture", 0);
-    Qelt::IParameterBinding* const other = program->getBindingIntf("unused", 0);
-    EXPECT_EQ(sampler->getType(), Qelt::kBindingInt);
-    EXPECT_THAT(static_cast<int>(other->getType()), testing::Not(testing::AnyOf(0, 3, 4, 6, 7, 9)));
-    program->release();
-    sampler->set(1);
-    sampler->release();
-    other->release();
+    Painter window(kWindowShader), texture(kTextureShader);
+    EXPECT_EQ(window.uniforms["projection"]->getType(), Qelt::kBindingMatrix4);
+    EXPECT_EQ(window.uniforms["tint"]->getType(), Qelt::kBindingVector4);
+    EXPECT_EQ(window.uniforms["offset"]->getType(), Qelt::kBindingVector2);
+    EXPECT_EQ(window.uniforms["strength"]->getType(), Qelt::kBindingFloat);
+    EXPECT_EQ(texture.uniforms["picture"]->getType(), Qelt::kBindingInt);
+    EXPECT_THAT(static_cast<int>(texture.uniforms["unused"]->getType()),
+                testing::Not(testing::AnyOf(0, 3, 4, 6, 7, 9)));
+    EXPECT_EQ(window.uniforms["picture"], nullptr);
+    EXPECT_EQ(window.program->getBindingIntf("tint", Qelt::kBindingFloat), nullptr);
+    EXPECT_EQ(window.program->getBindingIntf(nullptr, 0), nullptr);
+    window.uniforms["tint"]->set(3.0f);  // of another type: dropped, no GL error
   });
 }
 
@@ -433,15 +389,12 @@ TEST_P(Layer, BrokenShadersAreLoggedAndAnswerNull) {
 TEST_P(Layer, VertexCountsAreHeldToWhatWasUploaded) {
   CanvasLayer layer(queue, 8, 8);
   queue.run([&] {
-    WindowPainter painter;
-    setQuad(*painter.quad, 0, 0, 8, 8);
+    Painter painter(kWindowShader);
+    painter.setQuad(0, 0, 8, 8);
     painter.quad->updateBuffer(1, nullptr, 3);
     painter.quad->updateBuffer(-1, nullptr, 3);
-    layer.GetBitmap()->GetSubBitmap(0)->BeginRender(0);
-    painter.program->activate();
-    painter.quad->draw(100, 5, true, 0);
-    painter.quad->draw(-3, 1000000, true, 0);
-    layer.GetBitmap()->GetSubBitmap(0)->EndRender(0);
+    painter.draw(*layer.GetBitmap(), 100, 5);
+    painter.draw(*layer.GetBitmap(), -3, 1000000);
     layer.clear();
     painter.quad->updateBuffer(0, nullptr, 6);
     painter.draw(*layer.GetBitmap());
@@ -455,8 +408,8 @@ TEST(LayerQueues, TwoQueuesOnOneThreadKeepTheirContextsApart) {
   RenderQueue two(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
   CanvasLayer second(two, 16, 16);
   one.run([&] {
-    WindowPainter painter;
-    setQuad(*painter.quad, 0, 0, 16, 16);
+    Painter painter(kWindowShader);
+    painter.setQuad(0, 0, 16, 16);
     EXPECT_EQ(second.readPixels(), std::vector<std::uint8_t>(16 * 16 * 4));  // inside the other's task
     painter.draw(*first.GetBitmap());
   });

@@ -32,7 +32,7 @@ class StrokeCache : public testing::Test {
   PenStrokeDataManager& manager = *PenStrokeDataManager::GetInstance();
 };
 
-TEST_F(StrokeCache, OnlyThePageMakesEntries) {
+TEST_F(StrokeCache, OnlyThePageMakesEntriesAndPointsNeedABuffer) {
   EXPECT_EQ(manager.GetStrokeData(kHandle), nullptr);
   manager.ReleaseStrokeData(kHandle);
   manager.CreateStrokeData(kHandle);
@@ -40,38 +40,36 @@ TEST_F(StrokeCache, OnlyThePageMakesEntries) {
   ASSERT_NE(data, nullptr);
   manager.CreateStrokeData(kHandle);
   EXPECT_EQ(manager.GetStrokeData(kHandle), data);
+  auto* const empty = new PenStrokePointData;
+  EXPECT_FALSE(data->SetPointData(empty));
+  EXPECT_EQ(data->GetPointData(), nullptr);
+  empty->Unref();
   manager.ReleaseStrokeData(kHandle);
   manager.ReleaseStrokeData(kHandle);
 }
 
 // Under AddressSanitizer this is the test that the last use frees, and no sooner.
-TEST_F(StrokeCache, ADroppedEntryGoesWithItsLastUse) {
-  manager.CreateStrokeData(kHandle);
-  PenStrokeData* const data = manager.GetStrokeData(kHandle);
-  PenStrokePointData* const points = pointsOf({1, 2, 3});
-  EXPECT_TRUE(data->SetPointData(points));
-  points->Unref();
-  manager.DropStrokeData(kHandle);
-  EXPECT_EQ(manager.GetStrokeData(kHandle), nullptr);
-  PenStrokePointData* const counted = data->GetPointData();
-  manager.ReleaseStrokeData(kHandle);
-  EXPECT_EQ(counted->mBuffer->size(), 3u);
-  counted->Unref();
-  manager.ReleaseStrokeData(kHandle);
-}
-
-TEST_F(StrokeCache, AnEntryMadeAnewInUseStartsOverEmpty) {
-  manager.CreateStrokeData(kHandle);
-  PenStrokeData* const data = manager.GetStrokeData(kHandle);
-  PenStrokePointData* const points = pointsOf({1});
-  data->SetPointData(points);
-  points->Unref();
-  manager.DropStrokeData(kHandle);
-  manager.CreateStrokeData(kHandle);
-  EXPECT_EQ(manager.GetStrokeData(kHandle), data);
-  EXPECT_EQ(data->GetPointData(), nullptr);
-  manager.ReleaseStrokeData(kHandle);
-  manager.ReleaseStrokeData(kHandle);
+TEST_F(StrokeCache, ADroppedEntryGoesWithItsLastUseAndOneMadeAnewMeanwhileIsEmpty) {
+  for (const bool isMadeAnew : {false, true}) {
+    manager.CreateStrokeData(kHandle);
+    PenStrokeData* const data = manager.GetStrokeData(kHandle);
+    PenStrokePointData* const points = pointsOf({1, 2, 3});
+    EXPECT_TRUE(data->SetPointData(points));
+    points->Unref();
+    PenStrokePointData* const counted = data->GetPointData();
+    manager.DropStrokeData(kHandle);
+    EXPECT_EQ(manager.GetStrokeData(kHandle), nullptr);
+    if (isMadeAnew) {
+      manager.CreateStrokeData(kHandle);
+      EXPECT_EQ(manager.GetStrokeData(kHandle), data);
+      EXPECT_EQ(data->GetPointData(), nullptr);
+      manager.ReleaseStrokeData(kHandle);
+    }
+    manager.ReleaseStrokeData(kHandle);
+    EXPECT_EQ(counted->mBuffer->size(), 3u);
+    counted->Unref();
+    manager.ReleaseStrokeData(kHandle);
+  }
 }
 
 TEST_F(StrokeCache, PointsRecordTheScaleOfTheViewThatTheyWereStoredIn) {
@@ -91,14 +89,6 @@ TEST_F(StrokeCache, PointsRecordTheScaleOfTheViewThatTheyWereStoredIn) {
   constexpr float kInfinity = std::numeric_limits<float>::infinity();
   EXPECT_FALSE(points->hasSameInverseScale({kInfinity, kInfinity}));
   points->Unref();
-}
-
-TEST_F(StrokeCache, PointsWithoutABufferAreNotKept) {
-  PenStrokeData data;
-  auto* const empty = new PenStrokePointData;
-  EXPECT_FALSE(data.SetPointData(empty));
-  EXPECT_EQ(data.GetPointData(), nullptr);
-  empty->Unref();
 }
 
 TEST(PageObjects, AreFoundByHandleWhileTheyLive) {

@@ -9,7 +9,6 @@
 #include <vector>
 
 #include "math/Matrix4.h"
-#include "pencommon/PenStrokeDataManager.h"
 #include "render/Patterns.h"
 #include "render/Pencil2StrokeDrawableRTV1.h"
 #include "render/Pencil2StrokeDrawableRTV2.h"
@@ -71,6 +70,17 @@ std::vector<Sample> wave(float left, float top) {
 
 constexpr float kLeft = 31.37f, kTop = 23.61f;
 
+// A straight stroke posts no start point: its grain is that of the stroke before, here a tap.
+Picture straightAfterTapAt(DrawingBoard& board, float x, float y, const std::vector<Sample>& samples) {
+  board.shared.mCurveEnabled = true;
+  board.stroke({{x, y}, {x, y}});
+  board.queue.finish();
+  board.layer->clear();
+  board.shared.mCurveEnabled = false;
+  board.stroke(samples);
+  return board.pixels();
+}
+
 // The versions that bring something of their own to the render thread: RTV1, RTV2, RTV3.
 class Draw : public testing::TestWithParam<int> {};
 
@@ -87,28 +97,18 @@ TEST_P(Draw, HasTheGrainFixedToTheStartPoint) {
   EXPECT_GT(differing(first, shifted, 63, 96), inked(first) / 5);
 }
 
-// A straight stroke posts no start point: its grain is that of the stroke before.
 TEST_P(Draw, StraightStrokesKeepTheGrainWhereItWas) {
   DrawingBoard board(paper(GetParam()));
-  const auto straightAfterTapAt = [&](float x, float y) {
-    board.shared.mCurveEnabled = true;
-    board.stroke({{x, y}, {x, y}});
-    board.queue.finish();
-    board.layer->clear();
-    board.shared.mCurveEnabled = false;
-    board.stroke(wave(kLeft, kTop));
-    return board.pixels();
-  };
-  const Picture a = straightAfterTapAt(40.37f, 40.61f);
-  const Picture b = straightAfterTapAt(51.37f, 47.61f);
-  EXPECT_GT(differing(a, b), inked(a) / 5);
-  EXPECT_EQ(differing(a, straightAfterTapAt(40.37f, 40.61f)), 0);
+  const auto after = [&](float x, float y) { return straightAfterTapAt(board, x, y, wave(kLeft, kTop)); };
+  const Picture a = after(40.37f, 40.61f);
+  EXPECT_GT(differing(a, after(51.37f, 47.61f)), inked(a) / 5);
+  EXPECT_EQ(differing(a, after(40.37f, 40.61f)), 0);
 
   // The grain repeats: every 150 stroke units in the first render version, every 75 in the others.
-  const Picture further = straightAfterTapAt(40.37f + 75.0f, 40.61f);
+  const Picture further = after(40.37f + 75.0f, 40.61f);
   if (GetParam() == 1) {
     EXPECT_GT(differing(a, further), inked(a) / 5);
-    EXPECT_LE(differing(a, straightAfterTapAt(40.37f + 150.0f, 40.61f)), inked(a) / 200);
+    EXPECT_LE(differing(a, after(40.37f + 150.0f, 40.61f)), inked(a) / 200);
   } else {
     EXPECT_LE(differing(a, further), inked(a) / 200);
   }
@@ -123,58 +123,33 @@ TEST_P(Draw, GrainZoomsWithTheView) {
   options.size = 18.0f / zoom;
   DrawingBoard board(options);
   board.canvas.setMatrix(viewOf(zoom));
-  const auto drawAfterTapAt = [&](float x) {
-    board.shared.mCurveEnabled = true;
-    board.stroke({{x, 20.31f}, {x, 20.31f}});
-    board.queue.finish();
-    board.layer->clear();
-    board.shared.mCurveEnabled = false;
-    board.stroke({{40.38f / zoom, 80.62f / zoom, 0.7f},
-                  {120.0f / zoom, 180.0f / zoom, 0.7f},
-                  {220.0f / zoom, 90.0f / zoom, 0.7f}});
-    return board.pixels();
+  const auto after = [&](float x) {
+    return straightAfterTapAt(board, x, 20.31f,
+                              {{40.38f / zoom, 80.62f / zoom, 0.7f},
+                               {120.0f / zoom, 180.0f / zoom, 0.7f},
+                               {220.0f / zoom, 90.0f / zoom, 0.7f}});
   };
-  const Picture a = drawAfterTapAt(20.19f);
-  EXPECT_LE(differing(a, drawAfterTapAt(20.19f + period)), inked(a) / 200);
-  EXPECT_GT(differing(a, drawAfterTapAt(20.19f + 0.5f * period)), inked(a) / 5);
+  const Picture a = after(20.19f);
+  EXPECT_LE(differing(a, after(20.19f + period)), inked(a) / 200);
+  EXPECT_GT(differing(a, after(20.19f + 0.5f * period)), inked(a) / 5);
 }
 
-TEST_P(Draw, IsSeamlessAcrossTiles) {
+// A drawable that dies in the middle of a stroke: what it handed over is drawn first.
+TEST_P(Draw, IsSeamlessAcrossTilesAndFinishedWhenTheDrawableDies) {
   Picture whole;
-  {
-    DrawingBoard board(paper(GetParam()));
+  for (const int tile : {kSide, 64}) {
+    BoardOptions options = paper(GetParam());
+    options.tile = tile;
+    DrawingBoard board(options);
     board.stroke(wave(kLeft, kTop));
-    whole = board.pixels();
+    if (tile == kSide) {
+      whole = board.pixels();
+      continue;
+    }
+    board.deleteDrawable();
+    EXPECT_GT(inked(whole), 1500);
+    EXPECT_LE(differing(whole, board.pixels()), inked(whole) / 500);
   }
-  BoardOptions tiled = paper(GetParam());
-  tiled.tile = 64;
-  DrawingBoard board(tiled);
-  board.stroke(wave(kLeft, kTop));
-  EXPECT_LE(differing(whole, board.pixels()), inked(whole) / 500);
-}
-
-TEST_P(Draw, OfTheCacheIsThePictureThatComputingGave) {
-  DrawingBoard board(paper(GetParam()));
-  const auto stroke = board.stored(wave(kLeft, kTop));
-  PenStrokeDataManager::GetInstance()->CreateStrokeData(stroke->GetRuntimeHandle());
-  board.redraw(*stroke);
-  const Picture computed = board.pixels();
-  ASSERT_GT(inked(computed), 1500);
-  board.layer->clear();
-  board.takePosts();
-  board.redraw(*stroke);
-  EXPECT_THAT(board.takePosts(), testing::Contains("Unref"));
-  EXPECT_EQ(board.pixels(), computed);
-  PenStrokeDataManager::GetInstance()->DropStrokeData(stroke->GetRuntimeHandle());
-}
-
-TEST_P(Draw, OfNothingLeavesThePictureAlone) {
-  DrawingBoard board(paper(GetParam()));
-  board.stroke(wave(kLeft, kTop));
-  const Picture before = board.pixels();
-  board.down({50.0f, 50.0f});
-  board.move({{50.5f, 50.0f}});
-  EXPECT_EQ(board.pixels(), before);
 }
 
 // The layer holds premultiplied colour: wherever there is ink, it is the pen's.
@@ -195,21 +170,14 @@ TEST_P(Draw, InksInThePensColour) {
 
 TEST_P(Draw, GoesOnAfterTheContextIsLostAndRestored) {
   const std::vector<Sample> samples = wave(kLeft, kTop);
-  const std::vector<Sample> half(samples.begin() + 1, samples.begin() + 12),
-      rest(samples.begin() + 12, samples.end());
-  Picture undisturbed;
-  {
-    DrawingBoard board(paper(GetParam()));
-    board.down(samples.front());
-    board.move(half);
-    board.move(rest);
-    undisturbed = board.pixels();
-  }
   DrawingBoard board(paper(GetParam()));
+  board.stroke(samples);
+  const Picture undisturbed = board.pixels();
+  board.layer->clear();
   board.down(samples.front());
-  board.move(half);
+  board.move({samples.begin() + 1, samples.begin() + 12});
   board.queue.loseContext();
-  board.move(rest);  // no context: what was posted draws nothing
+  board.move({samples.begin() + 12, samples.end()});  // no context: what was posted draws nothing
   board.queue.finish();
   board.queue.restoreContext();
   const int inkedBefore = inked(board.pixels());
@@ -218,18 +186,8 @@ TEST_P(Draw, GoesOnAfterTheContextIsLostAndRestored) {
 
   // What is drawn from now on looks as ever.
   board.layer->clear();
-  board.down(samples.front());
-  board.move(half);
-  board.move(rest);
+  board.stroke(samples);
   EXPECT_EQ(differing(undisturbed, board.pixels()), 0);
-}
-
-// A drawable that dies in the middle of a stroke: what it handed over is drawn first.
-TEST_P(Draw, FinishesWhatADyingDrawableHandedOver) {
-  DrawingBoard board(paper(GetParam()));
-  board.stroke(wave(kLeft, kTop));
-  board.deleteDrawable();
-  EXPECT_GT(inked(board.pixels()), 1500);
 }
 
 // Kept: the grain's size is what the diagonal of a 150-unit square spans in x and in y, which a rotation
@@ -270,9 +228,23 @@ class RenderDrawable : public testing::Test {
     EXPECT_THAT(batch, BatchOf(1, 11));
     return batch;
   }
-  void drawAll() {
+  // What was handed over, or the cached batch.
+  void drawAll(bool useCache = false) {
+    drawable.Update(useCache);
     ISPBitmap* const bitmap = layer.GetBitmap();
     for (int i = 0; i < bitmap->GetTileCount(); ++i) drawable.Draw(bitmap->GetSubBitmap(i), identity);
+  }
+  // The picture of one batch alone.
+  Picture pictureOf(std::vector<float>& batch) {
+    layer.clear();
+    queue.run([&] {
+      drawable.SetPenData(9.0f, static_cast<int>(0xFF000000u));
+      drawable.SetStartPoint(60.37f, 128.37f);
+      drawable.SendDataToGPU(&batch);
+      drawAll();
+      drawable.Clear();
+    });
+    return layer.readPixels();
   }
 
   RenderQueue queue{RenderQueue::Mode::Caller, RenderQueue::GL::Context};
@@ -284,39 +256,31 @@ class RenderDrawable : public testing::Test {
 
 TEST_F(RenderDrawable, DrawsTheBufferThatItsUpdateChose) {
   std::vector<float> live = stampAt(60.37f), cached = stampAt(190.37f);
-  queue.run([&] {
-    drawable.SetPenData(9.0f, static_cast<int>(0xFF000000u));
-    drawable.SetStartPoint(60.37f, 128.37f);
-    drawable.SendDataToGPU(&live);
-    drawable.SetCacheBuffer(&cached);
-    drawable.Update(true);
-    drawAll();
-  });
-  Picture picture = layer.readPixels();
-  EXPECT_EQ(alphaAt(picture, 60, 120), 0);
-  EXPECT_GT(inked(picture), 500);
-
-  layer.clear();
-  queue.run([&] {
-    drawable.Update(false);
-    drawAll();
-    drawable.Clear();
-  });
-  picture = layer.readPixels();
-  EXPECT_GT(inked(picture), 500);
-  EXPECT_EQ(alphaAt(picture, 190, 120), 0);
-  // Cleared: emptied, its room kept, and forgotten.
+  const Picture ofLive = pictureOf(live);
+  EXPECT_GT(inked(ofLive), 500);
+  EXPECT_EQ(alphaAt(ofLive, 190, 120), 0);
+  // Cleared: emptied and its room kept.
   EXPECT_TRUE(live.empty());
   EXPECT_GE(live.capacity(), 66u);
-  EXPECT_EQ(cached.size(), 66u);
+
+  live = stampAt(60.37f);
+  layer.clear();
+  queue.run([&] {
+    drawable.SendDataToGPU(&live);
+    drawable.SetCacheBuffer(&cached);
+    drawAll(true);
+  });
+  const Picture ofCached = layer.readPixels();
+  EXPECT_GT(inked(ofCached), 500);
+  EXPECT_EQ(alphaAt(ofCached, 60, 120), 0);
 
   layer.clear();
   queue.run([&] {
-    drawable.Update(false);
-    drawAll();
     drawable.Clear();
+    drawAll();  // forgotten
   });
   EXPECT_EQ(inked(layer.readPixels()), 0);
+  EXPECT_EQ(cached.size(), 66u);
 }
 
 // The window pixel of the start point: tiles are windows into one framebuffer, so it is the same in every
@@ -342,17 +306,8 @@ TEST_F(RenderDrawable, SettlesTheGrainOriginWithTheFirstTileDrawn) {
 // The dimming of thin stamps comes with the vertices, last of all: half of it is half the ink.
 TEST_F(RenderDrawable, DimsStampsByTheirWidth) {
   const auto inkOf = [this](std::vector<float> batch) {
-    layer.clear();
-    queue.run([&] {
-      drawable.SetPenData(9.0f, static_cast<int>(0xFF000000u));
-      drawable.SetStartPoint(60.37f, 128.37f);
-      drawable.SendDataToGPU(&batch);
-      drawable.Update(false);
-      drawAll();
-      drawable.Clear();
-    });
+    const Picture picture = pictureOf(batch);
     double ink = 0.0;
-    const Picture picture = layer.readPixels();
     for (std::size_t i = 3; i < picture.size(); i += 4) ink += picture[i];
     return ink;
   };
@@ -364,39 +319,29 @@ TEST_F(RenderDrawable, DimsStampsByTheirWidth) {
   EXPECT_NEAR(inkOf(half) / ink, 0.5, 0.03);
 }
 
-TEST_F(RenderDrawable, DrawsNothingWithoutATileOrABatch) {
+TEST_F(RenderDrawable, DrawsNothingWithoutATileOrABatchOrOnceReleased) {
   std::vector<float> live = stampAt(60.37f), empty;
   queue.run([&] {
     drawable.SendDataToGPU(&live);
     drawable.Update(false);
     drawable.Draw(nullptr, identity);
     drawable.SendDataToGPU(&empty);
-    drawable.Update(false);
     drawAll();
     drawable.Clear();
-    drawable.Update(true);
-    drawAll();
+    drawAll(true);
   });
   EXPECT_EQ(inked(layer.readPixels()), 0);
-}
 
-TEST_F(RenderDrawable, CanBeReleasedTwiceAndDrawsNothingAfterwards) {
-  std::vector<float> live = stampAt(60.37f);
   queue.run([&] {
     drawable.CreatePenCanvas(1, 1, nullptr);  // ready already
     drawable.Release();
     drawable.Release();
-    drawable.SendDataToGPU(&live);
-    drawable.Update(false);
-    drawAll();
-    drawable.Clear();
-    drawable.Init();
-    drawable.SendDataToGPU(&live);
-    drawable.Update(false);
-    drawAll();
-    drawable.Clear();
   });
-  EXPECT_EQ(inked(layer.readPixels()), 0);
+  for (int i = 0; i < 2; ++i) {
+    live = stampAt(60.37f);
+    EXPECT_EQ(inked(pictureOf(live)), 0);
+    queue.run([&] { drawable.Init(); });
+  }
 }
 
 // A stamp of 100 x 100 pixels, each on a texel of its shape: where the shape is 0 nothing is drawn, where it

@@ -36,24 +36,26 @@ class FakeQueue : public Qelt::IGLMsgQueue {
   std::vector<std::unique_ptr<Qelt::ITask>> tasks;
 };
 
+// One of a row of tiles, 64 pixels each.
 class FakeTile : public Qelt::ISPSubBitmap {
  public:
-  FakeTile(int left, int top, int width, int height) : mX(left), mY(top), mWidth(width), mHeight(height) {}
+  explicit FakeTile(int left) : mX(left) {}
   int GetX() const override { return mX; }
-  int GetY() const override { return mY; }
-  int GetWidth() const override { return mWidth; }
-  int GetHeight() const override { return mHeight; }
+  int GetY() const override { return 0; }
+  int GetWidth() const override { return 64; }
+  int GetHeight() const override { return 64; }
   const Qelt::Matrix4<float>& GetProjection() const override { return mProjection; }
   void BeginRender(int) override {}
   void EndRender(int) override {}
 
  private:
-  int mX, mY, mWidth, mHeight;
+  int mX;
   Qelt::Matrix4<float> mProjection;
 };
 
-class FakeBitmap : public Qelt::ISPBitmap {
+class FakeLayer : public Qelt::ISPLayer, public Qelt::ISPBitmap {
  public:
+  Qelt::ISPBitmap* GetBitmap() override { return hasBitmap ? this : nullptr; }
   int GetWidth() const override { return 0; }
   int GetHeight() const override { return 0; }
   Qelt::ISPTexture* GetTexture() override { return nullptr; }
@@ -62,14 +64,8 @@ class FakeBitmap : public Qelt::ISPBitmap {
   int GetTileCount() const override { return static_cast<int>(tiles.size()); }
   Qelt::ISPSubBitmap* GetSubBitmap(int index) override { return &tiles[static_cast<std::size_t>(index)]; }
 
-  std::vector<FakeTile> tiles;
-};
-
-class FakeLayer : public Qelt::ISPLayer {
- public:
-  Qelt::ISPBitmap* GetBitmap() override { return bitmap; }
-
-  FakeBitmap* bitmap = nullptr;
+  std::vector<FakeTile> tiles{FakeTile(0)};
+  bool hasBitmap = true;
 };
 
 class FakeCanvas : public Qelt::ISPPenCanvas {
@@ -77,13 +73,14 @@ class FakeCanvas : public Qelt::ISPPenCanvas {
   explicit FakeCanvas(Events& log) : events(log) {}
   Qelt::IGLMsgQueue* GetMsgQueue() override { return queue; }
   const Qelt::Matrix3<float>& GetMatrix() override { return matrix; }
-  Qelt::ISPLayer* GetLayer() override { return layer; }
+  Qelt::ISPLayer* GetLayer() override { return hasLayer ? &layer : nullptr; }
   void BeginTile(int index) override { events.push_back("begin " + std::to_string(index)); }
   void EndTile(int index) override { events.push_back("end " + std::to_string(index)); }
 
   Events& events;
   Qelt::IGLMsgQueue* queue = nullptr;
-  FakeLayer* layer = nullptr;
+  FakeLayer layer;
+  bool hasLayer = true;
   Qelt::Matrix3<float> matrix;
 };
 

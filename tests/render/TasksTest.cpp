@@ -46,6 +46,8 @@ TEST(TasksTest, CallTheirMemberOnceAndThroughTheObjectsOwnOverride) {
   FakeQueue queue;
   Derived object;
   EXPECT_TRUE(post(&queue, &object, &Base::nothing));
+  EXPECT_EQ(queue.tasks.at(0)->mNext, nullptr);
+  EXPECT_TRUE(queue.tasks[0]->isGlobalLockAllowed());
   EXPECT_TRUE(post(&queue, &object, &Base::one, 7));  // the result is ignored
   EXPECT_EQ(object.heard, "");
   queue.run();
@@ -56,36 +58,11 @@ TEST(TasksTest, CallTheirMemberOnceAndThroughTheObjectsOwnOverride) {
   EXPECT_EQ(object.heard, "1.500000 3");
 }
 
-TEST(TasksTest, AreLinkedToNothingAndAllowTheGlobalLock) {
-  FakeQueue queue;
-  Derived object;
-  post(&queue, &object, &Base::nothing);
-  ASSERT_EQ(queue.tasks.size(), 1u);
-  EXPECT_EQ(queue.tasks[0]->mNext, nullptr);
-  EXPECT_TRUE(queue.tasks[0]->isGlobalLockAllowed());
-}
-
 struct CountedString : String {
   explicit CountedString(int& deaths) : mDeaths(deaths) {}
   ~CountedString() override { ++mDeaths; }
   int& mDeaths;
 };
-
-TEST(TasksTest, DeleteThroughTheVirtualDestructorAndOnlyWhenRun) {
-  FakeQueue queue;
-  int deaths = 0;
-  auto kept = std::make_unique<CountedString>(deaths);
-  queue.refuses = [](const ITask&) { return true; };
-  EXPECT_FALSE(postDelete<String>(&queue, kept.get()));  // refused: still the caller's
-  EXPECT_EQ(deaths, 0);
-  queue.refuses = nullptr;
-  EXPECT_TRUE(postDelete<String>(&queue, kept.release()));
-  EXPECT_EQ(deaths, 0);
-  queue.run();
-  EXPECT_EQ(deaths, 1);
-  EXPECT_TRUE(postDelete<String>(&queue, nullptr));
-  queue.run();
-}
 
 struct CountedTask : ITask {
   explicit CountedTask(int& deaths) : mDeaths(deaths) {}
@@ -94,31 +71,32 @@ struct CountedTask : ITask {
   int& mDeaths;
 };
 
-TEST(PostingTest, DestroysWhatTheQueueRefusesAtOnceAndOnce) {
+TEST(TasksTest, AreDestroyedOnceAndWhatTheyDeleteOnlyWhenRun) {
   FakeQueue queue;
-  int deaths = 0;
-  EXPECT_TRUE(postTask(&queue, new CountedTask(deaths)));
-  EXPECT_EQ(deaths, 0);
-  queue.run();
-  EXPECT_EQ(deaths, 1);
+  int strings = 0, tasks = 0;
+  auto kept = std::make_unique<CountedString>(strings);
   queue.refuses = [](const ITask&) { return true; };
-  EXPECT_FALSE(postTask(&queue, new CountedTask(deaths)));
-  EXPECT_EQ(deaths, 2);
-  EXPECT_FALSE(postTask(nullptr, new CountedTask(deaths)));  // no queue at all
-  EXPECT_EQ(deaths, 3);
-  EXPECT_FALSE(postTask(&queue, nullptr));  // no memory for the task
+  EXPECT_FALSE(postDelete<String>(&queue, kept.get()));  // refused: still the caller's
+  EXPECT_FALSE(postTask(&queue, new CountedTask(tasks)));
+  EXPECT_FALSE(postTask(nullptr, new CountedTask(tasks)));  // no queue at all
+  EXPECT_FALSE(postTask(&queue, nullptr));                  // no memory for the task
+  EXPECT_EQ(tasks, 2);
+  queue.refuses = nullptr;
+  EXPECT_TRUE(postDelete<String>(&queue, kept.release()));
+  EXPECT_TRUE(postDelete<String>(&queue, nullptr));
+  EXPECT_TRUE(postTask(&queue, new CountedTask(tasks)));
+  EXPECT_EQ(strings, 0);
+  EXPECT_EQ(tasks, 2);
+  queue.run();
+  EXPECT_EQ(strings, 1);
+  EXPECT_EQ(tasks, 3);
 }
 
 // --- Guards ---
 
 class Guards : public testing::Test {
  protected:
-  Guards() {
-    canvas.queue = &queue;
-    layer.bitmap = &bitmap;
-    bitmap.tiles.emplace_back(0, 0, 64, 64);
-    canvas.layer = &layer;
-  }
+  Guards() { canvas.queue = &queue; }
   // What was handed over frees itself.
   ~Guards() override { queue.run(); }
 
@@ -143,8 +121,6 @@ class Guards : public testing::Test {
 
   Events events;
   FakeQueue queue;
-  FakeBitmap bitmap;
-  FakeLayer layer;
   FakeCanvas canvas{events};
   FakeDrawable drawable{events};
   UnclaimedBatch unclaimed;
@@ -166,12 +142,10 @@ TEST_F(Guards, HandABatchOverWithItsMessageAndItsDeletion) {
   EXPECT_THAT(take(), ElementsAre("send 66", "update", "begin 0", "draw at 0", "end 0", "clear"));
 }
 
-TEST_F(Guards, HandAnEmptyBatchOverAllTheSame) {
+TEST_F(Guards, HandAnEmptyBatchOverAllTheSameAndWhenAnExceptionLeaves) {
   draw(0);
   EXPECT_THAT(posted(), ElementsAre("Batch", "Render", "DeleteBatch"));
-}
-
-TEST_F(Guards, HandABatchOverWhenAnExceptionLeaves) {
+  queue.run();
   try {
     const Pencil2V1ReturnCallback guard(&drawable, &canvas, &unclaimed);
     throw 1;
@@ -218,7 +192,8 @@ TEST_F(Guards, LoseNothingToARefusal) {
   EXPECT_EQ(liveAllocations(), before);
 }
 
-TEST_F(Guards, FreeWhatIsLeftWithTheDrawable) {
+TEST_F(Guards, FreeWhatIsLeftWithTheDrawableAndWhatNoQueueTakes) {
+  canvas.queue = nullptr;
   const long before = liveAllocations();
   {
     UnclaimedBatch left;
@@ -226,12 +201,6 @@ TEST_F(Guards, FreeWhatIsLeftWithTheDrawable) {
     left.keep(new std::vector<float>(6), true);
     left.keep(new RefCount);
   }
-  EXPECT_EQ(liveAllocations(), before);
-}
-
-TEST_F(Guards, WithoutAQueueFreeTheBatch) {
-  canvas.queue = nullptr;
-  const long before = liveAllocations();
   draw(66);
   take();
   EXPECT_EQ(liveAllocations(), before);
@@ -250,25 +219,23 @@ TEST_F(Guards, StayInertWithoutMemoryForTheBatch) {
 
 TEST_F(Guards, OfACachedBatchBorrowIt) {
   std::vector<float> cached(54, 1.0f);
-  RectF rect;
-  rect.Set(1.0f, 2.0f, 3.0f, 4.0f);
-  bool handedOver = false;
-  { const Pencil2V7CacheRedrawCallback guard(&drawable, &canvas, rect, &cached, &unclaimed, &handedOver); }
-  EXPECT_TRUE(handedOver);
+  // Whether it was handed over.
+  const auto redraw = [&](std::vector<float>* batch) {
+    bool handedOver = false;
+    { const Pencil2V7CacheRedrawCallback guard(&drawable, &canvas, {}, batch, &unclaimed, &handedOver); }
+    return handedOver;
+  };
+  EXPECT_TRUE(redraw(&cached));
   EXPECT_THAT(posted(), ElementsAre("Batch", "Render"));
   EXPECT_TRUE(dynamic_cast<const PenGLRenderMsg&>(*queue.tasks[1]).mUseCacheBuffer);
   queue.run();
   EXPECT_THAT(take(), ElementsAre("cache 54", "update cache", "begin 0", "draw at 0", "end 0", "clear"));
   EXPECT_EQ(cached.size(), 54u);
 
-  handedOver = false;
-  { const Pencil2V7CacheRedrawCallback guard(&drawable, &canvas, rect, nullptr, &unclaimed, &handedOver); }
-  EXPECT_FALSE(handedOver);
+  EXPECT_FALSE(redraw(nullptr));
   EXPECT_THAT(posted(), IsEmpty());
-
   refuse(0);
-  { const Pencil2V7CacheRedrawCallback guard(&drawable, &canvas, rect, &cached, &unclaimed, &handedOver); }
-  EXPECT_FALSE(handedOver);
+  EXPECT_FALSE(redraw(&cached));
   EXPECT_THAT(posted(), IsEmpty());  // no message that would draw the batch before
 }
 
@@ -289,22 +256,21 @@ TEST_F(Guards, OfTwoBuffersFreeBothWhateverIsRefused) {
     int batches = 0;
   } outline(nullptr);
   UnclaimedBatch ofOutline;
-  { const OutlineGuard guard(&outline, &canvas, &ofOutline); }
-  ASSERT_EQ(queue.tasks.size(), 4u);
-  EXPECT_EQ(taskName(*queue.tasks[1]), "Render");
-  EXPECT_EQ(taskName(*queue.tasks[2]), "DeleteBatch");
-  EXPECT_EQ(taskName(*queue.tasks[3]), "DeleteBatch");
+  const auto draw = [&] { const OutlineGuard guard(&outline, &canvas, &ofOutline); };
+  draw();
+  const std::vector<std::string> names = posted();
+  EXPECT_THAT(std::vector(names.begin() + 1, names.end()),
+              ElementsAre("Render", "DeleteBatch", "DeleteBatch"));
   queue.run();
   EXPECT_EQ(outline.batches, 1);
 
-  queue.tasks.shrink_to_fit();
   take();
   const long before = liveAllocations();
   for (int refused = 0; refused < 4; ++refused) {
     refuse(refused);
-    { const OutlineGuard guard(&outline, &canvas, &ofOutline); }
+    draw();
     queue.run();
-    { const OutlineGuard guard(&outline, &canvas, &ofOutline); }  // puts it right
+    draw();  // puts it right
     queue.run();
     take();
   }
