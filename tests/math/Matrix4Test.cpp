@@ -2,41 +2,21 @@
 
 #include <gtest/gtest.h>
 
-#include <array>
 #include <cmath>
 #include <numeric>
 
 #include "base/Vector.h"
+#include "math/Elements.h"
 
 namespace Qelt {
 namespace {
 
-using Elements = std::array<float, 16>;
+using Elements = QeltTests::Elements<4>;
+using QeltTests::expectNear;
+using QeltTests::naiveProduct;
 
 Matrix4<float> of(const Elements& elements) {
   return Matrix4<float>(elements.data());
-}
-
-void expectNear(const Matrix4<float>& matrix, const Elements& expected, float tolerance) {
-  for (int index = 0; index < 16; ++index) {
-    EXPECT_NEAR(matrix[index], expected[index], tolerance) << "element " << index;
-  }
-}
-
-Elements naiveProduct(const Elements& left, const Elements& right) {
-  Elements result{};
-  for (int row = 0; row < 4; ++row) {
-    for (int column = 0; column < 4; ++column) {
-      double sum = 0.0;
-      for (int k = 0; k < 4; ++k) sum += double(left[row + 4 * k]) * right[k + 4 * column];
-      result[row + 4 * column] = static_cast<float>(sum);
-    }
-  }
-  return result;
-}
-
-Vector3<float> turned(const Matrix4<float>& m, float x, float y, float z) {
-  return {m[0] * x + m[4] * y + m[8] * z, m[1] * x + m[5] * y + m[9] * z, m[2] * x + m[6] * y + m[10] * z};
 }
 
 constexpr Elements kIdentity = {1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1};
@@ -73,14 +53,12 @@ TEST(Matrix4, EqualityIsThatOfTheBytes) {
 
 TEST(Matrix4, MultipliesTheOtherFromTheRight) {
   const Elements other = {-3, 0.75f, 0.5f, 1, 2, 1, -0.25f, 0, 4, 9, 2, -1, 0.5f, 6, -7, 3};
-  expectNear(of(kAny) * of(other), naiveProduct(kAny, other), 1e-5f);
+  expectNear(of(kAny) * of(other), naiveProduct<4>(kAny, other), 1e-5f);
 }
 
 TEST(Matrix4, InverseTimesMatrixIsTheIdentity) {
   const Matrix4<float> inverse = of(kAny).inverse();
-  Elements elements;
-  for (int index = 0; index < 16; ++index) elements[index] = inverse[index];
-  expectNear(of(naiveProduct(elements, kAny)), kIdentity, 2e-6f);
+  expectNear(naiveProduct<4>(inverse, kAny), kIdentity, 2e-6f);
   Matrix4<float> itself = of(kAny);
   EXPECT_EQ(itself.inverseSelf(), inverse);
 }
@@ -106,13 +84,13 @@ TEST(Matrix4, PerspectiveSpansTheFieldOfView) {
   // 90 degrees: f = near, so element 5 is 1; aspect 2 halves element 0. near 1, far 3:
   // -(1 + 3) / 2 = -2 and -(2 * 3 * 1) / 2 = -3.
   expectNear(Matrix4<float>::perspectiveMatrix(90, 2, 1, 3),
-             {0.5f, 0, 0, 0, 0, 1, 0, 0, 0, 0, -2, -1, 0, 0, -3, 0}, 1e-6f);
+             Elements{0.5f, 0, 0, 0, 0, 1, 0, 0, 0, 0, -2, -1, 0, 0, -3, 0}, 1e-6f);
 }
 
 TEST(Matrix4, OrthoTakesTheBoxToTheUnitCube) {
   // 2 / 4, 2 / (2 - 10), -2 / 8, -(1 + 5) / 4, -(10 + 2) / -8, -(1 + 9) / 8
   expectNear(Matrix4<float>::orthoMatrix(1, 5, 10, 2, 1, 9),
-             {0.5f, 0, 0, 0, 0, -0.25f, 0, 0, 0, 0, -0.25f, 0, -1.5f, 1.5f, -1.25f, 1}, 0.0f);
+             Elements{0.5f, 0, 0, 0, 0, -0.25f, 0, 0, 0, 0, -0.25f, 0, -1.5f, 1.5f, -1.25f, 1}, 0.0f);
 }
 
 TEST(Matrix4, TranslationAndScaleInBothForms) {
@@ -126,25 +104,24 @@ TEST(Matrix4, TranslationAndScaleInBothForms) {
   Elements untranslated = kAny;
   untranslated[12] = untranslated[13] = untranslated[14] = 0;
   expectNear(of(kAny).rotation(), untranslated, 0.0f);
-  expectNear(of(kAny).translation(), {1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1, 0, 5, -2, 6, 1}, 0.0f);
+  expectNear(of(kAny).translation(), Elements{1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1, 0, 5, -2, 6, 1}, 0.0f);
 }
 
 TEST(Matrix4, EulerAnglesTurnAboutZThenYThenX) {
   // Each angle alone, in radians, counter-clockwise about its axis.
-  expectNear(Matrix4<float>::rotateMatrix(kQuarter, 0, 0), {1, 0, 0, 0, 0, 0, 1, 0, 0, -1, 0, 0, 0, 0, 0, 1},
-             1e-6f);
-  expectNear(Matrix4<float>::rotateMatrix(0, kQuarter, 0), {0, 0, -1, 0, 0, 1, 0, 0, 1, 0, 0, 0, 0, 0, 0, 1},
-             1e-6f);
-  expectNear(Matrix4<float>::rotateMatrix(0, 0, kQuarter), {0, 1, 0, 0, -1, 0, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1},
-             1e-6f);
+  expectNear(Matrix4<float>::rotateMatrix(kQuarter, 0, 0),
+             Elements{1, 0, 0, 0, 0, 0, 1, 0, 0, -1, 0, 0, 0, 0, 0, 1}, 1e-6f);
+  expectNear(Matrix4<float>::rotateMatrix(0, kQuarter, 0),
+             Elements{0, 0, -1, 0, 0, 1, 0, 0, 1, 0, 0, 0, 0, 0, 0, 1}, 1e-6f);
+  expectNear(Matrix4<float>::rotateMatrix(0, 0, kQuarter),
+             Elements{0, 1, 0, 0, -1, 0, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1}, 1e-6f);
   // All three, against the product of the three.
   const float angles[3] = {0.3f, -0.7f, 1.1f};
   const Matrix4<float> product = Matrix4<float>::rotateMatrix(angles[0], 0, 0) *
                                  Matrix4<float>::rotateMatrix(0, angles[1], 0) *
                                  Matrix4<float>::rotateMatrix(0, 0, angles[2]);
-  Elements expected;
-  for (int index = 0; index < 16; ++index) expected[index] = product[index];
-  expectNear(Matrix4<float>::rotateMatrix(angles[0], angles[1], angles[2]), expected, 1e-6f);
+  expectNear(Matrix4<float>::rotateMatrix(angles[0], angles[1], angles[2]),
+             naiveProduct<4>(product, kIdentity), 1e-6f);
 }
 
 TEST(Matrix4, RotatingReplacesTheUpperThreeByThree) {
@@ -170,12 +147,12 @@ TEST(Matrix4, RotatingReplacesTheUpperThreeByThree) {
 TEST(Matrix4, AxisAndAngleTurnAgainstTheEulerSense) {
   Vector3<float> axis{0, 0, 5};  // any length
   const Matrix4<float> matrix = Matrix4<float>::rotateMatrix(kQuarter, axis);
-  expectNear(matrix, {0, -1, 0, 0, 1, 0, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1}, 1e-6f);
+  expectNear(matrix, Elements{0, -1, 0, 0, 1, 0, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1}, 1e-6f);
   EXPECT_EQ(axis.z, 5.0f);
   // A third of a turn about the diagonal takes y to x, z to y and x to z.
   Vector3<float> diagonal{1, 1, 1};
   expectNear(Matrix4<float>::rotateMatrix(2.0943951f, diagonal),
-             {0, 0, 1, 0, 1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 0, 1}, 1e-6f);
+             Elements{0, 0, 1, 0, 1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 0, 1}, 1e-6f);
   Vector3<float> none{0, 0, 0};
   EXPECT_FALSE(std::isfinite(Matrix4<float>::rotateMatrix(1.0f, none)[0]));
 }
@@ -183,10 +160,10 @@ TEST(Matrix4, AxisAndAngleTurnAgainstTheEulerSense) {
 TEST(Matrix4, ADirectionAndAnUpwardMakeAFrame) {
   // dir z, up y: z x y = -x, (-x) x z = y.
   expectNear(Matrix4<float>::rotateMatrix(Vector3<float>{0, 0, 2}, Vector3<float>{0, 3, 1}),
-             {-1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1}, 1e-6f);
-  const Vector3<float> x = turned(Matrix4<float>::rotateMatrix({1, 2, 3}, {0, 1, 0}), 0, 0, 1);
-  EXPECT_NEAR(x.y / x.x, 2.0f, 1e-5f);
-  EXPECT_NEAR(x.z / x.x, 3.0f, 1e-5f);
+             Elements{-1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1}, 1e-6f);
+  const Matrix4<float> m = Matrix4<float>::rotateMatrix({1, 2, 3}, {0, 1, 0});
+  EXPECT_NEAR(m[9] / m[8], 2.0f, 1e-5f);
+  EXPECT_NEAR(m[10] / m[8], 3.0f, 1e-5f);
   EXPECT_FALSE(std::isfinite(Matrix4<float>::rotateMatrix({0, 0, 1}, {0, 0, 1})[0]));
 }
 
