@@ -199,64 +199,30 @@ std::size_t bytes(std::align_val_t alignment) {
 
 }  // namespace
 
-void* operator new(std::size_t size) {
-  return orThrow(allocate(size, 0, QELT_CALLER));
-}
-void* operator new[](std::size_t size) {
-  return orThrow(allocate(size, 0, QELT_CALLER));
-}
-void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
-  return allocate(size, 0, QELT_CALLER);
-}
-void* operator new[](std::size_t size, const std::nothrow_t&) noexcept {
-  return allocate(size, 0, QELT_CALLER);
-}
-void* operator new(std::size_t size, std::align_val_t alignment) {
-  return orThrow(allocate(size, bytes(alignment), QELT_CALLER));
-}
-void* operator new[](std::size_t size, std::align_val_t alignment) {
-  return orThrow(allocate(size, bytes(alignment), QELT_CALLER));
-}
-void* operator new(std::size_t size, std::align_val_t alignment, const std::nothrow_t&) noexcept {
-  return allocate(size, bytes(alignment), QELT_CALLER);
-}
-void* operator new[](std::size_t size, std::align_val_t alignment, const std::nothrow_t&) noexcept {
-  return allocate(size, bytes(alignment), QELT_CALLER);
-}
+// Both of a form: for one and for many.
+#define QELT_NEW(PARAMETERS, MEMORY) \
+  void* operator new PARAMETERS {    \
+    return MEMORY;                   \
+  }                                  \
+  void* operator new[] PARAMETERS {  \
+    return MEMORY;                   \
+  }
+QELT_NEW((std::size_t size), orThrow(allocate(size, 0, QELT_CALLER)))
+QELT_NEW((std::size_t size, const std::nothrow_t&) noexcept, allocate(size, 0, QELT_CALLER))
+QELT_NEW((std::size_t size, std::align_val_t to), orThrow(allocate(size, bytes(to), QELT_CALLER)))
+QELT_NEW((std::size_t size, std::align_val_t to, const std::nothrow_t&) noexcept,
+         allocate(size, bytes(to), QELT_CALLER))
 
-void operator delete(void* memory) noexcept {
-  release(memory);
-}
-void operator delete[](void* memory) noexcept {
-  release(memory);
-}
-void operator delete(void* memory, std::size_t) noexcept {
-  release(memory);
-}
-void operator delete[](void* memory, std::size_t) noexcept {
-  release(memory);
-}
-void operator delete(void* memory, const std::nothrow_t&) noexcept {
-  release(memory);
-}
-void operator delete[](void* memory, const std::nothrow_t&) noexcept {
-  release(memory);
-}
-void operator delete(void* memory, std::align_val_t) noexcept {
-  release(memory);
-}
-void operator delete[](void* memory, std::align_val_t) noexcept {
-  release(memory);
-}
-void operator delete(void* memory, std::size_t, std::align_val_t) noexcept {
-  release(memory);
-}
-void operator delete[](void* memory, std::size_t, std::align_val_t) noexcept {
-  release(memory);
-}
-void operator delete(void* memory, std::align_val_t, const std::nothrow_t&) noexcept {
-  release(memory);
-}
-void operator delete[](void* memory, std::align_val_t, const std::nothrow_t&) noexcept {
-  release(memory);
-}
+#define QELT_DELETE(PARAMETERS)                \
+  void operator delete PARAMETERS noexcept {   \
+    release(memory);                           \
+  }                                            \
+  void operator delete[] PARAMETERS noexcept { \
+    release(memory);                           \
+  }
+QELT_DELETE((void* memory))
+QELT_DELETE((void* memory, std::size_t))
+QELT_DELETE((void* memory, const std::nothrow_t&))
+QELT_DELETE((void* memory, std::align_val_t))
+QELT_DELETE((void* memory, std::size_t, std::align_val_t))
+QELT_DELETE((void* memory, std::align_val_t, const std::nothrow_t&))

@@ -12,11 +12,11 @@
 namespace QeltTests {
 namespace {
 
-class AllocationSweep : public testing::TestWithParam<SweepCase> {};
+class AllocationSweep : public testing::TestWithParam<Scenario> {};
 
 TEST_P(AllocationSweep, LeavesThePenAsGoodAsNew) {
-  const auto& [scenario, picture] = GetParam();
-  SweepGround ground(picture);
+  const Scenario& scenario = GetParam();
+  SweepGround ground(scenario.picture);
   int total = 0;
   for (const int version : allVersions()) {
     if (!isSwept(scenario, version)) continue;
@@ -38,8 +38,8 @@ TEST_P(AllocationSweep, LeavesThePenAsGoodAsNew) {
   RecordProperty("failures", total);
 }
 
-INSTANTIATE_TEST_SUITE_P(Scenarios, AllocationSweep, testing::ValuesIn(sweepCases()),
-                         [](const auto& test) { return std::string(test.param.scenario.name); });
+INSTANTIATE_TEST_SUITE_P(Scenarios, AllocationSweep, testing::ValuesIn(scenarios()),
+                         [](const auto& test) { return std::string(test.param.name); });
 
 }  // namespace
 }  // namespace QeltTests

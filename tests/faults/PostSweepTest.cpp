@@ -52,11 +52,11 @@ class Doorman {
   long mNumber = 0;
 };
 
-class PostSweep : public testing::TestWithParam<SweepCase> {};
+class PostSweep : public testing::TestWithParam<Scenario> {};
 
 TEST_P(PostSweep, LeavesThePenAsGoodAsNew) {
-  const auto& [scenario, picture] = GetParam();
-  SweepGround ground(picture);
+  const Scenario& scenario = GetParam();
+  SweepGround ground(scenario.picture);
   int total = 0;
   for (const int version : allVersions()) {
     if (!isSwept(scenario, version)) continue;
@@ -83,9 +83,9 @@ TEST_P(PostSweep, LeavesThePenAsGoodAsNew) {
 }
 
 TEST_P(PostSweep, SurvivesRefusalsWithoutAPattern) {
-  const auto& [scenario, picture] = GetParam();
-  SweepGround ground(picture);
-  for (std::uint32_t seed = 1; seed <= (picture ? 8u : 60u); ++seed) {
+  const Scenario& scenario = GetParam();
+  SweepGround ground(scenario.picture);
+  for (std::uint32_t seed = 1; seed <= (scenario.picture ? 8u : 60u); ++seed) {
     // From one in sixteen to fifteen in sixteen.
     const std::uint32_t sixteenths = 1 + seed % 15;
     std::mt19937 random(seed);
@@ -97,8 +97,8 @@ TEST_P(PostSweep, SurvivesRefusalsWithoutAPattern) {
   }
 }
 
-INSTANTIATE_TEST_SUITE_P(Scenarios, PostSweep, testing::ValuesIn(sweepCases()),
-                         [](const auto& test) { return std::string(test.param.scenario.name); });
+INSTANTIATE_TEST_SUITE_P(Scenarios, PostSweep, testing::ValuesIn(scenarios()),
+                         [](const auto& test) { return std::string(test.param.name); });
 
 }  // namespace
 }  // namespace QeltTests

@@ -10,41 +10,36 @@ std::vector<Scenario> scenarios() {
        [](Stage& stage) {
          stage.makePen();
          stage.deletePen();
-       },
-       false},
+       }},
       {"LiveStroke", [](Stage& stage) { stage.live(); }, true},
-      {"LiveStrokeLeftOpen", [](Stage& stage) { stage.beginLive(); }, false},
+      {"LiveStrokeLeftOpen", [](Stage& stage) { stage.beginLive(); }},
       {"LiveStrokeQueuedAsThePenDies",
        [](Stage& stage) {
          stage.live(false);
          stage.deletePen();
-       },
-       false},
+       }},
       {"Redraws", [](Stage& stage) { stage.redraw(); }, true},
       {"RedrawsQueuedAsThePenDies",
        [](Stage& stage) {
          stage.redraw(false);
          stage.deletePen();
-       },
-       false},
+       }},
       {"RedrawAtAnotherScale",
        [](Stage& stage) {
          stage.redraw();
          stage.zoom(3.0f);
          stage.redraw(false);
-       },
-       false},
+       }},
       {"Outlines", [](Stage& stage) { stage.outline(); }, true},
-      {"Preview", [](Stage& stage) { stage.preview(); }, false},
-      {"Prediction", [](Stage& stage) { stage.predict(); }, false},
+      {"Preview", [](Stage& stage) { stage.preview(); }},
+      {"Prediction", [](Stage& stage) { stage.predict(); }},
       {"AllQueuedAsThePenDies",
        [](Stage& stage) {
          stage.outline(false);
          stage.preview(false);
          stage.predict(false);
          stage.deletePen();
-       },
-       false},
+       }},
       {"VersionChange",
        [](Stage& stage) {
          stage.live(false);
@@ -53,26 +48,20 @@ std::vector<Scenario> scenarios() {
            stage.pen()->setVersion(version);
            stage.live(false);
          }
-       },
-       false},
-  };
-}
-
-std::vector<Scenario> pictureScenarios() {
-  return {
+       }},
       {"InitAndRelease",
        [](Stage& stage) {
          stage.prepareAll();
          stage.deletePen();
        },
-       false},
-      {"LivePicture", [](Stage& stage) { stage.live(); }, false},
+       false, true},
+      {"LivePicture", [](Stage& stage) { stage.live(); }, false, true},
       {"ContextLoss",
        [](Stage& stage) {
          stage.prepareAll();
          stage.loseAndRestoreContext();
        },
-       false},
+       false, true},
   };
 }
 

@@ -10,12 +10,12 @@ namespace QeltTests {
 struct Scenario {
   const char* name;
   void (*run)(Stage&);
-  bool everyVersion;  // or version 8 alone
+  bool everyVersion = false;  // or version 8 alone
+  bool picture = false;       // or no GL
 };
 
-// Those that need no GL. Where a pen dies, it dies with work queued.
+// Where a pen dies, it dies with work queued. Those with a picture: textures, shaders, buffers; loss of the
+// context.
 std::vector<Scenario> scenarios();
-// Those with a picture: textures, shaders, buffers; loss of the context.
-std::vector<Scenario> pictureScenarios();
 
 }  // namespace QeltTests

@@ -6,6 +6,9 @@
 #include <chrono>
 #include <cstdint>
 #include <cstdlib>
+#include <functional>
+#include <iterator>
+#include <memory>
 #include <random>
 #include <string>
 #include <thread>
@@ -48,45 +51,32 @@ long drawFor(double time, Stage& stage, RenderQueue& queue, Pace pace, bool lose
   const auto below = [&random](int bound) {
     return static_cast<int>(random() % static_cast<unsigned>(bound));
   };
+  const auto live = [&] { stage.live(false); };
+  const auto redraw = [&] { stage.redraw(false); };
+  const std::function<void()> all[] = {
+      live,
+      live,
+      redraw,
+      redraw,
+      [&] { stage.beginLive(); },
+      [&] { stage.outline(false); },
+      [&] { stage.preview(false); },
+      [&] { stage.predict(false); },
+      [&] { stage.deletePen(); },
+      [&] { stage.zoom(1.0f + 0.5f * static_cast<float>(below(4))); },
+      [&] {
+        if (stage.pen() != nullptr) stage.pen()->setVersion(1 + below(8));
+      },
+      [&] {
+        stage.turnPage();
+        if (losesContext && below(4) == 0) stage.loseAndRestoreContext();
+      },
+  };
   const Clock::time_point end =
       Clock::now() + std::chrono::duration_cast<Clock::duration>(std::chrono::duration<double>(time));
   long actions = 0;
   for (int ahead = 0; Clock::now() < end; ++actions) {
-    switch (below(12)) {
-      case 0:
-      case 1:
-        stage.live(false);
-        break;
-      case 2:
-        stage.beginLive();
-        break;
-      case 3:
-      case 4:
-        stage.redraw(false);
-        break;
-      case 5:
-        stage.outline(false);
-        break;
-      case 6:
-        stage.preview(false);
-        break;
-      case 7:
-        stage.predict(false);
-        break;
-      case 8:
-        if (stage.pen() != nullptr) stage.pen()->setVersion(1 + below(8));
-        break;
-      case 9:
-        stage.zoom(1.0f + 0.5f * static_cast<float>(below(4)));
-        break;
-      case 10:
-        stage.turnPage();
-        if (losesContext && below(4) == 0) stage.loseAndRestoreContext();
-        break;
-      default:
-        stage.deletePen();
-        break;
-    }
+    all[below(static_cast<int>(std::size(all)))]();
     if (pace.mostSleep > 0) {
       auto* const sleep = new SleepTask(std::chrono::microseconds(below(pace.mostSleep)));
       if (!queue.Post(sleep)) delete sleep;

@@ -1,10 +1,10 @@
 #include "Stage.h"
 
 #include <cmath>
-#include <initializer_list>
 #include <new>
 #include <stdexcept>
 
+#include "base/RectF.h"
 #include "desktop/pencommon/BatchObserver.h"
 #include "math/Matrix3.h"
 #include "pencommon/IPenMorphable.h"
@@ -12,7 +12,6 @@
 #include "pencommon/PenPredictionDrawableGL.h"
 #include "pencommon/PenPreviewDrawableGL.h"
 #include "pencommon/PenStrokeDataManager.h"
-#include "support/BlindLayer.h"
 
 namespace QeltTests {
 
@@ -57,51 +56,25 @@ MotionEvent recordedStroke() {
   return eventOf(Qelt::kActionUp, all, 0, all.size());
 }
 
-bool sameBits(float a, float b) {
-  return a == b || (std::isnan(a) && std::isnan(b));
-}
-
 }  // namespace
 
-// With a layer a canvas like any other; without, one whose render messages have something to run through.
-class Stage::Canvas final : public QeltDesktop::PenCanvas {
- public:
-  using PenCanvas::PenCanvas;
-  Qelt::ISPLayer* GetLayer() override { return layer() != nullptr ? PenCanvas::GetLayer() : &mBlindLayer; }
-
- private:
-  BlindLayer mBlindLayer;
-};
-
-bool Drawn::Step::operator==(const Step& other) const {
-  return answer == other.answer && sameBits(rect.left, other.rect.left) &&
-         sameBits(rect.top, other.rect.top) && sameBits(rect.right, other.rect.right) &&
-         sameBits(rect.bottom, other.rect.bottom);
-}
-
 std::string difference(const Drawn& drawn, const Drawn& expected) {
-  if (drawn.steps.size() != expected.steps.size()) {
-    return std::to_string(drawn.steps.size()) + " steps instead of " + std::to_string(expected.steps.size());
-  }
-  for (std::size_t i = 0; i < drawn.steps.size(); ++i) {
-    if (!(drawn.steps[i] == expected.steps[i])) return "step " + std::to_string(i);
-  }
-  if (drawn.batches.size() != expected.batches.size()) {
-    return std::to_string(drawn.batches.size()) + " batches instead of " +
-           std::to_string(expected.batches.size());
-  }
-  for (std::size_t i = 0; i < drawn.batches.size(); ++i) {
-    if (drawn.batches[i] != expected.batches[i]) return "batch " + std::to_string(i);
-  }
-  return drawn.pixels == expected.pixels ? "" : "pixels";
+  const auto ofLists = [](const char* name, const auto& some, const auto& others) {
+    if (some.size() != others.size()) {
+      return std::to_string(some.size()) + " " + name + "s instead of " + std::to_string(others.size());
+    }
+    for (std::size_t i = 0; i < some.size(); ++i) {
+      if (some[i] != others[i]) return std::string(name) + " " + std::to_string(i);
+    }
+    return std::string();
+  };
+  std::string found = ofLists("step", drawn.steps, expected.steps);
+  if (found.empty()) found = ofLists("batch", drawn.batches, expected.batches);
+  return found.empty() && drawn.pixels != expected.pixels ? "pixels" : found;
 }
 
 Stage::Stage(QeltDesktop::RenderQueue& queue, QeltDesktop::CanvasLayer* layer, int version)
-    : mVersion(version),
-      mQueue(queue),
-      mLayer(layer),
-      mCanvas(std::make_unique<Canvas>(&queue, layer)),
-      mData(&queue) {}
+    : mVersion(version), mQueue(queue), mLayer(layer), mCanvas(&queue, layer), mData(&queue) {}
 
 Stage::~Stage() {
   mPen.reset();
@@ -138,14 +111,22 @@ void Stage::drawing(Call&& call) {
   } catch (const std::bad_alloc&) {
     ++mRefusedBatches;
   }
-  if (mRecord != nullptr) mRecord->steps.push_back({answer, rect});
+  if (mRecord == nullptr) return;
+  mRecord->steps.push_back({answer ? 1.0f : 0.0f});
+  // Two edges that are no numbers are alike.
+  for (const float edge : {rect.left, rect.top, rect.right, rect.bottom})
+    mRecord->steps.back().push_back(std::isnan(edge) ? 0.0625f : edge);
+}
+
+template <typename Drawable>
+Drawable* Stage::onCanvas(Drawable* (Qelt::Pen::*getter)()) {
+  Drawable* const drawable = mPen == nullptr ? nullptr : (mPen.get()->*getter)();
+  if (drawable != nullptr) drawable->SetCanvas(&mCanvas);
+  return drawable;
 }
 
 Qelt::PenStrokeDrawableGL* Stage::strokeDrawable() {
-  if (mPen == nullptr) return nullptr;
-  Qelt::PenStrokeDrawableGL* drawable = mPen->GetStrokeDrawableGL();
-  if (drawable != nullptr) drawable->SetCanvas(mCanvas.get());
-  return drawable;
+  return onCanvas(&Qelt::Pen::GetStrokeDrawableGL);
 }
 
 StoredStroke& Stage::newStroke() {
@@ -158,19 +139,22 @@ StoredStroke& Stage::newStroke() {
   return *mPage.back();
 }
 
+template <typename Drawable>
+void Stage::send(Drawable* drawable, int action, const std::vector<Sample>& from, std::size_t begin,
+                 std::size_t end, bool finishes) {
+  const MotionEvent event = eventOf(action, from, begin, end);
+  drawing([&](RectF* rect) { return drawable->Draw(&event, rect); });
+  if (finishes) mQueue.finish();
+}
+
 void Stage::drawStroke(Qelt::PenStrokeDrawableGL* drawable, bool finishes, bool ends) {
   if (drawable == nullptr) return;
   const std::vector<Sample> all = samples();
-  const auto send = [&](int action, std::size_t begin, std::size_t end) {
-    const MotionEvent event = eventOf(action, all, begin, end);
-    drawing([&](RectF* rect) { return drawable->Draw(&event, rect); });
-    if (finishes) mQueue.finish();
-  };
-  send(Qelt::kActionDown, 0, 1);
-  send(Qelt::kActionMove, 1, 4);
-  send(Qelt::kActionMove, 4, 6);
-  send(Qelt::kActionMove, 6, 9);
-  if (ends) send(Qelt::kActionUp, 9, 10);
+  send(drawable, Qelt::kActionDown, all, 0, 1, finishes);
+  send(drawable, Qelt::kActionMove, all, 1, 4, finishes);
+  send(drawable, Qelt::kActionMove, all, 4, 6, finishes);
+  send(drawable, Qelt::kActionMove, all, 6, 9, finishes);
+  if (ends) send(drawable, Qelt::kActionUp, all, 9, 10, finishes);
 }
 
 void Stage::live(bool finishes) {
@@ -216,10 +200,8 @@ void Stage::redraw(bool finishes) {
 
 void Stage::outline(bool finishes) {
   makePen();
-  if (mPen == nullptr) return;
-  Qelt::PenOutlineDrawableGL* drawable = mPen->GetOutlineDrawableGL();
+  Qelt::PenOutlineDrawableGL* drawable = onCanvas(&Qelt::Pen::GetOutlineDrawableGL);
   if (drawable == nullptr) return;
-  drawable->SetCanvas(mCanvas.get());
   drawable->SetOutlineSize(2.0f);
   drawable->SetOutlineColor(kInk);
   const StoredStroke& stroke = newStroke();
@@ -233,19 +215,12 @@ void Stage::outline(bool finishes) {
 
 void Stage::preview(bool finishes) {
   makePen();
-  if (mPen == nullptr) return;
-  Qelt::PenPreviewDrawableGL* drawable = mPen->GetPreviewDrawableGL();
+  Qelt::PenPreviewDrawableGL* drawable = onCanvas(&Qelt::Pen::GetPreviewDrawableGL);
   if (drawable == nullptr) return;
-  drawable->SetCanvas(mCanvas.get());
   const std::vector<Sample> all = samples();
-  const auto send = [&](int action, std::size_t begin, std::size_t end) {
-    const MotionEvent event = eventOf(action, all, begin, end);
-    drawing([&](RectF* rect) { return drawable->Draw(&event, rect); });
-    if (finishes) mQueue.finish();
-  };
-  send(Qelt::kActionDown, 0, 1);
-  send(Qelt::kActionMove, 1, 6);
-  send(Qelt::kActionUp, 9, 10);
+  send(drawable, Qelt::kActionDown, all, 0, 1, finishes);
+  send(drawable, Qelt::kActionMove, all, 1, 6, finishes);
+  send(drawable, Qelt::kActionUp, all, 9, 10, finishes);
   MotionEvent recorded = recordedStroke();
   drawing([&](RectF* rect) { return drawable->RedrawPen(&recorded, rect); });
   if (finishes) mQueue.finish();
@@ -255,32 +230,22 @@ void Stage::predict(bool finishes) {
   makePen();
   if (mPen == nullptr || mVersion != 8) return;
   drawStroke(strokeDrawable(), finishes, false);
-  Qelt::IPenPredictionDrawableGL* drawable = mPen->GetPredictionStrokeDrawableGL();
+  auto* const drawable = onCanvas(&Qelt::Pen::GetPredictionStrokeDrawableGL);
   if (drawable == nullptr) return;
-  drawable->SetCanvas(mCanvas.get());
   drawable->SetOpacity(0.5f);
   std::vector<Sample> ahead = samples();
   for (Sample& sample : ahead) sample.x += 60.0f;
-  const MotionEvent event = eventOf(Qelt::kActionMove, ahead, 0, 4);
-  for (int i = 0; i < 2; ++i) {
-    drawing([&](RectF* rect) { return drawable->Draw(&event, rect); });
-    if (finishes) mQueue.finish();
-  }
+  for (int i = 0; i < 2; ++i) send(drawable, Qelt::kActionMove, ahead, 0, 4, finishes);
   Qelt::PenStrokeDrawableGL* stroke = strokeDrawable();
-  if (stroke == nullptr) return;
-  const MotionEvent up = eventOf(Qelt::kActionUp, samples(), 9, 10);
-  drawing([&](RectF* rect) { return stroke->Draw(&up, rect); });
+  if (stroke != nullptr) send(stroke, Qelt::kActionUp, samples(), 9, 10, false);
 }
 
 void Stage::prepareAll() {
   makePen();
-  if (mPen == nullptr) return;
   strokeDrawable();
-  for (Qelt::PenDrawableGL* drawable : std::initializer_list<Qelt::PenDrawableGL*>{
-           mPen->GetOutlineDrawableGL(), mPen->GetPreviewDrawableGL(),
-           mVersion == 8 ? mPen->GetPredictionStrokeDrawableGL() : nullptr}) {
-    if (drawable != nullptr) drawable->SetCanvas(mCanvas.get());
-  }
+  onCanvas(&Qelt::Pen::GetOutlineDrawableGL);
+  onCanvas(&Qelt::Pen::GetPreviewDrawableGL);
+  if (mVersion == 8) onCanvas(&Qelt::Pen::GetPredictionStrokeDrawableGL);
 }
 
 void Stage::turnPage() {
@@ -293,7 +258,7 @@ void Stage::turnPage() {
 void Stage::zoom(float factor) {
   Qelt::Matrix3<float> matrix;
   matrix[0] = matrix[4] = factor;
-  mCanvas->setMatrix(matrix);
+  mCanvas.setMatrix(matrix);
 }
 
 void Stage::loseAndRestoreContext() {

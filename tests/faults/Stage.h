@@ -1,38 +1,32 @@
 #pragma once
 
+#include <cstddef>
+#include <cstdint>
 #include <memory>
 #include <string>
 #include <vector>
 
-#include "base/RectF.h"
 #include "desktop/engine/PluginLibrary.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/graphics/CanvasLayer.h"
-#include "desktop/graphics/PenCanvas.h"
 #include "desktop/model/StoredStroke.h"
 #include "desktop/pencommon/PenDataManager.h"
 #include "engine/MotionEvent.h"
 #include "pencommon/Pen.h"
 #include "pencommon/PenStrokeDrawableGL.h"
+#include "support/BlindCanvas.h"
 #include "support/LiveStroke.h"
 
 namespace QeltTests {
 
 // What a pen made of the same input: compared between a pen that went through a fault and a fresh one.
 struct Drawn {
-  struct Step {
-    bool answer;
-    Qelt::RectF rect;
-    bool operator==(const Step&) const;
-  };
-  std::vector<Step> steps;
+  std::vector<std::vector<float>> steps;    // each call's answer and the edges of its rectangle
   std::vector<std::vector<float>> batches;  // as they reached the render drawables
   std::vector<std::uint8_t> pixels;         // only where there is a layer
-
-  bool operator==(const Drawn&) const = default;
 };
 
-// The first difference, for people.
+// The first difference, for people; empty where there is none.
 std::string difference(const Drawn& drawn, const Drawn& expected);
 
 // A host's end of one pen: queue, canvas, data manager, page; and the things that a host does with them. None
@@ -77,12 +71,17 @@ class Stage {
   int refusedBatches() const { return mRefusedBatches; }
 
  private:
-  class Canvas;
-
   // Runs a call that hands over a batch: it may run out of memory while the batch grows.
   template <typename Call>
   void drawing(Call&& call);
+  // A drawable of the pen's on the canvas; null where there is no pen or it could not make one.
+  template <typename Drawable>
+  Drawable* onCanvas(Drawable* (Qelt::Pen::*getter)());
   Qelt::PenStrokeDrawableGL* strokeDrawable();
+  // One event of some of the samples.
+  template <typename Drawable>
+  void send(Drawable* drawable, int action, const std::vector<Sample>& from, std::size_t begin,
+            std::size_t end, bool finishes);
   QeltDesktop::StoredStroke& newStroke();
   void drawStroke(Qelt::PenStrokeDrawableGL* drawable, bool finishes, bool ends);
   template <typename Drawable, typename Input>
@@ -91,7 +90,7 @@ class Stage {
   const int mVersion;
   QeltDesktop::RenderQueue& mQueue;
   QeltDesktop::CanvasLayer* mLayer;
-  std::unique_ptr<QeltDesktop::PenCanvas> mCanvas;
+  BlindCanvas mCanvas;
   QeltDesktop::PenDataManager mData;
   std::unique_ptr<Qelt::Pen> mPen;
   std::vector<std::unique_ptr<QeltDesktop::StoredStroke>> mPage;

@@ -12,19 +12,6 @@
 
 namespace QeltTests {
 
-// A scenario, and whether it runs with a picture.
-struct SweepCase {
-  Scenario scenario;
-  bool picture;
-};
-
-inline std::vector<SweepCase> sweepCases() {
-  std::vector<SweepCase> all;
-  for (const Scenario& scenario : scenarios()) all.push_back({scenario, false});
-  for (const Scenario& scenario : pictureScenarios()) all.push_back({scenario, true});
-  return all;
-}
-
 // Whether a scenario is swept in a version. The sanitizers take longer, and look at one version of each kind
 // of placement and of vertex.
 inline bool isSwept(const Scenario& scenario, int version) {

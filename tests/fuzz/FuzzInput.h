@@ -4,10 +4,18 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <cstdio>
+#include <cstdlib>
 #include <cstring>
 #include <limits>
 
 namespace QeltTests {
+
+// Ends the process, for a fuzzer to see.
+[[noreturn]] inline void breakOff(const char* who, const char* what) {
+  std::fprintf(stderr, "%s broke its word: %s\n", who, what);
+  std::abort();
+}
 
 // Turns the bytes of a fuzz input into decisions and numbers. Past its end everything is 0.
 class FuzzInput {
@@ -49,26 +57,12 @@ class FuzzInput {
   // Floats that arithmetic stumbles over.
   float odd() {
     using Limits = std::numeric_limits<float>;
-    constexpr std::array<float, 20> kOdd{0.0f,
-                                         -0.0f,
-                                         1.0f,
-                                         -1.0f,
-                                         Limits::infinity(),
-                                         -Limits::infinity(),
-                                         Limits::quiet_NaN(),
-                                         Limits::max(),
-                                         Limits::lowest(),
-                                         Limits::min(),
-                                         Limits::denorm_min(),
-                                         1e19f,
-                                         -1e19f,
-                                         16777216.0f,
-                                         1e-3f,
-                                         3.1415927f,
-                                         -3.1415927f,
-                                         0.79f,
-                                         0.75f,
-                                         0.4f};
+    // clang-format off
+    constexpr std::array<float, 20> kOdd{
+        0.0f, -0.0f, 1.0f, -1.0f, Limits::infinity(), -Limits::infinity(), Limits::quiet_NaN(), Limits::max(),
+        Limits::lowest(), Limits::min(), Limits::denorm_min(), 1e19f, -1e19f, 16777216.0f, 1e-3f, 3.1415927f,
+        -3.1415927f, 0.79f, 0.75f, 0.4f};
+    // clang-format on
     return kOdd[static_cast<std::size_t>(pick(static_cast<int>(kOdd.size())))];
   }
 

@@ -6,10 +6,10 @@
 
 #include <cmath>
 #include <cstdint>
-#include <cstdio>
 #include <cstdlib>
 #include <string>
 
+#include "FuzzInput.h"
 #include "InkmlReader.h"
 #include "Refusal.h"
 #include "SourceText.h"
@@ -18,18 +18,15 @@ namespace {
 
 using QeltDesktop::Page;
 
-[[noreturn]] void breakOff(const char* what) {
-  std::fprintf(stderr, "the reader broke its word: %s\n", what);
-  std::abort();
-}
-
 void check(const Page& page) {
-  if (page.traces.empty()) breakOff("a page without traces");
+  if (page.traces.empty()) QeltTests::breakOff("the reader", "a page without traces");
   for (const QeltDesktop::Trace& trace : page.traces) {
-    if (trace.samples.empty()) breakOff("a trace without samples");
-    if (trace.brush.width && !(*trace.brush.width > 0.0f)) breakOff("a brush of no width");
+    if (trace.samples.empty()) QeltTests::breakOff("the reader", "a trace without samples");
+    if (trace.brush.width && !(*trace.brush.width > 0.0f))
+      QeltTests::breakOff("the reader", "a brush of no width");
     for (const QeltDesktop::Sample& sample : trace.samples) {
-      if (!std::isfinite(sample.x) || !std::isfinite(sample.y)) breakOff("a point that is not finite");
+      if (!std::isfinite(sample.x) || !std::isfinite(sample.y))
+        QeltTests::breakOff("the reader", "a point that is not finite");
     }
   }
 }
@@ -55,7 +52,8 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     }
   } catch (const QeltDesktop::Refusal& refusal) {
     const std::string text = refusal.what();
-    if (!marked && text.rfind("page:", 0) != 0) breakOff("a refusal without its file");
+    if (!marked && text.rfind("page:", 0) != 0)
+      QeltTests::breakOff("the reader", "a refusal without its file");
   }
   return 0;
 }

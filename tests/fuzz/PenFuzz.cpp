@@ -5,7 +5,6 @@
 #include <android/log.h>
 #include <dlfcn.h>
 
-#include <cstdio>
 #include <cstdlib>
 #include <memory>
 
@@ -64,10 +63,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
     result = play(queue, nullptr, data, size);
   }
-  if (results[0] != results[1]) {
-    std::fprintf(stderr, "a pen broke its word: equal runs made different batches\n");
-    std::abort();
-  }
+  if (results[0] != results[1]) QeltTests::breakOff("a pen", "equal runs made different batches");
   if (drawsToo(data, size)) {
     static Screen* const screen = new Screen;  // for the process's life
     play(*screen->queue, screen->layer.get(), data, size);

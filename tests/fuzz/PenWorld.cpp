@@ -1,8 +1,6 @@
 #include "PenWorld.h"
 
 #include <cmath>
-#include <cstdio>
-#include <cstdlib>
 #include <cstring>
 #include <string_view>
 #include <typeinfo>
@@ -16,7 +14,6 @@
 #include "pencommon/PenPredictionDrawableGL.h"
 #include "pencommon/PenPreviewDrawableGL.h"
 #include "pencommon/PenStrokeDataManager.h"
-#include "support/BlindLayer.h"
 
 namespace QeltTests {
 
@@ -35,11 +32,6 @@ constexpr float kFinePen = 0.05f;   // stroke units
 constexpr std::size_t kMostFloats = 60'000'000;
 constexpr std::size_t kMostStrokes = 4;
 
-[[noreturn]] void breakOff(const char* what) {
-  std::fprintf(stderr, "a pen broke its word: %s\n", what);
-  std::abort();
-}
-
 // Floats in one stamp of a render drawable.
 std::size_t floatsPerStamp(const Qelt::PenDrawableRT& drawable) {
   const std::string_view name = typeid(drawable).name();
@@ -50,19 +42,6 @@ std::size_t floatsPerStamp(const Qelt::PenDrawableRT& drawable) {
 }
 
 }  // namespace
-
-class PenWorld::Canvas final : public QeltDesktop::PenCanvas {
- public:
-  using PenCanvas::PenCanvas;
-  Qelt::ISPLayer* GetLayer() override {
-    if (layer() != nullptr) return PenCanvas::GetLayer();
-    return isBlank ? nullptr : &mBlindLayer;
-  }
-  bool isBlank = false;
-
- private:
-  BlindLayer mBlindLayer;
-};
 
 // A stored stroke, any of whose arrays may be missing.
 class PenWorld::Stroke final : public Qelt::ObjectStroke {
@@ -87,11 +66,10 @@ PenWorld::PenWorld(const QeltDesktop::PluginLibrary& library, QeltDesktop::Rende
                    QeltDesktop::CanvasLayer* layer)
     : mLibrary(library),
       mQueue(queue),
-      mCanvas(std::make_unique<Canvas>(&queue, layer)),
-      mBlank(std::make_unique<Canvas>(&queue, nullptr)),
+      mCanvas(&queue, layer),
+      mBlank(&queue, nullptr),
       mData(&queue),
       mQueueless(nullptr) {
-  mBlank->isBlank = true;
   mQueue.accept = [this](const Qelt::ITask&) {
     const bool refused = (mRefusals & 1) != 0;
     mRefusals >>= 1;
@@ -129,51 +107,32 @@ void PenWorld::step(FuzzInput& input) {
   std::unique_ptr<Qelt::Pen>& pen = mPens[which];
   if (pen == nullptr) {
     pen.reset(mLibrary.createPen());
-    if (pen == nullptr) breakOff("no pen");
+    if (pen == nullptr) breakOff("a pen", "no pen");
     pen->setPenDataManager(&mData);
     pen->setVersion(8);
     mSizes[which] = pen->GetSize();
   }
-  switch (input.pick(16)) {
-    case 0:
-      pen.reset();
-      break;
-    case 1:
-    case 2:
-      change(input, *pen);
-      mSizes[which] = pen->GetSize();
-      break;
-    case 3:
-      ask(input, *pen);
-      break;
-    case 4:
-    case 5:
-    case 6:
-    case 7:
-      if (mayDraw(*pen)) draw(input, *pen);
-      break;
-    case 8:
-    case 9:
-      if (mayDraw(*pen)) redraw(input, *pen);
-      break;
-    case 10:
-      if (mayDraw(*pen)) outline(input, *pen);
-      break;
-    case 11:
-      if (mayDraw(*pen)) preview(input, *pen);
-      break;
-    case 12:
-      if (mayDraw(*pen)) predict(input, *pen);
-      break;
-    case 13:
-      changeView(input);
-      break;
-    case 14:
-      changeQueue(input);
-      break;
-    default:
-      mQueue.finish();
-      break;
+  // What comes more often stands there more often.
+  using Move = void (PenWorld::*)(FuzzInput&, Qelt::Pen&);
+  constexpr Move kDraws[] = {&PenWorld::draw,    &PenWorld::draw,    &PenWorld::draw,
+                             &PenWorld::draw,    &PenWorld::redraw,  &PenWorld::redraw,
+                             &PenWorld::outline, &PenWorld::preview, &PenWorld::predict};
+  const int move = input.pick(16);
+  if (move == 0) {
+    pen.reset();
+  } else if (move <= 2) {
+    change(input, *pen);
+    mSizes[which] = pen->GetSize();
+  } else if (move == 3) {
+    ask(input, *pen);
+  } else if (move <= 12) {
+    if (mayDraw(*pen)) (this->*kDraws[move - 4])(input, *pen);
+  } else if (move == 13) {
+    changeView(input);
+  } else if (move == 14) {
+    changeQueue(input);
+  } else {
+    mQueue.finish();
   }
 }
 
@@ -243,33 +202,26 @@ void PenWorld::ask(FuzzInput& input, Qelt::Pen& pen) {
   mix(flags, sizeof flags);
   const std::string_view setting = pen.GetAdvancedSetting()->GetText();
   mix(setting.data(), setting.size());
-  switch (input.pick(5)) {
-    case 0:
-      if (auto* drawable = pen.GetStrokeDrawableGL()) drawable->SetCanvas(pickCanvas(input));
-      break;
-    case 1:
-      if (auto* drawable = pen.GetOutlineDrawableGL()) drawable->SetCanvas(pickCanvas(input));
-      break;
-    case 2:
-      if (auto* drawable = pen.GetPreviewDrawableGL()) drawable->SetCanvas(pickCanvas(input));
-      break;
-    case 3:
-      if (auto* drawable = pen.GetPredictionStrokeDrawableGL()) drawable->SetCanvas(pickCanvas(input));
-      break;
-    default: {
-      Qelt::PointF points[3];
-      float pressures[3];
-      for (auto& point : points) point = {input.any(), input.any()};
-      for (auto& pressure : pressures) pressure = input.any();
-      note(true,
-           pen.GetStrokeRect(points, pressures, nullptr, input.pick(4), input.any(), input.flag(), nullptr));
-      break;
-    }
+  const int which = input.pick(5);
+  if (which == 4) {
+    Qelt::PointF points[3];
+    float pressures[3];
+    for (auto& point : points) point = {input.any(), input.any()};
+    for (auto& pressure : pressures) pressure = input.any();
+    note(true,
+         pen.GetStrokeRect(points, pressures, nullptr, input.pick(4), input.any(), input.flag(), nullptr));
+    return;
   }
+  Qelt::PenDrawableGL* drawable = nullptr;
+  if (which == 0) drawable = pen.GetStrokeDrawableGL();
+  if (which == 1) drawable = pen.GetOutlineDrawableGL();
+  if (which == 2) drawable = pen.GetPreviewDrawableGL();
+  if (which == 3) drawable = pen.GetPredictionStrokeDrawableGL();
+  if (drawable != nullptr) drawable->SetCanvas(pickCanvas(input));
 }
 
 Qelt::ISPPenCanvas* PenWorld::pickCanvas(FuzzInput& input) {
-  Qelt::ISPPenCanvas* const choices[] = {mCanvas.get(), mCanvas.get(), mBlank.get(), nullptr};
+  Qelt::ISPPenCanvas* const choices[] = {&mCanvas, &mCanvas, &mBlank, nullptr};
   return choices[input.pick(4)];
 }
 
@@ -327,10 +279,15 @@ PenWorld::Stroke& PenWorld::stroke(FuzzInput& input) {
   return *mStrokes.back();
 }
 
+template <typename Drawable>
+Drawable* PenWorld::onCanvas(FuzzInput& input, Drawable* drawable) {
+  if (drawable == nullptr) breakOff("a pen", "no drawable");
+  if (drawable->GetCanvas() == nullptr && input.flag()) drawable->SetCanvas(&mCanvas);
+  return drawable;
+}
+
 void PenWorld::draw(FuzzInput& input, Qelt::Pen& pen) {
-  Qelt::PenStrokeDrawableGL* const drawable = pen.GetStrokeDrawableGL();
-  if (drawable == nullptr) breakOff("no stroke drawable");
-  if (drawable->GetCanvas() == nullptr && input.flag()) drawable->SetCanvas(mCanvas.get());
+  Qelt::PenStrokeDrawableGL* const drawable = onCanvas(input, pen.GetStrokeDrawableGL());
   const MotionEvent made = event(input, 4);
   const int nulls = input.byte();
   RectF rect;
@@ -353,9 +310,7 @@ void PenWorld::keepCacheFitting(const Stroke& stroke, const Qelt::PenStrokeDrawa
 }
 
 void PenWorld::redraw(FuzzInput& input, Qelt::Pen& pen) {
-  Qelt::PenStrokeDrawableGL* const drawable = pen.GetStrokeDrawableGL();
-  if (drawable == nullptr) breakOff("no stroke drawable");
-  if (drawable->GetCanvas() == nullptr && input.flag()) drawable->SetCanvas(mCanvas.get());
+  Qelt::PenStrokeDrawableGL* const drawable = onCanvas(input, pen.GetStrokeDrawableGL());
   const int kind = input.byte();
   RectF rect;
   RectF* const into = kind >= 252 ? nullptr : &rect;
@@ -375,9 +330,7 @@ void PenWorld::redraw(FuzzInput& input, Qelt::Pen& pen) {
 }
 
 void PenWorld::outline(FuzzInput& input, Qelt::Pen& pen) {
-  Qelt::PenOutlineDrawableGL* const drawable = pen.GetOutlineDrawableGL();
-  if (drawable == nullptr) breakOff("no outline drawable");
-  if (drawable->GetCanvas() == nullptr && input.flag()) drawable->SetCanvas(mCanvas.get());
+  Qelt::PenOutlineDrawableGL* const drawable = onCanvas(input, pen.GetOutlineDrawableGL());
   const int kind = input.byte();
   if (kind % 4 == 0) drawable->SetOutlineSize(input.any());
   if (kind % 4 == 1) drawable->SetOutlineColor(input.word());
@@ -395,9 +348,7 @@ void PenWorld::outline(FuzzInput& input, Qelt::Pen& pen) {
 }
 
 void PenWorld::preview(FuzzInput& input, Qelt::Pen& pen) {
-  Qelt::PenPreviewDrawableGL* const drawable = pen.GetPreviewDrawableGL();
-  if (drawable == nullptr) breakOff("no preview drawable");
-  if (drawable->GetCanvas() == nullptr && input.flag()) drawable->SetCanvas(mCanvas.get());
+  Qelt::PenPreviewDrawableGL* const drawable = onCanvas(input, pen.GetPreviewDrawableGL());
   const int kind = input.byte();
   const MotionEvent made = event(input, 4);
   const MotionEvent* const given = kind == 254 ? nullptr : &made;
@@ -409,7 +360,7 @@ void PenWorld::preview(FuzzInput& input, Qelt::Pen& pen) {
 void PenWorld::predict(FuzzInput& input, Qelt::Pen& pen) {
   Qelt::IPenPredictionDrawableGL* const drawable = pen.GetPredictionStrokeDrawableGL();
   if (drawable == nullptr) return;
-  if (drawable->GetCanvas() == nullptr && input.flag()) drawable->SetCanvas(mCanvas.get());
+  onCanvas(input, drawable);
   const int kind = input.byte();
   if (kind % 4 == 0) drawable->SetOpacity(input.any());
   const MotionEvent made = event(input, 3);
@@ -429,7 +380,7 @@ void PenWorld::changeView(FuzzInput& input) {
     default:
       break;
   }
-  (input.flag() ? mBlank : mCanvas)->setMatrix(matrix);
+  static_cast<QeltDesktop::PenCanvas&>(input.flag() ? mBlank : mCanvas).setMatrix(matrix);
 }
 
 void PenWorld::changeQueue(FuzzInput& input) {
@@ -461,7 +412,7 @@ void PenWorld::note(bool answer, const RectF& rect) {
 void PenWorld::note(const QeltDesktop::Batch& batch) {
   const std::size_t stamp = floatsPerStamp(*batch.drawable);
   for (const std::vector<float>& buffer : batch.buffers) {
-    if (buffer.size() % stamp != 0) breakOff("a batch that is not of whole stamps");
+    if (buffer.size() % stamp != 0) breakOff("a pen", "a batch that is not of whole stamps");
     mFloats += buffer.size();
     const std::size_t count = buffer.size();
     mix(&count, sizeof count);

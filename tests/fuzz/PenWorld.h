@@ -18,6 +18,7 @@
 #include "model/ObjectStroke.h"
 #include "pencommon/Pen.h"
 #include "pencommon/PenStrokeDrawableGL.h"
+#include "support/BlindCanvas.h"
 
 namespace QeltTests {
 
@@ -38,9 +39,7 @@ class PenWorld {
   std::uint64_t play(FuzzInput input);
 
  private:
-  class Canvas;
   class Stroke;
-  struct Cost;
 
   void step(FuzzInput& input);
   void change(FuzzInput& input, Qelt::Pen& pen);
@@ -54,6 +53,9 @@ class PenWorld {
   void changeQueue(FuzzInput& input);
 
   Qelt::ISPPenCanvas* pickCanvas(FuzzInput& input);
+  // The drawable, which must be there, on a canvas more often than not.
+  template <typename Drawable>
+  Drawable* onCanvas(FuzzInput& input, Drawable* drawable);
   float coordinate(FuzzInput& input);
   Qelt::MotionEvent event(FuzzInput& input, int mostHistory);
   Stroke& stroke(FuzzInput& input);
@@ -65,7 +67,8 @@ class PenWorld {
 
   const QeltDesktop::PluginLibrary& mLibrary;
   QeltDesktop::RenderQueue& mQueue;
-  std::unique_ptr<Canvas> mCanvas, mBlank;
+  BlindCanvas mCanvas;
+  QeltDesktop::PenCanvas mBlank;  // has no layer at all
   QeltDesktop::PenDataManager mData, mQueueless;
   std::unique_ptr<Qelt::Pen> mPens[2];
   float mSizes[2] = {};

@@ -6,15 +6,17 @@
 #include <link.h>
 #include <unistd.h>
 
-#include <cstdio>
+#include <cstddef>
+#include <cstdint>
 #include <filesystem>
-#include <functional>
 #include <memory>
 #include <stdexcept>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "AllocationGate.h"
+#include "base/PointF.h"
 #include "base/RectF.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/graphics/CanvasLayer.h"
@@ -35,18 +37,13 @@ using QeltDesktop::RenderQueue;
 // A library that goes when it is closed; the host's own loader keeps it for good.
 class Loaded {
  public:
-  explicit Loaded(const std::string& path)
-      : mPath(path), mHandle(dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL)) {
+  explicit Loaded(const std::string& path) : mHandle(dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL)) {
     if (mHandle == nullptr) throw std::runtime_error(dlerror());
   }
-  ~Loaded() { close(); }
+  ~Loaded() { dlclose(mHandle); }
   Loaded(const Loaded&) = delete;
   Loaded& operator=(const Loaded&) = delete;
 
-  void close() {
-    if (mHandle != nullptr) dlclose(mHandle);
-    mHandle = nullptr;
-  }
   static bool isThere(const std::string& path) {
     void* const again = dlopen(path.c_str(), RTLD_NOW | RTLD_NOLOAD);
     if (again != nullptr) dlclose(again);
@@ -56,12 +53,11 @@ class Loaded {
   const void* symbol(const char* name) const { return dlsym(mHandle, name); }
   std::unique_ptr<Qelt::Pen> makePen() const {
     const auto create = reinterpret_cast<Qelt::Pen* (*)()>(dlsym(mHandle, "createPenInst"));
-    if (create == nullptr) throw std::runtime_error(mPath + ": no createPenInst");
+    if (create == nullptr) throw std::runtime_error(dlerror());
     return std::unique_ptr<Qelt::Pen>(create());
   }
 
  private:
-  std::string mPath;
   void* mHandle;
 };
 
@@ -81,20 +77,22 @@ class Desk {
     mQueue.finish();
   }
 
-  void event(int action, float x, float y) {
+  static constexpr int kEvents = 4;
+  // One of the events of a stroke.
+  void event(int number) {
+    constexpr int kActions[kEvents] = {Qelt::kActionDown, Qelt::kActionMove, Qelt::kActionMove,
+                                       Qelt::kActionUp};
+    constexpr Qelt::PointF kPoints[kEvents] = {
+        {10.3f, 10.4f}, {40.3f, 14.4f}, {60.3f, 44.4f}, {90.3f, 50.4f}};
     const Qelt::PointerProperties pointer{0, Qelt::kToolStylus};
-    const Qelt::PointerCoords coords{x, y, 0.6f, 0.3f, 0.4f};
-    const Qelt::MotionEvent made(0, 1, action, 1, &pointer, &coords, 0, Qelt::kSourceStylus, 0);
+    const Qelt::PointerCoords coords{kPoints[number].x, kPoints[number].y, 0.6f, 0.3f, 0.4f};
+    const Qelt::MotionEvent made(0, 1, kActions[number], 1, &pointer, &coords, 0, Qelt::kSourceStylus, 0);
     Qelt::RectF rect;
     mPen->GetStrokeDrawableGL()->Draw(&made, &rect);
     mQueue.finish();
   }
-
   void stroke() {
-    event(Qelt::kActionDown, 10.3f, 10.4f);
-    event(Qelt::kActionMove, 40.3f, 14.4f);
-    event(Qelt::kActionMove, 60.3f, 44.4f);
-    event(Qelt::kActionUp, 90.3f, 50.4f);
+    for (int number = 0; number < kEvents; ++number) event(number);
   }
 
  private:
@@ -117,22 +115,7 @@ class Copy {
   const std::string path;
 };
 
-class Batches {
- public:
-  Batches() {
-    QeltDesktop::setBatchObserver([this](const QeltDesktop::Batch& batch) {
-      for (const auto& buffer : batch.buffers) mAll.push_back(buffer);
-    });
-  }
-  ~Batches() { QeltDesktop::setBatchObserver(nullptr); }
-  Batches(const Batches&) = delete;
-  Batches& operator=(const Batches&) = delete;
-
-  std::vector<std::vector<float>> take() { return std::exchange(mAll, {}); }
-
- private:
-  std::vector<std::vector<float>> mAll;
-};
+using Batches = std::vector<std::vector<float>>;
 
 // Bytes of the list of functions that the loader calls before anybody calls the library.
 std::size_t initialiserBytes(void* handle) {
@@ -204,23 +187,21 @@ TEST(Loading, TwoCopiesDrawInTurnsAsOneDoesAlone) {
   const Loaded one(QELT_PLUGIN_PATH), other(copy.path);
   ASSERT_NE(one.symbol("versionTable"), other.symbol("versionTable")) << "the same library twice";
   Batches batches;
+  QeltDesktop::setBatchObserver([&](const QeltDesktop::Batch& batch) {
+    batches.insert(batches.end(), batch.buffers.begin(), batch.buffers.end());
+  });
   Desk left(one, queue, nullptr), right(other, queue, nullptr);
   left.stroke();
-  const auto alone = batches.take();
-  ASSERT_FALSE(alone.empty());
-  const struct {
-    int action;
-    float x, y;
-  } events[] = {{Qelt::kActionDown, 10.3f, 10.4f},
-                {Qelt::kActionMove, 40.3f, 14.4f},
-                {Qelt::kActionMove, 60.3f, 44.4f},
-                {Qelt::kActionUp, 90.3f, 50.4f}};
-  for (std::size_t i = 0; i < std::size(events); ++i) {
+  const Batches alone = std::exchange(batches, {});
+  ASSERT_EQ(alone.size(), static_cast<std::size_t>(Desk::kEvents));
+  for (int i = 0; i < Desk::kEvents; ++i) {
     for (Desk* desk : {&left, &right}) {
-      desk->event(events[i].action, events[i].x, events[i].y);
-      EXPECT_EQ(batches.take(), (std::vector<std::vector<float>>{alone[i]})) << "event " << i;
+      desk->event(i);
+      EXPECT_EQ(batches, (Batches{alone[static_cast<std::size_t>(i)]})) << "event " << i;
+      batches.clear();
     }
   }
+  QeltDesktop::setBatchObserver(nullptr);
 }
 
 TEST(Loading, ACopyDrawsOnWithTheShadersThatAnotherBrought) {

@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include <cmath>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -70,10 +71,13 @@ TEST(StrokeFeeder, UpEventRepeatsTheLastPointWhole) {
   });
 }
 
-TEST(StrokeFeeder, RecordedEventHoldsEveryPointInItsHistory) {
+TEST(StrokeFeeder, RecordedEventAndStoredStrokeHoldEveryPoint) {
   const Trace trace = line(3);
   const Qelt::MotionEvent event = recordedEvent(trace, kStylus);
+  const auto stroke = storedStroke(trace, kStylus);
   ASSERT_EQ(event.GetHistorySize(), 3);
+  ASSERT_EQ(stroke->GetPointCount(), 3);
+  EXPECT_EQ(stroke->GetToolType(), 2);
   for (int i = 0; i < 3; ++i) {
     const Sample& sample = trace.samples[static_cast<std::size_t>(i)];
     EXPECT_EQ(event.GetHistoricalX(i), sample.x);
@@ -81,22 +85,23 @@ TEST(StrokeFeeder, RecordedEventHoldsEveryPointInItsHistory) {
     EXPECT_EQ(event.GetHistoricalPressure(i), sample.pressure);
     EXPECT_EQ(event.GetHistoricalTilt(i), sample.tilt);
     EXPECT_EQ(event.GetHistoricalOrientation(i), sample.orientation);
+    EXPECT_EQ(stroke->GetPoint()[i].x, sample.x);
+    EXPECT_EQ(stroke->GetPoint()[i].y, sample.y);
+    EXPECT_EQ(stroke->GetTimeStamp()[i], 4 * i);
+    EXPECT_EQ(stroke->GetPressure()[i], sample.pressure);
+    EXPECT_EQ(stroke->GetTilt()[i], sample.tilt);
+    EXPECT_EQ(stroke->GetOrientation()[i], sample.orientation);
   }
   EXPECT_EQ(event.GetX(0), 2.0f);
   EXPECT_EQ(event.GetPressure(0), trace.samples[2].pressure);
   EXPECT_EQ(recordedEvent(line(1), kStylus).GetHistorySize(), 1);
-}
 
-TEST(StrokeFeeder, StoredStrokeHoldsEveryPoint) {
-  const Trace trace = line(3);
-  const auto stroke = storedStroke(trace, kStylus);
-  ASSERT_EQ(stroke->GetPointCount(), 3);
-  EXPECT_EQ(stroke->GetToolType(), 2);
-  EXPECT_EQ(stroke->GetPoint()[2].y, 20.0f);
-  EXPECT_EQ(stroke->GetTimeStamp()[2], 8);
-  EXPECT_EQ(stroke->GetPressure()[2], trace.samples[2].pressure);
-  EXPECT_EQ(stroke->GetTilt()[2], trace.samples[2].tilt);
-  EXPECT_EQ(stroke->GetOrientation()[2], trace.samples[2].orientation);
+  // Times that no clock shows.
+  Trace odd = line(2);
+  odd.samples[0].time = -1e300;
+  odd.samples[1].time = 1e300;
+  EXPECT_LT(recordedEvent(odd, kStylus).GetDownTime(), 0);
+  EXPECT_GT(recordedEvent(odd, kStylus).GetEventTime(), 0);
 }
 
 TEST(StrokeFeeder, PredictionGoesOnInEqualSteps) {
@@ -113,15 +118,17 @@ TEST(StrokeFeeder, PredictionGoesOnInEqualSteps) {
 }
 
 TEST(StrokeFeeder, ToolsHaveTheirSources) {
-  Trace trace = line(1);
-  EXPECT_EQ(pointerFor(trace, {}, {}).tool, 2);
-  EXPECT_EQ(pointerFor(trace, {}, {}).source, 16386);
-  trace.tool = 1;
-  EXPECT_EQ(pointerFor(trace, {}, {}).tool, 1);
-  EXPECT_EQ(pointerFor(trace, {}, {}).source, 4098);
-  EXPECT_EQ(pointerFor(trace, 3, {}).source, 8194);
-  EXPECT_EQ(pointerFor(trace, 2, 4098).tool, 2);
-  EXPECT_EQ(pointerFor(trace, 2, 4098).source, 4098);
+  const auto expectPointer = [](std::optional<int> ofTrace, std::optional<int> tool,
+                                std::optional<int> source, const Pointer& wanted) {
+    Trace trace = line(1);
+    trace.tool = ofTrace;
+    EXPECT_EQ(pointerFor(trace, tool, source).tool, wanted.tool);
+    EXPECT_EQ(pointerFor(trace, tool, source).source, wanted.source);
+  };
+  expectPointer({}, {}, {}, {2, 16386});
+  expectPointer(1, {}, {}, {1, 4098});
+  expectPointer(1, 3, {}, {3, 8194});
+  expectPointer(1, 2, 4098, {2, 4098});
 }
 
 TEST(StrokeFeeder, CutsTheLastTraceOnly) {
@@ -131,14 +138,6 @@ TEST(StrokeFeeder, CutsTheLastTraceOnly) {
   cutLastTrace(page, 2);
   EXPECT_EQ(page.traces[0].samples.size(), 5u);
   EXPECT_EQ(page.traces[1].samples.size(), 2u);
-}
-
-TEST(StrokeFeeder, TakesTimesThatNoClockShows) {
-  Trace trace = line(2);
-  trace.samples[0].time = -1e300;
-  trace.samples[1].time = 1e300;
-  EXPECT_LT(recordedEvent(trace, kStylus).GetDownTime(), 0);
-  EXPECT_GT(recordedEvent(trace, kStylus).GetEventTime(), 0);
 }
 
 }  // namespace
