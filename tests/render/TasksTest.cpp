@@ -7,11 +7,8 @@
 #include <utility>
 #include <vector>
 
-#include "base/RefCount.h"
 #include "base/String.h"
 #include "gl/ITask.h"
-#include "pencommon/PenOutlineDrawableRT.h"
-#include "render/BatchGuard.h"
 #include "render/Fakes.h"
 #include "render/PenGLRenderMsg.h"
 #include "render/Posting.h"
@@ -142,18 +139,6 @@ TEST_F(Guards, HandABatchOverWithItsMessageAndItsDeletion) {
   EXPECT_THAT(take(), ElementsAre("send 66", "update", "begin 0", "draw at 0", "end 0", "clear"));
 }
 
-TEST_F(Guards, HandAnEmptyBatchOverAllTheSameAndWhenAnExceptionLeaves) {
-  draw(0);
-  EXPECT_THAT(posted(), ElementsAre("Batch", "Render", "DeleteBatch"));
-  queue.run();
-  try {
-    const Pencil2V1ReturnCallback guard(&drawable, &canvas, &unclaimed);
-    throw 1;
-  } catch (int) {
-    EXPECT_THAT(posted(), ElementsAre("Batch", "Render", "DeleteBatch"));
-  }
-}
-
 // Refused: the batch, its message, or its deletion. The next call puts it right before its own batch.
 TEST_F(Guards, LoseNothingToARefusal) {
   const long before = liveAllocations();
@@ -192,31 +177,6 @@ TEST_F(Guards, LoseNothingToARefusal) {
   EXPECT_EQ(liveAllocations(), before);
 }
 
-TEST_F(Guards, FreeWhatIsLeftWithTheDrawableAndWhatNoQueueTakes) {
-  canvas.queue = nullptr;
-  const long before = liveAllocations();
-  {
-    UnclaimedBatch left;
-    left.keep(new std::vector<float>(5), true);
-    left.keep(new std::vector<float>(6), true);
-    left.keep(new RefCount);
-  }
-  draw(66);
-  take();
-  EXPECT_EQ(liveAllocations(), before);
-  EXPECT_THAT(posted(), IsEmpty());
-}
-
-TEST_F(Guards, StayInertWithoutMemoryForTheBatch) {
-  if (!countsAllocations()) GTEST_SKIP() << "allocations are the sanitizer's";
-  {
-    const FailingAllocation first(0);
-    const Pencil2V8ReturnCallback guard(&drawable, &canvas, &unclaimed);
-    EXPECT_EQ(guard.buffer(), nullptr);
-  }
-  EXPECT_THAT(posted(), IsEmpty());
-}
-
 TEST_F(Guards, OfACachedBatchBorrowIt) {
   std::vector<float> cached(54, 1.0f);
   // Whether it was handed over.
@@ -237,45 +197,6 @@ TEST_F(Guards, OfACachedBatchBorrowIt) {
   refuse(0);
   EXPECT_FALSE(redraw(&cached));
   EXPECT_THAT(posted(), IsEmpty());  // no message that would draw the batch before
-}
-
-// An outline hands two buffers over at once.
-class OutlineGuard final : public BatchGuard<PenOutlineDrawableRT, 2> {
- public:
-  using BatchGuard::BatchGuard;
-};
-
-TEST_F(Guards, OfTwoBuffersFreeBothWhateverIsRefused) {
-  class Outline : public PenOutlineDrawableRT {
-   public:
-    using PenOutlineDrawableRT::PenOutlineDrawableRT;
-    void SendDataToGPU(std::vector<float>* inner, std::vector<float>* outer) override {
-      PenOutlineDrawableRT::SendDataToGPU(inner, outer);
-      ++batches;
-    }
-    int batches = 0;
-  } outline(nullptr);
-  UnclaimedBatch ofOutline;
-  const auto draw = [&] { const OutlineGuard guard(&outline, &canvas, &ofOutline); };
-  draw();
-  const std::vector<std::string> names = posted();
-  EXPECT_THAT(std::vector(names.begin() + 1, names.end()),
-              ElementsAre("Render", "DeleteBatch", "DeleteBatch"));
-  queue.run();
-  EXPECT_EQ(outline.batches, 1);
-
-  take();
-  const long before = liveAllocations();
-  for (int refused = 0; refused < 4; ++refused) {
-    refuse(refused);
-    draw();
-    queue.run();
-    draw();  // puts it right
-    queue.run();
-    take();
-  }
-  queue.refuses = nullptr;
-  EXPECT_EQ(liveAllocations(), before);
 }
 
 }  // namespace
