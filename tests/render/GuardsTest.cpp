@@ -1,17 +1,14 @@
-#include "render/Tasks.h"
-
 #include <gmock/gmock.h>
 
-#include <memory>
+#include <cstddef>
 #include <string>
 #include <utility>
 #include <vector>
 
-#include "base/String.h"
+#include "base/RectF.h"
 #include "gl/ITask.h"
 #include "render/Fakes.h"
 #include "render/PenGLRenderMsg.h"
-#include "render/Posting.h"
 #include "render/UnclaimedBatch.h"
 #include "stroke/DrawingBoard.h"
 #include "stroke/StrokeGuards.h"
@@ -23,73 +20,6 @@ namespace {
 using namespace Qelt;
 using testing::ElementsAre;
 using testing::IsEmpty;
-
-// --- Tasks ---
-
-struct Base {
-  virtual ~Base() = default;
-  virtual void nothing() { heard = "base"; }
-  int one(int a) { return last = a; }
-  virtual void two(float a, int b) { heard = std::to_string(a) + " " + std::to_string(b); }
-  std::string heard;
-  int last = 0;
-};
-
-struct Derived : Base {
-  void nothing() override { heard = "derived"; }
-};
-
-TEST(TasksTest, CallTheirMemberOnceAndThroughTheObjectsOwnOverride) {
-  FakeQueue queue;
-  Derived object;
-  EXPECT_TRUE(post(&queue, &object, &Base::nothing));
-  EXPECT_EQ(queue.tasks.at(0)->mNext, nullptr);
-  EXPECT_TRUE(queue.tasks[0]->isGlobalLockAllowed());
-  EXPECT_TRUE(post(&queue, &object, &Base::one, 7));  // the result is ignored
-  EXPECT_EQ(object.heard, "");
-  queue.run();
-  EXPECT_EQ(object.heard, "derived");
-  EXPECT_EQ(object.last, 7);
-  EXPECT_TRUE(post(&queue, &object, &Base::two, 1.5f, 3));
-  queue.run();
-  EXPECT_EQ(object.heard, "1.500000 3");
-}
-
-struct CountedString : String {
-  explicit CountedString(int& deaths) : mDeaths(deaths) {}
-  ~CountedString() override { ++mDeaths; }
-  int& mDeaths;
-};
-
-struct CountedTask : ITask {
-  explicit CountedTask(int& deaths) : mDeaths(deaths) {}
-  ~CountedTask() override { ++mDeaths; }
-  void run() override {}
-  int& mDeaths;
-};
-
-TEST(TasksTest, AreDestroyedOnceAndWhatTheyDeleteOnlyWhenRun) {
-  FakeQueue queue;
-  int strings = 0, tasks = 0;
-  auto kept = std::make_unique<CountedString>(strings);
-  queue.refuses = [](const ITask&) { return true; };
-  EXPECT_FALSE(postDelete<String>(&queue, kept.get()));  // refused: still the caller's
-  EXPECT_FALSE(postTask(&queue, new CountedTask(tasks)));
-  EXPECT_FALSE(postTask(nullptr, new CountedTask(tasks)));  // no queue at all
-  EXPECT_FALSE(postTask(&queue, nullptr));                  // no memory for the task
-  EXPECT_EQ(tasks, 2);
-  queue.refuses = nullptr;
-  EXPECT_TRUE(postDelete<String>(&queue, kept.release()));
-  EXPECT_TRUE(postDelete<String>(&queue, nullptr));
-  EXPECT_TRUE(postTask(&queue, new CountedTask(tasks)));
-  EXPECT_EQ(strings, 0);
-  EXPECT_EQ(tasks, 2);
-  queue.run();
-  EXPECT_EQ(strings, 1);
-  EXPECT_EQ(tasks, 3);
-}
-
-// --- Guards ---
 
 class Guards : public testing::Test {
  protected:
@@ -128,6 +58,8 @@ TEST_F(Guards, HandABatchOverWithItsMessageAndItsDeletion) {
   // The drawable appends nowhere before anything is posted.
   EXPECT_THAT(take(), ElementsAre("buffer", "no buffer"));
   EXPECT_THAT(posted(), ElementsAre("Batch", "Render", "DeleteBatch"));
+  EXPECT_TRUE(queue.tasks[0]->isGlobalLockAllowed());
+  EXPECT_EQ(queue.tasks[0]->mNext, nullptr);
   const auto& message = dynamic_cast<const PenGLRenderMsg&>(*queue.tasks[1]);
   EXPECT_EQ(message.mRect.bottom, 4.0f);
   EXPECT_EQ(message.mDrawable, &drawable);
