@@ -30,7 +30,7 @@ constexpr std::uint64_t kAlive = 0x51454C5441110CADu;
 constexpr std::uint64_t kDeleted = 0xDEADDEADDEADDEADu;
 
 std::atomic<std::uintptr_t> codeBegin{0}, codeEnd{0};
-std::atomic<long> blocks{0}, ownBlocks{0}, allocations{0}, ownAllocations{0}, deletionsOfNothing{0};
+std::atomic<long> blocks{0}, ownBlocks{0}, ownAllocations{0}, deletionsOfNothing{0};
 std::atomic<long> askedSince{0}, failFrom{0}, failTo{0};  // failing: from <= number <= to
 
 // Guards the list of the plug-in's living blocks. Not a std::mutex's business to allocate, nor this one's.
@@ -44,7 +44,6 @@ bool isOfPlugIn(const void* caller) {
 }
 
 void* allocate(std::size_t size, std::size_t alignment, const void* caller) {
-  allocations.fetch_add(1, std::memory_order_relaxed);
   const bool ofPlugIn = isOfPlugIn(caller);
   long number = 0;
   if (ofPlugIn) {
@@ -148,10 +147,6 @@ long AllocationGate::allBlocks() {
 
 long AllocationGate::plugInAllocations() {
   return ownAllocations;
-}
-
-long AllocationGate::allAllocations() {
-  return allocations;
 }
 
 long AllocationGate::badDeletions() {

@@ -25,9 +25,8 @@ class AllocationGate {
   // Blocks that are alive: the plug-in's, and those of the whole process.
   static long plugInBlocks();
   static long allBlocks();
-  // Allocations so far, failed ones included.
+  // The plug-in's allocations so far, failed ones included.
   static long plugInAllocations();
-  static long allAllocations();
   // How many deletions were of something that was not alive.
   static long badDeletions();
   // Which of the plug-in's allocations gave the block that begins here; 0 when none did.

@@ -129,9 +129,15 @@ TEST(Drawables, OutliveTheRenderThread) {
   EXPECT_THAT(notes, ElementsAre("create 8 x 8", "release", "gone"));
 }
 
-TEST(Drawables, HandOversAreShownToTheObserver) {
+TEST(Drawables, SplitTheColourIntoSharesAndShowHandOversToTheObserver) {
   Notes notes;
   NotingRT stroke(notes);
+  stroke.SetPenData(3.0f, static_cast<int>(0x80FF3300u));
+  EXPECT_EQ(stroke.color().x, 1.0f);
+  EXPECT_EQ(stroke.color().y, 0.2f);  // 51 / 255
+  EXPECT_EQ(stroke.color().z, 0.0f);
+  EXPECT_EQ(stroke.color().w, 128.0f / 255.0f);
+
   Qelt::PenOutlineDrawableRT outline(nullptr);
   std::vector<QeltDesktop::Batch> seen;
   QeltDesktop::setBatchObserver([&](QeltDesktop::Batch batch) { seen.push_back(std::move(batch)); });
@@ -154,16 +160,6 @@ TEST(Drawables, HandOversAreShownToTheObserver) {
   EXPECT_THAT(seen[1].buffers, ElementsAre(empty));
   EXPECT_EQ(seen[2].drawable, &outline);
   EXPECT_THAT(seen[2].buffers, ElementsAre(second, first));
-}
-
-TEST(Drawables, ThePenColourIsSplitIntoShares) {
-  Notes notes;
-  NotingRT stroke(notes);
-  stroke.SetPenData(3.0f, static_cast<int>(0x80FF3300u));
-  EXPECT_EQ(stroke.color().x, 1.0f);
-  EXPECT_EQ(stroke.color().y, 0.2f);  // 51 / 255
-  EXPECT_EQ(stroke.color().z, 0.0f);
-  EXPECT_EQ(stroke.color().w, 128.0f / 255.0f);
 }
 
 TEST(PenBase, AStrokesRectIsItsPointsGrownByTheSize) {

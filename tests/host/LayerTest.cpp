@@ -5,10 +5,8 @@
 #include <cmath>
 #include <cstddef>
 #include <cstdint>
-#include <map>
 #include <memory>
 #include <stdexcept>
-#include <string>
 #include <vector>
 
 #include "desktop/gl/RenderQueue.h"
@@ -46,13 +44,10 @@ void main() {
 constexpr const char* kWindowShader = R"(#version 300 es
 precision highp float;
 in vec2 passed;
-uniform vec4 tint;
-uniform vec2 offset;
-uniform float strength;
 out vec4 FragColor;
 void main() {
-  vec2 at = floor(gl_FragCoord.xy - offset);
-  FragColor = vec4(mod(at.x, 256.0) / 255.0, mod(at.y, 256.0) / 255.0, passed.x, strength) * tint;
+  vec2 at = floor(gl_FragCoord.xy);
+  FragColor = vec4(mod(at.x, 256.0) / 255.0, mod(at.y, 256.0) / 255.0, passed.x, 1.0);
 }
 )";
 
@@ -60,10 +55,9 @@ constexpr const char* kTextureShader = R"(#version 300 es
 precision highp float;
 in vec2 passed;
 uniform sampler2D picture;
-uniform vec3 unused;
 out vec4 FragColor;
 void main() {
-  FragColor = texture(picture, passed) + vec4(unused, 0.0);
+  FragColor = texture(picture, passed);
 }
 )";
 
@@ -72,8 +66,8 @@ class Painter {
  public:
   explicit Painter(const char* fragmentShader) {
     program = Qelt::GraphicsFactory::createOpenGLShaderProgram(kVertexShader, fragmentShader, nullptr);
-    for (const char* name : {"projection", "tint", "offset", "strength", "picture", "unused"})
-      uniforms[name] = program->getBindingIntf(name, 0);
+    projection = program->getBindingIntf("projection", 0);
+    picture = program->getBindingIntf("picture", Qelt::kBindingInt);
     Qelt::VertexDescriptor layout;
     layout.addAttribute(Qelt::AttributeType::Float, 2, -1);
     layout.addAttribute(Qelt::AttributeType::Float, 2, -1);
@@ -82,9 +76,8 @@ class Painter {
   ~Painter() {
     // Uniforms may outlive their program.
     program->release();
-    for (const auto& [name, uniform] : uniforms) {
-      if (uniform != nullptr) uniform->release();
-    }
+    projection->release();
+    if (picture != nullptr) picture->release();
     quad->release();
   }
   Painter(const Painter&) = delete;
@@ -103,14 +96,8 @@ class Painter {
       Qelt::ISPSubBitmap& tile = *target.GetSubBitmap(i);
       tile.BeginRender(0);
       program->activate();
-      uniforms["projection"]->set(tile.GetProjection());
-      if (uniforms["tint"] != nullptr) {
-        uniforms["tint"]->set(Qelt::Vector4<float>{1, 1, 1, 1});
-        uniforms["offset"]->set(Qelt::Vector2<float>{0, 0});
-        uniforms["strength"]->set(1.0f);
-      } else {
-        uniforms["picture"]->set(1);
-      }
+      projection->set(tile.GetProjection());
+      if (picture != nullptr) picture->set(1);
       quad->draw(first, count, true, 0);
       Qelt::OpenGLRenderer::discardFramebuffer(6);
       tile.EndRender(0);
@@ -118,7 +105,7 @@ class Painter {
   }
 
   Qelt::OpenGLShaderProgram* program;
-  std::map<std::string, Qelt::IParameterBinding*> uniforms;
+  Qelt::IParameterBinding *projection, *picture;
   Qelt::GraphicsObject* quad;
 };
 
@@ -357,28 +344,16 @@ TEST_P(Layer, TheHostShapeFillsItsSquare) {
   });
 }
 
-TEST_P(Layer, UniformsTellTheirTypeAndRefuseAnother) {
-  queue.run([&] {
-    Painter window(kWindowShader), texture(kTextureShader);
-    EXPECT_EQ(window.uniforms["projection"]->getType(), Qelt::kBindingMatrix4);
-    EXPECT_EQ(window.uniforms["tint"]->getType(), Qelt::kBindingVector4);
-    EXPECT_EQ(window.uniforms["offset"]->getType(), Qelt::kBindingVector2);
-    EXPECT_EQ(window.uniforms["strength"]->getType(), Qelt::kBindingFloat);
-    EXPECT_EQ(texture.uniforms["picture"]->getType(), Qelt::kBindingInt);
-    EXPECT_THAT(static_cast<int>(texture.uniforms["unused"]->getType()),
-                testing::Not(testing::AnyOf(0, 3, 4, 6, 7, 9)));
-    EXPECT_EQ(window.uniforms["picture"], nullptr);
-    EXPECT_EQ(window.program->getBindingIntf("tint", Qelt::kBindingFloat), nullptr);
-    EXPECT_EQ(window.program->getBindingIntf(nullptr, 0), nullptr);
-    window.uniforms["tint"]->set(3.0f);  // of another type: dropped, no GL error
-  });
-}
-
-TEST_P(Layer, BrokenShadersAreLoggedAndAnswerNull) {
+TEST_P(Layer, ShadersThatAreBrokenOrMisusedAreLoggedAndAnswerNull) {
   queue.run([&] {
     EXPECT_EQ(Qelt::GraphicsFactory::createOpenGLShaderProgram("nonsense", kWindowShader, nullptr), nullptr);
     EXPECT_EQ(Qelt::GraphicsFactory::createOpenGLShaderProgram(kVertexShader, nullptr, nullptr), nullptr);
     EXPECT_EQ(Qelt::GraphicsFactory::createGraphicsObject(0, 4, Qelt::VertexDescriptor(), 0, 0), nullptr);
+    Painter painter(kTextureShader);
+    EXPECT_EQ(painter.program->getBindingIntf("nowhere", 0), nullptr);
+    EXPECT_EQ(painter.program->getBindingIntf("picture", Qelt::kBindingFloat), nullptr);
+    EXPECT_EQ(painter.program->getBindingIntf(nullptr, 0), nullptr);
+    painter.projection->set(3.0f);  // of another type: dropped, no GL error
   });
   const auto lines = log.take();
   ASSERT_EQ(lines.size(), 1u);

@@ -112,41 +112,35 @@ TEST(InkmlReader, KeepsTheLastReadingWhereOneIsNotReported) {
 
 constexpr float kPi = 3.14159265f;
 
+void expectAttitude(const Sample& sample, float tilt, float orientation) {
+  EXPECT_NEAR(sample.tilt, tilt, 1e-6f);
+  EXPECT_NEAR(sample.orientation, orientation, 1e-6f);
+}
+
 TEST(InkmlReader, TurnsElevationAndAzimuthIntoTiltAndOrientation) {
-  const std::string degrees = std::string(kXY) + R"(<channel name="OE"/><channel name="OA" units="deg"/>)";
-  const auto samples = samplesOf(degrees, "0 0 60 90, 0 0 90 270, 0 0 0 -180, 0 0 30 540");
-  EXPECT_NEAR(samples[0].tilt, kPi / 6, 1e-6f);
-  EXPECT_NEAR(samples[0].orientation, kPi / 2, 1e-6f);
-  EXPECT_NEAR(samples[1].tilt, 0.0f, 1e-6f);
-  EXPECT_NEAR(samples[1].orientation, -kPi / 2, 1e-6f);
-  EXPECT_NEAR(samples[2].tilt, kPi / 2, 1e-6f);
+  const std::string xy = kXY;
+  const auto samples = samplesOf(xy + R"(<channel name="OE"/><channel name="OA" units="deg"/>)",
+                                 "0 0 60 90, 0 0 90 270, 0 0 0 -180, 0 0 30 540");
+  expectAttitude(samples[0], kPi / 6, kPi / 2);
+  expectAttitude(samples[1], 0.0f, -kPi / 2);
+  expectAttitude(samples[2], kPi / 2, kPi);
   // Half a turn is plus pi, whichever way it was written.
   EXPECT_EQ(samples[2].orientation, kPi);
   EXPECT_EQ(samples[3].orientation, kPi);
 
-  const std::string radians = std::string(kXY) + R"(<channel name="OE" units="rad"/>)";
-  EXPECT_NEAR(samplesOf(radians, "0 0 1")[0].tilt, kPi / 2 - 1.0f, 1e-6f);
-  EXPECT_EQ(samplesOf(radians, "0 0 1")[0].orientation, 0.0f);
-  const std::string azimuth = std::string(kXY) + R"(<channel name="OA" units="rad"/>)";
-  EXPECT_EQ(samplesOf(azimuth, "0 0 1")[0].orientation, 1.0f);
-  EXPECT_EQ(samplesOf(azimuth, "0 0 1")[0].tilt, 0.0f);
+  expectAttitude(samplesOf(xy + R"(<channel name="OE" units="rad"/>)", "0 0 1")[0], kPi / 2 - 1.0f, 0.0f);
+  expectAttitude(samplesOf(xy + R"(<channel name="OA" units="rad"/>)", "0 0 1")[0], 0.0f, 1.0f);
 }
 
 TEST(InkmlReader, TurnsTiltsAlongTheAxesIntoTiltAndOrientation) {
-  const std::string axes = R"(<channel name="OTx"/><channel name="OTy"/>)";
-  const auto samples = samplesOf(kXY + axes, "0 0 45 0, 0 0 0 -30, 0 0 0 30, 0 0 45 -45");
-  EXPECT_NEAR(samples[0].tilt, kPi / 4, 1e-6f);
-  EXPECT_NEAR(samples[0].orientation, kPi / 2, 1e-6f);  // towards +x: a quarter clockwise from up
-  EXPECT_NEAR(samples[1].tilt, kPi / 6, 1e-6f);
-  EXPECT_NEAR(samples[1].orientation, 0.0f, 1e-6f);  // towards -y: up
-  EXPECT_NEAR(samples[2].orientation, kPi, 1e-6f);
-  EXPECT_NEAR(samples[3].tilt, std::atan(std::sqrt(2.0f)), 1e-6f);
-  EXPECT_NEAR(samples[3].orientation, kPi / 4, 1e-6f);
-
+  const std::string axes = std::string(kXY) + R"(<channel name="OTx"/><channel name="OTy"/>)";
+  const auto samples = samplesOf(axes, "0 0 45 0, 0 0 0 -30, 0 0 0 30, 0 0 45 -45");
+  expectAttitude(samples[0], kPi / 4, kPi / 2);  // towards +x: a quarter clockwise from up
+  expectAttitude(samples[1], kPi / 6, 0.0f);     // towards -y: up
+  expectAttitude(samples[2], kPi / 6, kPi);
+  expectAttitude(samples[3], std::atan(std::sqrt(2.0f)), kPi / 4);
   // Where elevation is recorded the axes do not count.
-  const auto both = samplesOf(kXY + axes + R"(<channel name="OE"/>)", "0 0 45 0 90");
-  EXPECT_NEAR(both[0].tilt, 0.0f, 1e-6f);
-  EXPECT_EQ(both[0].orientation, 0.0f);
+  expectAttitude(samplesOf(axes + R"(<channel name="OE"/>)", "0 0 45 0 90")[0], 0.0f, 0.0f);
 }
 
 TEST(InkmlReader, FindsTheFormatOfATraceThroughItsContext) {

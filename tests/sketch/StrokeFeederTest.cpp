@@ -5,6 +5,7 @@
 #include <cmath>
 #include <optional>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "Ink.h"
@@ -57,20 +58,6 @@ TEST(StrokeFeeder, BatchesLiveSamples) {
   EXPECT_EQ(described(line(6), 4, true), "down 0; move 1 2 3 4; move 5");
 }
 
-TEST(StrokeFeeder, UpEventRepeatsTheLastPointWhole) {
-  const Trace trace = line(4);
-  feedLive(trace, {1, 77}, 4, false, [&](LiveEvent& live) {
-    EXPECT_EQ(live.event.GetToolType(0), 1);
-    EXPECT_EQ(live.event.GetSource(), 77);
-    EXPECT_EQ(live.event.GetDownTime(), 0);
-    if (live.event.GetAction() != Qelt::kActionUp) return;
-    EXPECT_EQ(live.event.GetPressure(0), trace.samples[3].pressure);
-    EXPECT_EQ(live.event.GetTilt(0), trace.samples[3].tilt);
-    EXPECT_EQ(live.event.GetOrientation(0), trace.samples[3].orientation);
-    EXPECT_EQ(live.event.GetEventTime(), 12);
-  });
-}
-
 TEST(StrokeFeeder, RecordedEventAndStoredStrokeHoldEveryPoint) {
   const Trace trace = line(3);
   const Qelt::MotionEvent event = recordedEvent(trace, kStylus);
@@ -93,7 +80,19 @@ TEST(StrokeFeeder, RecordedEventAndStoredStrokeHoldEveryPoint) {
     EXPECT_EQ(stroke->GetOrientation()[i], sample.orientation);
   }
   EXPECT_EQ(event.GetX(0), 2.0f);
-  EXPECT_EQ(event.GetPressure(0), trace.samples[2].pressure);
+  // So does the up event of a live stroke, of its last point.
+  feedLive(trace, {1, 77}, 4, false, [&](LiveEvent& live) {
+    EXPECT_EQ(live.event.GetToolType(0), 1);
+    EXPECT_EQ(live.event.GetSource(), 77);
+    if (live.event.GetAction() != Qelt::kActionUp) return;
+    for (const Qelt::MotionEvent* whole : {&event, &std::as_const(live.event)}) {
+      EXPECT_EQ(whole->GetPressure(0), trace.samples[2].pressure);
+      EXPECT_EQ(whole->GetTilt(0), trace.samples[2].tilt);
+      EXPECT_EQ(whole->GetOrientation(0), trace.samples[2].orientation);
+      EXPECT_EQ(whole->GetDownTime(), 0);
+      EXPECT_EQ(whole->GetEventTime(), 8);
+    }
+  });
   EXPECT_EQ(recordedEvent(line(1), kStylus).GetHistorySize(), 1);
 
   // Times that no clock shows.
