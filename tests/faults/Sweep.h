@@ -9,6 +9,7 @@
 #include "Scenarios.h"
 #include "Stage.h"
 #include "support/LogCapture.h"
+#include "support/Versions.h"
 
 namespace QeltTests {
 
@@ -35,6 +36,11 @@ class SweepGround {
   // false when nothing failed. Checks that nothing threw, leaked or was deleted twice. Answers `disarm`'s.
   template <typename Arm, typename Disarm>
   bool survives(const Scenario& scenario, int version, const std::string& what, Arm&& arm, Disarm&& disarm);
+
+  // The same in every version that is swept, with the first `thing` failing, the second, and so on until
+  // nothing fails; alone, then with all after it. Answers the number of failures.
+  template <typename Arm, typename Disarm>
+  int survivesEach(const Scenario& scenario, const std::string& thing, Arm&& arm, Disarm&& disarm);
 
  private:
   struct Counts {
@@ -84,6 +90,27 @@ bool SweepGround::survives(const Scenario& scenario, int version, const std::str
   }
   EXPECT_EQ(after.bad, before.bad) << where << ": deleted twice";
   return failed;
+}
+
+template <typename Arm, typename Disarm>
+int SweepGround::survivesEach(const Scenario& scenario, const std::string& thing, Arm&& arm,
+                              Disarm&& disarm) {
+  int total = 0;
+  for (const int version : allVersions()) {
+    if (!isSwept(scenario, version)) continue;
+    for (const bool andAllAfter : {false, true}) {
+      long number = 1;
+      while (survives(
+          scenario, version,
+          thing + " " + std::to_string(number) + (andAllAfter ? " and all after it" : " alone"),
+          [&] { arm(number, andAllAfter); }, [&] { return disarm(number); })) {
+        ++number;
+      }
+      EXPECT_GT(number, 1) << "no " << thing << ": the sweep sees the plug-in no longer";
+      total += static_cast<int>(number - 1);
+    }
+  }
+  return total;
 }
 
 }  // namespace QeltTests
