@@ -22,6 +22,7 @@ TEST(Compose, LayersMeetPremultiplied) {
   EXPECT_EQ(composeLayers({{0, 0, 255, 255}, {128, 0, 0, 128}}, kWhite), (Pixels{128, 0, 127, 255}));
   // Untouched pixels show the background as it is.
   EXPECT_EQ(composeLayers({{0, 0, 0, 0}}, std::array<std::uint8_t, 3>{1, 2, 3}), (Pixels{1, 2, 3, 255}));
+  EXPECT_THROW(composeLayers({{0, 0, 0, 0}, {}}, kWhite), std::invalid_argument) << "of different sizes";
 }
 
 TEST(Compose, WithoutABackgroundColoursComeOutStraight) {
@@ -32,10 +33,6 @@ TEST(Compose, WithoutABackgroundColoursComeOutStraight) {
   EXPECT_EQ(straight[2], 0);
   EXPECT_EQ(straight[3], 128);
   EXPECT_EQ(composeLayers({{0, 0, 0, 0}}, std::nullopt), (Pixels{0, 0, 0, 0}));
-}
-
-TEST(Compose, RefusesLayersOfDifferentSizes) {
-  EXPECT_THROW(composeLayers({{0, 0, 0, 0}, {}}, kWhite), std::invalid_argument);
 }
 
 }  // namespace
