@@ -11,12 +11,6 @@ using Qelt::RectF;
 constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
 constexpr float kInfinity = std::numeric_limits<float>::infinity();
 
-RectF rectOf(float left, float top, float right, float bottom) {
-  RectF rect;
-  rect.Set(left, top, right, bottom);
-  return rect;
-}
-
 void expectEdges(const RectF& rect, float left, float top, float right, float bottom) {
   EXPECT_EQ(rect.left, left);
   EXPECT_EQ(rect.top, top);
@@ -25,32 +19,32 @@ void expectEdges(const RectF& rect, float left, float top, float right, float bo
 }
 
 TEST(RectF, GrowsByRectanglesWithoutAreaToo) {
-  RectF rect = rectOf(1, 2, 3, 4);
-  rect.Union(rectOf(7, 1, 7, 1));
+  RectF rect = RectF{1, 2, 3, 4};
+  rect.Union(RectF{7, 1, 7, 1});
   expectEdges(rect, 1, 1, 7, 4);
   rect.Union(RectF());
   expectEdges(rect, 0, 0, 7, 4);
 }
 
 TEST(RectF, IgnoresWhatIsNotANumberEdgeByEdge) {
-  RectF rect = rectOf(1, 2, 3, 4);
+  RectF rect = RectF{1, 2, 3, 4};
   rect.MakeRect(kNaN, 9);
   expectEdges(rect, 1, 2, 3, 9);
-  rect.Union(rectOf(kNaN, -1, kNaN, kNaN));
+  rect.Union(RectF{kNaN, -1, kNaN, kNaN});
   expectEdges(rect, 1, -1, 3, 9);
   rect.MakeRect(nullptr);
   expectEdges(rect, 1, -1, 3, 9);
 
-  RectF broken = rectOf(kNaN, kNaN, kNaN, kNaN);
+  RectF broken = RectF{kNaN, kNaN, kNaN, kNaN};
   broken.MakeRect(5, 6);
   expectEdges(broken, 5, 6, 5, 6);
 }
 
 TEST(RectF, RoundsOutwardsAndSurvivesInfinity) {
-  RectF rect = rectOf(-0.25f, 1.0f, 1.25f, -1.5f);
+  RectF rect = RectF{-0.25f, 1.0f, 1.25f, -1.5f};
   rect.ExtendRect();
   expectEdges(rect, -1, 1, 2, -1);
-  rect = rectOf(-kInfinity, kNaN, kInfinity, 1e30f);
+  rect = RectF{-kInfinity, kNaN, kInfinity, 1e30f};
   rect.ExtendRect();
   EXPECT_EQ(rect.left, -kInfinity);
   EXPECT_NE(rect.top, rect.top);
@@ -58,11 +52,11 @@ TEST(RectF, RoundsOutwardsAndSurvivesInfinity) {
 }
 
 TEST(RectF, TouchingRectanglesIntersect) {
-  const RectF tile = rectOf(512, 0, 1024, 512);
-  EXPECT_TRUE(rectOf(500, 500, 512, 512).IsIntersect(tile));
-  EXPECT_FALSE(rectOf(500, 500, 511.99f, 512).IsIntersect(tile));
-  EXPECT_TRUE(rectOf(600, 100, 600, 100).IsIntersect(tile));
-  EXPECT_FALSE(rectOf(kNaN, 0, 1000, 100).IsIntersect(tile));
+  const RectF tile = RectF{512, 0, 1024, 512};
+  EXPECT_TRUE((RectF{500, 500, 512, 512}.IsIntersect(tile)));
+  EXPECT_FALSE((RectF{500, 500, 511.99f, 512}.IsIntersect(tile)));
+  EXPECT_TRUE((RectF{600, 100, 600, 100}.IsIntersect(tile)));
+  EXPECT_FALSE((RectF{kNaN, 0, 1000, 100}.IsIntersect(tile)));
 }
 
 }  // namespace

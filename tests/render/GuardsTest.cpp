@@ -31,9 +31,7 @@ class Guards : public testing::Test {
   void draw(std::size_t floats) {
     Pencil2V8ReturnCallback guard(&drawable, &canvas, &unclaimed);
     if (drawable.writeBuffer() != nullptr) drawable.writeBuffer()->resize(floats);
-    RectF rect;
-    rect.Set(1.0f, 2.0f, 3.0f, 4.0f);
-    guard.setRect(rect);
+    guard.setRect({1.0f, 2.0f, 3.0f, 4.0f});
   }
   Events take() { return std::exchange(events, {}); }
   std::vector<std::string> posted() const {

@@ -16,12 +16,6 @@ using Qelt::RectF;
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-RectF rectOf(float left, float top, float right, float bottom) {
-  RectF rect;
-  rect.Set(left, top, right, bottom);
-  return rect;
-}
-
 // Two tiles side by side, 64 pixels each.
 class RenderMessage : public testing::Test {
  protected:
@@ -46,7 +40,7 @@ TEST_F(RenderMessage, BoxesAllFourCornersOfItsRectangle) {
   constexpr float kHalfRoot = 0.70710678f;
   const float turn[9] = {kHalfRoot, kHalfRoot, 0, -kHalfRoot, kHalfRoot, 0, 100, 50, 1};
   canvas.matrix = Matrix3<float>(turn);
-  const RectF box = PenGLRenderMsg(&drawable, &canvas, rectOf(0, 0, 10, 20), false).getTransformedRect();
+  const RectF box = PenGLRenderMsg(&drawable, &canvas, RectF{0, 0, 10, 20}, false).getTransformedRect();
   EXPECT_NEAR(box.left, 85.857864f, 1e-4f);
   EXPECT_NEAR(box.top, 50.0f, 1e-4f);
   EXPECT_NEAR(box.right, 107.0710678f, 1e-4f);
@@ -58,16 +52,16 @@ TEST_F(RenderMessage, DrawsTheTilesItMeetsAndBracketsEveryOne) {
     PenGLRenderMsg(&drawable, &canvas, rect, useCache).run();
     return std::exchange(events, {});
   };
-  EXPECT_THAT(ran(rectOf(10, 10, 20, 20), false),
+  EXPECT_THAT(ran(RectF{10, 10, 20, 20}, false),
               ElementsAre("update", "begin 0", "draw at 0", "end 0", "begin 1", "end 1", "clear"));
-  EXPECT_THAT(ran(rectOf(60, 10, 70, 20), true), ElementsAre("update cache", "begin 0", "draw at 0", "end 0",
-                                                             "begin 1", "draw at 64", "end 1", "clear"));
-  EXPECT_THAT(ran(rectOf(10, 200, 20, 220), false),
+  EXPECT_THAT(ran(RectF{60, 10, 70, 20}, true), ElementsAre("update cache", "begin 0", "draw at 0", "end 0",
+                                                            "begin 1", "draw at 64", "end 1", "clear"));
+  EXPECT_THAT(ran(RectF{10, 200, 20, 220}, false),
               ElementsAre("update", "begin 0", "end 0", "begin 1", "end 1", "clear"));
 }
 
 TEST_F(RenderMessage, OffersABitmapToThoseWhoTakeOne) {
-  PenGLRenderMsg message(&drawable, &canvas, rectOf(10, 10, 20, 20), false);
+  PenGLRenderMsg message(&drawable, &canvas, RectF{10, 10, 20, 20}, false);
   message.mReferenceBitmap = &canvas.layer;
   for (const bool takes : {false, true}) {
     events.clear();
@@ -80,7 +74,7 @@ TEST_F(RenderMessage, OffersABitmapToThoseWhoTakeOne) {
 }
 
 TEST_F(RenderMessage, DoesNothingAtAllWithoutDrawableCanvasLayerOrBitmap) {
-  const RectF rect = rectOf(10, 10, 20, 20);
+  const RectF rect = RectF{10, 10, 20, 20};
   PenGLRenderMsg(nullptr, &canvas, rect, false).run();
   PenGLRenderMsg(&drawable, nullptr, rect, false).run();
   canvas.layer.hasBitmap = false;

@@ -1,7 +1,5 @@
-#include <android/log.h>
 #include <gmock/gmock.h>
 
-#include <stdexcept>
 #include <string>
 #include <typeinfo>
 
@@ -44,17 +42,7 @@ struct Alive {
   static inline int count = 0;
 };
 struct OneShader : Alive {};
-struct SparedShader {
-  float uniform = 1.0f;
-};
 struct OtherShader : Alive {};
-struct BadShader : Alive {
-  BadShader() {
-    if (isBad) throw std::runtime_error("bad");
-  }
-  static inline bool isBad = true;
-};
-
 ShaderManager& registry() {
   return *ShaderManager::GetInstance();
 }
@@ -95,42 +83,6 @@ TEST(ShaderRegistryTest, ReportsMisuseAndLeavesTheRegisteredOneAlone) {
   EXPECT_EQ(Alive::count, 2);
   registry().ReleaseShader(registered);
   EXPECT_EQ(Alive::count, 1);
-}
-
-TEST(ShaderRegistryTest, KeepsNothingOfAShaderThatCouldNotBeMade) {
-  const LogCapture log;
-  EXPECT_THROW(registry().GetShader<BadShader>(), std::runtime_error);
-  EXPECT_EQ(Alive::count, 0);
-  BadShader::isBad = false;
-  BadShader* const made = registry().GetShader<BadShader>();  // not a leftover
-  ASSERT_NE(made, nullptr);
-  EXPECT_EQ(Alive::count, 1);
-  registry().ReleaseShader(made);
-  EXPECT_EQ(Alive::count, 0);
-}
-
-TEST(ShaderRegistryTest, TriesAgainWhereMemoryRanOutForAShader) {
-  if (!countsAllocations()) GTEST_SKIP() << "the sanitizers bring allocation functions of their own";
-  // What captures lines allocates, which here would fail inside the log library.
-  __android_log_set_logger([](const __android_logger_data*, const char*) {});
-  const long before = liveAllocations();
-  int failures = 0;
-  for (bool failed = true; failed; ++failures) {
-    SparedShader* shader;
-    {
-      const FailingAllocation failing(failures);
-      shader = registry().GetShader<SparedShader>();
-      failed = failing.hasFailed();
-    }
-    EXPECT_EQ(shader == nullptr, failed) << "allocation " << failures;
-    SparedShader* const again = registry().GetShader<SparedShader>();
-    EXPECT_NE(again, nullptr) << "after failed allocation " << failures;
-    registry().ReleaseShader(again);
-    registry().ReleaseShader(shader);
-  }
-  __android_log_set_logger(__android_log_stderr_logger);
-  EXPECT_GE(failures, 3) << "a shader, a node of the map and a key have been asked for";
-  EXPECT_EQ(liveAllocations(), before) << "whoever got none held none";
 }
 
 // --- Uniforms ---
