@@ -19,7 +19,7 @@ void expectEdges(const RectF& rect, float left, float top, float right, float bo
 }
 
 TEST(RectF, GrowsByRectanglesWithoutAreaToo) {
-  RectF rect = RectF{1, 2, 3, 4};
+  RectF rect{1, 2, 3, 4};
   rect.Union(RectF{7, 1, 7, 1});
   expectEdges(rect, 1, 1, 7, 4);
   rect.Union(RectF());
@@ -27,7 +27,7 @@ TEST(RectF, GrowsByRectanglesWithoutAreaToo) {
 }
 
 TEST(RectF, IgnoresWhatIsNotANumberEdgeByEdge) {
-  RectF rect = RectF{1, 2, 3, 4};
+  RectF rect{1, 2, 3, 4};
   rect.MakeRect(kNaN, 9);
   expectEdges(rect, 1, 2, 3, 9);
   rect.Union(RectF{kNaN, -1, kNaN, kNaN});
@@ -35,13 +35,13 @@ TEST(RectF, IgnoresWhatIsNotANumberEdgeByEdge) {
   rect.MakeRect(nullptr);
   expectEdges(rect, 1, -1, 3, 9);
 
-  RectF broken = RectF{kNaN, kNaN, kNaN, kNaN};
+  RectF broken{kNaN, kNaN, kNaN, kNaN};
   broken.MakeRect(5, 6);
   expectEdges(broken, 5, 6, 5, 6);
 }
 
 TEST(RectF, RoundsOutwardsAndSurvivesInfinity) {
-  RectF rect = RectF{-0.25f, 1.0f, 1.25f, -1.5f};
+  RectF rect{-0.25f, 1.0f, 1.25f, -1.5f};
   rect.ExtendRect();
   expectEdges(rect, -1, 1, 2, -1);
   rect = RectF{-kInfinity, kNaN, kInfinity, 1e30f};
@@ -52,7 +52,7 @@ TEST(RectF, RoundsOutwardsAndSurvivesInfinity) {
 }
 
 TEST(RectF, TouchingRectanglesIntersect) {
-  const RectF tile = RectF{512, 0, 1024, 512};
+  const RectF tile{512, 0, 1024, 512};
   EXPECT_TRUE((RectF{500, 500, 512, 512}.IsIntersect(tile)));
   EXPECT_FALSE((RectF{500, 500, 511.99f, 512}.IsIntersect(tile)));
   EXPECT_TRUE((RectF{600, 100, 600, 100}.IsIntersect(tile)));
