@@ -61,6 +61,11 @@ class TraceText::Scanner {
       ++count;
     }
     if (count < mFormat.regularCount) throw wrongCount();
+    for (std::size_t i = 0; i < mStates.size(); ++i) {
+      const Quantity quantity = mFormat.channels[i].quantity;
+      const bool isPlace = quantity == Quantity::X || quantity == Quantity::Y;
+      if (isPlace && !mStates[i].reading.known) throw badPoint("point without a place");
+    }
     if (!atEnd()) {
       ++mAt;
       skipSpace();
@@ -183,11 +188,13 @@ class TraceText::Scanner {
   }
 
   Refusal wrongCount() const {
+    return badPoint("point does not have the " + std::to_string(mFormat.regularCount) +
+                    " values of its format");
+  }
+
+  Refusal badPoint(const std::string& what) const {
     const std::string point = trimmed(textUntil(mPointStart, [](char c) { return c == ','; }));
-    const std::string wanted = std::to_string(mFormat.regularCount);
-    return mTrace.mSource.refusal(mTrace.lineAt(mPointStart),
-                                  "point does not have the " + wanted + " values of its format",
-                                  point.empty() ? "\"\"" : point);
+    return mTrace.mSource.refusal(mTrace.lineAt(mPointStart), what, point.empty() ? "\"\"" : point);
   }
 
   const TraceText& mTrace;

@@ -27,8 +27,8 @@ class TraceText {
   // Hands over the points in order, one reading a channel. An omitted intermittent value and "?" leave the
   // channel's reading as it was; "*" repeats the number before it under the same prefix. Differences add up
   // from the channel's last value: ' is the change, " the change of the change; a prefix holds for its
-  // channel until the next one. Throws Refusal at the first malformed value, and at one that no float can
-  // hold in a channel that we use.
+  // channel until the next one. Throws Refusal at the first malformed value, at one that no float can
+  // hold in a channel that we use, and at a point before X or Y has a value.
   void forEachPoint(const TraceFormat& format,
                     const std::function<void(const std::vector<Reading>&)>& take) const;
 

@@ -30,7 +30,7 @@ constexpr std::uint64_t kAlive = 0x51454C5441110CADu;
 constexpr std::uint64_t kDeleted = 0xDEADDEADDEADDEADu;
 
 std::atomic<std::uintptr_t> codeBegin{0}, codeEnd{0};
-std::atomic<long> blocks{0}, ownBlocks{0}, ownAllocations{0}, deletionsOfNothing{0};
+std::atomic<long> blocks{0}, ownBlocks{0}, ownAllocations{0}, deletionsOfNothing{0}, thrown{0};
 std::atomic<long> askedSince{0}, failFrom{0}, failTo{0};  // failing: from <= number <= to
 
 // Guards the list of the plug-in's living blocks. Not a std::mutex's business to allocate, nor this one's.
@@ -149,6 +149,10 @@ long AllocationGate::plugInAllocations() {
   return ownAllocations;
 }
 
+long AllocationGate::thrownFailures() {
+  return thrown;
+}
+
 long AllocationGate::badDeletions() {
   return deletionsOfNothing;
 }
@@ -184,8 +188,9 @@ std::string AllocationGate::livingSince(long after) {
 namespace {
 
 void* orThrow(void* memory) {
-  if (memory == nullptr) throw std::bad_alloc();
-  return memory;
+  if (memory != nullptr) return memory;
+  thrown.fetch_add(1);
+  throw std::bad_alloc();
 }
 
 std::size_t bytes(std::align_val_t alignment) {

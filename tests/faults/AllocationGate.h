@@ -27,6 +27,8 @@ class AllocationGate {
   static long allBlocks();
   // The plug-in's allocations so far, failed ones included.
   static long plugInAllocations();
+  // How many allocations failed so far that told it by an exception.
+  static long thrownFailures();
   // How many deletions were of something that was not alive.
   static long badDeletions();
   // Which of the plug-in's allocations gave the block that begins here; 0 when none did.

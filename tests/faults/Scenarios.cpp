@@ -12,6 +12,7 @@ std::vector<Scenario> scenarios() {
          stage.deletePen();
        }},
       {"LiveStroke", [](Stage& stage) { stage.live(); }, true},
+      {"Straight", [](Stage& stage) { stage.straight(); }, true},
       {"LiveStrokeLeftOpen", [](Stage& stage) { stage.beginLive(); }},
       {"LiveStrokeQueuedAsThePenDies",
        [](Stage& stage) {
@@ -54,7 +55,7 @@ std::vector<Scenario> scenarios() {
          stage.prepareAll();
          stage.deletePen();
        },
-       false, true},
+       true, true},
       {"LivePicture", [](Stage& stage) { stage.live(); }, false, true},
       {"ContextLoss",
        [](Stage& stage) {

@@ -10,7 +10,7 @@ namespace QeltTests {
 struct Scenario {
   const char* name;
   void (*run)(Stage&);
-  bool everyVersion = false;  // or version 8 alone
+  bool everyVersion = false;  // or version 8 alone; of pictures, every version that draws its own way
   bool picture = false;       // or no GL
 };
 

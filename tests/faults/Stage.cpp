@@ -167,6 +167,16 @@ void Stage::beginLive() {
   drawStroke(strokeDrawable(), false, false);
 }
 
+void Stage::straight() {
+  makePen();
+  if (mPen == nullptr) return;
+  mPen->GetMorphable()->SetCurveEnabled(false);
+  live();
+  outline();
+  preview();
+  mPen->GetMorphable()->SetCurveEnabled(true);
+}
+
 template <typename Drawable, typename Input>
 void Stage::redrawTwice(Drawable* drawable, const Input& input) {
   for (int i = 0; i < 2; ++i) {

@@ -50,6 +50,8 @@ class Stage {
   void live(bool finishes = true);
   // Part of one, the pen still down.
   void beginLive();
+  // A live stroke, an outline and a preview, not smoothed.
+  void straight();
   // Stored strokes and recorded events, smooth and straight, from the cache and not.
   void redraw(bool finishes = true);
   // Two outlines each of a stored stroke and of a recorded one.

@@ -31,11 +31,20 @@ void check(const Page& page) {
   }
 }
 
-// As a file: that is where other encodings are told apart.
-Page readAsFile(const std::uint8_t* data, std::size_t size) {
+// A file of these bytes: that is where other encodings are told apart.
+std::string fileOf(const std::uint8_t* data, std::size_t size) {
   static const int file = memfd_create("ink", 0);
   if (ftruncate(file, 0) != 0 || pwrite(file, data, size, 0) != static_cast<ssize_t>(size)) std::abort();
-  return QeltDesktop::readInkmlFile("/proc/self/fd/" + std::to_string(file));
+  return "/proc/self/fd/" + std::to_string(file);
+}
+
+// "name:line: what", in one line.
+bool namesPlace(const std::string& text, const std::string& name) {
+  if (text.rfind(name + ":", 0) != 0) return false;
+  const std::size_t line = name.size() + 1;
+  const std::size_t end = text.find_first_not_of("0123456789", line);
+  return end != std::string::npos && end > line && text[line] != '0' && text.compare(end, 2, ": ") == 0 &&
+         text.find_first_of("\n\r") == std::string::npos;
 }
 
 }  // namespace
@@ -44,16 +53,16 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   if (size > 65536) return -1;
   const bool marked =
       size >= 2 && ((data[0] == 0xFE && data[1] == 0xFF) || (data[0] == 0xFF && data[1] == 0xFE));
+  const std::string name = marked ? fileOf(data, size) : "page";
   try {
     if (marked) {
-      check(readAsFile(data, size));
+      check(QeltDesktop::readInkmlFile(name));
     } else {
-      check(QeltDesktop::readInkml({"page", std::string(reinterpret_cast<const char*>(data), size)}));
+      check(QeltDesktop::readInkml({name, std::string(reinterpret_cast<const char*>(data), size)}));
     }
   } catch (const QeltDesktop::Refusal& refusal) {
-    const std::string text = refusal.what();
-    if (!marked && text.rfind("page:", 0) != 0)
-      QeltTests::breakOff("the reader", "a refusal without its file");
+    if (!namesPlace(refusal.what(), name))
+      QeltTests::breakOff("the reader", "a refusal without file and line");
   }
   return 0;
 }
