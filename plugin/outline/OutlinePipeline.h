@@ -24,6 +24,7 @@
 #include "stroke/parts/PenSample.h"
 #include "stroke/parts/Replay.h"
 #include "stroke/parts/SampleCleaner.h"
+#include "stroke/parts/SampleSources.h"
 #include "stroke/parts/SegmentPath.h"
 #include "stroke/parts/StampRun.h"
 #include "stroke/parts/StampWalk.h"
@@ -66,6 +67,7 @@ class OutlinePipeline : public Pencil2OutlineDrawableGL {
     }
     if (mRender == nullptr || mCanvas == nullptr || !settings().exist()) return false;
 
+    // Kept: set at once, not posted; an outline that still waits is drawn in this colour too.
     mRender->SetOutlineColor(static_cast<unsigned int>(GetOutlineColor()));
     mRender->SetOutlineSize(GetOutlineSize());
     typename Version::ReturnGuard guard(mRender, mCanvas, mRender->unclaimedBatch());
@@ -115,8 +117,8 @@ class OutlinePipeline : public Pencil2OutlineDrawableGL {
   }
 
   // Kept: leaves the size reached as it is.
-  bool endPen(const MotionEvent* event, RectF* rect, Smoothing smoothing) {
-    const PenSample sample = endSample(*event, kCleaner, mPath, kEndGrowth, rect);
+  bool endPen(const MotionEvent& event, RectF* rect, Smoothing smoothing) {
+    const PenSample sample = endSample(event, kCleaner, mPath, kEndGrowth, rect);
     mAttitude.push(sample.tilt, sample.orientation);
     if (!settings().hasUsableSize()) return true;
 

@@ -40,9 +40,11 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
 
     void AddPoint(const Vector2<float>* point, float size, float tiltFactor) {
       const StampLook look{0.0f, tiltFactor, 0.0f, point[1]};
-      const float half = size * 0.5f;
-      mInner.add(quad(point[0], half), look);
-      mOuter.add(quad(point[0], half + mOutlineSize), look);
+      StampExtent extent = squareExtent(size);
+      mInner.add(stampQuad(point[0], extent), look);
+      extent.x += mOutlineSize;
+      extent.y += mOutlineSize;
+      mOuter.add(stampQuad(point[0], extent), look);
     }
 
     // The buffers hold all stamps from here on.
@@ -52,10 +54,6 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
     }
 
    private:
-    static StampQuad quad(Vector2<float> centre, float half) {
-      return {centre.x - half, centre.y - half, centre.x + half, centre.y + half, 0.0f, 1.0f};
-    }
-
     StampAppender<kFloatsPerVertex> mInner;
     StampAppender<kFloatsPerVertex> mOuter;
     float mOutlineSize;

@@ -11,6 +11,7 @@
 #include "log/Log.h"
 #include "render/DrawablePosts.h"
 #include "stroke/StrokeRules.h"
+#include "stroke/parts/SampleSources.h"
 #include "stroke/parts/StampWalk.h"
 
 namespace Qelt {
@@ -114,13 +115,13 @@ bool Pencil2PreviewDrawableGL::drawLine(const PenSample& sample, RectF* rect, Sm
   return placed;
 }
 
-bool Pencil2PreviewDrawableGL::endPen(const MotionEvent* event, RectF* rect, Smoothing smoothing) {
+bool Pencil2PreviewDrawableGL::endPen(const MotionEvent& event, RectF* rect, Smoothing smoothing) {
   // Kept: the message names another class.
   if (smoothing == Smoothing::Curve &&
       !hasSpacing("Pencil3GL::EndPen, mRepeatDistance is a wrong value(%f).")) {
     return false;
   }
-  const PenSample sample = endSample(*event, kCleaner, mPath, kGrowth, rect);
+  const PenSample sample = endSample(event, kCleaner, mPath, kGrowth, rect);
   mAttitude.push(sample.tilt, sample.orientation);
   if (!settings().hasUsableSize()) return true;
 

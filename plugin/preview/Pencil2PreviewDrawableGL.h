@@ -54,7 +54,7 @@ class Pencil2PreviewDrawableGL final : public PenPreviewDrawableGL {
   void beginReplay(const PenSample& start, bool coarseTool, Smoothing smoothing);
   void forgetAlpha();
   bool drawLine(const PenSample& sample, RectF* rect, Smoothing smoothing);
-  bool endPen(const MotionEvent* event, RectF* rect, Smoothing smoothing);
+  bool endPen(const MotionEvent& event, RectF* rect, Smoothing smoothing);
 
   bool canDraw() const;
   // Takes the numbers that follow the pen size.

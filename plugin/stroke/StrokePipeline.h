@@ -27,6 +27,7 @@
 #include "stroke/parts/PenSample.h"
 #include "stroke/parts/Replay.h"
 #include "stroke/parts/SampleCleaner.h"
+#include "stroke/parts/SampleSources.h"
 #include "stroke/parts/SegmentPath.h"
 #include "stroke/parts/StampCounter.h"
 #include "stroke/parts/StampRun.h"
@@ -157,12 +158,8 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
   void forgetAlpha() { mAlpha = kNoAlpha; }
 
   // Ends a stroke at the event's point. A point that is not finite leaves the closing segment out.
-  bool endPen(const MotionEvent* event, RectF* rect, Smoothing smoothing) {
-    if (event == nullptr || rect == nullptr) {
-      Error::SetError(Error::kInvalidArgument);
-      return false;
-    }
-    const PenSample sample = endSample(*event, kCleaner, mPath, kMoveGrowth, rect);
+  bool endPen(const MotionEvent& event, RectF* rect, Smoothing smoothing) {
+    const PenSample sample = endSample(event, kCleaner, mPath, kMoveGrowth, rect);
     mAttitude.push(sample.tilt, sample.orientation);
     if (!settings().hasUsableSize()) return true;
 

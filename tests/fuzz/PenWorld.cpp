@@ -26,7 +26,7 @@ namespace {
 // A run must not take long: a segment is allowed a quarter of a million stamps, so few inputs may ask for
 // such, and for few. Points far out, and pens so fine that every segment is long for them, are counted.
 constexpr int kMostFarPoints = 1;
-constexpr int kMostHeavyCalls = 2;
+constexpr int kMostHeavyCalls = 1;
 constexpr float kFarOut = 2000.0f;  // stroke units
 constexpr float kFinePen = 0.05f;   // stroke units
 constexpr std::size_t kMostFloats = 60'000'000;

@@ -7,8 +7,8 @@
 #include "engine/MotionEvent.h"
 #include "stroke/parts/MoveFilter.h"
 #include "stroke/parts/PenSample.h"
-#include "stroke/parts/Replay.h"
 #include "stroke/parts/SampleCleaner.h"
+#include "stroke/parts/SampleSources.h"
 #include "stroke/parts/SegmentPath.h"
 #include "stroke/parts/StrokeState.h"
 
@@ -21,7 +21,8 @@ inline void substituteTouchPressure(const MotionEvent& event, const SampleCleane
     writable(event).SetPressure(cleaner.unknownPressure);
 }
 
-inline PenSample currentSample(const MotionEvent& event, const SampleCleaner& cleaner) {
+// Cleaned; a tilt above the cap is written back.
+inline PenSample takeCurrentSample(const MotionEvent& event, const SampleCleaner& cleaner) {
   EventSource(event).prepare(cleaner);
   return {{event.GetX(0), event.GetY(0)},
           cleaner.pressure(event.GetPressure(0), event.GetToolType(0)),
@@ -55,7 +56,7 @@ void takeMove(const MotionEvent& event, const SampleCleaner& cleaner, Take&& tak
     for (int i = 0; i < history; ++i) writable(event).SetHistoricalPressure(i, cleaner.unknownPressure);
     writable(event).SetPressure(cleaner.unknownPressure);
   }
-  const PenSample current = currentSample(event, cleaner);
+  const PenSample current = takeCurrentSample(event, cleaner);
   EventSource source(event);
   for (int i = 0; i < history; ++i) {
     take(PenSample{source.point(i), cleaner.pressure(source.pressure(i), toolType), source.tilt(i, cleaner),
@@ -68,7 +69,7 @@ void takeMove(const MotionEvent& event, const SampleCleaner& cleaner, Take&& tak
 inline PenSample endSample(const MotionEvent& event, const SampleCleaner& cleaner, const SegmentPath& path,
                            float growth, RectF* rect) {
   substituteTouchPressure(event, cleaner);
-  const PenSample sample = currentSample(event, cleaner);
+  const PenSample sample = takeCurrentSample(event, cleaner);
   path.setToJoint(rect);
   if (isFinite(sample.at)) rect->MakeRect(&sample.at);
   rect->IncreaseRect(growth);
@@ -90,13 +91,13 @@ bool drawLive(const MotionEvent& event, Pen& pen, StrokeState& state, RectF* rec
       if (!isFinite(at)) return false;
       state.down();
       substituteTouchPressure(event, pen.cleaner());
-      pen.beginLive(currentSample(event, pen.cleaner()),
+      pen.beginLive(takeCurrentSample(event, pen.cleaner()),
                     isCoarseTool(event.GetToolType(0), event.GetSource()), smoothing);
       rect->Set(at.x, at.y, at.x, at.y);
       return true;
     }
     case kActionMove:
-      if (!state.move()) return false;
+      if (!state.takesMoves()) return false;
       pen.path().setToJoint(rect);
       pen.beginMove(event);
       takeMove(event, pen.cleaner(), [&](const PenSample& sample) { pen.drawLine(sample, rect, smoothing); });
@@ -105,7 +106,7 @@ bool drawLive(const MotionEvent& event, Pen& pen, StrokeState& state, RectF* rec
     case kActionUp:
       if (!state.up()) return false;
       pen.forgetAlpha();
-      return pen.endPen(&event, rect, smoothing);
+      return pen.endPen(event, rect, smoothing);
     default:
       return false;
   }
