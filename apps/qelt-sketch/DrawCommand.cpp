@@ -14,6 +14,7 @@ namespace QeltDesktop {
 
 void drawCommand(const Options& options) {
   Page page = readInkmlFile(inputPath(options));
+  OutputFile file(options.output, inputPath(options));
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
 
@@ -26,7 +27,6 @@ void drawCommand(const Options& options) {
   Progress progress("drawing stroke", page.traces.size() * static_cast<std::size_t>(options.repeat));
   const Picture picture = drawPage(plugin, queue, page, options, layOut(area, options.zoom, options.rotate),
                                    drawablesFor(options), progress);
-  OutputFile file(options.output);
   file.write(encodePng(picture));
   file.commit();
 }

@@ -10,28 +10,33 @@
 #include <CLI/CLI.hpp>
 
 #include "NumberText.h"
+#include "Refusal.h"
 #include "engine/MotionEvent.h"
 
 namespace QeltDesktop {
 namespace {
 
+// What an option takes: how the help shows it, how a refusal names it, and what makes a value of its text.
+// Every number goes through our own parsers, which no locale bends.
 template <typename Value>
-using Parser = std::function<std::optional<Value>(const std::string&)>;
+struct Form {
+  const char* shape;
+  const char* wanted;
+  std::function<std::optional<Value>(const std::string&)> parse;
+};
 
-// An option whose text `parse` understands; every number goes through our own parsers, which no locale bends.
 template <typename Value, typename Target>
-void addValue(CLI::App& app, const char* name, Target& target, const Parser<Value>& parse, const char* shape,
-              const char* help) {
+void addValue(CLI::App& app, const char* name, Target& target, const Form<Value>& form, const char* help) {
   app.add_option_function<std::string>(
          name,
-         [&target, parse, name, shape](const std::string& text) {
-           const std::optional<Value> value = parse(text);
+         [&target, form, name](const std::string& text) {
+           const std::optional<Value> value = form.parse(text);
            if (!value)
-             throw CLI::ValidationError(name, std::string("expects ") + shape + ", not '" + text + "'");
+             throw CLI::ValidationError(name, std::string("expects ") + form.wanted + ", not '" + text + "'");
            target = *value;
          },
          help)
-      ->type_name(shape);
+      ->type_name(form.shape);
 }
 
 std::optional<int> countFrom(int least, const std::string& text) {
@@ -100,13 +105,14 @@ std::optional<Background> background(const std::string& text) {
   return Background{.rgb = *rgb};
 }
 
+// One of some words, which `shape` lists.
 template <typename Value>
-Parser<Value> oneOf(std::map<std::string, Value> names) {
-  return [names = std::move(names)](const std::string& text) -> std::optional<Value> {
-    const auto found = names.find(text);
-    if (found == names.end()) return std::nullopt;
-    return found->second;
-  };
+Form<Value> oneOf(const std::map<std::string, Value>& names, const char* shape) {
+  return {shape, shape, [&names](const std::string& text) -> std::optional<Value> {
+            const auto found = names.find(text);
+            if (found == names.end()) return std::nullopt;
+            return found->second;
+          }};
 }
 
 const std::map<std::string, Mode> kModes{
@@ -126,6 +132,19 @@ const char* nameIn(const std::map<std::string, Value>& names, Value value) {
   return "";
 }
 
+const Form<int> kCount{"N", "a whole number from 1", count};
+const Form<int> kInteger{"N", "a whole number", integer};
+const Form<int> kPredictionCount{"K", "a whole number from 0 to 10000", predictionCount};
+const Form<float> kSize{"S", "a number", anyFloat};
+const Form<float> kZoom{"Z", "a number above 0", positiveFloat};
+const Form<float> kDegrees{"DEG", "a number of degrees", finiteFloat};
+const Form<float> kShare{"O", "a number from 0 to 1", share};
+const Form<std::uint32_t> kColor{"'#AARRGGBB'", "a colour as #AARRGGBB", argbColor};
+const Form<PageSize> kPage{"WxH", "WxH, two numbers above 0", pageSize};
+const Form<Background> kBackground{"white|transparent|'#RRGGBB'", "white, transparent or #RRGGBB",
+                                   background};
+const Form<OutlineOptions> kOutline{"SIZE,'#AARRGGBB'", "SIZE,#AARRGGBB", outline};
+
 // Option by option, in the order the help shows them.
 
 void addInput(CLI::App& app, Options& options) {
@@ -142,43 +161,41 @@ void addPlugin(CLI::App& app, Options& options) {
 }
 
 void addPen(CLI::App& app, Options& options) {
-  addValue<float>(app, "--size", options.size, anyFloat, "S",
-                  "pen size (default: the file's, else the pen's)");
-  addValue<std::uint32_t>(app, "--color", options.argb, argbColor, "'#AARRGGBB'",
+  addValue<float>(app, "--size", options.size, kSize, "pen size (default: the file's, else the pen's)");
+  addValue<std::uint32_t>(app, "--color", options.argb, kColor,
                           "pen colour (default: the file's, else the pen's)");
 }
 
 void addFeeding(CLI::App& app, Options& options) {
   app.add_flag_callback(
       "--no-curve", [&options] { options.curve = false; }, "straight segments");
-  addValue<Mode>(app, "--mode", options.mode, oneOf(kModes), "live|event|stroke",
+  addValue<Mode>(app, "--mode", options.mode, oneOf(kModes, "live|event|stroke"),
                  "how strokes reach the plug-in (default live)");
-  addValue<int>(app, "--batch", options.batch, count, "N", "live: samples a move event (default 4)");
-  addValue<int>(app, "--tool", options.tool, oneOf(kTools), "stylus|finger|mouse",
+  addValue<int>(app, "--batch", options.batch, kCount, "live: samples a move event (default 4)");
+  addValue<int>(app, "--tool", options.tool, oneOf(kTools, "stylus|finger|mouse"),
                 "tool (default: the file's, else stylus)");
-  addValue<int>(app, "--source", options.source, integer, "N",
+  addValue<int>(app, "--source", options.source, kInteger,
                 "event source (default 16386 stylus, 4098 finger, 8194 mouse)");
 }
 
 void addDrawing(CLI::App& app, Options& options) {
-  addValue<int>(app, "--rendering-version", options.renderingVersion, integer, "N", "of the pen (default 8)");
+  addValue<int>(app, "--rendering-version", options.renderingVersion, kInteger, "of the pen (default 8)");
   addPen(app, options);
   addFeeding(app, options);
-  addValue<int>(app, "--repeat", options.repeat, count, "N",
+  addValue<int>(app, "--repeat", options.repeat, kCount,
                 "draw the page N times, each onto a cleared layer; in stroke mode from the cache");
-  addValue<float>(app, "--zoom", options.zoom, positiveFloat, "Z", "canvas pixels a stroke unit (default 1)");
-  addValue<float>(app, "--rotate", options.rotate, finiteFloat, "DEG",
+  addValue<float>(app, "--zoom", options.zoom, kZoom, "canvas pixels a stroke unit (default 1)");
+  addValue<float>(app, "--rotate", options.rotate, kDegrees,
                   "turn clockwise about the page's centre (default 0)");
-  addValue<PageSize>(app, "--page", options.page, pageSize, "WxH",
+  addValue<PageSize>(app, "--page", options.page, kPage,
                      "page in stroke units, from (0, 0) (default: the file's extent plus a margin)");
-  addValue<Background>(app, "--background", options.background, background, "white|transparent|'#RRGGBB'",
-                       "default white");
-  addValue<OutlineOptions>(app, "--outline", options.outline, outline, "SIZE,'#AARRGGBB'",
+  addValue<Background>(app, "--background", options.background, kBackground, "default white");
+  addValue<OutlineOptions>(app, "--outline", options.outline, kOutline,
                            "draw every stroke's outline under the strokes");
-  addValue<int>(app, "--predict", options.predict, predictionCount, "K",
+  addValue<int>(app, "--predict", options.predict, kPredictionCount,
                 "live: K predicted samples after every move event");
-  addValue<float>(app, "--opacity", options.opacity, share, "O", "of the prediction, 0 to 1 (default 0.5)");
-  addValue<int>(app, "--points", options.points, count, "N",
+  addValue<float>(app, "--opacity", options.opacity, kShare, "of the prediction, 0 to 1 (default 0.5)");
+  addValue<int>(app, "--points", options.points, kCount,
                 "stop after the first N points of the last trace, the pen still down");
 }
 
@@ -191,6 +208,12 @@ void checkTogether(const Options& options) {
   if (options.drawable == DrawableKind::Preview && options.mode == Mode::Stroke) {
     throw CLI::ValidationError("--drawable preview", "takes --mode live or event");
   }
+}
+
+UsageEnd usageEnd(const CLI::App& app, const CLI::ParseError& error) {
+  std::ostringstream text;
+  const bool asked = app.exit(error, text, text) == 0;
+  return {text.str(), asked ? 0 : 2};
 }
 
 }  // namespace
@@ -210,8 +233,9 @@ std::variant<Options, UsageEnd> parseOptions(int argc, const char* const* argv) 
   addInput(*trace, options);
   addOutput(*trace, options, "file to write; - is standard output");
   addDrawing(*trace, options);
-  addValue<DrawableKind>(*trace, "--drawable", options.drawable, oneOf(kDrawables),
-                         "stroke|outline|preview|prediction", "whose calls to write (default stroke)");
+  addValue<DrawableKind>(*trace, "--drawable", options.drawable,
+                         oneOf(kDrawables, "stroke|outline|preview|prediction"),
+                         "whose calls to write (default stroke)");
 
   CLI::App* const preview = app.add_subcommand("preview", "draw the settings panel's sample stroke");
   addOutput(*preview, options, "picture to write");
@@ -239,10 +263,11 @@ std::variant<Options, UsageEnd> parseOptions(int argc, const char* const* argv) 
       if (command->parsed()) options.command = value;
     }
     checkTogether(options);
+  } catch (const CLI::RequiredError& error) {
+    if (!app.get_subcommands().empty() || argc < 2) return usageEnd(app, error);
+    return UsageEnd{"no command '" + oneLine(argv[1]) + "'; see qelt-sketch --help\n", 2};
   } catch (const CLI::ParseError& error) {
-    std::ostringstream text;
-    const bool asked = app.exit(error, text, text) == 0;
-    return UsageEnd{text.str(), asked ? 0 : 2};
+    return usageEnd(app, error);
   }
   return options;
 }

@@ -38,7 +38,7 @@ void rememberUnfinished(const std::string& path) {
 
 }  // namespace
 
-OutputFile::OutputFile(const std::string& path) : mShownPath(path), mPath(path) {
+OutputFile::OutputFile(const std::string& path, const std::string& input) : mShownPath(path), mPath(path) {
   if (path == "-") {
     mFile = stdout;
     return;
@@ -50,6 +50,8 @@ OutputFile::OutputFile(const std::string& path) : mShownPath(path), mPath(path) 
     errno = EISDIR;
     refuse();
   }
+  if (fs::is_regular_file(status) && !input.empty() && fs::equivalent(path, input, error))
+    throw Refusal(path + ": cannot be written: it is the page to read");
   if (fs::exists(status) && !fs::is_regular_file(status)) {
     mFile = std::fopen(path.c_str(), "wb");
   } else {

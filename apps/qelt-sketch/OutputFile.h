@@ -10,8 +10,8 @@ namespace QeltDesktop {
 // `commit`. What is not a regular file ("-" for standard output, a device, a pipe) is written straight.
 class OutputFile {
  public:
-  // Throws Refusal when the file cannot be written.
-  explicit OutputFile(const std::string& path);
+  // Throws Refusal when the file cannot be written, or is `input`: what is read is not lost.
+  explicit OutputFile(const std::string& path, const std::string& input = {});
   // Removes what was not committed.
   ~OutputFile();
   OutputFile(const OutputFile&) = delete;

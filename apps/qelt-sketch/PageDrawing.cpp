@@ -5,10 +5,12 @@
 #include <cmath>
 #include <cstdio>
 #include <optional>
+#include <string>
 #include <vector>
 
 #include "PagePlayer.h"
 #include "PenSession.h"
+#include "ProgramFiles.h"
 #include "Progress.h"
 #include "Refusal.h"
 #include "desktop/gl/RenderQueue.h"
@@ -32,7 +34,8 @@ struct PixelSize {
   int width, height;
 };
 
-PixelSize pixelSizeOf(const PageLayout& layout) {
+// `page` says where the size comes from.
+PixelSize pixelSizeOf(const PageLayout& layout, const std::string& page) {
   const double width = pixelsFor(layout.width);
   const double height = pixelsFor(layout.height);
   // Not a single comparison holds for a size that is not a number.
@@ -40,9 +43,9 @@ PixelSize pixelSizeOf(const PageLayout& layout) {
     return {static_cast<int>(width), static_cast<int>(height)};
   }
   std::array<char, 128> text{};
-  std::snprintf(text.data(), text.size(), "the picture is too large to draw: %.6g x %.6g pixels", width,
+  std::snprintf(text.data(), text.size(), ": the picture is too large to draw: %.6g x %.6g pixels", width,
                 height);
-  throw Refusal(text.data());
+  throw Refusal(page + text.data());
 }
 
 // A layer and the view of the page that a drawable has of it.
@@ -133,7 +136,7 @@ float largestPenSize(const PluginLibrary& plugin, RenderQueue& queue, const Page
 
 Picture drawPage(const PluginLibrary& plugin, RenderQueue& queue, const Page& page, const Options& options,
                  const PageLayout& layout, const DrawableSet& drawables, Progress& progress) {
-  const PixelSize size = pixelSizeOf(layout);
+  const PixelSize size = pixelSizeOf(layout, options.page ? "--page" : inputPath(options));
   Drawing drawing(queue, size, layout, drawables, progress);
   {
     PenSession session(plugin, queue, options);

@@ -48,13 +48,13 @@ Page samplePanel() {
 void previewCommand(const Options& asked) {
   Options options = asked;
   options.mode = Mode::Event;
+  OutputFile file(options.output);
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
   Progress progress("drawing stroke", 1);
   const PageLayout layout = layOut({0.0f, 0.0f, kPanelWidth, kPanelHeight}, kPanelZoom, 0.0f);
   const Picture picture =
       drawPage(plugin, queue, samplePanel(), options, layout, {.preview = true}, progress);
-  OutputFile file(options.output);
   file.write(encodePng(picture));
   file.commit();
 }

@@ -31,6 +31,7 @@ constexpr std::uint32_t kPaper = 0xE8E8E8, kInk = 0x404040;
 void sheetCommand(const Options& asked) {
   Options options = asked;
   const Page page = readInkmlFile(inputPath(options));
+  OutputFile file(options.output, inputPath(options));
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
 
@@ -57,7 +58,6 @@ void sheetCommand(const Options& asked) {
                "RENDERING VERSION " + std::to_string(options.renderingVersion));
     paste(*sheet, cell, x, y + kGlyphHeight * kLabelScale + kGap / 2);
   }
-  OutputFile file(options.output);
   file.write(encodePng(*sheet));
   file.commit();
 }

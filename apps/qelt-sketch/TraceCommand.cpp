@@ -65,9 +65,9 @@ class CountingRecorder final : public CallRecorder {
 
 void traceCommand(const Options& options) {
   Page page = readInkmlFile(inputPath(options));
+  OutputFile file(options.output, inputPath(options));
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
-  OutputFile file(options.output);
   CountingRecorder recorder(queue, file, options,
                             page.traces.size() * static_cast<std::size_t>(options.repeat));
 
