@@ -1,4 +1,5 @@
 #include <algorithm>
+#include <atomic>
 #include <iterator>
 #include <memory>
 #include <new>
@@ -67,7 +68,10 @@ class ProgramState final : public GlResource {
 
   // Makes the program current; false when there is none.
   bool use() {
-    if (mProgram == 0 || !isLive()) return false;
+    if (mProgram == 0 || !isLive()) {
+      noteForeignContext();
+      return false;
+    }
     device()->useProgram(mProgram);
     return true;
   }
@@ -94,6 +98,12 @@ class ProgramState final : public GlResource {
   void forget() override { mProgram = 0; }
   void remake() override {
     if (!mReleased) build();
+  }
+
+  // Shaders are shared by the whole process, contexts are not: a second queue's strokes stay invisible.
+  void noteForeignContext() {
+    if (GlDevice::live() == nullptr || GlDevice::live() == device() || mSaidForeign.exchange(true)) return;
+    logError("a shader program belongs to another render queue's context; nothing is drawn with it here");
   }
 
   static GLuint compile(GLenum stage, const char* source) {
@@ -161,6 +171,7 @@ class ProgramState final : public GlResource {
   std::string mFragmentSource;
   GLuint mProgram = 0;
   bool mReleased = false;
+  std::atomic<bool> mSaidForeign{false};  // whichever render thread comes first
   std::vector<Uniform> mUniforms;
 };
 
