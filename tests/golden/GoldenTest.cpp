@@ -1,14 +1,15 @@
 #include <gtest/gtest.h>
 
-#include <charconv>
+#include <algorithm>
+#include <cmath>
 #include <cstddef>
-#include <cstdint>
-#include <initializer_list>
 #include <string>
 #include <vector>
 
 #include "golden/Golden.h"
-#include "stroke/DrawingBoard.h"
+#include "prediction/Pencil2PredictionDrawableGL.h"
+#include "preview/Pencil2PreviewDrawableGL.h"
+#include "support/DrawableBoard.h"
 #include "support/Stamps.h"
 #include "support/Versions.h"
 
@@ -16,17 +17,28 @@
 namespace QeltTests {
 namespace {
 
-// Shortest decimals that read back as the same float.
-std::string line(const char* what, std::initializer_list<float> numbers) {
-  std::string text = what;
-  for (const float number : numbers) {
-    char digits[32];
-    const auto [end, error] = std::to_chars(digits, digits + sizeof digits, number);
-    text += ' ';
-    text.append(digits, end);
-  }
-  return text;
+using PreviewBoard = DrawableBoard<Qelt::Pencil2PreviewDrawableGL>;
+using PredictionBoard = DrawableBoard<Qelt::Pencil2PredictionDrawableGL>;
+
+std::string areaLine(const Qelt::RectF& rect) {
+  return traceLine("area", {rect.left, rect.top, rect.right, rect.bottom});
 }
+
+// Ink on paper: what a board's layer holds.
+GreyPicture pictureOf(Board& board) {
+  board.queue.finish();
+  GreyPicture picture{board.options.width, board.options.height, {}};
+  const std::vector<std::uint8_t> pixels = board.pixels();
+  for (std::size_t i = 3; i < pixels.size(); i += 4)
+    picture.pixels.push_back(static_cast<std::uint8_t>(255 - pixels[i]));
+  return picture;
+}
+
+std::string versionName(const testing::TestParamInfo<int>& test) {
+  return "Version" + std::to_string(test.param);
+}
+
+// --- Strokes ---
 
 // Draws a stroke event by event and writes down stamps and areas, and at the end what the prediction is told.
 void traceStroke(Trace& trace, const BoardOptions& options, float zoom, const std::vector<Sample>& samples) {
@@ -34,12 +46,19 @@ void traceStroke(Trace& trace, const BoardOptions& options, float zoom, const st
   board.canvas.setMatrix(viewOf(zoom));
   const auto write = [&] {
     for (const Stamp& s : board.takeStamps()) {
-      std::string text = line("stamp", {s.x, s.y, s.halfWidth, s.halfHeight, s.alpha, s.narrowing,
-                                        static_cast<float>(s.tile), s.directionX, s.directionY});
-      if (strideOf(options.version) == 11) text += line("", {s.innerRadius, s.alphaByWidth});
-      trace.push_back(text);
+      std::vector<float> numbers = {s.x,
+                                    s.y,
+                                    s.halfWidth,
+                                    s.halfHeight,
+                                    s.alpha,
+                                    s.narrowing,
+                                    static_cast<float>(s.tile),
+                                    s.directionX,
+                                    s.directionY};
+      if (board.stride() == 11) numbers.insert(numbers.end(), {s.innerRadius, s.alphaByWidth});
+      trace.push_back(traceLine("stamp", numbers));
     }
-    trace.push_back(line("area", {board.rect.left, board.rect.top, board.rect.right, board.rect.bottom}));
+    trace.push_back(areaLine(board.rect));
   };
   board.down(samples.front());
   write();
@@ -51,9 +70,9 @@ void traceStroke(Trace& trace, const BoardOptions& options, float zoom, const st
   board.up(samples.back());
   write();
   const Qelt::Pencil2Data& d = board.shared;
-  trace.push_back(
-      line("state", {d.mStartX, d.mStartY, d.mLastWidth, d.mLastStampX, d.mLastStampY, d.mLastX, d.mLastY,
-                     d.mLastAlpha, d.mLastOrientation, static_cast<float>(d.mStampCount), d.mTiltBlend}));
+  trace.push_back(traceLine(
+      "state", {d.mStartX, d.mStartY, d.mLastWidth, d.mLastStampX, d.mLastStampY, d.mLastX, d.mLastY,
+                d.mLastAlpha, d.mLastOrientation, static_cast<float>(d.mStampCount), d.mTiltBlend}));
 }
 
 // Pressure from below to above every clamp; tilt from one cap over the other down again; the orientation
@@ -75,13 +94,15 @@ std::vector<Sample> fingerMoves(float skipDistance) {
           {x + 1.1f * skipDistance, y + 0.5f * skipDistance, 0.9f}};
 }
 
-Trace traceOf(int version) {
-  BoardOptions options;
-  options.version = version;
-  options.color = 0x60203040u;
+class Golden : public testing::TestWithParam<int> {};
+
+// To the last bit: the files were recorded on x86-64; on 64-bit ARM the same test holds the other processor
+// to them.
+TEST_P(Golden, StampsAreThoseOfTheRelease) {
+  const int version = GetParam();
   Trace trace;
   trace.emplace_back("curve, size 2, stylus");
-  options.size = 2.0f;
+  BoardOptions options{.version = version, .size = 2.0f, .color = 0x60203040u};
   traceStroke(trace, options, 1.0f, kHand);
   trace.emplace_back("straight, size 0.8, stylus, zoom 1.5");
   options.size = 0.8f;
@@ -93,20 +114,14 @@ Trace traceOf(int version) {
   options.tool = Qelt::kToolFinger;
   options.source = Qelt::kSourceTouchScreen;
   traceStroke(trace, options, 1.0f, fingerMoves(version == 8 ? 20.0f : 50.0f));
-  return trace;
+  expectGoldenTrace(trace, "stamps-v" + std::to_string(version) + ".txt", Exactness::ToTheLastBit);
 }
 
 // A wave under growing pressure, shading with the pen laid down, and a straight hairline, thinner than a
 // pixel.
-GreyPicture pictureOf(int version) {
-  BoardOptions options;
-  options.version = version;
-  options.color = 0xA0203040u;
-  options.width = 160;
-  options.height = 120;
-  options.tile = 64;
-  options.size = 7.0f;
-  DrawingBoard board(options);
+TEST_P(Golden, PictureIsThatOfTheRelease) {
+  DrawingBoard board(
+      {.version = GetParam(), .size = 7.0f, .color = 0xA0203040u, .width = 160, .height = 120, .tile = 64});
   std::vector<Sample> wave, shading, hairline;
   for (int i = 0; i <= 20; ++i) {
     const auto t = static_cast<float>(i);
@@ -121,31 +136,130 @@ GreyPicture pictureOf(int version) {
   board.settings.size = 0.7f;
   board.shared.mCurveEnabled = false;
   board.stroke(hairline);
-
-  const std::vector<std::uint8_t> pixels = board.pixels();
-  GreyPicture picture{options.width, options.height, {}};
-  for (std::size_t i = 3; i < pixels.size(); i += 4)
-    picture.pixels.push_back(static_cast<std::uint8_t>(255 - pixels[i]));
-  return picture;
+  expectGoldenPicture(pictureOf(board), "picture-v" + std::to_string(GetParam()) + ".pgm");
 }
 
-class Golden : public testing::TestWithParam<int> {};
+INSTANTIATE_TEST_SUITE_P(Versions, Golden, testing::ValuesIn(allVersions()), versionName);
 
-TEST_P(Golden, StampsAreThoseOfTheRelease) {
-  expectGoldenTrace(traceOf(GetParam()), "stamps-v" + std::to_string(GetParam()) + ".txt");
+// --- Outlines, preview, prediction ---
+
+// Each stamp's first vertex, and the opposite corner; then the area.
+template <typename Board>
+void traceCall(Trace& trace, Board& board) {
+  const auto stride = static_cast<std::size_t>(board.stride());
+  for (const std::vector<float>& floats : board.takeBuffers()) {
+    trace.emplace_back("batch");
+    for (std::size_t stamp = 0; stamp + 6 * stride <= floats.size(); stamp += 6 * stride) {
+      const float* const first = &floats[stamp];
+      std::vector<float> numbers(first, first + stride);
+      numbers.insert(numbers.end(), first + 5 * stride, first + 5 * stride + 2);
+      trace.push_back(traceLine("stamp", numbers));
+    }
+  }
+  trace.push_back(areaLine(board.rect));
 }
 
-// The files were recorded on x86-64; on 64-bit ARM the same test holds the other processor to them.
-TEST_P(Golden, StampsAreTheSameOnEveryProcessorToTheLastBit) {
-  expectExactGoldenTrace(traceOf(GetParam()), "stamps-v" + std::to_string(GetParam()) + ".txt");
+// Tilt from one cap over the other down again, the orientation across the wrap, and moves of 0.7 and 1.3
+// among the longer ones.
+const std::vector<Sample> kShortHand = {
+    {10.13f, 10.29f, 0.20f, 0.79f, 2.90f},  {11.93f, 10.61f, 0.20f, 1.20f, -3.00f},
+    {12.61f, 10.77f, 0.55f, 1.20f, -2.80f}, {13.89f, 10.93f, 0.55f, 0.77f, 2.60f},
+    {16.97f, 13.03f, 1.00f, 0.40f, 2.20f},  {14.11f, 15.93f, 0.75f, 0.20f, 1.50f},
+    {12.03f, 16.47f, 0.35f, 0.60f, 0.90f},
+};
+
+// A wave over most of a small page, the pen leaning more and more.
+std::vector<Sample> wave() {
+  std::vector<Sample> samples;
+  for (int i = 0; i <= 24; ++i) {
+    const auto t = static_cast<float>(i);
+    samples.push_back(
+        {14.13f + 5.3f * t, 40.39f + 18.0f * std::sin(0.5f * t), 0.3f + 0.025f * t, 0.04f * t, 0.7f});
+  }
+  return samples;
 }
 
-TEST_P(Golden, PictureIsThatOfTheRelease) {
-  expectGoldenPicture(pictureOf(GetParam()), "picture-v" + std::to_string(GetParam()) + ".pgm");
+BoardOptions page(int version = 8) {
+  return {.version = version, .size = 7.0f, .color = 0xFF203040u, .width = 160, .height = 80, .tile = 64};
 }
 
-INSTANTIATE_TEST_SUITE_P(Versions, Golden, testing::ValuesIn(allVersions()),
-                         [](const auto& version) { return "Version" + std::to_string(version.param); });
+class OutlineGolden : public testing::TestWithParam<int> {};
+
+TEST_P(OutlineGolden, StampsAreThoseOfTheRelease) {
+  Trace trace;
+  for (const bool curve : {true, false}) {
+    OutlineBoard board({.version = GetParam(), .size = curve ? 2.0f : 0.8f, .curve = curve});
+    board.drawable->SetOutlineSize(1.5f);
+    board.outline(kShortHand);
+    traceCall(trace, board);
+  }
+  expectGoldenTrace(trace, "outline-stamps-v" + std::to_string(GetParam()) + ".txt");
+}
+
+TEST_P(OutlineGolden, PictureIsThatOfTheRelease) {
+  OutlineBoard board(page(GetParam()));
+  board.drawable->SetOutlineSize(4.0f);
+  board.drawable->SetOutlineColor(static_cast<int>(0xFF2060C0u));
+  board.outline(wave());
+  expectGoldenPicture(pictureOf(board), "outline-picture-v" + std::to_string(GetParam()) + ".pgm");
+}
+
+INSTANTIATE_TEST_SUITE_P(Versions, OutlineGolden, testing::ValuesIn(outlineVersions()), versionName);
+
+TEST(PreviewGolden, StampsAreThoseOfTheRelease) {
+  Trace trace;
+  for (const bool curve : {true, false}) {
+    PreviewBoard board({.size = curve ? 5.0f : 0.8f, .color = 0x60203040u, .curve = curve});
+    board.redraw(board.recorded(kShortHand));
+    traceCall(trace, board);
+    board.down(kShortHand[0]);
+    board.move({kShortHand[1], kShortHand[3], kShortHand[4]});
+    board.up(kShortHand[5]);
+    traceCall(trace, board);
+  }
+  expectGoldenTrace(trace, "preview-stamps.txt");
+}
+
+TEST(PreviewGolden, PictureIsThatOfTheRelease) {
+  PreviewBoard board(page());
+  board.redraw(board.recorded(wave()));
+  expectGoldenPicture(pictureOf(board), "preview-picture.pgm");
+}
+
+// What a live stroke might have left.
+void leaveStroke(Qelt::Pencil2Data& shared) {
+  shared.mStartX = 12.13f;
+  shared.mStartY = 20.39f;
+  shared.mLastStampX = 20.37f;
+  shared.mLastStampY = 40.61f;
+  shared.mLastX = 24.71f;
+  shared.mLastY = 44.29f;
+  shared.mLastWidth = 9.0f;
+  shared.mLastAlpha = 0.6f;
+  shared.mLastOrientation = 0.7f;
+  shared.mStampCount = 7;
+  shared.mTiltBlend = 0.2f;
+  shared.mHasLastStroke = true;
+}
+
+const std::vector<Sample> kAhead = {{40.13f, 52.77f}, {71.59f, 44.31f}, {105.23f, 20.87f}, {139.61f, 33.93f}};
+
+TEST(PredictionGolden, StampsAreThoseOfTheRelease) {
+  Trace trace;
+  PredictionBoard board;
+  leaveStroke(board.shared);
+  board.move(kAhead);
+  traceCall(trace, board);
+  expectGoldenTrace(trace, "prediction-stamps.txt");
+}
+
+TEST(PredictionGolden, PictureIsThatOfTheRelease) {
+  PredictionBoard board(page());
+  board.drawable->SetOpacity(0.8f);
+  leaveStroke(board.shared);
+  board.move(kAhead);
+  expectGoldenPicture(pictureOf(board), "prediction-picture.pgm");
+}
 
 }  // namespace
 }  // namespace QeltTests

@@ -2,13 +2,14 @@
 // the contract's headers against the same numbers.
 
 #include <dlfcn.h>
-#include <gtest/gtest.h>
+#include <gmock/gmock.h>
 
-#include <cstddef>
+#include <climits>
 #include <cstdint>
 #include <cstring>
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "base/RectF.h"
 #include "base/String.h"
@@ -27,6 +28,7 @@ using Qelt::IPenMorphable;
 using Qelt::Pen;
 using Qelt::PenDrawableRT;
 using Qelt::PenStrokeDrawableRT;
+using testing::ElementsAre;
 
 void* codeAt(const void* object, int slot) {
   return (*static_cast<void* const* const*>(object))[slot];
@@ -70,10 +72,12 @@ class Slots : public testing::Test {
 TEST_F(Slots, ThePenAnswersAtItsSlots) {
   void* pen = mPen.get();
   EXPECT_EQ((callSlot<float>(pen, 3)), 0.477f);  // size of a fresh pen
-  EXPECT_EQ((callSlot<float>(pen, 4)), 0.477f);  // smallest
-  EXPECT_EQ((callSlot<float>(pen, 5)), 6.571f);  // largest
-  callSlot<void>(pen, 2, 3.0f);
-  EXPECT_EQ((callSlot<float>(pen, 3)), 3.0f);
+  for (const float size : {3.0f, 40.0f, -1.0f}) {
+    callSlot<void>(pen, 2, size);
+    EXPECT_EQ((callSlot<float>(pen, 3)), size);
+    EXPECT_EQ((callSlot<float>(pen, 4)), 0.477f);  // smallest
+    EXPECT_EQ((callSlot<float>(pen, 5)), 6.571f);  // largest
+  }
   EXPECT_EQ((callSlot<int>(pen, 7)), static_cast<int>(0xFF000000u));
   callSlot<void>(pen, 6, 0x12345678);
   EXPECT_EQ((callSlot<int>(pen, 7)), 0x12345678);
@@ -83,7 +87,7 @@ TEST_F(Slots, ThePenAnswersAtItsSlots) {
   EXPECT_EQ((callSlot<float>(pen, 14)), 0.25f);
   callSlot<void>(pen, 15, 7);
   EXPECT_EQ((callSlot<int>(pen, 16)), 7);
-  for (const int attribute : {-1, 0, 1, 2, 3, 4, 5}) {
+  for (const int attribute : {-1, 0, 1, 2, 3, 4, 5, 32, 36, INT_MAX, INT_MIN}) {
     const bool expected = attribute >= 0 && attribute <= 4 && attribute != 3;
     EXPECT_EQ((callSlot<bool>(pen, 18, attribute)), expected) << attribute;
   }
@@ -122,43 +126,28 @@ TEST_F(Slots, ThePenOverridesOnlyItsOwn) {
   }
 }
 
-TEST(ContractSlots, OfThePen) {
-  EXPECT_EQ(slotOf(&Pen::SetSize), 2);
-  EXPECT_EQ(slotOf(&Pen::GetMaxSize), 5);
-  EXPECT_EQ(slotOf(&Pen::SetScreenResolution), 8);
-  EXPECT_EQ(slotOf(&Pen::GetAdvancedSetting), 10);
-  EXPECT_EQ(slotOf(&Pen::SetEnhancedAntiAlias), 17);
-  EXPECT_EQ(slotOf(&Pen::GetStrokeDrawableGL), 19);
-  EXPECT_EQ(slotOf(&Pen::GetPredictionStrokeDrawableGL), 20);
-  EXPECT_EQ(slotOf(&Pen::GetOutlineDrawableGL), 21);
-  EXPECT_EQ(slotOf(&Pen::GetPreviewDrawableGL), 22);
-  EXPECT_EQ(slotOf(&Pen::GetTestDrawableGL), 23);
-  EXPECT_EQ(slotOf(&Pen::GetStrokeRect), 27);
-  EXPECT_EQ(slotOf(&Pen::setPenDataManager), 28);
-  EXPECT_EQ(slotOf(&IPenMorphable::SetCurveEnabled), 2);
-  EXPECT_EQ(slotOf(&IPenMorphable::GetFixedWidth), 7);
-}
-
-TEST(ContractSlots, OfTasksAndRenderDrawables) {
-  EXPECT_EQ(slotOf(&Qelt::ITask::run), 2);
-  EXPECT_EQ(slotOf(&Qelt::ITask::isGlobalLockAllowed), 3);
-  EXPECT_EQ(slotOf(&Qelt::ManagedObject::OnRelease), 2);
-  EXPECT_EQ(slotOf(&Qelt::ManagedObject::OnRestore), 3);
-  EXPECT_EQ(slotOf(&PenDrawableRT::ReleaseGLObject), 4);
-  EXPECT_EQ(slotOf(&PenDrawableRT::RestoreGLObject), 5);
-  EXPECT_EQ(slotOf(&PenDrawableRT::Init), 6);
-  EXPECT_EQ(slotOf(&PenDrawableRT::Release), 7);
-  EXPECT_EQ(slotOf(&PenDrawableRT::AddPoint), 8);
-  EXPECT_EQ(slotOf(&PenDrawableRT::CreatePenCanvas), 9);
-  EXPECT_EQ(slotOf(&PenDrawableRT::ClearPenCanvas), 10);
-  EXPECT_EQ(slotOf(&PenDrawableRT::Clear), 11);
-  EXPECT_EQ(slotOf(&PenDrawableRT::Update), 12);
-  EXPECT_EQ(slotOf(&PenDrawableRT::Draw), 13);
-  EXPECT_EQ(slotOf(&PenDrawableRT::GetDepthMapBitmapSettable), 14);
-  EXPECT_EQ(slotOf(&PenDrawableRT::GetReferenceBitmapSettable), 15);
-  EXPECT_EQ(slotOf(&PenStrokeDrawableRT::SetBuffer), 16);
-  EXPECT_EQ(slotOf(&PenStrokeDrawableRT::SendDataToGPU), 17);
-  EXPECT_EQ(slotOf(&PenStrokeDrawableRT::SetCacheBuffer), 18);
+// What the numbers above rest on, and those that a render thread calls by.
+TEST(ContractSlots, AreThoseOfHostsBuiltElsewhere) {
+  const auto slotsOf = [](auto... members) { return std::vector<int>{slotOf(members)...}; };
+  EXPECT_THAT(slotsOf(&Pen::SetSize, &Pen::GetMaxSize, &Pen::SetScreenResolution, &Pen::GetAdvancedSetting,
+                      &Pen::SetEnhancedAntiAlias),
+              ElementsAre(2, 5, 8, 10, 17));
+  EXPECT_THAT(slotsOf(&Pen::GetStrokeDrawableGL, &Pen::GetPredictionStrokeDrawableGL,
+                      &Pen::GetOutlineDrawableGL, &Pen::GetPreviewDrawableGL, &Pen::GetTestDrawableGL,
+                      &Pen::GetStrokeRect, &Pen::setPenDataManager),
+              ElementsAre(19, 20, 21, 22, 23, 27, 28));
+  EXPECT_THAT(slotsOf(&IPenMorphable::SetCurveEnabled, &IPenMorphable::GetFixedWidth), ElementsAre(2, 7));
+  EXPECT_THAT(slotsOf(&Qelt::ITask::run, &Qelt::ITask::isGlobalLockAllowed), ElementsAre(2, 3));
+  EXPECT_THAT(slotsOf(&Qelt::ManagedObject::OnRelease, &Qelt::ManagedObject::OnRestore), ElementsAre(2, 3));
+  EXPECT_THAT(slotsOf(&PenDrawableRT::ReleaseGLObject, &PenDrawableRT::RestoreGLObject, &PenDrawableRT::Init,
+                      &PenDrawableRT::Release, &PenDrawableRT::AddPoint, &PenDrawableRT::CreatePenCanvas,
+                      &PenDrawableRT::ClearPenCanvas, &PenDrawableRT::Clear, &PenDrawableRT::Update,
+                      &PenDrawableRT::Draw, &PenDrawableRT::GetDepthMapBitmapSettable,
+                      &PenDrawableRT::GetReferenceBitmapSettable),
+              ElementsAre(4, 5, 6, 7, 8, 9, 10, 11, 12, 13, 14, 15));
+  EXPECT_THAT(slotsOf(&PenStrokeDrawableRT::SetBuffer, &PenStrokeDrawableRT::SendDataToGPU,
+                      &PenStrokeDrawableRT::SetCacheBuffer),
+              ElementsAre(16, 17, 18));
 }
 
 }  // namespace

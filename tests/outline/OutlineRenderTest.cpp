@@ -14,9 +14,8 @@
 #include "desktop/pencommon/PenDataManager.h"
 #include "graphics/ISPBitmap.h"
 #include "math/Matrix4.h"
-#include "outline/Outliner.h"
-#include "outline/Pencil2OutlineDrawableGLV4.h"
 #include "outline/Pencil2OutlineDrawableRTV1.h"
+#include "support/DrawableBoard.h"
 #include "support/LogCapture.h"
 
 namespace QeltTests {
@@ -25,17 +24,12 @@ namespace {
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-using V4 = Qelt::Pencil2OutlineDrawableGLV4;
-
 constexpr int kSide = 120;
 
 std::vector<std::uint8_t> outlinePicture(float outlineSize, const std::vector<Sample>& samples,
                                          float zoom = 1.0f) {
-  BoardOptions options = outlinePaper(30.0f, false);
-  options.width = kSide;
-  options.height = kSide;
-  options.tile = 64;
-  Outliner<V4> board(options);
+  OutlineBoard board(
+      {.version = 4, .size = 30.0f, .curve = false, .width = kSide, .height = kSide, .tile = 64});
   board.outline({{0.0f, 0.0f}, {60.0f, 0.0f}});  // brings the size up to 30
   board.queue.finish();
   board.layer->clear();
@@ -43,7 +37,7 @@ std::vector<std::uint8_t> outlinePicture(float outlineSize, const std::vector<Sa
   board.drawable->SetOutlineSize(outlineSize);
   board.drawable->SetOutlineColor(static_cast<int>(0x40FF8000u));
   board.outline(samples);
-  return board.layer->readPixels();
+  return board.pixels();
 }
 
 // How covered a pixel is: 0 to 255, taking colour and alpha together.

@@ -14,7 +14,6 @@
 #include "pen/Pencil2.h"
 #include "pencommon/PenPredictionDrawableGL.h"
 #include "prediction/Pencil2PredictionDrawableGL.h"
-#include "stroke/DrawingBoard.h"
 #include "stroke/Pencil2StrokeDrawableGLV1.h"
 #include "support/DrawableBoard.h"
 #include "support/LogCapture.h"
@@ -32,7 +31,7 @@ using testing::ElementsAre;
 using testing::IsEmpty;
 using testing::SizeIs;
 
-using Board = DrawableBoard<Pencil2PredictionDrawableGL>;
+using PredictionBoard = DrawableBoard<Pencil2PredictionDrawableGL>;
 
 constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
 constexpr float kInfinity = std::numeric_limits<float>::infinity();
@@ -53,15 +52,11 @@ void leaveStroke(Qelt::Pencil2Data& shared) {
   shared.mHasLastStroke = true;
 }
 
-std::vector<Stamp> stamps(Board& board) {
-  return stampsOf(board.takeFloats(), 11);
-}
-
 TEST(Prediction, GoesOnFromTheLastStampWithItsLooks) {
-  Board board;
+  PredictionBoard board;
   leaveStroke(board.shared);
   EXPECT_TRUE(board.move({{30.5f, 0.0f, 0.1f, 0.7f, 2.0f}}));  // only the position counts
-  const std::vector<Stamp> placed = stamps(board);
+  const std::vector<Stamp> placed = board.takeStamps();
   ASSERT_THAT(placed, SizeIs(20));  // from 10 to 30.5, one a unit
   for (std::size_t i = 0; i < placed.size(); ++i) {
     EXPECT_THAT(placed[i], StampNear(11.0f + static_cast<float>(i), 0.0f, 0.02f)) << i;
@@ -80,28 +75,28 @@ TEST(Prediction, GoesOnFromTheLastStampWithItsLooks) {
 }
 
 TEST(Prediction, EndsAtTheLastSampleAndPassesTheOthersHalfWay) {
-  Board board;
+  PredictionBoard board;
   leaveStroke(board.shared);
   // 10 to 25 through 20; 25 to 35 through 30; 35 to 50.2 through 40.
   EXPECT_TRUE(board.move({{30.0f, 0.0f}, {40.0f, 0.0f}, {50.2f, 0.0f}}));
-  std::vector<Stamp> placed = stamps(board);
+  std::vector<Stamp> placed = board.takeStamps();
   ASSERT_THAT(placed, SizeIs(40));
   EXPECT_THAT(placed.back(), StampNear(50.0f, 0.0f, 0.05f));
   // A sample that is nowhere is left out.
   leaveStroke(board.shared);
   board.move({{30.0f, 0.0f}, {kNaN, 0.0f}, {40.0f, -kInfinity}, {40.0f, 0.0f}, {50.2f, 0.0f}});
-  EXPECT_EQ(stamps(board).size(), placed.size());
+  EXPECT_EQ(board.takeStamps().size(), placed.size());
   // Left and right of the way the same: the path bends towards each sample.
   leaveStroke(board.shared);
   board.move({{30.0f, 10.0f}});
-  for (const Stamp& stamp : stamps(board)) {
+  for (const Stamp& stamp : board.takeStamps()) {
     EXPECT_LE(stamp.y, 10.0f);
     EXPECT_GE(stamp.y, 0.0f);
   }
 }
 
 TEST(Prediction, EveryStateOfTheLiveStrokeIsPredictedFromOnce) {
-  Board board;
+  PredictionBoard board;
   EXPECT_FALSE(board.move({{30.0f, 0.0f}}));  // no stroke yet
   EXPECT_THAT(board.takePosts(), IsEmpty());
   leaveStroke(board.shared);
@@ -115,7 +110,7 @@ TEST(Prediction, EveryStateOfTheLiveStrokeIsPredictedFromOnce) {
   board.takePosts();
   EXPECT_FALSE(board.up({30.0f, 0.0f}));
   EXPECT_THAT(board.takePosts(), ElementsAre("SetRect", "Batch", "Render", "DeleteBatch"));
-  EXPECT_THAT(stamps(board), IsEmpty());
+  EXPECT_THAT(board.takeStamps(), IsEmpty());
   EXPECT_FALSE(board.shared.mHasLastStroke);
   // Nothing is carried from one to the next.
   leaveStroke(board.shared);
@@ -126,37 +121,50 @@ TEST(Prediction, EveryStateOfTheLiveStrokeIsPredictedFromOnce) {
   EXPECT_EQ(board.takeFloats(), once);
 }
 
+// Kept: before a stroke's first stamp the prediction goes on from wherever the stroke before it ended.
+TEST(Prediction, BeforeTheFirstStampStartsFromTheStrokeBefore) {
+  PredictionBoard board;
+  leaveStroke(board.shared);
+  // A new stroke far away has begun, and has not placed a stamp yet.
+  board.shared.mStartX = board.shared.mLastX = 500.0f;
+  board.shared.mStartY = board.shared.mLastY = 500.0f;
+  board.shared.mStampCount = 0;
+  board.move({{510.0f, 500.0f}});
+  EXPECT_THAT(board.takeStamps().at(0), StampNear(10.0f, 0.0f, 1.01f));
+}
+
 TEST(Prediction, TheRimFollowsTheView) {
-  Board board;
+  PredictionBoard board;
   board.canvas.setMatrix(viewOf(2.0f));
   leaveStroke(board.shared);
   board.move({{30.0f, 0.0f}});
-  EXPECT_NEAR(stamps(board)[0].halfWidth, 2.25f, 1e-5f);  // half a pixel is a quarter of a unit
+  EXPECT_NEAR(board.takeStamps().at(0).halfWidth, 2.25f, 1e-5f);  // half a pixel is a quarter of a unit
 }
 
-// A live stroke, with predictions between its events or without.
-std::vector<float> liveFloats(bool predicts, std::vector<float>* predicted) {
-  BoardOptions options;
-  options.size = 6.0f;
-  DrawingBoard board(options);
+// A live stroke: its floats and those of predictions between its events, if there are any, and the last stamp
+// before the first of them.
+struct LiveAndPredicted {
+  std::vector<float> live, predicted;
+  Stamp last;
+};
+
+LiveAndPredicted drawnLive(bool predicts) {
+  DrawingBoard board({.size = 6.0f});
   Pencil2PredictionDrawableGL prediction(&board.shared, &board.data);
   prediction.SetCanvas(&board.canvas);
-  std::vector<float> live;
-  const auto collect = [&board](std::vector<float>* floats) {
-    for (const QeltDesktop::Batch& batch : board.takeBatches()) {
-      if (floats != nullptr) {
-        floats->insert(floats->end(), batch.buffers.front().begin(), batch.buffers.front().end());
-      }
-    }
+  LiveAndPredicted drawn;
+  const auto collect = [&board](std::vector<float>& floats) {
+    const std::vector<float> more = board.takeFloats();
+    floats.insert(floats.end(), more.begin(), more.end());
   };
   const auto predict = [&](float x, float y) {
-    collect(&live);
+    collect(drawn.live);
     if (!predicts) return;
-    const MotionEvent event = motionEvent(Qelt::kActionMove, {{x, y}, {x + 9.0f, y + 1.0f}},
-                                          Qelt::kToolStylus, Qelt::kSourceStylus);
+    if (drawn.predicted.empty()) drawn.last = stampsOf(drawn.live, 11).back();
+    const MotionEvent event = motionEvent(Qelt::kActionMove, {{x, y}, {x + 9.0f, y + 1.0f}});
     RectF rect;
     EXPECT_TRUE(prediction.Draw(&event, &rect));
-    collect(predicted);
+    collect(drawn.predicted);
   };
   board.down({10.0f, 10.0f});
   board.move({{22.0f, 12.0f, 0.7f, 0.2f, 0.3f}, {30.0f, 15.0f, 0.8f, 0.77f, 0.4f}});
@@ -164,23 +172,15 @@ std::vector<float> liveFloats(bool predicts, std::vector<float>* predicted) {
   board.move({{43.0f, 22.0f, 0.6f, 0.78f, 0.4f}});
   predict(50.0f, 30.0f);
   board.up({47.0f, 30.0f});
-  collect(&live);
-  board.queue.finish();
-  return live;
+  collect(drawn.live);
+  return drawn;
 }
 
 TEST(Prediction, ContinuesTheLiveStrokeAndLeavesItAlone) {
-  std::vector<float> predicted;
-  const std::vector<float> alone = liveFloats(false, nullptr);
-  EXPECT_EQ(liveFloats(true, &predicted), alone);
-
-  BoardOptions options;
-  options.size = 6.0f;
-  DrawingBoard board(options);
-  board.down({10.0f, 10.0f});
-  board.move({{22.0f, 12.0f, 0.7f, 0.2f, 0.3f}, {30.0f, 15.0f, 0.8f, 0.77f, 0.4f}});
-  const Stamp last = board.takeStamps().back();
-  const Stamp first = stampsOf(predicted, 11).front();
+  const LiveAndPredicted drawn = drawnLive(true);
+  EXPECT_EQ(drawn.live, drawnLive(false).live);
+  const Stamp& last = drawn.last;
+  const Stamp first = stampsOf(drawn.predicted, 11).front();
   EXPECT_EQ(first.tile, (last.tile + 1) % 3);
   EXPECT_NEAR(first.alpha, 2.0f * last.alpha, 1e-5f);  // by 3 instead of by 6
   // The width is the segment's target, which the last stamp has all but reached.
@@ -189,9 +189,8 @@ TEST(Prediction, ContinuesTheLiveStrokeAndLeavesItAlone) {
 }
 
 TEST(Prediction, RefusesWhatIsMissingAndStartsNowhereFromARecordOutOfBounds) {
-  Board board;
-  const MotionEvent event =
-      motionEvent(Qelt::kActionMove, {{30.0f, 0.0f}}, Qelt::kToolStylus, Qelt::kSourceStylus);
+  PredictionBoard board;
+  const MotionEvent event = motionEvent(Qelt::kActionMove, {{30.0f, 0.0f}});
   RectF rect;
   leaveStroke(board.shared);
   Error::SetError(0);
@@ -219,7 +218,7 @@ TEST(Prediction, RefusesWhatIsMissingAndStartsNowhereFromARecordOutOfBounds) {
       leaveStroke(board.shared);
       board.shared.*field = value;
       EXPECT_FALSE(board.drawable->Draw(&event, &rect));
-      EXPECT_THAT(stamps(board), IsEmpty());
+      EXPECT_THAT(board.takeStamps(), IsEmpty());
     }
   }
   // Far away is walked only so far; a count below 0 and a size of 0 do no harm.
@@ -235,7 +234,7 @@ TEST(Prediction, RefusesWhatIsMissingAndStartsNowhereFromARecordOutOfBounds) {
   leaveStroke(board.shared);
   board.settings.size = 0.0f;
   EXPECT_FALSE(board.drawable->Draw(&event, &rect));
-  EXPECT_THAT(stamps(board), IsEmpty());
+  EXPECT_THAT(board.takeStamps(), IsEmpty());
 }
 
 struct Picture {
@@ -247,10 +246,7 @@ constexpr int kSide = 420;
 
 // One large predicted stamp.
 Picture predictedStamp(float zoom, float opacity) {
-  BoardOptions options;
-  options.width = kSide;
-  options.height = kSide;
-  Board board(options);
+  PredictionBoard board({.width = kSide, .height = kSide});
   board.canvas.setMatrix(viewOf(zoom));
   leaveStroke(board.shared);
   board.shared.mLastStampX = board.shared.mLastX = 205.3f / zoom - 1.2f;
@@ -263,9 +259,9 @@ Picture predictedStamp(float zoom, float opacity) {
   board.drawable->SetOpacity(opacity);
   board.drawable->SetOpacity(kNaN);  // changes nothing
   EXPECT_TRUE(board.move({{205.3f / zoom + 0.1f, 206.7f / zoom}}));
-  const std::vector<Stamp> placed = stamps(board);
+  const std::vector<Stamp> placed = board.takeStamps();
   EXPECT_THAT(placed, SizeIs(1));
-  return {board.layer->readPixels(), placed.at(0)};
+  return {board.pixels(), placed.at(0)};
 }
 
 StampPicture expectedOf(const Picture& picture, float zoom) {

@@ -7,7 +7,6 @@
 
 #include "base/Error.h"
 #include "engine/MotionEvent.h"
-#include "gl/ITask.h"
 #include "preview/Pencil2PreviewDrawableGL.h"
 #include "support/DrawableBoard.h"
 #include "support/LogCapture.h"
@@ -28,20 +27,10 @@ using testing::SizeIs;
 using Panel = DrawableBoard<Pencil2PreviewDrawableGL>;
 
 constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
-constexpr float kInfinity = std::numeric_limits<float>::infinity();
 
-BoardOptions panel(float size, bool curve = true, int tool = Qelt::kToolStylus) {
-  BoardOptions options;
-  options.size = size;
-  options.color = 0xA0202020u;  // alpha 160: colour factor 2
-  options.curve = curve;
-  options.tool = tool;
-  options.source = tool == Qelt::kToolFinger ? Qelt::kSourceTouchScreen : Qelt::kSourceStylus;
-  return options;
-}
-
-std::vector<Stamp> stamps(Panel& board) {
-  return stampsOf(board.takeFloats(), 9);
+// Alpha 160: colour factor 2.
+BoardOptions panel(float size, bool curve = true, int source = Qelt::kSourceStylus) {
+  return {.size = size, .color = 0xA0202020u, .curve = curve, .source = source};
 }
 
 const std::vector<Sample> kSampleStroke = {{10.3f, 40.0f, 0.5f},
@@ -56,7 +45,7 @@ TEST(Preview, TapPlacesOneStampAtTheDownPoint) {
     EXPECT_EQ(board.rect.left, 50.3f);
     EXPECT_EQ(board.rect.bottom, 40.0f);
     EXPECT_TRUE(board.up({52.0f, 40.0f, 0.7f}));
-    const std::vector<Stamp> placed = stamps(board);
+    const std::vector<Stamp> placed = board.takeStamps();
     ASSERT_THAT(placed, SizeIs(1));
     EXPECT_FLOAT_EQ(placed[0].x, 50.3f);
     EXPECT_FLOAT_EQ(placed[0].y, 40.0f);
@@ -77,7 +66,7 @@ TEST(Preview, CurvesCarryTheirSpacingFromSegmentToSegment) {
   board.down({0.0f, 0.0f});
   board.move({{41.0f, 0.0f}});  // as far as 20.5: 25 stamps, 0.3 left over
   board.move({{82.0f, 0.0f}});  // as far as 61.5: the 76th lies at 60.8
-  const std::vector<Stamp> placed = stamps(board);
+  const std::vector<Stamp> placed = board.takeStamps();
   ASSERT_THAT(placed, SizeIs(76));
   for (std::size_t i = 0; i < placed.size(); ++i) {
     EXPECT_THAT(placed[i], StampNear(0.8f * static_cast<float>(i + 1), 0.0f, 0.02f)) << i;
@@ -90,7 +79,7 @@ TEST(Preview, StraightSegmentsAreDividedEvenlyFromTheirOwnStart) {
   board.down({0.0f, 0.0f});
   board.move({{41.0f, 0.0f}});  // trunc(8 / 10 * 41) = 32
   board.move({{41.0f, 5.0f}});  // 4
-  const std::vector<Stamp> placed = stamps(board);
+  const std::vector<Stamp> placed = board.takeStamps();
   ASSERT_THAT(placed, SizeIs(36));
   for (int i = 0; i < 32; ++i) {
     EXPECT_THAT(placed[i], StampNear(41.0f / 32.0f * static_cast<float>(i), 0.0f, 0.02f)) << i;
@@ -105,34 +94,33 @@ TEST(Preview, RampsMayOvershootAndTheNextSegmentBeginsFromTheirTargets) {
   board.down({0.0f, 0.0f, 0.5f});
   // Mean tilt 1 / 3: blend (0.33333 - 0.05) / 1.9 = 0.149123, width 10 + 50 * 0.149123 = 17.456.
   board.move({{41.0f, 0.0f, 0.5f, 1.0f}});
-  const std::vector<Stamp> first = stamps(board);
+  const std::vector<Stamp> first = board.takeStamps();
   ASSERT_THAT(first, SizeIs(25));
   // 16 steps of 0.46602 each, but 25 stamps.
   EXPECT_NEAR(first[0].halfWidth, 5.5f, 1e-4f);
   EXPECT_NEAR(first[24].halfWidth, (10.0f + 24.0f * 0.46602f + 1.0f) / 2.0f, 1e-3f);
   EXPECT_NEAR(first[0].narrowing, 0.149123f, 1e-5f);
   board.move({{82.0f, 0.0f, 0.5f, 1.0f}});
-  EXPECT_NEAR(stamps(board)[0].halfWidth, (17.4561f + 1.0f) / 2.0f, 1e-3f);
+  EXPECT_NEAR(board.takeStamps()[0].halfWidth, (17.4561f + 1.0f) / 2.0f, 1e-3f);
 }
 
 TEST(Preview, NothingFadesInAndNothingIsLeftOfTheStrokeBefore) {
   Panel board(panel(10.0f));
-  const MotionEvent strong = board.recorded({{0.3f, 0.0f, 0.8f}, {41.0f, 0.0f, 0.8f}});
-  const MotionEvent faint = board.recorded({{0.3f, 0.0f, 0.1f}, {41.0f, 0.0f, 0.1f}});
-  RectF rect;
-  board.drawable->RedrawPen(&faint, &rect);
-  for (const Stamp& stamp : stamps(board)) EXPECT_NEAR(stamp.alpha, 0.32f, 1e-5f);  // 0.16 * 2
-  board.drawable->RedrawPen(&strong, &rect);
-  for (const Stamp& stamp : stamps(board)) EXPECT_NEAR(stamp.alpha, 1.28f, 1e-5f);  // 0.64 * 2
-  board.drawable->RedrawPen(&faint, &rect);
-  EXPECT_NEAR(stamps(board)[0].alpha, 0.32f, 1e-5f);
-  // A stroke given up half way does not show in the next one.
-  board.down({0.0f, 0.0f, 0.8f});
-  board.move({{41.0f, 0.0f, 0.8f}});
-  board.down({0.0f, 0.0f, 0.1f});
+  // 0.64 * 2 and, raised to 0.16, 0.16 * 2. The last stroke drawn live, after one that was given up half way.
+  const Sample strong[] = {{0.3f, 0.0f, 0.8f}, {41.0f, 0.0f, 0.8f}};
+  const Sample faint[] = {{0.3f, 0.0f, 0.1f}, {41.0f, 0.0f, 0.1f}};
+  board.redraw(board.recorded({faint[0], faint[1]}));
+  for (const Stamp& stamp : board.takeStamps()) EXPECT_NEAR(stamp.alpha, 0.32f, 1e-5f);
+  board.redraw(board.recorded({strong[0], strong[1]}));
+  for (const Stamp& stamp : board.takeStamps()) EXPECT_NEAR(stamp.alpha, 1.28f, 1e-5f);
+  board.redraw(board.recorded({faint[0], faint[1]}));
+  EXPECT_NEAR(board.takeStamps().at(0).alpha, 0.32f, 1e-5f);
+  board.down(strong[0]);
+  board.move({strong[1]});
+  board.down(faint[0]);
   board.takeBatches();
-  board.move({{41.0f, 0.0f, 0.1f}});
-  for (const Stamp& stamp : stamps(board)) EXPECT_NEAR(stamp.alpha, 0.32f, 1e-5f);
+  board.move({faint[1]});
+  for (const Stamp& stamp : board.takeStamps()) EXPECT_NEAR(stamp.alpha, 0.32f, 1e-5f);
 }
 
 // The live up closes at its own alpha; the end of a replay ramps to it.
@@ -142,64 +130,54 @@ TEST(Preview, TheClosingSegmentRampsInReplaysOnly) {
   board.move({{41.0f, 0.0f, 0.8f}});
   board.takeBatches();
   board.up({61.0f, 0.0f, 0.4f});
-  for (const Stamp& stamp : stamps(board)) EXPECT_NEAR(stamp.alpha, 0.32f, 1e-5f);
-  const MotionEvent event =
-      motionEvent(Qelt::kActionUp, {{0.3f, 0.0f, 0.8f}, {41.0f, 0.0f, 0.8f}, {61.0f, 0.0f, 0.4f}},
-                  Qelt::kToolStylus, Qelt::kSourceStylus);
-  RectF rect;
-  board.drawable->RedrawPen(&event, &rect);
-  const std::vector<Stamp> placed = stamps(board);
+  for (const Stamp& stamp : board.takeStamps()) EXPECT_NEAR(stamp.alpha, 0.32f, 1e-5f);
+  board.redraw(motionEvent(Qelt::kActionUp, {{0.3f, 0.0f, 0.8f}, {41.0f, 0.0f, 0.8f}, {61.0f, 0.0f, 0.4f}}));
+  const std::vector<Stamp> placed = board.takeStamps();
   ASSERT_THAT(placed, SizeIs(48));
   EXPECT_NEAR(placed[32].alpha, 1.28f, 1e-5f);
   EXPECT_NEAR(placed[40].alpha, 0.80f, 1e-4f);  // half way
 }
 
 TEST(Preview, FingersTakeShortMovesEveryOtherTime) {
-  Panel board(panel(10.0f, false, Qelt::kToolFinger));
+  Panel board(
+      {.color = 0xA0202020u, .curve = false, .tool = Qelt::kToolFinger, .source = Qelt::kSourceTouchScreen});
   board.down({0.0f, 0.0f, 1.0f});
   board.move({{20.0f, 0.0f}});  // left out
-  EXPECT_THAT(stamps(board), IsEmpty());
+  EXPECT_THAT(board.takeStamps(), IsEmpty());
   board.move({{30.0f, 0.0f}});
-  const std::vector<Stamp> placed = stamps(board);
+  const std::vector<Stamp> placed = board.takeStamps();
   ASSERT_THAT(placed, SizeIs(24));            // from 0 to 30
   EXPECT_NEAR(placed[0].alpha, 0.5f, 1e-5f);  // pressure 0.5 whatever is reported
   board.move({{31.9f, 0.0f}});                // below size / 5
   board.move({{40.0f, 0.0f}});                // left out
   board.move({{85.0f, 0.0f}});                // 55 away: always taken
-  EXPECT_THAT(stamps(board), SizeIs(44));
+  EXPECT_THAT(board.takeStamps(), SizeIs(44));
 }
 
 TEST(Preview, AStylusOnATouchScreenHasItsPressureReplacedInTheEvent) {
-  BoardOptions options = panel(10.0f);
-  options.source = Qelt::kSourceTouchScreen;
-  Panel board(options);
+  Panel board(panel(10.0f, true, Qelt::kSourceTouchScreen));
   board.down({0.0f, 0.0f, 0.9f});
-  MotionEvent move = motionEvent(Qelt::kActionMove, {{60.0f, 0.0f, 0.9f}, {120.0f, 0.0f, kNaN, 1.3f}},
-                                 options.tool, options.source);
-  EXPECT_TRUE(board.drawable->Draw(&move, &board.rect));
+  const MotionEvent move = motionEvent(Qelt::kActionMove, {{60.0f, 0.0f, 0.9f}, {120.0f, 0.0f, kNaN, 1.3f}},
+                                       Qelt::kToolStylus, Qelt::kSourceTouchScreen);
+  EXPECT_TRUE(board.send(move));
   EXPECT_EQ(move.GetHistoricalPressure(0), 0.5f);
   EXPECT_EQ(move.GetPressure(0), 0.5f);
   EXPECT_EQ(move.GetTilt(0), 1.0f);  // capped at 1, not at the strokes' 0.79
 }
 
+// Kept: a straight replay posts no start point, a straight stroke does.
 TEST(Preview, PostsTheStartPointLiveAndOnCurvedReplays) {
-  Panel curved(panel(10.0f));
-  Panel* board = &curved;
-  const std::vector<std::string> liveDown = {"SetStartPoint", "SetPenData", "SetRect",
-                                             "Batch",         "Render",     "DeleteBatch"};
-  board->down(kSampleStroke[0]);
-  EXPECT_EQ(board->takePosts(), liveDown);
-  const MotionEvent stroke = board->recorded(kSampleStroke);
-  board->drawable->RedrawPen(&stroke, &board->rect);
-  EXPECT_THAT(board->takePosts(), ElementsAre("SetRedrawState", "SetPenData", "SetStartPoint", "SetRect",
-                                              "Batch", "Render", "DeleteBatch"));
-  // Kept: a straight replay posts none, a straight stroke does.
-  board->shared.mCurveEnabled = false;
-  board->drawable->RedrawPen(&stroke, &board->rect);
-  EXPECT_THAT(board->takePosts(),
-              ElementsAre("SetRedrawState", "SetPenData", "SetRect", "Batch", "Render", "DeleteBatch"));
-  board->down(kSampleStroke[0]);
-  EXPECT_EQ(board->takePosts(), liveDown);
+  for (const bool curve : {true, false}) {
+    Panel board(panel(10.0f, curve));
+    board.down(kSampleStroke[0]);
+    EXPECT_THAT(board.takePosts(),
+                ElementsAre("SetStartPoint", "SetPenData", "SetRect", "Batch", "Render", "DeleteBatch"));
+    board.redraw(board.recorded(kSampleStroke));
+    std::vector<std::string> ofReplay = {"SetRedrawState", "SetPenData", "SetStartPoint", "SetRect",
+                                         "Batch",          "Render",     "DeleteBatch"};
+    if (!curve) ofReplay.erase(ofReplay.begin() + 2);
+    EXPECT_EQ(board.takePosts(), ofReplay);
+  }
 }
 
 TEST(Preview, ReplaysDrawWhatTheLiveStrokeDrew) {
@@ -208,16 +186,14 @@ TEST(Preview, ReplaysDrawWhatTheLiveStrokeDrew) {
     board.down(kSampleStroke[0]);
     board.move({kSampleStroke.begin() + 1, kSampleStroke.end()});
     const std::vector<float> live = board.takeFloats();
-    const MotionEvent event = board.recorded(kSampleStroke);
-    RectF rect;
-    EXPECT_TRUE(board.drawable->RedrawPen(&event, &rect));
+    EXPECT_TRUE(board.redraw(board.recorded(kSampleStroke)));
     std::vector<float> replayed = board.takeFloats();
     ASSERT_GE(replayed.size(), live.size());
     replayed.resize(live.size());  // then follows the closing segment
     EXPECT_EQ(replayed, live);
     for (const Sample& sample : kSampleStroke) {
-      EXPECT_LT(rect.left, sample.x);
-      EXPECT_GT(rect.bottom, sample.y);
+      EXPECT_LT(board.rect.left, sample.x);
+      EXPECT_GT(board.rect.bottom, sample.y);
     }
   }
 }
@@ -236,10 +212,9 @@ TEST(Preview, WithoutASizeCurvesLogAndNothingIsPlaced) {
   EXPECT_THAT(lines,
               ElementsAre("Pencil2PreviewDrawableGL::drawLine, mRepeatDistance is a wrong value(0.000000).",
                           "Pencil3GL::EndPen, mRepeatDistance is a wrong value(0.000000)."));
-  EXPECT_THAT(stamps(board), IsEmpty());
+  EXPECT_THAT(board.takeStamps(), IsEmpty());
   // The area of a replay that placed nothing is where it began, not the page's corner as well.
-  const MotionEvent event = board.recorded({{50.0f, 60.0f}, {90.0f, 60.0f}});
-  EXPECT_TRUE(board.drawable->RedrawPen(&event, &board.rect));
+  EXPECT_TRUE(board.redraw(board.recorded({{50.0f, 60.0f}, {90.0f, 60.0f}})));
   EXPECT_EQ(board.rect.left, 49.0f);
   EXPECT_EQ(board.rect.top, 59.0f);
   // Straight segments do not ask for a spacing.
@@ -247,29 +222,29 @@ TEST(Preview, WithoutASizeCurvesLogAndNothingIsPlaced) {
   board.down({0.0f, 0.0f});
   board.move({{40.0f, 0.0f}});
   EXPECT_TRUE(board.up({80.0f, 0.0f}));
-  EXPECT_THAT(stamps(board), IsEmpty());
+  EXPECT_THAT(board.takeStamps(), IsEmpty());
 }
 
 TEST(Preview, RefusesWhatIsMissing) {
   Panel board(panel(10.0f));
   const MotionEvent event = board.recorded(kSampleStroke);
+  const MotionEvent* const none = nullptr;
   RectF rect;
-  for (int i = 0; i < 4; ++i) {
+  const auto refuses = [](auto call) {
     Error::SetError(0);
-    const bool answer = i == 0   ? board.drawable->Draw(nullptr, &rect)
-                        : i == 1 ? board.drawable->Draw(&event, nullptr)
-                        : i == 2 ? board.drawable->RedrawPen(static_cast<const MotionEvent*>(nullptr), &rect)
-                                 : board.drawable->RedrawPen(&event, nullptr);
-    EXPECT_FALSE(answer) << i;
-    EXPECT_EQ(Error::GetError(), Error::kInvalidArgument) << i;
-  }
+    return !call() && Error::GetError() == Error::kInvalidArgument;
+  };
+  EXPECT_TRUE(refuses([&] { return board.drawable->Draw(none, &rect); }));
+  EXPECT_TRUE(refuses([&] { return board.drawable->Draw(&event, nullptr); }));
+  EXPECT_TRUE(refuses([&] { return board.drawable->RedrawPen(none, &rect); }));
+  EXPECT_TRUE(refuses([&] { return board.drawable->RedrawPen(&event, nullptr); }));
   EXPECT_TRUE(board.drawable->RedrawPen(static_cast<const Qelt::List*>(nullptr), nullptr));
   Error::SetError(0);
   EXPECT_FALSE(board.move({{1.0f, 1.0f}}));  // before any down: only the batch is handed over
   EXPECT_THAT(board.takePosts(), ElementsAre("SetRect", "Batch", "Render", "DeleteBatch"));
   board.drawable->SetCanvas(nullptr);
   EXPECT_FALSE(board.down({1.0f, 1.0f}));
-  EXPECT_FALSE(board.drawable->RedrawPen(&event, &rect));
+  EXPECT_FALSE(board.redraw(event));
   EXPECT_THAT(board.takePosts(), IsEmpty());
   EXPECT_EQ(Error::GetError(), 0u);
   Pencil2PreviewDrawableGL orphan(nullptr, nullptr);
@@ -277,47 +252,12 @@ TEST(Preview, RefusesWhatIsMissing) {
   EXPECT_FALSE(orphan.Draw(&event, &rect));
   EXPECT_FALSE(orphan.RedrawPen(&event, &rect));
 
-  const MotionEvent empty =
-      motionEvent(Qelt::kActionUp, {{1.0f, 1.0f}}, Qelt::kToolStylus, Qelt::kSourceStylus);
+  const MotionEvent empty = motionEvent(Qelt::kActionUp, {{1.0f, 1.0f}});  // no history
   board.drawable->SetCanvas(&board.canvas);
-  EXPECT_TRUE(board.drawable->RedrawPen(&empty, &rect));  // Kept: curves answer true all the same
+  EXPECT_TRUE(board.redraw(empty));  // Kept: curves answer true all the same
   EXPECT_EQ(Error::GetError(), Error::kInvalidArgument);
   board.shared.mCurveEnabled = false;
-  EXPECT_FALSE(board.drawable->RedrawPen(&empty, &rect));
-}
-
-TEST(Preview, WholeStampsWhateverComesIn) {
-  const LogCapture log;
-  const float bad[] = {kNaN, kInfinity, -kInfinity, 3e38f, -3e38f, 1e-40f, 0.0f, -1.0f, 5.0f};
-  for (const bool curve : {true, false}) {
-    Panel board(panel(10.0f, curve));
-    unsigned next = 0;
-    const auto value = [&] { return bad[(next = next * 5u + 3u) % 9u]; };
-    for (int round = 0; round < 28; ++round) {
-      next += static_cast<unsigned>(round);
-      board.settings.size = round % 2 == 0 ? 10.0f : value();
-      const float x = round % 3 == 0 ? value() : static_cast<float>(round);
-      const Sample odd{x, 3.0f, value(), value(), value()};
-      board.send(round % 7 == 0   ? Qelt::kActionDown
-                 : round % 7 == 6 ? Qelt::kActionUp
-                                  : Qelt::kActionMove,
-                 {{1.0f, 2.0f, value(), value(), value()}, odd});
-      for (const QeltDesktop::Batch& batch : board.takeBatches()) {
-        EXPECT_EQ(batch.buffers.front().size() % 54, 0u);
-      }
-    }
-  }
-}
-
-TEST(Preview, ARefusingQueueLosesNothingButTheBatch) {
-  Panel board(panel(10.0f));
-  board.queue.accept = [](const Qelt::ITask&) { return false; };
-  board.down({0.0f, 0.0f});
-  board.move({{40.0f, 0.0f}});
-  EXPECT_THAT(board.takeBatches(), IsEmpty());
-  board.queue.accept = nullptr;
-  board.move({{80.0f, 0.0f}});
-  EXPECT_THAT(board.takeBatches(), SizeIs(1));
+  EXPECT_FALSE(board.redraw(empty));
 }
 
 // Kept: the grain's x goes by the height of its tile on screen, its y by the width.
@@ -326,13 +266,13 @@ TEST(PreviewPicture, GrainSwapsWidthAndHeight) {
   options.width = 420;
   options.height = 210;
   Panel board(options);
-  const float wide[9] = {2.0f, 0.0f, 0.0f, 0.0f, 1.0f, 0.0f, 0.0f, 0.0f, 1.0f};
-  board.canvas.setMatrix(Qelt::Matrix3<float>(wide));
-  board.down({103.3f, 104.7f, 0.5f, 0.0f, 0.4f});
-  board.up({103.3f, 104.7f, 0.5f, 0.0f, 0.4f});
-  const std::vector<Stamp> placed = stamps(board);
+  Qelt::Matrix3<float> wide;
+  wide.setScale(2.0f, 1.0f);
+  board.canvas.setMatrix(wide);
+  board.stroke({{103.3f, 104.7f, 0.5f, 0.0f, 0.4f}});
+  const std::vector<Stamp> placed = board.takeStamps();
   ASSERT_THAT(placed, SizeIs(1));
-  const std::vector<std::uint8_t> pixels = board.layer->readPixels();
+  const std::vector<std::uint8_t> pixels = board.pixels();
 
   StampPicture expected{.stamp = placed[0], .zoomX = 2.0f, .startX = 206.6f, .startY = 104.7f};
   expected.grainX = 150.0f;  // the height of a 150-unit tile in this view

@@ -12,7 +12,7 @@
 #include "render/Pencil2StrokeDrawableRTV1.h"
 #include "render/Pencil2StrokeDrawableRTV2.h"
 #include "render/Pencil2StrokeDrawableRTV3.h"
-#include "stroke/DrawingBoard.h"
+#include "support/DrawableBoard.h"
 #include "support/StampPicture.h"
 #include "support/Stamps.h"
 

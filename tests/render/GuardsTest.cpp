@@ -10,7 +10,7 @@
 #include "render/Fakes.h"
 #include "render/PenGLRenderMsg.h"
 #include "render/UnclaimedBatch.h"
-#include "stroke/DrawingBoard.h"
+#include "support/DrawableBoard.h"
 #include "stroke/StrokeGuards.h"
 #include "support/Allocations.h"
 

@@ -1,17 +1,12 @@
 #include <gmock/gmock.h>
 
 #include <cmath>
-#include <cstddef>
 #include <limits>
-#include <new>
 #include <string>
 #include <vector>
 
-#include "base/Error.h"
 #include "engine/MotionEvent.h"
-#include "gl/ITask.h"
-#include "stroke/DrawingBoard.h"
-#include "support/Allocations.h"
+#include "support/DrawableBoard.h"
 #include "support/LogCapture.h"
 #include "support/Stamps.h"
 #include "support/Versions.h"
@@ -19,38 +14,35 @@
 namespace QeltTests {
 namespace {
 
-using Qelt::Error;
 using Qelt::MotionEvent;
 using testing::ElementsAre;
+using testing::HasSubstr;
 using testing::IsEmpty;
+using testing::Not;
 using testing::SizeIs;
 
 constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
 constexpr float kInfinity = std::numeric_limits<float>::infinity();
-
-BoardOptions paper(int version, bool curve = true) {
-  BoardOptions options;
-  options.version = version;
-  options.curve = curve;
-  return options;
-}
 
 // A stroke with a corner, a short move and changing pressure.
 const std::vector<Sample> kStroke = {{10.0f, 10.0f, 0.3f},        {14.0f, 11.0f, 0.5f, 0.3f, 0.2f},
                                      {22.0f, 11.5f, 0.9f, 0.77f}, {23.0f, 11.5f, 0.9f},
                                      {24.0f, 19.0f, 0.4f},        {17.0f, 23.0f, 0.6f}};
 
-std::vector<std::vector<float>> floatsOf(const std::vector<QeltDesktop::Batch>& batches) {
-  std::vector<std::vector<float>> floats;
-  for (const auto& batch : batches) floats.push_back(batch.buffers.front());
-  return floats;
+std::vector<float> drawn(DrawingBoard& board, const std::vector<Sample>& samples) {
+  board.takeBatches();
+  board.stroke(samples);
+  return board.takeFloats();
 }
 
-class LiveStroke : public testing::TestWithParam<int> {};
+class LiveStroke : public testing::TestWithParam<int> {
+ protected:
+  const int version = GetParam();
+};
 
 // Every action in every state: up, down, moving.
 TEST_P(LiveStroke, FollowsTheTableOfStates) {
-  DrawingBoard board(paper(GetParam()));
+  DrawingBoard board({.version = version});
   const Sample start{10.0f, 10.0f}, further{30.0f, 10.0f};
   const auto draws = [&board] { return !board.takeStamps().empty(); };
 
@@ -89,32 +81,30 @@ TEST_P(LiveStroke, FollowsTheTableOfStates) {
 }
 
 TEST_P(LiveStroke, PostsInOrderWhateverTheActionDid) {
+  const auto rectAndBatch = ElementsAre("SetRect", "Batch", "Render", "DeleteBatch");
   for (const bool curve : {true, false}) {
     SCOPED_TRACE(curve ? "curve" : "straight");
-    DrawingBoard board(paper(GetParam(), curve));
+    DrawingBoard board({.version = version, .curve = curve});
     // Ignored: the rectangle and the (empty) batch are handed over all the same.
     board.move({{20.0f, 10.0f}});
-    EXPECT_THAT(board.takePosts(), ElementsAre("SetRect", "Batch", "Render", "DeleteBatch"));
-    EXPECT_THAT(floatsOf(board.takeBatches()), ElementsAre(IsEmpty()));
+    EXPECT_THAT(board.takePosts(), rectAndBatch);
+    EXPECT_THAT(board.takeBuffers(), ElementsAre(IsEmpty()));
     board.send(Qelt::kActionCancel, {{20.0f, 10.0f}});
-    EXPECT_THAT(board.takePosts(), ElementsAre("SetRect", "Batch", "Render", "DeleteBatch"));
+    EXPECT_THAT(board.takePosts(), rectAndBatch);
 
     board.down({10.0f, 10.0f});
-    if (curve) {
-      EXPECT_THAT(board.takePosts(),
-                  ElementsAre("SetStartPoint", "SetPenData", "SetRect", "Batch", "Render", "DeleteBatch"));
-    } else {
-      EXPECT_THAT(board.takePosts(), ElementsAre("SetPenData", "SetRect", "Batch", "Render", "DeleteBatch"));
-    }
+    std::vector<std::string> ofDown = {"SetPenData", "SetRect", "Batch", "Render", "DeleteBatch"};
+    if (curve) ofDown.insert(ofDown.begin(), "SetStartPoint");
+    EXPECT_EQ(board.takePosts(), ofDown);
     board.move({{30.0f, 10.0f}, {50.0f, 10.0f}});
-    EXPECT_THAT(board.takePosts(), ElementsAre("SetRect", "Batch", "Render", "DeleteBatch"));
+    EXPECT_THAT(board.takePosts(), rectAndBatch);
     board.up({60.0f, 10.0f});
-    EXPECT_THAT(board.takePosts(), ElementsAre("SetRect", "Batch", "Render", "DeleteBatch"));
+    EXPECT_THAT(board.takePosts(), rectAndBatch);
   }
 }
 
 TEST_P(LiveStroke, AddsUpASlowDrag) {
-  DrawingBoard board(paper(GetParam(), false));
+  DrawingBoard board({.version = version, .curve = false});
   board.down({10.0f, 10.0f});
   // Size 10: moves below 2 are dropped, and the last point stays.
   EXPECT_TRUE(board.move({{11.0f, 10.0f}, {11.5f, 10.0f}, {11.9f, 10.0f}}));
@@ -122,12 +112,12 @@ TEST_P(LiveStroke, AddsUpASlowDrag) {
   EXPECT_TRUE(board.move({{12.5f, 10.0f}}));
   const std::vector<Stamp> stamps = board.takeStamps();
   ASSERT_FALSE(stamps.empty());
-  EXPECT_THAT(stamps.front(), StampNear(GetParam() == 8 ? 10.4f : 10.0f, 10.0f, 1e-3f));
+  EXPECT_THAT(stamps.front(), StampNear(version == 8 ? 10.4f : 10.0f, 10.0f, 1e-3f));
 }
 
 // Nothing but short moves: the stroke ends as a tap where it began, with the tool's pressure and size.
 TEST_P(LiveStroke, EndsAsATapWhenEveryMoveWasDropped) {
-  DrawingBoard board(paper(GetParam()));
+  DrawingBoard board({.version = version});
   board.down({10.0f, 10.0f, 0.9f});
   board.move({{11.0f, 10.0f, 0.9f}});
   EXPECT_TRUE(board.up({11.5f, 10.0f, 0.5f}));
@@ -135,14 +125,13 @@ TEST_P(LiveStroke, EndsAsATapWhenEveryMoveWasDropped) {
   ASSERT_THAT(stamps, ElementsAre(StampNear(10.0f, 10.0f, 0.0f)));
   EXPECT_EQ(stamps[0].tile, 0);
   // 0.25, times 255 / 80 from version 2 on; in version 8 times 15 / 10 and over 6 as well.
-  const float alpha = GetParam() == 1 ? 0.25f : GetParam() == 8 ? 0.19921875f : 0.796875f;
-  EXPECT_FLOAT_EQ(stamps[0].alpha, alpha);
+  EXPECT_FLOAT_EQ(stamps[0].alpha, version == 1 ? 0.25f : version == 8 ? 0.19921875f : 0.796875f);
   // The joint, the up point, 5 around them: the stamp's own reach (5.5 at most) goes past that upwards.
   EXPECT_EQ(board.rect.right, 16.5f);
 }
 
 TEST_P(LiveStroke, GoesOnStraightWhenSmoothingIsSwitchedOffMidStroke) {
-  DrawingBoard board(paper(GetParam()));
+  DrawingBoard board({.version = version});
   board.down({100.0f, 50.0f});
   board.move({{108.4f, 50.0f}});
   board.takeStamps();
@@ -151,95 +140,56 @@ TEST_P(LiveStroke, GoesOnStraightWhenSmoothingIsSwitchedOffMidStroke) {
   board.move({{112.5f, 50.0f}});
   std::vector<Stamp> stamps = board.takeStamps();
   ASSERT_FALSE(stamps.empty());
-  EXPECT_THAT(stamps.front(), StampNear(GetParam() == 8 ? 108.6f : 108.4f, 50.0f, 1e-3f));
+  EXPECT_THAT(stamps.front(), StampNear(version == 8 ? 108.6f : 108.4f, 50.0f, 1e-3f));
   board.up({116.8f, 50.0f});
   stamps = board.takeStamps();
   ASSERT_FALSE(stamps.empty());
-  EXPECT_THAT(stamps.front(), StampNear(GetParam() == 8 ? 112.6f : 112.5f, 50.0f, 1e-3f));
+  EXPECT_THAT(stamps.front(), StampNear(version == 8 ? 112.6f : 112.5f, 50.0f, 1e-3f));
 }
 
+// A stylus on a touch screen reports no pressure: it is replaced in every sample. A finger's is substituted
+// for drawing alone.
 TEST_P(LiveStroke, WritesItsCorrectionsBackIntoTheEvent) {
-  const int version = GetParam();
   const float cap = version == 5 ? 1.0f : 0.79f;
   const float substitute = version == 8 ? 0.6f : 0.5f;
-  DrawingBoard board(paper(version));
-  board.down({0.0f, 0.0f});
-  const std::vector<Sample> tilted = {
-      {10.0f, 0.0f, 0.9f, 1.2f}, {20.0f, 0.0f, 0.9f, 0.6f}, {30.0f, 0.0f, 0.9f, 1.3f}};
-
-  MotionEvent stylus = motionEvent(Qelt::kActionMove, tilted, Qelt::kToolStylus, Qelt::kSourceStylus);
-  board.send(stylus);
-  EXPECT_EQ(stylus.GetHistoricalTilt(0), cap);
-  EXPECT_EQ(stylus.GetHistoricalTilt(1), 0.6f);
-  EXPECT_EQ(stylus.GetTilt(0), cap);
-  EXPECT_EQ(stylus.GetPressure(0), 0.9f);
-
-  // A stylus on a touch screen reports no pressure: in every sample.
-  MotionEvent touch = motionEvent(Qelt::kActionMove, tilted, Qelt::kToolStylus, Qelt::kSourceTouchScreen);
-  board.send(touch);
-  EXPECT_EQ(touch.GetHistoricalPressure(0), substitute);
-  EXPECT_EQ(touch.GetHistoricalPressure(1), substitute);
-  EXPECT_EQ(touch.GetPressure(0), substitute);
-  MotionEvent up =
-      motionEvent(Qelt::kActionUp, {{40.0f, 0.0f, 0.9f, 1.2f}}, Qelt::kToolStylus, Qelt::kSourceTouchScreen);
-  board.send(up);
-  EXPECT_EQ(up.GetPressure(0), substitute);
-  EXPECT_EQ(up.GetTilt(0), cap);
-  MotionEvent down =
-      motionEvent(Qelt::kActionDown, {{40.0f, 0.0f, 0.9f}}, Qelt::kToolStylus, Qelt::kSourceTouchScreen);
-  board.send(down);
-  EXPECT_EQ(down.GetPressure(0), substitute);
-
-  // A finger's pressure is substituted for drawing alone.
-  MotionEvent finger = motionEvent(Qelt::kActionMove, tilted, Qelt::kToolFinger, Qelt::kSourceTouchScreen);
-  board.send(finger);
-  EXPECT_EQ(finger.GetHistoricalPressure(0), 0.9f);
-  EXPECT_EQ(finger.GetPressure(0), 0.9f);
-}
-
-TEST_P(LiveStroke, RefusesNullArgumentsAndStaysSilentWithoutACanvas) {
-  DrawingBoard board(paper(GetParam()));
-  MotionEvent event = motionEvent(Qelt::kActionDown, {{1.0f, 1.0f}}, Qelt::kToolStylus, Qelt::kSourceStylus);
-  Qelt::RectF rect;
-  Error::SetError(0);
-  EXPECT_FALSE(board.drawable().Draw(nullptr, &rect));
-  EXPECT_EQ(Error::GetError(), 7u);
-  Error::SetError(0);
-  EXPECT_FALSE(board.drawable().Draw(&event, nullptr));
-  EXPECT_EQ(Error::GetError(), 7u);
-
-  Error::SetError(0);
-  board.drawable().SetCanvas(nullptr);
-  EXPECT_FALSE(board.drawable().Draw(&event, &rect));
-  EXPECT_EQ(Error::GetError(), 0u);
-  EXPECT_THAT(board.takePosts(), IsEmpty());
+  struct Case {
+    int tool, source;
+    float pressure;
+  };
+  for (const auto& [tool, source, pressure] : {Case{Qelt::kToolStylus, Qelt::kSourceStylus, 0.9f},
+                                               Case{Qelt::kToolStylus, Qelt::kSourceTouchScreen, substitute},
+                                               Case{Qelt::kToolFinger, Qelt::kSourceTouchScreen, 0.9f}}) {
+    SCOPED_TRACE("tool " + std::to_string(tool) + ", source " + std::to_string(source));
+    DrawingBoard board({.version = version});
+    const Sample end{40.0f, 0.0f, 0.9f, 1.2f};
+    for (const int action : {Qelt::kActionDown, Qelt::kActionMove, Qelt::kActionUp}) {
+      std::vector<Sample> samples = {end};
+      if (action == Qelt::kActionMove) samples = {{10.0f, 0.0f, 0.9f, 1.3f}, {20.0f, 0.0f, 0.9f, 0.6f}, end};
+      const MotionEvent event = motionEvent(action, samples, tool, source);
+      board.send(event);
+      EXPECT_EQ(event.GetPressure(0), pressure) << "action " << action;
+      EXPECT_EQ(event.GetTilt(0), cap) << "action " << action;
+      if (action != Qelt::kActionMove) continue;
+      EXPECT_EQ(event.GetHistoricalPressure(0), pressure);
+      EXPECT_EQ(event.GetHistoricalPressure(1), pressure);
+      EXPECT_EQ(event.GetHistoricalTilt(0), cap);
+      EXPECT_EQ(event.GetHistoricalTilt(1), 0.6f);
+    }
+  }
 }
 
 // --- Bad input ---
 
 TEST_P(LiveStroke, DropsPointsThatAreNotFiniteAsIfTheyHadNotBeen) {
-  std::vector<Stamp> clean;
-  {
-    DrawingBoard board(paper(GetParam()));
-    board.down(kStroke[0]);
-    board.move({kStroke[1], kStroke[2]});
-    board.move({kStroke[4]});
-    board.up(kStroke[5]);
-    clean = board.takeStamps();
-  }
-  DrawingBoard board(paper(GetParam()));
+  DrawingBoard board({.version = version});
   EXPECT_FALSE(board.down({kNaN, 10.0f}));
   EXPECT_FALSE(board.move({kStroke[1]}));  // nothing has begun
-  board.takeStamps();
-  board.down(kStroke[0]);
-  board.move({{kNaN, 3.0f}, kStroke[1], {3.0f, kInfinity}, kStroke[2]});
-  board.move({kStroke[4], {-kInfinity, kNaN}});
-  board.up(kStroke[5]);
-  const std::vector<Stamp> stamps = board.takeStamps();
-  ASSERT_EQ(stamps.size(), clean.size());
-  for (std::size_t i = 0; i < stamps.size(); ++i) {
-    EXPECT_EQ(testing::PrintToString(stamps[i]), testing::PrintToString(clean[i])) << i;
-  }
+  std::vector<Sample> broken = kStroke;
+  broken.insert(broken.begin() + 1, {kNaN, 3.0f});
+  broken.insert(broken.begin() + 3, {3.0f, kInfinity});
+  broken.insert(broken.end() - 1, {-kInfinity, kNaN});
+  const std::vector<float> clean = drawn(board, kStroke);
+  EXPECT_EQ(drawn(board, broken), clean);
 
   // An end that is not finite leaves the closing segment out.
   board.down(kStroke[0]);
@@ -251,189 +201,80 @@ TEST_P(LiveStroke, DropsPointsThatAreNotFiniteAsIfTheyHadNotBeen) {
 }
 
 TEST_P(LiveStroke, ReplacesPressureAndAnglesThatAreNoNumbers) {
-  DrawingBoard board(paper(GetParam()));
-  const float substitute = GetParam() == 8 ? 0.6f : 0.5f;
-  board.stroke({{10.0f, 10.0f, kNaN, kNaN, kNaN},
-                {30.0f, 10.0f, kNaN, kInfinity, -kInfinity},
-                {50.0f, 10.0f, kNaN, -kInfinity, kInfinity}});
-  const std::vector<Stamp> odd = board.takeStamps();
-  board.stroke({{10.0f, 10.0f, substitute}, {30.0f, 10.0f, substitute}, {50.0f, 10.0f, substitute}});
-  const std::vector<Stamp> plain = board.takeStamps();
-  ASSERT_EQ(odd.size(), plain.size());
-  for (std::size_t i = 0; i < odd.size(); ++i)
-    EXPECT_EQ(testing::PrintToString(odd[i]), testing::PrintToString(plain[i]));
+  DrawingBoard board({.version = version});
+  const float substitute = version == 8 ? 0.6f : 0.5f;
+  const std::vector<float> plain =
+      drawn(board, {{10.0f, 10.0f, substitute}, {30.0f, 10.0f, substitute}, {50.0f, 10.0f, substitute}});
+  EXPECT_EQ(drawn(board, {{10.0f, 10.0f, kNaN, kNaN, kNaN},
+                          {30.0f, 10.0f, kNaN, kInfinity, -kInfinity},
+                          {50.0f, 10.0f, kNaN, -kInfinity, kInfinity}}),
+            plain);
 }
 
-TEST_P(LiveStroke, PlacesNothingAtASizeThatIsNone) {
+TEST_P(LiveStroke, PlacesNothingAtASizeThatIsNoneAndFiniteStampsOnceItIsSensible) {
   for (const float size : {0.0f, -3.0f, kNaN, kInfinity, -kInfinity}) {
     SCOPED_TRACE(size);
     for (const bool curve : {true, false}) {
-      BoardOptions options = paper(GetParam(), curve);
-      options.size = size;
-      DrawingBoard board(options);
+      DrawingBoard board({.version = version, .size = size, .curve = curve});
       board.stroke(kStroke);
-      board.down(kStroke[0]);
-      board.up(kStroke[0]);
+      board.stroke({kStroke[0], kStroke[0]});
       board.redraw(board.recorded(kStroke));
       board.redraw(*board.stored(kStroke));
       EXPECT_THAT(board.takeStamps(), IsEmpty());
     }
   }
-}
-
-TEST_P(LiveStroke, PlacesFiniteStampsOnceTheSizeIsSensible) {
-  DrawingBoard board(paper(GetParam()));
-  board.settings.size = kNaN;
+  DrawingBoard board({.version = version, .size = kNaN});
   board.down(kStroke[0]);
   board.settings.size = 6.0f;
   board.move({kStroke.begin() + 1, kStroke.end()});
-  const std::vector<Stamp> placed = board.takeStamps();
-  ASSERT_THAT(placed, Not(IsEmpty()));
-  for (const Stamp& stamp : placed) EXPECT_TRUE(std::isfinite(stamp.halfWidth) && std::isfinite(stamp.alpha));
+  const std::vector<float> placed = board.takeFloats();
+  EXPECT_THAT(placed, Not(IsEmpty()));
+  for (const float value : placed) ASSERT_TRUE(std::isfinite(value));
 }
 
 TEST_P(LiveStroke, EndsOnHugeCoordinates) {
   const LogCapture log;
-  DrawingBoard board(paper(GetParam()));
-  board.queue.onAccepted = nullptr;
+  DrawingBoard board({.version = version});
+  const std::vector<float> before = drawn(board, kStroke);
   for (const float far : {1e6f, std::numeric_limits<float>::max()}) {
-    board.down({0.0f, 0.0f});
-    board.move({{far, far}});
-    board.move({{-far, far}});
-    board.up({0.0f, -far});
-    for (const auto& floats : floatsOf(board.takeBatches())) EXPECT_LE(floats.size(), 262144u * 66u) << far;
+    board.stroke({{0.0f, 0.0f}, {far, far}, {-far, far}, {0.0f, -far}}, 1);
+    for (const auto& floats : board.takeBuffers()) EXPECT_LE(floats.size(), 262144u * 66u) << far;
   }
-  // And draws as ever afterwards.
-  board.stroke(kStroke);
-  const std::vector<Stamp> stamps = board.takeStamps();
-  DrawingBoard fresh(paper(GetParam()));
-  fresh.stroke(kStroke);
-  EXPECT_EQ(stamps.size(), fresh.takeStamps().size());
-}
-
-// --- A queue that refuses, memory that runs out ---
-
-// Draws the stroke with the accepting rule given, then takes the rule away and draws a second stroke.
-template <typename Accept>
-std::vector<std::vector<float>> secondStrokeAfter(int version, Accept accept) {
-  DrawingBoard board(paper(version));
-  board.queue.accept = accept;
-  board.stroke(kStroke, 2);
-  board.takeBatches();
-  board.queue.accept = nullptr;
-  board.stroke(kStroke, 2);
-  return floatsOf(board.takeBatches());
-}
-
-TEST_P(LiveStroke, SurvivesEachPostRefusedAloneAndLeaksNothing) {
-  const auto undisturbed = secondStrokeAfter(GetParam(), [](const Qelt::ITask&) { return true; });
-  const long before = liveAllocations();
-  {
-    // Down, three moves and up post 22 tasks.
-    for (int refused = 0; refused < 24; ++refused) {
-      int number = 0;
-      EXPECT_EQ(secondStrokeAfter(GetParam(), [&](const Qelt::ITask&) { return number++ != refused; }),
-                undisturbed)
-          << "post " << refused;
-    }
-    // From some post on all of them.
-    for (int last = 0; last < 24; ++last) {
-      int number = 0;
-      EXPECT_EQ(secondStrokeAfter(GetParam(), [&](const Qelt::ITask&) { return number++ < last; }),
-                undisturbed)
-          << "from post " << last;
-    }
-    // Every task of one kind.
-    for (const char* kind : {"SetStartPoint", "SetPenData", "SetRect", "Batch", "Render", "DeleteBatch"}) {
-      EXPECT_EQ(
-          secondStrokeAfter(GetParam(), [&](const Qelt::ITask& task) { return taskName(task) != kind; }),
-          undisturbed)
-          << kind;
-    }
-  }
-  EXPECT_EQ(liveAllocations(), before);
-}
-
-TEST_P(LiveStroke, FreesEverythingWhenItDiesWhileTheQueueRefuses) {
-  { DrawingBoard warmUp(paper(GetParam())); }
-  const long before = liveAllocations();
-  for (const char* kind : {"Batch", "Render", "DeleteBatch"}) {
-    DrawingBoard board(paper(GetParam()));
-    board.queue.accept = [kind](const Qelt::ITask& task) { return taskName(task) != kind; };
-    board.stroke(kStroke);
-    board.queue.accept = [](const Qelt::ITask&) { return false; };
-    board.deleteDrawable();
-  }
-  EXPECT_EQ(liveAllocations(), before);
-}
-
-// Every allocation of the stroke fails once. What a call throws, if anything, is std::bad_alloc; nothing is
-// lost, and the next stroke is drawn as ever.
-TEST_P(LiveStroke, SurvivesEachAllocationFailingAlone) {
-  if (!countsAllocations()) GTEST_SKIP() << "allocations are the sanitizer's";
-  std::vector<std::vector<float>> undisturbed;
-  {
-    DrawingBoard board(paper(GetParam()));
-    board.stroke(kStroke, 2);
-    undisturbed = floatsOf(board.takeBatches());
-  }
-  const long before = liveAllocations();
-  bool failed = true;
-  long number = 0;
-  for (; failed && number < 500; ++number) {
-    DrawingBoard board(paper(GetParam()));
-    board.queue.onAccepted = nullptr;  // the test's own allocations stay out of it
-    std::vector<MotionEvent> events;
-    events.push_back(motionEvent(Qelt::kActionDown, {kStroke[0]}, Qelt::kToolStylus, Qelt::kSourceStylus));
-    events.push_back(motionEvent(Qelt::kActionMove, {kStroke.begin() + 1, kStroke.end()}, Qelt::kToolStylus,
-                                 Qelt::kSourceStylus));
-    events.push_back(motionEvent(Qelt::kActionUp, {kStroke.back()}, Qelt::kToolStylus, Qelt::kSourceStylus));
-    {
-      const FailingAllocation failing(number);
-      for (MotionEvent& event : events) {
-        try {
-          board.send(event);
-        } catch (const std::bad_alloc&) {
-          // Only a batch that cannot grow throws.
-        }
-      }
-      failed = failing.hasFailed();
-    }
-    board.takeBatches();
-    board.stroke(kStroke, 2);
-    ASSERT_EQ(floatsOf(board.takeBatches()), undisturbed) << "allocation " << number;
-  }
-  EXPECT_FALSE(failed);
-  EXPECT_GT(number, 10);
-  EXPECT_EQ(liveAllocations(), before);
+  EXPECT_EQ(drawn(board, kStroke), before);
 }
 
 INSTANTIATE_TEST_SUITE_P(Versions, LiveStroke, testing::ValuesIn(allVersions()),
-                         [](const auto& version) { return "Version" + std::to_string(version.param); });
+                         [](const auto& test) { return "Version" + std::to_string(test.param); });
 
-// --- What version 8 alone has ---
-
-// At zoom 4 a device pixel is a quarter of a stroke unit: the margin of half a pixel is 0.125.
-TEST(ViewScaleTest, MarginsOfVersion8AreDevicePixels) {
-  DrawingBoard board(paper(8));
-  board.canvas.setMatrix(viewOf(4.0f));
-  board.down({10.0f, 10.0f});
-  board.up({10.0f, 10.0f});
-  EXPECT_FLOAT_EQ(board.takeStamps().at(0).halfWidth, 5.125f);
-  // The next event sees the view change at once.
-  board.canvas.setMatrix(viewOf(0.5f));
-  board.down({10.0f, 10.0f});
-  board.up({10.0f, 10.0f});
-  EXPECT_FLOAT_EQ(board.takeStamps().at(0).halfWidth, 6.0f);
+TEST(EndlessSegmentTest, IsCutShortAndSaidOnceAStroke) {
+  LogCapture log;
+  DrawingBoard board({.curve = false});
+  board.down({0.0f, 0.0f});
+  board.takeBatches();
+  log.take();
+  board.move({{1e30f, 0.0f}});
+  EXPECT_THAT(board.takeBuffers(), ElementsAre(BatchOf(262144, 11)));
+  board.move({{20.0f, 20.0f}});
+  board.takeBatches();
+  const std::vector<LogLine> lines = log.take();
+  ASSERT_THAT(lines, SizeIs(1)) << "two segments were cut";
+  EXPECT_EQ(lines[0].priority, 6);
+  EXPECT_EQ(lines[0].tag, "qel_log");
+  EXPECT_THAT(lines[0].text, HasSubstr("cut short"));
+  // The next segment starts as if the walk had ended on its spacing: 40 units, a stamp every 0.4.
+  board.move({{60.0f, 20.0f}});
+  EXPECT_NEAR(static_cast<double>(board.takeStamps().size()), 100.0, 1.0);
 }
 
-TEST(ViewScaleTest, AViewThatCannotBeInvertedCountsAsUnscaled) {
-  DrawingBoard board(paper(8));
-  for (const float zoom : {0.0f, kNaN, kInfinity}) {
+// Margins of version 8 are device pixels: at zoom 4 half a pixel is 0.125 units. A view that cannot be
+// inverted counts as unscaled. Each event sees a change of view at once.
+TEST(ViewScaleTest, MarginsOfVersion8AreDevicePixels) {
+  DrawingBoard board;
+  const float cases[][2] = {{4.0f, 5.125f}, {0.5f, 6.0f}, {0.0f, 5.5f}, {kNaN, 5.5f}, {kInfinity, 5.5f}};
+  for (const auto& [zoom, half] : cases) {
     board.canvas.setMatrix(viewOf(zoom));
-    board.down({10.0f, 10.0f});
-    board.up({10.0f, 10.0f});
-    EXPECT_FLOAT_EQ(board.takeStamps().at(0).halfWidth, 5.5f) << zoom;
+    board.stroke({{10.0f, 10.0f}, {10.0f, 10.0f}});
+    EXPECT_FLOAT_EQ(board.takeStamps().at(0).halfWidth, half) << zoom;
   }
 }
 

@@ -8,7 +8,7 @@
 #include <vector>
 
 #include "engine/MotionEvent.h"
-#include "stroke/DrawingBoard.h"
+#include "support/DrawableBoard.h"
 #include "support/Stamps.h"
 #include "support/Versions.h"
 
@@ -47,20 +47,17 @@ std::vector<Sample> strokeByLot(unsigned seed) {
 }
 
 // Bit for bit, float by float.
-std::vector<float> drawnLive(DrawingBoard& board, const std::vector<Sample>& samples, int batch) {
+std::vector<float> drawnLive(DrawingBoard& board, const std::vector<Sample>& samples, int batch = 4) {
   board.takeBatches();
   board.stroke(samples, batch);
-  std::vector<float> floats;
-  for (const auto& some : board.takeBatches())
-    floats.insert(floats.end(), some.buffers.front().begin(), some.buffers.front().end());
-  return floats;
+  return board.takeFloats();
 }
 
 template <typename Input>
 std::vector<float> redrawn(DrawingBoard& board, const Input& input) {
   board.takeBatches();
   board.redraw(input);
-  return board.takeBatches().back().buffers.front();
+  return board.takeFloats();
 }
 
 // How many stamps the two have in common from the first on.
@@ -90,15 +87,8 @@ constexpr unsigned kStrokes = 12;
 class StrokesByLot : public testing::TestWithParam<std::tuple<int, bool, Hand>> {
  protected:
   BoardOptions options() const {
-    BoardOptions made;
-    bool curve;
-    Hand hand;
-    std::tie(made.version, curve, hand) = GetParam();
-    made.curve = curve;
-    made.tool = hand.tool;
-    made.source = hand.source;
-    made.size = 6.0f;
-    return made;
+    const auto& [version, curve, hand] = GetParam();
+    return {.version = version, .size = 6.0f, .curve = curve, .tool = hand.tool, .source = hand.source};
   }
 };
 
@@ -129,7 +119,7 @@ TEST_P(StrokesByLot, AreTheSameLiveRecordedAndStored) {
     SCOPED_TRACE("seed " + std::to_string(seed));
     const std::vector<Sample> samples = strokeByLot(seed);
     DrawingBoard board(options());
-    const std::vector<float> live = drawnLive(board, samples, 4);
+    const std::vector<float> live = drawnLive(board, samples);
     const std::vector<float> recorded = redrawn(board, board.recorded(samples));
     const std::vector<float> stored = redrawn(board, *board.stored(samples));
     EXPECT_EQ(recorded, stored);
@@ -149,49 +139,37 @@ TEST_P(StrokesByLot, AreTheSameLiveRecordedAndStored) {
   }
 }
 
-TEST_P(StrokesByLot, AreRedrawnTheSameWhateverWasDrawnBefore) {
+TEST_P(StrokesByLot, AreDrawnAndRedrawnTheSameWhateverWasDrawnBefore) {
   for (unsigned seed = 1; seed <= kStrokes; ++seed) {
     SCOPED_TRACE("seed " + std::to_string(seed));
     const std::vector<Sample> samples = strokeByLot(seed);
-    std::vector<float> recorded, stored;
-    {
+    const auto onFresh = [&](auto draw) {
       DrawingBoard fresh(options());
-      recorded = redrawn(fresh, fresh.recorded(samples));
-    }
-    {
-      DrawingBoard fresh(options());
-      stored = redrawn(fresh, *fresh.stored(samples));
-    }
+      return draw(fresh);
+    };
+    const auto live = [&](DrawingBoard& board) { return drawnLive(board, samples); };
+    const auto recorded = [&](DrawingBoard& board) { return redrawn(board, board.recorded(samples)); };
+    const auto stored = [&](DrawingBoard& board) { return redrawn(board, *board.stored(samples)); };
+    const std::vector<float> ofLive = onFresh(live), ofRecorded = onFresh(recorded),
+                             ofStored = onFresh(stored);
+
     DrawingBoard used(options());
     const std::vector<Sample> other = strokeByLot(seed + 100);
     used.stroke(other);
-    EXPECT_EQ(redrawn(used, used.recorded(samples)), recorded);
+    EXPECT_EQ(recorded(used), ofRecorded);
     // In the middle of a live stroke.
     used.down(other.front());
     used.move({other.begin() + 1, other.end()});
-    EXPECT_EQ(redrawn(used, *used.stored(samples)), stored);
+    EXPECT_EQ(stored(used), ofStored);
     used.settings.size = 17.0f;
     used.shared.mCurveEnabled = !used.shared.mCurveEnabled;
     used.redraw(used.recorded(other));
     used.settings.size = 6.0f;
     used.shared.mCurveEnabled = !used.shared.mCurveEnabled;
-    EXPECT_EQ(redrawn(used, used.recorded(samples)), recorded);
+    EXPECT_EQ(recorded(used), ofRecorded);
     used.redraw(*used.stored(other));
-    EXPECT_EQ(redrawn(used, *used.stored(samples)), stored);
-  }
-}
-
-// A live stroke, likewise, does not depend on the one before.
-TEST_P(StrokesByLot, AreDrawnTheSameWhateverWasDrawnBefore) {
-  std::vector<std::vector<float>> fresh;
-  for (unsigned seed = 1; seed <= kStrokes; ++seed) {
-    DrawingBoard board(options());
-    fresh.push_back(drawnLive(board, strokeByLot(seed), 4));
-  }
-  DrawingBoard used(options());
-  for (unsigned seed = 1; seed <= kStrokes; ++seed) {
-    used.redraw(*used.stored(strokeByLot(seed + 100)));
-    EXPECT_EQ(drawnLive(used, strokeByLot(seed), 4), fresh[seed - 1]) << "seed " << seed;
+    EXPECT_EQ(live(used), ofLive);
+    EXPECT_EQ(stored(used), ofStored);
   }
 }
 

@@ -57,17 +57,10 @@ TEST(EvenWalkTest, StartsAtTheBeginningAndEndsOneStepShort) {
   Line line(1.0f);
   EXPECT_THAT(line.evenly(4, 1.0f), ElementsAre(near(0.0f), near(0.25f), near(0.5f), near(0.75f)));
   EXPECT_THAT(line.evenly(0, 1.0f), IsEmpty());
-}
-
-TEST(EvenWalkTest, GivesAPointItsOneStamp) {
-  Line point(0.0f);
-  EXPECT_THAT(point.evenly(1, 0.0f), ElementsAre(0.0f));
-}
-
-TEST(EvenWalkTest, StopsWhereThePathHasNoPosition) {
-  Line line(1.0f);
+  // It stops where the path has no position, and gives a point its one stamp.
   EXPECT_THAT(line.evenly(4, 2.0f), ElementsAre(near(0.0f), near(0.5f), near(1.0f)));
   EXPECT_FALSE(line.cutShort);
+  EXPECT_THAT(Line(0.0f).evenly(1, 0.0f), ElementsAre(0.0f));
 }
 
 TEST(SpacedWalkTest, PlacesFromTheCarriedDistanceAndCarriesTheRest) {
@@ -75,16 +68,10 @@ TEST(SpacedWalkTest, PlacesFromTheCarriedDistanceAndCarriesTheRest) {
   EXPECT_THAT(line.spaced(0.5f, 0.5f, 2.25f), ElementsAre(near(0.5f), near(1.0f), near(1.5f), near(2.0f)));
   EXPECT_EQ(line.carry, 0.25f);  // 2.5 - 2.25
   EXPECT_FALSE(line.cutShort);
-}
-
-TEST(SpacedWalkTest, TakesAStampAtTheVeryEnd) {
-  Line line(2.0f);
+  // A stamp at the very end is taken.
   EXPECT_THAT(line.spaced(0.5f, 0.5f, 2.0f), ElementsAre(near(0.5f), near(1.0f), near(1.5f), near(2.0f)));
   EXPECT_EQ(line.carry, 0.5f);
-}
-
-TEST(SpacedWalkTest, PlacesNothingOnASegmentShorterThanTheCarryAndShortensTheCarry) {
-  Line line(0.25f);
+  // A segment shorter than what is carried shortens that.
   EXPECT_THAT(line.spaced(0.75f, 0.5f, 0.25f), IsEmpty());
   EXPECT_EQ(line.carry, 0.5f);  // 0.75 - 0.25
   EXPECT_FALSE(line.cutShort);

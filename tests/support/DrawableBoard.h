@@ -1,134 +1,104 @@
 #pragma once
 
-#include <cstdint>
+#include <cstddef>
 #include <memory>
-#include <string>
-#include <typeinfo>
-#include <utility>
+#include <type_traits>
 #include <vector>
 
-#include "base/RectF.h"
-#include "desktop/gl/RenderQueue.h"
-#include "desktop/graphics/CanvasLayer.h"
-#include "desktop/graphics/PenCanvas.h"
-#include "desktop/pencommon/BatchObserver.h"
-#include "desktop/pencommon/PenDataManager.h"
-#include "engine/MotionEvent.h"
-#include "gl/ITask.h"
+#include "outline/Pencil2OutlineDrawableGL.h"
+#include "pen/DrawableFactory.h"
 #include "pen/Pencil2Data.h"
-#include "pencommon/PenOutlineDrawableRT.h"
-#include "pencommon/PenPredictionDrawableRT.h"
-#include "pencommon/PenPreviewDrawableRT.h"
+#include "pen/VersionTable.h"
+#include "pencommon/PenPreviewDrawableGL.h"
 #include "pencommon/PenSettingData.h"
-#include "prediction/Pencil2PredictionDrawableRT.h"
-#include "preview/Pencil2PreviewDrawableRT.h"
-#include "render/Tasks.h"
-#include "stroke/DrawingBoard.h"
-#include "support/LiveStroke.h"
+#include "stroke/Pencil2StrokeDrawableGL.h"
+#include "support/Board.h"
+#include "support/Stamps.h"
+#include "support/Versions.h"
 
 namespace QeltTests {
 
-// As `taskName`, for the tasks of every drawable; "Batch" of an outline is a batch of two.
-inline std::string drawableTaskName(const Qelt::ITask& task) {
-  using namespace Qelt;
-  const auto is = [&task](const std::type_info& type) { return typeid(task) == type; };
-  using Floats = std::vector<float>*;
-  if (is(typeid(WorkerTask::Member2<Pencil2PreviewDrawableRT,
-                                    void (Pencil2PreviewDrawableRT::*)(float, float), float, float>)) ||
-      is(typeid(WorkerTask::Member2<Pencil2PredictionDrawableRT,
-                                    void (Pencil2PredictionDrawableRT::*)(float, float), float, float>))) {
-    return "SetStartPoint";
-  }
-  if (is(typeid(WorkerTask::Member1<PenPreviewDrawableRT, void (PenPreviewDrawableRT::*)(Floats), Floats>)) ||
-      is(typeid(
-          WorkerTask::Member1<PenPredictionDrawableRT, void (PenPredictionDrawableRT::*)(Floats), Floats>)) ||
-      is(typeid(WorkerTask::Member2<PenOutlineDrawableRT, void (PenOutlineDrawableRT::*)(Floats, Floats),
-                                    Floats, Floats>))) {
-    return "Batch";
-  }
-  return taskName(task);
-}
-
-// An outline, preview or prediction drawable as the code under test makes it, with settings and shared record
-// within reach. Tasks run on the test's own thread, when something is asked for. One at a time.
+// A drawable as the code under test makes it, not through the loaded library, with settings and shared record
+// within reach. The version in the options is a stroke's rendering version, or an outline's own.
 template <typename Drawable>
-class DrawableBoard {
+class DrawableBoard : public Board {
  public:
-  explicit DrawableBoard(const BoardOptions& wanted = {})
-      : options(wanted),
-        queue(QeltDesktop::RenderQueue::Mode::Caller,
-              wanted.width > 0 ? QeltDesktop::RenderQueue::GL::Context : QeltDesktop::RenderQueue::GL::None),
-        layer(wanted.width > 0 ? std::make_unique<QeltDesktop::CanvasLayer>(queue, wanted.width,
-                                                                            wanted.height, wanted.tile)
-                               : nullptr),
-        canvas(&queue, layer.get()),
-        data(&queue) {
+  explicit DrawableBoard(const BoardOptions& wanted = {}) : Board(wanted) {
     settings.size = options.size;
     settings.color = options.color;
     shared.mSettingData = &settings;
     shared.mCurveEnabled = options.curve;
     shared.mLastAlpha = -1.0f;
-    drawable = std::make_unique<Drawable>(&shared, &data);
+    if constexpr (std::is_same_v<Drawable, Qelt::Pencil2StrokeDrawableGL>) {
+      const int version = versionTable[Qelt::versionRow(options.version)][0];
+      drawable.reset(Qelt::createStrokeDrawable(version, &shared, &data));
+    } else if constexpr (kOutlines) {
+      drawable.reset(Qelt::createOutlineDrawable(options.version, &shared, &data));
+    } else {
+      drawable = std::make_unique<Drawable>(&shared, &data);
+    }
     drawable->SetCanvas(&canvas);
-    queue.finish();
-    queue.onAccepted = [this](const Qelt::ITask& task) { mPosts.push_back(drawableTaskName(task)); };
-    QeltDesktop::setBatchObserver([this](QeltDesktop::Batch batch) { mBatches.push_back(std::move(batch)); });
+    watch();
+  }
+  ~DrawableBoard() override {
+    unwatch();
+    deleteDrawable();
   }
 
-  ~DrawableBoard() {
-    queue.onAccepted = nullptr;
-    queue.accept = nullptr;
+  // As a pen does it when it dies or its version changes.
+  void deleteDrawable() {
     drawable.reset();
     queue.finish();
-    QeltDesktop::setBatchObserver(nullptr);
   }
-  DrawableBoard(const DrawableBoard&) = delete;
-  DrawableBoard& operator=(const DrawableBoard&) = delete;
 
-  // One event each; of a move the last sample is the current one. The rectangle is handed in as four zeros.
-  bool down(const Sample& sample) { return send(Qelt::kActionDown, {sample}); }
-  bool move(const std::vector<Sample>& samples) { return send(Qelt::kActionMove, samples); }
-  bool up(const Sample& sample) { return send(Qelt::kActionUp, {sample}); }
-  bool send(int action, const std::vector<Sample>& samples) {
-    Qelt::MotionEvent event = motionEvent(action, samples, options.tool, options.source);
+  // A recorded event or a stored stroke: drawn again, outlined.
+  template <typename Input>
+  bool redraw(const Input& input) {
     rect = {};
-    return drawable->Draw(&event, &rect);
+    return drawable->RedrawPen(&input, &rect);
   }
+  template <typename Input>
+  bool outline(const Input& input) {
+    rect = {};
+    return drawable->DrawOutline(&input, &rect);
+  }
+  bool outline(const std::vector<Sample>& samples) { return outline(recorded(samples)); }
 
-  // A whole stroke packed into one event: every sample in the history, the last one current as well.
-  Qelt::MotionEvent recorded(std::vector<Sample> samples) const {
-    samples.push_back(samples.back());
-    return motionEvent(Qelt::kActionUp, samples, options.tool, options.source);
-  }
-
-  // What reached the render drawable since the last call.
-  std::vector<QeltDesktop::Batch> takeBatches() {
-    queue.finish();
-    return std::exchange(mBatches, {});
-  }
-  std::vector<float> takeFloats() {
-    std::vector<float> floats;
+  // The stamps that reached the render drawable since the last call; of an outline's two streams the inner
+  // one comes first.
+  std::vector<Stamp> takeStamps(std::size_t stream = 0) {
+    std::vector<Stamp> stamps;
     for (const QeltDesktop::Batch& batch : takeBatches()) {
-      floats.insert(floats.end(), batch.buffers.front().begin(), batch.buffers.front().end());
+      const std::vector<Stamp> some = stampsOf(batch.buffers.at(stream), stride());
+      stamps.insert(stamps.end(), some.begin(), some.end());
     }
-    return floats;
+    return stamps;
   }
-  // The names of the tasks posted since the last call.
-  std::vector<std::string> takePosts() { return std::exchange(mPosts, {}); }
 
-  BoardOptions options;
+  // Floats in one vertex.
+  int stride() const {
+    if constexpr (kOutlines) return 7;
+    if constexpr (std::is_base_of_v<Qelt::PenPreviewDrawableGL, Drawable>) return 9;
+    return strideOf(options.version);
+  }
+
   Qelt::PenSettingData settings;
   Qelt::Pencil2Data shared{};
-  Qelt::RectF rect;  // of the last call
-  QeltDesktop::RenderQueue queue;
-  std::unique_ptr<QeltDesktop::CanvasLayer> layer;
-  QeltDesktop::PenCanvas canvas;
-  QeltDesktop::PenDataManager data;
   std::unique_ptr<Drawable> drawable;
 
+ protected:
+  bool draw(const Qelt::MotionEvent& event) override {
+    if constexpr (kOutlines)
+      return false;  // they take whole strokes only
+    else
+      return drawable->Draw(&event, &rect);
+  }
+
  private:
-  std::vector<QeltDesktop::Batch> mBatches;
-  std::vector<std::string> mPosts;
+  static constexpr bool kOutlines = std::is_same_v<Drawable, Qelt::Pencil2OutlineDrawableGL>;
 };
+
+using OutlineBoard = DrawableBoard<Qelt::Pencil2OutlineDrawableGL>;
+using DrawingBoard = DrawableBoard<Qelt::Pencil2StrokeDrawableGL>;
 
 }  // namespace QeltTests

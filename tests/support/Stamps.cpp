@@ -34,20 +34,21 @@ std::vector<Stamp> stampsOf(const std::vector<float>& batch, int stride) {
         EXPECT_EQ(vertex[value], first[value]) << where << ", float " << value;
       }
     }
-    Stamp stamp{(first[0] + last[0]) * 0.5f,
-                (first[1] + last[1]) * 0.5f,
-                (last[0] - first[0]) * 0.5f,
-                (last[1] - first[1]) * 0.5f,
-                first[4],
-                first[5],
-                static_cast<int>(first[6]),
-                first[7],
-                first[8]};
+    Stamp& stamp = stamps.emplace_back();
+    stamp.x = (first[0] + last[0]) * 0.5f;
+    stamp.y = (first[1] + last[1]) * 0.5f;
+    stamp.halfWidth = (last[0] - first[0]) * 0.5f;
+    stamp.halfHeight = (last[1] - first[1]) * 0.5f;
+    // An outline's vertex has no alpha and no tile.
+    if (stride > 7) stamp.alpha = first[4];
+    stamp.narrowing = first[stride > 7 ? 5 : 4];
+    if (stride > 7) stamp.tile = static_cast<int>(first[6]);
+    stamp.directionX = first[stride > 7 ? 7 : 5];
+    stamp.directionY = first[stride > 7 ? 8 : 6];
     if (stride == 11) {
       stamp.innerRadius = first[9];
       stamp.alphaByWidth = first[10];
     }
-    stamps.push_back(stamp);
   }
   return stamps;
 }

@@ -9,6 +9,11 @@ inline constexpr std::array<int, 8> allVersions() {
   return {1, 2, 3, 4, 5, 6, 7, 8};
 }
 
+// Every version of an outline.
+inline constexpr std::array<int, 5> outlineVersions() {
+  return {1, 2, 3, 4, 5};
+}
+
 // Floats in one vertex of a stroke's batch.
 inline constexpr int strideOf(int renderingVersion) {
   return renderingVersion == 8 ? 11 : 9;

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <memory>
 #include <string>
@@ -14,13 +15,17 @@
 #include "desktop/pencommon/PenDataManager.h"
 #include "engine/MotionEvent.h"
 #include "gl/ITask.h"
-#include "pen/Pencil2Data.h"
-#include "pencommon/PenSettingData.h"
-#include "stroke/Pencil2StrokeDrawableGL.h"
-#include "support/LiveStroke.h"
-#include "support/Stamps.h"
+#include "math/Matrix3.h"
 
 namespace QeltTests {
+
+// A point of the stroke under way; pressure 0 to 1, angles in radians.
+struct Sample {
+  float x, y;
+  float pressure = 0.5f;
+  float tilt = 0.0f;
+  float orientation = 0.0f;
+};
 
 struct BoardOptions {
   int version = 8;  // rendering version
@@ -32,16 +37,29 @@ struct BoardOptions {
   // Pixels of the layer; 0: no layer and no GL, batches only.
   int width = 0, height = 0;
   int tile = 512;
+  // A render thread; without, tasks run on the test's own, when something is asked for.
+  bool thread = false;
 };
 
-// A stroke drawable as the code under test makes it, not through the loaded library, with settings and shared
-// record within reach. Tasks run on the test's own thread, when something is asked for. One at a time.
-class DrawingBoard {
+// One event; the last sample is the current one, those before it are its history.
+Qelt::MotionEvent motionEvent(int action, const std::vector<Sample>& samples, int tool = Qelt::kToolStylus,
+                              int source = Qelt::kSourceStylus);
+
+// What a task does, in a word, told by its type: "SetStartPoint", "SetPenData", "SetRedrawState", "SetRect",
+// "Batch" (SendDataToGPU or SetCacheBuffer), "Render", "DeleteBatch", "Unref", "ReleaseStrokeData",
+// "ReleasePenData", "DeleteName", "Clear"; any other's type as it stands.
+std::string taskName(const Qelt::ITask& task);
+
+// The matrix that scales by `zoom` and moves by (dx, dy).
+Qelt::Matrix3<float> viewOf(float zoom, float dx = 0.0f, float dy = 0.0f);
+
+// What a host sets up to draw with one drawable, which whoever derives from this makes. One at a time: the
+// observer of batches, and the GL context of a picture, belong to the process.
+class Board {
  public:
-  explicit DrawingBoard(const BoardOptions& options);
-  ~DrawingBoard();
-  DrawingBoard(const DrawingBoard&) = delete;
-  DrawingBoard& operator=(const DrawingBoard&) = delete;
+  virtual ~Board();
+  Board(const Board&) = delete;
+  Board& operator=(const Board&) = delete;
 
   // One event each; of a move the last sample is the current one. The answer is the drawable's; the rectangle
   // is handed in as four zeros.
@@ -49,52 +67,43 @@ class DrawingBoard {
   bool move(const std::vector<Sample>& samples) { return send(Qelt::kActionMove, samples); }
   bool up(const Sample& sample) { return send(Qelt::kActionUp, {sample}); }
   bool send(int action, const std::vector<Sample>& samples);
-  bool send(Qelt::MotionEvent& event);
+  bool send(const Qelt::MotionEvent& event);
   // A whole stroke: down at the first sample, the rest `batch` at a time, up at the last.
   void stroke(const std::vector<Sample>& samples, int batch = 4);
-  bool redraw(const Qelt::MotionEvent& event);
-  bool redraw(const Qelt::ObjectStroke& stroke);
 
   // A whole stroke packed into one event: every sample in the history, the last one current as well.
-  Qelt::MotionEvent recorded(const std::vector<Sample>& samples) const;
+  Qelt::MotionEvent recorded(std::vector<Sample> samples) const;
   std::unique_ptr<QeltDesktop::StoredStroke> stored(const std::vector<Sample>& samples,
                                                     bool hasAngles = true) const;
 
-  // What reached the render drawable since the last call: all stamps, or batch by batch.
-  std::vector<Stamp> takeStamps();
+  // What reached the render drawable since the last call: hand-over by hand-over, buffer by buffer, or the
+  // first buffers in one.
   std::vector<QeltDesktop::Batch> takeBatches();
+  std::vector<std::vector<float>> takeBuffers();
+  std::vector<float> takeFloats();
   // The names of the tasks posted since the last call, see `taskName`.
   std::vector<std::string> takePosts();
+  // Width x height x 4 bytes, premultiplied; only with a layer.
   std::vector<std::uint8_t> pixels() { return layer->readPixels(); }
 
-  Qelt::Pencil2StrokeDrawableGL& drawable() { return *mDrawable; }
-  // As a pen does it when it dies or its version changes.
-  void deleteDrawable();
-
-  BoardOptions options;
-  Qelt::PenSettingData settings;
-  Qelt::Pencil2Data shared{};
+  const BoardOptions options;
   Qelt::RectF rect;  // of the last call
   QeltDesktop::RenderQueue queue;
   std::unique_ptr<QeltDesktop::CanvasLayer> layer;
   QeltDesktop::PenCanvas canvas;
   QeltDesktop::PenDataManager data;
 
+ protected:
+  explicit Board(const BoardOptions& wanted);
+  // Once the drawable is there: posts and batches are noted from here on.
+  void watch();
+  // Before the drawable goes: nothing is noted or refused any more.
+  void unwatch();
+  virtual bool draw(const Qelt::MotionEvent& event) = 0;
+
  private:
-  std::unique_ptr<Qelt::Pencil2StrokeDrawableGL> mDrawable;
   std::vector<QeltDesktop::Batch> mBatches;
   std::vector<std::string> mPosts;
 };
-
-// One event; the last sample is the current one, those before it are its history.
-Qelt::MotionEvent motionEvent(int action, const std::vector<Sample>& samples, int tool, int source);
-
-// What a task does, in a word, told by its exact type: "SetStartPoint", "SetPenData", "SetRedrawState",
-// "SetRect", "Batch" (SendDataToGPU or SetCacheBuffer), "Render", "DeleteBatch", "Unref",
-// "ReleaseStrokeData", "ReleasePenData", "DeleteName", "Clear"; any other's type as it stands.
-std::string taskName(const Qelt::ITask& task);
-
-// The matrix that scales by `zoom` and moves by (dx, dy).
-Qelt::Matrix3<float> viewOf(float zoom, float dx = 0.0f, float dy = 0.0f);
 
 }  // namespace QeltTests
