@@ -34,10 +34,6 @@ GreyPicture pictureOf(Board& board) {
   return picture;
 }
 
-std::string versionName(const testing::TestParamInfo<int>& test) {
-  return "Version" + std::to_string(test.param);
-}
-
 // --- Strokes ---
 
 // Draws a stroke event by event and writes down stamps and areas, and at the end what the prediction is told.

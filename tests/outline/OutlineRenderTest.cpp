@@ -47,25 +47,21 @@ int alphaAt(const std::vector<std::uint8_t>& pixels, int column, int row) {
 
 TEST(OutlinePicture, OnlyARimIsLeftInTheOutlinesColour) {
   for (const float zoom : {1.0f, 0.5f}) {
-    const float side = static_cast<float>(kSide) / zoom;
-    const auto pixels = outlinePicture(6.0f / zoom, {{side / 2.0f, side / 2.0f}}, zoom);
+    const float middle = 60.0f / zoom;
+    const auto pixels = outlinePicture(6.0f / zoom, {{middle, middle}}, zoom);
     // A stamp of 31 across, in units, around the middle.
     const float inner = 15.5f * zoom;
     const float outer = inner + 6.0f;
-    for (int row = 0; row < kSide; ++row) {
-      for (int column = 0; column < kSide; ++column) {
-        const float dx = static_cast<float>(column) + 0.5f - 60.0f;
-        const float dy = static_cast<float>(row) + 0.5f - 60.0f;
-        const float distance = std::sqrt(dx * dx + dy * dy);
-        const int alpha = alphaAt(pixels, column, row);
-        if (distance < inner - 2.0f || distance > outer + 2.0f) {
-          ASSERT_EQ(alpha, 0) << column << ", " << row;
-        }
-        if (distance > inner + 2.0f && distance < outer - 2.0f) {
-          const std::uint8_t* pixel = &pixels[static_cast<std::size_t>(row * kSide + column) * 4];
-          ASSERT_THAT(std::vector<int>(pixel, pixel + 4), ElementsAre(255, 128, 0, 255))
-              << column << ", " << row;
-        }
+    for (int i = 0; i < kSide * kSide; ++i) {
+      const std::uint8_t* const pixel = &pixels[static_cast<std::size_t>(i) * 4];
+      const float distance =
+          std::hypot(static_cast<float>(i % kSide) - 59.5f, static_cast<float>(i / kSide) - 59.5f);
+      if (distance < inner - 2.0f || distance > outer + 2.0f) {
+        ASSERT_EQ(pixel[3], 0) << i % kSide << ", " << i / kSide;
+      }
+      if (distance > inner + 2.0f && distance < outer - 2.0f) {
+        ASSERT_THAT(std::vector<int>(pixel, pixel + 4), ElementsAre(255, 128, 0, 255))
+            << i % kSide << ", " << i / kSide;
       }
     }
   }
@@ -82,10 +78,8 @@ TEST(OutlinePicture, WithoutASizeTheInsideIsErasedToNothing) {
   for (int row = 0; row < kSide; ++row) {
     for (int column = 0; column < kSide; ++column) {
       // c * (1 - c) is left where the rim is half covered.
-      ASSERT_LE(alphaAt(erased, column, row), 70) << column << ", " << row;
-      if (row > 47 && row < 73 && column > 30 && column < 90) {
-        ASSERT_EQ(alphaAt(erased, column, row), 0) << column << ", " << row;
-      }
+      const bool inside = row > 47 && row < 73 && column > 30 && column < 90;
+      ASSERT_LE(alphaAt(erased, column, row), inside ? 0 : 70) << column << ", " << row;
     }
   }
 }
@@ -105,85 +99,82 @@ TEST(OutlinePicture, ATiltedPenLeavesASlabThatIsErasedThinner) {
 // The drawable alone, on a queue of its own.
 class OutlineRenderer : public testing::Test {
  protected:
-  OutlineRenderer()
-      : mQueue(QeltDesktop::RenderQueue::Mode::Caller, QeltDesktop::RenderQueue::GL::Context),
-        mLayer(mQueue, kSide, kSide),
-        mData(&mQueue) {
-    mDrawable = std::make_unique<Qelt::Pencil2OutlineDrawableRTV1>(&mData);
+  OutlineRenderer() {
     const Qelt::Vector2<float> stamp[2] = {{60.0f, 60.0f}, {0.0f, 1.0f}};
-    mDrawable->SetOutlineSize(5.0f);
-    mDrawable->SetOutlineColor(0xFF00FF00u);
-    mDrawable->SetBuffer(&mInner, &mOuter);
-    mDrawable->AddPoint(stamp, 40.0f, 0.0f);
-    mDrawable->SetBuffer(nullptr, nullptr);
-    mDrawable->AddPoint(stamp, 40.0f, 0.0f);  // goes nowhere
+    drawable->SetOutlineSize(5.0f);
+    drawable->SetOutlineColor(0xFF00FF00u);
+    drawable->SetBuffer(&inner, &outer);
+    drawable->AddPoint(stamp, 40.0f, 0.0f);
+    drawable->SetBuffer(nullptr, nullptr);
+    drawable->AddPoint(stamp, 40.0f, 0.0f);  // goes nowhere
   }
   ~OutlineRenderer() override {
-    mQueue.run([this] { mDrawable.reset(); });
+    queue.run([this] { drawable.reset(); });
   }
 
   void draw() {
-    mQueue.run([this] {
+    queue.run([this] {
       Qelt::Matrix4<float> identity;
-      mDrawable->Draw(mLayer.GetBitmap()->GetSubBitmap(0), identity);
+      drawable->Draw(layer.GetBitmap()->GetSubBitmap(0), identity);
     });
   }
-  int rim() { return alphaAt(mLayer.readPixels(), 60 + 22, 60); }
+  int rim() { return alphaAt(layer.readPixels(), 60 + 22, 60); }
 
-  std::vector<float> mInner, mOuter;
-  QeltDesktop::RenderQueue mQueue;
-  QeltDesktop::CanvasLayer mLayer;
-  QeltDesktop::PenDataManager mData;
-  std::unique_ptr<Qelt::Pencil2OutlineDrawableRTV1> mDrawable;
+  std::vector<float> inner, outer;
+  QeltDesktop::RenderQueue queue{QeltDesktop::RenderQueue::Mode::Caller,
+                                 QeltDesktop::RenderQueue::GL::Context};
+  QeltDesktop::CanvasLayer layer{queue, kSide, kSide};
+  QeltDesktop::PenDataManager data{&queue};
+  std::unique_ptr<Qelt::Pencil2OutlineDrawableRTV1> drawable =
+      std::make_unique<Qelt::Pencil2OutlineDrawableRTV1>(&data);
 };
 
 TEST_F(OutlineRenderer, DrawsOnlyWhenThereIsSomethingToDrawWith) {
-  EXPECT_EQ(mInner.size(), 42u);
-  EXPECT_EQ(mOuter[0], mInner[0] - 5.0f);
-  mQueue.run([this] { mDrawable->SendDataToGPU(&mInner, &mOuter); });
+  EXPECT_EQ(inner.size(), 42u);
+  EXPECT_EQ(outer[0], inner[0] - 5.0f);
+  queue.run([this] { drawable->SendDataToGPU(&inner, &outer); });
   draw();  // before Init
   EXPECT_EQ(rim(), 0);
-  mQueue.run([this] {
-    mDrawable->CreatePenCanvas(0, 0, nullptr);
-    mDrawable->CreatePenCanvas(0, 0, nullptr);
-    mDrawable->Update(true);
+  queue.run([this] {
+    for (int twice = 0; twice < 2; ++twice) drawable->CreatePenCanvas(0, 0, nullptr);
+    drawable->Update(true);
     Qelt::Matrix4<float> identity;
-    mDrawable->Draw(nullptr, identity);
+    drawable->Draw(nullptr, identity);
   });
   EXPECT_EQ(rim(), 0);
   draw();
   EXPECT_EQ(rim(), 255);
 
-  mLayer.clear();
+  layer.clear();
   std::vector<float> none;
-  mQueue.run([&] { mDrawable->SendDataToGPU(&mInner, &none); });
+  queue.run([&] { drawable->SendDataToGPU(&inner, &none); });
   draw();
-  mQueue.run([&] { mDrawable->SendDataToGPU(nullptr, &mOuter); });
+  queue.run([&] { drawable->SendDataToGPU(nullptr, &outer); });
   draw();
   EXPECT_EQ(rim(), 0);  // one stream alone draws nothing
 
-  mQueue.run([&] {
-    mDrawable->SendDataToGPU(&mInner, &mOuter);
-    mDrawable->Clear();
-    mDrawable->Update(false);
+  queue.run([&] {
+    drawable->SendDataToGPU(&inner, &outer);
+    drawable->Clear();
+    drawable->Update(false);
   });
-  EXPECT_THAT(mInner, IsEmpty());
-  EXPECT_THAT(mOuter, IsEmpty());
+  EXPECT_THAT(inner, IsEmpty());
+  EXPECT_THAT(outer, IsEmpty());
   draw();
   EXPECT_EQ(rim(), 0);
-  mQueue.run([this] { mDrawable->Release(); });
+  queue.run([this] { drawable->Release(); });
   draw();
-  mQueue.run([this] { mDrawable->Release(); });
+  queue.run([this] { drawable->Release(); });
 }
 
 TEST_F(OutlineRenderer, NotesWhatItDoes) {
   LogCapture log;
-  mQueue.run([this] {
-    mDrawable->CreatePenCanvas(0, 0, nullptr);
-    mDrawable->SendDataToGPU(&mInner, &mOuter);
-    mDrawable->Update(false);
-    mDrawable->RestoreGLObject();
-    mDrawable->Release();
+  queue.run([this] {
+    drawable->CreatePenCanvas(0, 0, nullptr);
+    drawable->SendDataToGPU(&inner, &outer);
+    drawable->Update(false);
+    drawable->RestoreGLObject();
+    drawable->Release();
   });
   std::vector<std::string> lines;
   for (const LogLine& line : log.take()) {

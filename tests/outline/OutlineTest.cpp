@@ -111,19 +111,15 @@ TEST_P(OutlineVersions, RefusesWhatIsMissing) {
   const MotionEvent* const noEvent = nullptr;
   const StoredStroke* const noStroke = nullptr;
   RectF rect;
-  const auto refuses = [](auto call) {
-    Error::SetError(0);
-    return !call() && Error::GetError() == Error::kInvalidArgument;
-  };
-  EXPECT_TRUE(refuses([&] { return board.drawable->DrawOutline(noEvent, &rect); }));
-  EXPECT_TRUE(refuses([&] { return board.drawable->DrawOutline(noStroke, &rect); }));
-  EXPECT_TRUE(refuses([&] { return board.drawable->DrawOutline(&event, nullptr); }));
-  EXPECT_TRUE(refuses([&] { return board.drawable->DrawOutline(&empty, nullptr); }));
+  EXPECT_TRUE(isRefused([&] { return board.drawable->DrawOutline(noEvent, &rect); }));
+  EXPECT_TRUE(isRefused([&] { return board.drawable->DrawOutline(noStroke, &rect); }));
+  EXPECT_TRUE(isRefused([&] { return board.drawable->DrawOutline(&event, nullptr); }));
+  EXPECT_TRUE(isRefused([&] { return board.drawable->DrawOutline(&empty, nullptr); }));
   Error::SetError(0);
   EXPECT_TRUE(board.outline(empty));  // Kept: on curves true all the same
   EXPECT_EQ(Error::GetError(), Error::kInvalidArgument);
   board.shared.mCurveEnabled = false;
-  EXPECT_TRUE(refuses([&] { return board.outline(empty); }));
+  EXPECT_TRUE(isRefused([&] { return board.outline(empty); }));
   EXPECT_THAT(board.takeStamps(), IsEmpty());
   // Nor does a size that is none place anything.
   for (const float size : {0.0f, -3.0f, NAN, INFINITY}) {
@@ -137,8 +133,7 @@ TEST_P(OutlineVersions, RefusesWhatIsMissing) {
   EXPECT_THAT(board.takePosts(), IsEmpty());
 }
 
-INSTANTIATE_TEST_SUITE_P(Versions, OutlineVersions, testing::ValuesIn(outlineVersions()),
-                         [](const auto& test) { return "Version" + std::to_string(test.param); });
+INSTANTIATE_TEST_SUITE_P(Versions, OutlineVersions, testing::ValuesIn(outlineVersions()), versionName);
 
 // --- What tells the versions apart ---
 
@@ -179,26 +174,23 @@ TEST(Outline, VersionOneDropsShortSegmentsAndKeepsTheMeanOrientation) {
 }
 
 TEST(Outline, VersionFiveCapsTiltHigherAndAveragesThreeSamples) {
-  const std::vector<Sample> tilted(5, {0.0f, 0.0f, 0.5f, 1.3f});
-  std::vector<Sample> samples = tilted;
-  for (std::size_t i = 0; i < samples.size(); ++i) samples[i].x = 20.0f * static_cast<float>(i);
-  OutlineBoard four({.version = 4, .size = 4.0f, .curve = false});
-  MotionEvent event = four.recorded(samples);
-  four.outline(event);
-  EXPECT_EQ(event.GetHistoricalTilt(2), 0.79f);
-  EXPECT_EQ(event.GetTilt(0), 0.79f);
-  EXPECT_NEAR(four.takeStamps().back().narrowing, 0.5f, 1e-4f);  // (0.79 - 0.75) / 0.08
+  std::vector<Sample> samples;
+  for (int i = 0; i < 5; ++i) samples.push_back({20.0f * static_cast<float>(i), 0.0f, 0.5f, 1.3f});
+  // (0.79 - 0.75) / 0.08 and (1 - 0.05) / 1.9 are a half both.
+  for (const auto& [version, cap] : {std::pair(4, 0.79f), std::pair(5, 1.0f)}) {
+    OutlineBoard board({.version = version, .size = 4.0f, .curve = false});
+    const MotionEvent event = board.recorded(samples);
+    board.outline(event);
+    EXPECT_EQ(event.GetHistoricalTilt(2), cap);
+    EXPECT_EQ(event.GetTilt(0), cap);
+    EXPECT_NEAR(board.takeStamps().back().narrowing, 0.5f, 1e-4f);
+  }
+  samples[0].tilt = 0.0f;  // upright, then three of the samples at 1
   OutlineBoard five({.version = 5, .size = 4.0f, .curve = false});
-  event = five.recorded(samples);
-  five.outline(event);
-  EXPECT_EQ(event.GetHistoricalTilt(2), 1.0f);
+  five.outline(samples);
   const std::vector<Stamp> stamps = five.takeStamps();
-  EXPECT_NEAR(stamps.back().narrowing, 0.5f, 1e-5f);  // (1 - 0.05) / 1.9
-  EXPECT_NEAR(stamps.back().halfWidth, 7.5f, 0.1f);   // 4 + 4 * 5 * 0.5, and 1
-  samples[0].tilt = 0.0f;                             // upright, then three of the samples at 1
-  event = five.recorded(samples);
-  five.outline(event);
-  EXPECT_NEAR(five.takeStamps()[0].narrowing, (1.0f / 3.0f - 0.05f) / 1.9f, 1e-5f);
+  EXPECT_NEAR(stamps.front().narrowing, (1.0f / 3.0f - 0.05f) / 1.9f, 1e-5f);
+  EXPECT_NEAR(stamps.back().halfWidth, 7.5f, 0.1f);  // 4 + 4 * 5 * 0.5, and 1
 }
 
 TEST(Outline, FingersTakeShortMovesEveryOtherTime) {
@@ -235,19 +227,18 @@ TEST(OutlineGetter, FollowsTheVersionTable) {
   QeltDesktop::PenDataManager data(nullptr);
   Qelt::Pencil2 pen;
   pen.setPenDataManager(&data);
-  const std::vector<std::pair<int, const std::type_info*>> expected = {
-      {-3, &typeid(Qelt::Pencil2OutlineDrawableGLV1)}, {0, &typeid(Qelt::Pencil2OutlineDrawableGLV1)},
-      {1, &typeid(Qelt::Pencil2OutlineDrawableGLV1)},  {2, &typeid(Qelt::Pencil2OutlineDrawableGLV2)},
-      {3, &typeid(Qelt::Pencil2OutlineDrawableGLV3)},  {4, &typeid(Qelt::Pencil2OutlineDrawableGLV4)},
-      {5, &typeid(Qelt::Pencil2OutlineDrawableGLV5)},  {6, &typeid(Qelt::Pencil2OutlineDrawableGLV4)},
-      {7, &typeid(Qelt::Pencil2OutlineDrawableGLV4)},  {8, &typeid(Qelt::Pencil2OutlineDrawableGLV4)},
-      {9, &typeid(Qelt::Pencil2OutlineDrawableGLV1)}};
-  for (const auto& [version, type] : expected) {
+  const std::type_info* const types[] = {
+      &typeid(Qelt::Pencil2OutlineDrawableGLV1), &typeid(Qelt::Pencil2OutlineDrawableGLV2),
+      &typeid(Qelt::Pencil2OutlineDrawableGLV3), &typeid(Qelt::Pencil2OutlineDrawableGLV4),
+      &typeid(Qelt::Pencil2OutlineDrawableGLV5)};
+  const int expected[][2] = {{-3, 1}, {0, 1}, {1, 1}, {2, 2}, {3, 3}, {4, 4},
+                             {5, 5},  {6, 4}, {7, 4}, {8, 4}, {9, 1}};
+  for (const auto& [version, outlineVersion] : expected) {
     pen.setVersion(version);
     Qelt::PenOutlineDrawableGL* outline = pen.GetOutlineDrawableGL();
     ASSERT_NE(outline, nullptr);
     const Qelt::PenOutlineDrawableGL& made = *outline;
-    EXPECT_TRUE(typeid(made) == *type) << version;
+    EXPECT_EQ(typeid(made), *types[outlineVersion - 1]) << version;
     EXPECT_EQ(pen.GetOutlineDrawableGL(), outline);
   }
   // Versions 6 to 8 share one.

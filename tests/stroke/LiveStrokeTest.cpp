@@ -243,8 +243,7 @@ TEST_P(LiveStroke, EndsOnHugeCoordinates) {
   EXPECT_EQ(drawn(board, kStroke), before);
 }
 
-INSTANTIATE_TEST_SUITE_P(Versions, LiveStroke, testing::ValuesIn(allVersions()),
-                         [](const auto& test) { return "Version" + std::to_string(test.param); });
+INSTANTIATE_TEST_SUITE_P(Versions, LiveStroke, testing::ValuesIn(allVersions()), versionName);
 
 TEST(EndlessSegmentTest, IsCutShortAndSaidOnceAStroke) {
   LogCapture log;

@@ -279,16 +279,12 @@ TEST_P(Redraw, AndDrawRefuseNullAndStaySilentWithoutACanvas) {
   const MotionEvent* const noEvent = nullptr;
   const Qelt::ObjectStroke* const noStroke = nullptr;
   Qelt::RectF rect;
-  const auto refuses = [](auto call) {
-    Error::SetError(0);
-    return !call() && Error::GetError() == 7u;
-  };
-  EXPECT_TRUE(refuses([&] { return drawable.Draw(nullptr, &rect); }));
-  EXPECT_TRUE(refuses([&] { return drawable.Draw(&event, nullptr); }));
-  EXPECT_TRUE(refuses([&] { return drawable.RedrawPen(noEvent, &rect); }));
-  EXPECT_TRUE(refuses([&] { return drawable.RedrawPen(&event, nullptr); }));
-  EXPECT_TRUE(refuses([&] { return drawable.RedrawPen(noStroke, &rect); }));
-  EXPECT_TRUE(refuses([&] { return drawable.RedrawPen(stroke.get(), nullptr); }));
+  EXPECT_TRUE(isRefused([&] { return drawable.Draw(nullptr, &rect); }));
+  EXPECT_TRUE(isRefused([&] { return drawable.Draw(&event, nullptr); }));
+  EXPECT_TRUE(isRefused([&] { return drawable.RedrawPen(noEvent, &rect); }));
+  EXPECT_TRUE(isRefused([&] { return drawable.RedrawPen(&event, nullptr); }));
+  EXPECT_TRUE(isRefused([&] { return drawable.RedrawPen(noStroke, &rect); }));
+  EXPECT_TRUE(isRefused([&] { return drawable.RedrawPen(stroke.get(), nullptr); }));
 
   Error::SetError(0);
   drawable.SetCanvas(nullptr);
@@ -367,8 +363,7 @@ TEST_P(Redraw, OfAHundredThousandPointsEnds) {
   EXPECT_FALSE(floatsOf(board, stroke).empty());
 }
 
-INSTANTIATE_TEST_SUITE_P(Versions, Redraw, testing::ValuesIn(allVersions()),
-                         [](const auto& test) { return "Version" + std::to_string(test.param); });
+INSTANTIATE_TEST_SUITE_P(Versions, Redraw, testing::ValuesIn(allVersions()), versionName);
 
 }  // namespace
 }  // namespace QeltTests

@@ -11,19 +11,14 @@ namespace {
 thread_local long tUntilFailure = -1;  // below 0: none to come
 
 #if !QELT_SANITIZED
-void* allocate(std::size_t size, std::size_t alignment = 0) noexcept {
-  if (tUntilFailure >= 0 && tUntilFailure-- == 0) return nullptr;
-  const std::size_t atLeast = size == 0 ? 1 : size;
-  void* block = alignment == 0
-                    ? std::malloc(atLeast)
-                    : std::aligned_alloc(alignment, (atLeast + alignment - 1) / alignment * alignment);
-  if (block != nullptr) ++gAlive;
-  return block;
-}
-
-void* allocateOrThrow(std::size_t size, std::size_t alignment = 0) {
-  void* block = allocate(size, alignment);
+void* allocate(std::size_t size, std::size_t alignment) {
+  void* block = nullptr;
+  if (tUntilFailure < 0 || tUntilFailure-- != 0) {
+    const std::size_t whole = (size + alignment - 1) / alignment * alignment;
+    block = std::aligned_alloc(alignment, whole == 0 ? alignment : whole);
+  }
   if (block == nullptr) throw std::bad_alloc();
+  ++gAlive;
   return block;
 }
 
@@ -37,52 +32,23 @@ void release(void* block) noexcept {
 }  // namespace
 
 #if !QELT_SANITIZED
+// All the others, of arrays, with a size, or answering null, come down to these.
 void* operator new(std::size_t size) {
-  return allocateOrThrow(size);
-}
-void* operator new[](std::size_t size) {
-  return allocateOrThrow(size);
-}
-void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
-  return allocate(size);
-}
-void* operator new[](std::size_t size, const std::nothrow_t&) noexcept {
-  return allocate(size);
+  return allocate(size, alignof(std::max_align_t));
 }
 void* operator new(std::size_t size, std::align_val_t alignment) {
-  return allocateOrThrow(size, static_cast<std::size_t>(alignment));
-}
-void* operator new[](std::size_t size, std::align_val_t alignment) {
-  return allocateOrThrow(size, static_cast<std::size_t>(alignment));
-}
-void* operator new(std::size_t size, std::align_val_t alignment, const std::nothrow_t&) noexcept {
-  return allocate(size, static_cast<std::size_t>(alignment));
-}
-void* operator new[](std::size_t size, std::align_val_t alignment, const std::nothrow_t&) noexcept {
   return allocate(size, static_cast<std::size_t>(alignment));
 }
 void operator delete(void* block) noexcept {
   release(block);
 }
-void operator delete[](void* block) noexcept {
-  release(block);
-}
 void operator delete(void* block, std::size_t) noexcept {
-  release(block);
-}
-void operator delete[](void* block, std::size_t) noexcept {
   release(block);
 }
 void operator delete(void* block, std::align_val_t) noexcept {
   release(block);
 }
-void operator delete[](void* block, std::align_val_t) noexcept {
-  release(block);
-}
 void operator delete(void* block, std::size_t, std::align_val_t) noexcept {
-  release(block);
-}
-void operator delete[](void* block, std::size_t, std::align_val_t) noexcept {
   release(block);
 }
 #endif

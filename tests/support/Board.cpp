@@ -3,9 +3,12 @@
 #include <cxxabi.h>
 
 #include <algorithm>
+#include <cstddef>
 #include <cstdlib>
 #include <typeinfo>
 #include <utility>
+
+#include "base/Error.h"
 
 namespace QeltTests {
 
@@ -133,6 +136,11 @@ std::string taskName(const Qelt::ITask& task) {
     if (type.find(part) != std::string::npos) return name;
   }
   return type;
+}
+
+bool isRefused(const std::function<bool()>& call) {
+  Qelt::Error::SetError(0);
+  return !call() && Qelt::Error::GetError() == Qelt::Error::kInvalidArgument;
 }
 
 Qelt::Matrix3<float> viewOf(float zoom, float dx, float dy) {

@@ -1,7 +1,7 @@
 #pragma once
 
-#include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -52,6 +52,9 @@ std::string taskName(const Qelt::ITask& task);
 
 // The matrix that scales by `zoom` and moves by (dx, dy).
 Qelt::Matrix3<float> viewOf(float zoom, float dx = 0.0f, float dy = 0.0f);
+
+// Whether a call answers false and leaves the error of a wrong argument.
+bool isRefused(const std::function<bool()>& call);
 
 // What a host sets up to draw with one drawable, which whoever derives from this makes. One at a time: the
 // observer of batches, and the GL context of a picture, belong to the process.

@@ -19,7 +19,6 @@ struct StampPicture {
   float grainX = 150.0f, grainY = 150.0f;  // what the grain's x and y are divided by, pixels
   bool grainMask = false;                  // masked by squares of paper grain, not by the stamp shapes
   bool ramp = false;                       // rim by the ramp of the vertices, else not looked at
-  float opacity = 1.0f;
 
   // The fragment's alpha, 0 where there is none.
   float alphaAt(int column, int row) const {
@@ -53,7 +52,7 @@ struct StampPicture {
       if (dist > stamp.innerRadius) smooth *= 1.0f - (dist - stamp.innerRadius) / (0.5f - stamp.innerRadius);
       alpha *= smooth;
     }
-    return std::clamp(alpha * opacity, 0.0f, 1.0f);
+    return std::clamp(alpha, 0.0f, 1.0f);
   }
 
   // The share of the pixels within `radius` (0 to 0.5, texture units) whose alpha is more than 3 of 255 off:

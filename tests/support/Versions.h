@@ -1,6 +1,9 @@
 #pragma once
 
+#include <gtest/gtest.h>
+
 #include <array>
+#include <string>
 
 namespace QeltTests {
 
@@ -17,6 +20,11 @@ inline constexpr std::array<int, 5> outlineVersions() {
 // Floats in one vertex of a stroke's batch.
 inline constexpr int strideOf(int renderingVersion) {
   return renderingVersion == 8 ? 11 : 9;
+}
+
+// The name of a test of one version.
+inline std::string versionName(const testing::TestParamInfo<int>& test) {
+  return "Version" + std::to_string(test.param);
 }
 
 }  // namespace QeltTests
