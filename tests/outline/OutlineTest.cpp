@@ -4,20 +4,13 @@
 #include <cstddef>
 #include <limits>
 #include <string>
-#include <typeinfo>
 #include <utility>
 #include <vector>
 
 #include "base/Error.h"
 #include "desktop/model/StoredStroke.h"
-#include "desktop/pencommon/PenDataManager.h"
 #include "engine/MotionEvent.h"
-#include "outline/Pencil2OutlineDrawableGLV1.h"
-#include "outline/Pencil2OutlineDrawableGLV2.h"
-#include "outline/Pencil2OutlineDrawableGLV3.h"
 #include "outline/Pencil2OutlineDrawableGLV4.h"
-#include "outline/Pencil2OutlineDrawableGLV5.h"
-#include "pen/Pencil2.h"
 #include "support/DrawableBoard.h"
 #include "support/Versions.h"
 
@@ -219,38 +212,6 @@ TEST(Outline, ScalesComeFromTheScreenAndNothingFromNowhere) {
   const MotionEvent event = board.recorded(kStroke);
   EXPECT_FALSE(orphan.DrawOutline(&event, &board.rect));
   EXPECT_EQ(orphan.getSpeedScale(), 0.0f);
-}
-
-// --- The getter ---
-
-TEST(OutlineGetter, FollowsTheVersionTable) {
-  QeltDesktop::PenDataManager data(nullptr);
-  Qelt::Pencil2 pen;
-  pen.setPenDataManager(&data);
-  const std::type_info* const types[] = {
-      &typeid(Qelt::Pencil2OutlineDrawableGLV1), &typeid(Qelt::Pencil2OutlineDrawableGLV2),
-      &typeid(Qelt::Pencil2OutlineDrawableGLV3), &typeid(Qelt::Pencil2OutlineDrawableGLV4),
-      &typeid(Qelt::Pencil2OutlineDrawableGLV5)};
-  const int expected[][2] = {{-3, 1}, {0, 1}, {1, 1}, {2, 2}, {3, 3}, {4, 4},
-                             {5, 5},  {6, 4}, {7, 4}, {8, 4}, {9, 1}};
-  for (const auto& [version, outlineVersion] : expected) {
-    pen.setVersion(version);
-    Qelt::PenOutlineDrawableGL* outline = pen.GetOutlineDrawableGL();
-    ASSERT_NE(outline, nullptr);
-    const Qelt::PenOutlineDrawableGL& made = *outline;
-    EXPECT_EQ(typeid(made), *types[outlineVersion - 1]) << version;
-    EXPECT_EQ(pen.GetOutlineDrawableGL(), outline);
-  }
-  // Versions 6 to 8 share one.
-  pen.setVersion(6);
-  pen.GetOutlineDrawableGL()->SetOutlineSize(7.0f);
-  pen.setVersion(8);
-  EXPECT_EQ(pen.GetOutlineDrawableGL()->GetOutlineSize(), 7.0f);
-  // The preview has no version.
-  Qelt::PenPreviewDrawableGL* preview = pen.GetPreviewDrawableGL();
-  ASSERT_NE(preview, nullptr);
-  pen.setVersion(2);
-  EXPECT_EQ(pen.GetPreviewDrawableGL(), preview);
 }
 
 }  // namespace
