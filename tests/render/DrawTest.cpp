@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "math/Matrix4.h"
+#include "prediction/Pencil2PredictionDrawableRT.h"
 #include "render/Pencil2StrokeDrawableRTV1.h"
 #include "render/Pencil2StrokeDrawableRTV2.h"
 #include "render/Pencil2StrokeDrawableRTV3.h"
@@ -297,10 +298,11 @@ TEST_F(RenderDrawable, DrawsNothingWithoutATileOrABatchOrOnceReleased) {
   }
 }
 
-// Stamps of 100 x 100 units, each texel on pixels of its own: grain, shape, shade, and in version 8 the rim.
-// The grain is paper, not screen: it zooms with the view.
+// Stamps of 100 x 100 units, each texel on pixels of its own: grain, mask, shade, and where a vertex has them
+// the rim and the dimming of thin stamps. `look` is that at zoom 1; a stroke's grain is paper, not screen: it
+// zooms with the view.
 template <typename RenderDrawableType>
-void expectStampsAsWorkedOut(float size, float grain, bool ramp) {
+void expectStampsAsWorkedOut(float size, const StampPicture& look, bool grainZooms = true) {
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
   QeltDesktop::CanvasLayer layer(queue, kSide, kSide);
   QeltDesktop::PenDataManager data(&queue);
@@ -314,16 +316,13 @@ void expectStampsAsWorkedOut(float size, float grain, bool ramp) {
       const Vector2<float> stamp[2] = {{60.0f, 65.0f}, {0.6f, 0.8f}};
       drawable.SetBuffer(&batch);
       drawable.AddPoint(stamp, size, 1.5f, 0.1f, tile);
-      StampPicture expected{.stamp = stampsOf(batch, ramp ? 11 : 9).at(0),
-                            .zoomX = zoom,
-                            .zoomY = zoom,
-                            .startX = 60.37f * zoom,
-                            .startY = 65.61f * zoom,
-                            .grainX = grain * zoom,
-                            .grainY = grain * zoom,
-                            .ramp = ramp};
-      if (ramp) {
-        // The dimming of thin stamps comes with the vertices.
+      StampPicture expected = look;
+      expected.stamp = stampsOf(batch, look.ramp ? 11 : 9).at(0);
+      expected.zoomX = expected.zoomY = zoom;
+      expected.startX = 60.37f * zoom;
+      expected.startY = 65.61f * zoom;
+      expected.grainX = expected.grainY = look.grainX * (grainZooms ? zoom : 1.0f);
+      if (look.ramp) {
         for (std::size_t i = 10; i < batch.size(); i += 11) batch[i] = 0.625f;
         expected.stamp.alphaByWidth = 0.625f;
       }
@@ -342,9 +341,13 @@ void expectStampsAsWorkedOut(float size, float grain, bool ramp) {
 }
 
 TEST(StampPicturesTest, AreAsWorkedOutFragmentByFragment) {
-  expectStampsAsWorkedOut<Pencil2StrokeDrawableRTV1>(100.0f, 150.0f, false);
-  expectStampsAsWorkedOut<Pencil2StrokeDrawableRTV2>(100.0f, 75.0f, false);
-  expectStampsAsWorkedOut<Pencil2StrokeDrawableRTV3>(49.5f, 75.0f, true);  // and half a pixel of margin
+  // The sizes of anti-aliased ones leave room for half a pixel of margin.
+  expectStampsAsWorkedOut<Pencil2StrokeDrawableRTV1>(100.0f, {.stamp = {}});
+  expectStampsAsWorkedOut<Pencil2StrokeDrawableRTV2>(100.0f, {.stamp = {}, .grainX = 75.0f});
+  expectStampsAsWorkedOut<Pencil2StrokeDrawableRTV3>(49.5f, {.stamp = {}, .grainX = 75.0f, .ramp = true});
+  // Kept: a prediction's stamps are masked by squares of grain, and its grain has one size on screen.
+  expectStampsAsWorkedOut<Pencil2PredictionDrawableRT>(49.5f, {.stamp = {}, .grainMask = true, .ramp = true},
+                                                       false);
 }
 
 }  // namespace
