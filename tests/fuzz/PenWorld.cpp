@@ -2,6 +2,8 @@
 
 #include <cmath>
 #include <cstring>
+#include <functional>
+#include <iterator>
 #include <string_view>
 #include <typeinfo>
 
@@ -142,51 +144,39 @@ bool PenWorld::mayDraw(const Qelt::Pen& pen) {
 }
 
 void PenWorld::change(FuzzInput& input, Qelt::Pen& pen) {
-  switch (input.pick(11)) {
-    case 0:
-      pen.SetSize(input.any());
-      break;
-    case 1:
-      pen.SetSize(0.5f + std::abs(input.usual()));
-      break;
-    case 2:
-      pen.SetColor(input.word());
-      break;
-    case 3:
-      pen.setVersion(input.flag() ? 1 + input.pick(8) : input.word());
-      break;
-    case 4:
-      pen.GetMorphable()->SetCurveEnabled(input.flag());
-      break;
-    case 5:
-      pen.GetMorphable()->SetFixedWidthEnabled(input.flag());
-      pen.GetMorphable()->SetFixedWidth(input.any());
-      break;
-    case 6:
-      pen.SetScreenResolution(input.word(), input.word());
-      break;
-    case 7: {
-      const char text[] = {static_cast<char>(input.byte()), ';', '\0'};
-      const Qelt::String setting(text);
-      pen.SetAdvancedSetting(input.flag() ? &setting : nullptr);
-      break;
-    }
-    case 8:
-      pen.SetParticleDensity(input.word());
-      pen.SetParticleSize(input.any());
-      pen.SetRenderingLevel(input.word());
-      pen.SetEnhancedAntiAlias(input.flag());
-      break;
-    case 9: {
-      Qelt::PenGLDataManager* const choices[] = {&mData, &mQueueless, nullptr};
-      pen.setPenDataManager(choices[input.pick(3)]);
-      break;
-    }
-    default:
-      pen.GetMorphable()->SetCurveEnabled(true);
-      pen.setPenDataManager(&mData);
-      break;
-  }
+  Qelt::IPenMorphable& morphing = *pen.GetMorphable();
+  const std::function<void()> changes[] = {
+      [&] { pen.SetSize(input.any()); },
+      [&] { pen.SetSize(0.5f + std::abs(input.usual())); },
+      [&] { pen.SetColor(input.word()); },
+      [&] { pen.setVersion(input.flag() ? 1 + input.pick(8) : input.word()); },
+      [&] { morphing.SetCurveEnabled(input.flag()); },
+      [&] {
+        morphing.SetFixedWidthEnabled(input.flag());
+        morphing.SetFixedWidth(input.any());
+      },
+      [&] { pen.SetScreenResolution(input.word(), input.word()); },
+      [&] {
+        const char text[] = {static_cast<char>(input.byte()), ';', '\0'};
+        const Qelt::String setting(text);
+        pen.SetAdvancedSetting(input.flag() ? &setting : nullptr);
+      },
+      [&] {
+        pen.SetParticleDensity(input.word());
+        pen.SetParticleSize(input.any());
+        pen.SetRenderingLevel(input.word());
+        pen.SetEnhancedAntiAlias(input.flag());
+      },
+      [&] {
+        Qelt::PenGLDataManager* const choices[] = {&mData, &mQueueless, nullptr};
+        pen.setPenDataManager(choices[input.pick(3)]);
+      },
+      [&] {
+        morphing.SetCurveEnabled(true);
+        pen.setPenDataManager(&mData);
+      },
+  };
+  changes[input.pick(static_cast<int>(std::size(changes)))]();
 }
 
 void PenWorld::ask(FuzzInput& input, Qelt::Pen& pen) {
