@@ -57,13 +57,14 @@ class PlainGL : public Qelt::PenDrawableGL {
 TEST(Drawables, OfACanvasWithoutALayerPrepareNothingAndOutliveWhatIsQueued) {
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
   PenCanvas canvas(&queue, nullptr);
+  int posts = 0;
+  queue.onAccepted = [&](const Qelt::ITask&) { ++posts; };
   for (RenderQueue* const managersQueue : {&queue, static_cast<RenderQueue*>(nullptr)}) {
     PenDataManager manager(managersQueue);
     Notes notes;
-    int posts = 0;
-    queue.onAccepted = [&](const Qelt::ITask&) { ++posts; };
     {
       PlainGL drawable(&manager, new NotingRT(notes));
+      posts = 0;
       drawable.SetCanvas(&canvas);
       EXPECT_EQ(drawable.GetCanvas(), &canvas);
       drawable.SetCanvas(nullptr);
