@@ -107,6 +107,16 @@ TEST_F(Guards, LoseNothingToARefusal) {
   EXPECT_EQ(liveAllocations(), before);
 }
 
+TEST_F(Guards, StayInertWithoutMemoryForTheBatch) {
+  if (!countsAllocations()) GTEST_SKIP() << "allocations are the sanitizer's";
+  {
+    const FailingAllocation first(0);
+    const Pencil2V8ReturnCallback guard(&drawable, &canvas, &unclaimed);
+    EXPECT_EQ(guard.buffer(), nullptr);
+  }
+  EXPECT_THAT(posted(), IsEmpty());
+}
+
 TEST_F(Guards, OfACachedBatchBorrowIt) {
   std::vector<float> cached(54, 1.0f);
   // Whether it was handed over.
