@@ -102,6 +102,15 @@ class Desk {
   std::unique_ptr<Qelt::Pen> mPen;
 };
 
+// Whether the library really went after it was loaded and drew a stroke.
+bool drawsAndGoes(RenderQueue& queue, QeltDesktop::CanvasLayer* layer) {
+  {
+    const Loaded library(QELT_PLUGIN_PATH);
+    Desk(library, queue, layer).stroke();
+  }
+  return !Loaded::isThere(QELT_PLUGIN_PATH);
+}
+
 // A copy of the library under another name, for as long as this lives.
 class Copy {
  public:
@@ -145,12 +154,7 @@ TEST(Loading, AThousandTimesLeavesNothingBehind) {
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
   long early = 0;
   for (int i = 0; i < kTimes; ++i) {
-    {
-      const Loaded library(QELT_PLUGIN_PATH);
-      Desk desk(library, queue, nullptr);
-      desk.stroke();
-    }
-    ASSERT_FALSE(Loaded::isThere(QELT_PLUGIN_PATH)) << "still loaded after " << i + 1;
+    ASSERT_TRUE(drawsAndGoes(queue, nullptr)) << "still loaded after " << i + 1;
     log.take();
     if (i == 4) early = AllocationGate::allBlocks();
   }
@@ -164,12 +168,7 @@ TEST(Loading, WithAPictureLeavesNoShaderOfTheLibraryBehind) {
   std::vector<std::uint8_t> first;
   for (int i = 0; i < 10; ++i) {
     layer.clear();
-    {
-      const Loaded library(QELT_PLUGIN_PATH);
-      Desk desk(library, queue, &layer);
-      desk.stroke();
-    }
-    ASSERT_FALSE(Loaded::isThere(QELT_PLUGIN_PATH));
+    ASSERT_TRUE(drawsAndGoes(queue, &layer));
     // Nothing that is restored may be the library's.
     queue.loseContext();
     queue.restoreContext();
