@@ -70,6 +70,10 @@ class QuadSource {
     const double slopeX = u(), slopeY = u(), first = u(), second = u();
     return place(first * slopeX, first * slopeY, second * slopeX, second * slopeY);
   }
+  Quad gentle() {
+    const double bend = 0.2 * u();
+    return place(0.3, 0.3 + bend, 0.6 - bend, 0.6);
+  }
   // Of the three points the first two, the last two, the outer two or all are one.
   Quad withDoubledPoints() {
     const double x = u(), y = u();
@@ -132,6 +136,7 @@ TEST(SmPath, FollowsAnyQuadraticWithinTheTolerancesThatFloatsAllow) {
       expectExact(source.wild(), position, length);
       expectExact(source.nearlyBackAndForth(), position, length);
       expectExact(source.onALine(), position, length);
+      expectExact(source.gentle(), position, length);
       expectExact(source.withDoubledPoints(), position, length);
     }
   }
