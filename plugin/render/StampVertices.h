@@ -45,8 +45,8 @@ inline StampExtent squareExtent(float width) {
 }
 
 // A square of the given half width, with a margin of half a device pixel for the rim. A stamp thinner than
-// half a pixel is widened to that and dimmed in proportion. `inverseScale`: stroke units a device pixel,
-// positive.
+// half a pixel is widened to that and dimmed in proportion; what has no width left to widen is invisible.
+// `inverseScale`: stroke units a device pixel, positive.
 inline StampExtent antialiasedExtent(float halfWidth, Vector2<float> inverseScale) {
   float a = halfWidth / inverseScale.x;
   float b = halfWidth / inverseScale.y;
@@ -57,6 +57,8 @@ inline StampExtent antialiasedExtent(float halfWidth, Vector2<float> inverseScal
     alphaByWidth = 1.0f / k;
     a *= k;
     b *= k;
+    // A stroke begun at size 0 grows from nothing.
+    if (!std::isfinite(a) || !std::isfinite(b)) return {inverseScale.x, inverseScale.y, 0.0f, 0.0f};
   }
   a += 0.5f;
   b += 0.5f;

@@ -67,6 +67,23 @@ TEST(OutlinePicture, OnlyARimIsLeftInTheOutlinesColour) {
   }
 }
 
+// Kept: the colour is not queued with the stamps.
+TEST(OutlinePicture, AnOutlineThatStillWaitsTakesTheNewestColour) {
+  OutlineBoard board({.version = 4, .size = 30.0f, .width = kSide, .height = kSide});
+  for (const unsigned int color : {0xFFFF0000u, 0xFF0000FFu}) {
+    board.drawable->SetOutlineSize(6.0f);
+    board.drawable->SetOutlineColor(static_cast<int>(color));
+    board.outline({{color == 0xFFFF0000u ? 30.0f : 90.0f, 60.0f}});
+  }
+  int inked = 0;
+  const std::vector<std::uint8_t> pixels = board.pixels();
+  for (std::size_t i = 0; i < pixels.size(); i += 4) {
+    ASSERT_EQ(pixels[i], 0) << "red";
+    inked += pixels[i + 2] > 0 ? 1 : 0;
+  }
+  EXPECT_GT(inked, 200);
+}
+
 // Stamps that cover each other are erased together: the rim runs round the whole stroke.
 TEST(OutlinePicture, WithoutASizeTheInsideIsErasedToNothing) {
   const std::vector<Sample> stroke = {{30.3f, 60.0f}, {90.3f, 60.0f}};

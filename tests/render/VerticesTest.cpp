@@ -27,6 +27,9 @@ TEST(AntialiasedQuadTest, AddsHalfADevicePixelAndWidensThinStampsAndDimsThem) {
       // 0.5 units are 1 pixel in x and 0.25 in y. The thinner axis decides: k = 2, so a' = 2.5 and b' = 1.
       {0.5f, {0.5f, 2.0f}, 1.25f, 2.0f, 1.5f / 2.5f * 0.5f, 0.5f},
       {0.5f, {2.0f, 0.5f}, 2.0f, 1.25f, 1.5f / 2.5f * 0.5f, 0.5f},
+      // Nothing, and next to nothing, cannot be widened: as small as a stamp gets, and invisible.
+      {0.0f, {1.0f, 2.0f}, 1.0f, 2.0f, 0.0f, 0.0f},
+      {1e-40f, {1.0f, 1.0f}, 1.0f, 1.0f, 0.0f, 0.0f},
   };
   for (const auto& [radius, scale, halfWidth, halfHeight, innerRadius, alphaByWidth] : cases) {
     SCOPED_TRACE(testing::Message() << radius << " at " << scale.x << ", " << scale.y);

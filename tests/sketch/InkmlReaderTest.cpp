@@ -263,6 +263,7 @@ TEST(InkmlReader, RefusesWhatIsMalformedWithFileLineAndValue) {
       {trace("1 2,"), "2: nothing follows the last comma"},
       {trace("'1'2"), "2: a difference needs a value before it: '1'2"},
       {trace("* 2"), "2: nothing before it to repeat: *"},
+      {trace("\n? 10, 20 20"), "3: point without a place: ? 10"},
       {trace("1 T"), "2: not a number: T"},
       {trace("1 2<br/>"), "2: element that a trace cannot hold: br"},
       {format(R"(<channel name="X"/>)"), "1: traceFormat without channel: Y"},

@@ -327,7 +327,7 @@ TEST_F(Program, SaysInOneLineWhatCannotBeDoneAndLeavesAnOlderFileAlone) {
     EXPECT_NE(ran.err.find(why), std::string::npos) << ran.err;
     EXPECT_EQ(ran.out, "");
   };
-  expectRefused("draw '" + ink + "' --zoom 1e6 -o '" + older + "'", "too large");
+  expectRefused("draw '" + ink + "' --zoom 1e6 -o '" + older + "'", ink + ": the picture is too large");
   EXPECT_EQ(contentsOf(older), "older");
   expectRefused("draw '" + ink + "' --predict 3 --rendering-version 7 -o '" + path("no.png").string() + "'",
                 "the pen has no prediction drawable in rendering version 7");
@@ -335,6 +335,8 @@ TEST_F(Program, SaysInOneLineWhatCannotBeDoneAndLeavesAnOlderFileAlone) {
   expectRefused("draw '" + path("none.inkml").string() + "' -o '" + path("no.png").string() + "'", "");
   expectRefused("draw '" + ink + "' -o '" + path("no/folder/a.png").string() + "'", "");
   expectRefused("draw '" + ink + "' -o '" + path("").string() + "'", "");
+  expectRefused("trace '" + ink + "' -o '" + ink + "'", "it is the page to read");
+  EXPECT_EQ(run("trace '" + ink + "' -o -").status, 0);
   expectRefused("draw '" + ink + "' -o /dev/full", "");
   expectRefused("trace '" + ink + "' -o /dev/full", "");
   EXPECT_TRUE(fs::exists("/dev/full"));
@@ -350,6 +352,9 @@ TEST_F(Program, SaysInOneLineWhatCannotBeDoneAndLeavesAnOlderFileAlone) {
 TEST_F(Program, TellsWrongUsageFromHelp) {
   EXPECT_EQ(run("draw").status, 2);
   EXPECT_EQ(run("trace -o - --batch none").status, 2);
+  const Ran unknown = run("sketch");
+  EXPECT_EQ(unknown.status, 2);
+  EXPECT_NE(unknown.err.find("'sketch'"), std::string::npos);
   const Ran help = run("--help");
   EXPECT_EQ(help.status, 0);
   EXPECT_EQ(help.err, "");

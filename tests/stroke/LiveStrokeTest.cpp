@@ -223,13 +223,15 @@ TEST_P(LiveStroke, PlacesNothingAtASizeThatIsNoneAndFiniteStampsOnceItIsSensible
       EXPECT_THAT(board.takeStamps(), IsEmpty());
     }
   }
-  DrawingBoard board({.version = version, .size = kNaN});
-  board.down(kStroke[0]);
-  board.settings.size = 6.0f;
-  board.move({kStroke.begin() + 1, kStroke.end()});
-  const std::vector<float> placed = board.takeFloats();
-  EXPECT_THAT(placed, Not(IsEmpty()));
-  for (const float value : placed) ASSERT_TRUE(std::isfinite(value));
+  for (const float size : {0.0f, -3.0f, kNaN}) {
+    DrawingBoard board({.version = version, .size = size});
+    board.down(kStroke[0]);
+    board.settings.size = 6.0f;
+    board.move({kStroke.begin() + 1, kStroke.end()});
+    const std::vector<float> placed = board.takeFloats();
+    EXPECT_THAT(placed, Not(IsEmpty()));
+    for (const float value : placed) ASSERT_TRUE(std::isfinite(value)) << "begun at size " << size;
+  }
 }
 
 TEST_P(LiveStroke, EndsOnHugeCoordinates) {
