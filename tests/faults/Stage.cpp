@@ -12,6 +12,7 @@
 #include "pencommon/PenPredictionDrawableGL.h"
 #include "pencommon/PenPreviewDrawableGL.h"
 #include "pencommon/PenStrokeDataManager.h"
+#include "support/Board.h"
 
 namespace QeltTests {
 
@@ -36,17 +37,7 @@ std::vector<Sample> samples() {
 }
 
 MotionEvent eventOf(int action, const std::vector<Sample>& from, std::size_t begin, std::size_t end) {
-  const Qelt::PointerProperties pointer{0, Qelt::kToolStylus};
-  const auto coords = [&](std::size_t i) {
-    return Qelt::PointerCoords{from[i].x, from[i].y, from[i].pressure, from[i].tilt, from[i].orientation};
-  };
-  const Qelt::PointerCoords first = coords(begin);
-  MotionEvent event(0, 4, action, 1, &pointer, &first, 0, Qelt::kSourceStylus, 0);
-  for (std::size_t i = begin + 1; i < end; ++i) {
-    const Qelt::PointerCoords next = coords(i);
-    event.AddBatch(4 * static_cast<std::int64_t>(i), &next);
-  }
-  return event;
+  return motionEvent(action, {from.data() + begin, from.data() + end});
 }
 
 // A whole stroke in one event's history.
