@@ -10,9 +10,9 @@
 #include "render/Fakes.h"
 #include "render/PenGLRenderMsg.h"
 #include "render/UnclaimedBatch.h"
-#include "support/DrawableBoard.h"
 #include "stroke/StrokeGuards.h"
 #include "support/Allocations.h"
+#include "support/DrawableBoard.h"
 
 namespace QeltTests {
 namespace {
