@@ -1,8 +1,10 @@
 #include "gl/ManagedObject.h"
 
 #include <algorithm>
+#include <cstddef>
 #include <exception>
 #include <mutex>
+#include <new>
 #include <string>
 #include <vector>
 
@@ -22,9 +24,10 @@ struct Registry {
   std::vector<Entry> entries;
 };
 
-// Never destroyed: objects with static lifetime still leave it at exit.
+// Never destroyed: objects with static lifetime still leave it at exit. In place: to leave it takes no memory.
 Registry& registry() {
-  static Registry* const instance = new Registry;
+  alignas(Registry) static std::byte place[sizeof(Registry)];
+  static Registry* const instance = new (place) Registry;
   return *instance;
 }
 
