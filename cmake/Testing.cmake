@@ -5,11 +5,12 @@ include(GoogleTest)
 # All that ThreadSanitizer is asked about.
 add_custom_target(qelt_threaded_tests)
 
-# qelt_add_tests(TARGET SOURCES ... [LIBRARIES ...] [LABEL ...]): one executable of GoogleTest cases, each of
-# them a test of ctest's. The label "threaded" marks what ./check runs under ThreadSanitizer. Under an emulator
-# or a sanitizer, where starting a program takes longer than most cases, one test of ctest's runs them all.
+# qelt_add_tests(TARGET SOURCES ... [LIBRARIES ...] [LABEL ...] [SHARDS N]): one executable of GoogleTest
+# cases, each of them a test of ctest's. The label "threaded" marks what ./check runs under ThreadSanitizer.
+# Under an emulator or a sanitizer, where starting a program takes longer than most cases, one test of ctest's
+# runs them all, or SHARDS of them share the cases.
 function(qelt_add_tests target)
-  cmake_parse_arguments(PARSE_ARGV 1 arg "" "LABEL" "SOURCES;LIBRARIES")
+  cmake_parse_arguments(PARSE_ARGV 1 arg "" "LABEL;SHARDS" "SOURCES;LIBRARIES")
   if(NOT arg_LABEL)
     set(arg_LABEL single)
   endif()
@@ -21,8 +22,19 @@ function(qelt_add_tests target)
   # A test that needs a GL context takes the software renderer; a loaded machine may need minutes to start it.
   set(environment "EGL_PLATFORM=surfaceless")
   if(CMAKE_CROSSCOMPILING_EMULATOR OR QELT_SANITIZE)
-    add_test(NAME ${target} COMMAND ${target})
-    set_tests_properties(${target} PROPERTIES TIMEOUT 900 LABELS ${arg_LABEL} ENVIRONMENT ${environment})
+    if(NOT arg_SHARDS)
+      set(arg_SHARDS 1)
+    endif()
+    foreach(shard RANGE 1 ${arg_SHARDS})
+      math(EXPR index "${shard} - 1")
+      set(name ${target})
+      if(arg_SHARDS GREATER 1)
+        string(APPEND name .${shard})
+      endif()
+      add_test(NAME ${name} COMMAND ${target})
+      set_tests_properties(${name} PROPERTIES TIMEOUT 900 LABELS ${arg_LABEL}
+        ENVIRONMENT "${environment};GTEST_TOTAL_SHARDS=${arg_SHARDS};GTEST_SHARD_INDEX=${index}")
+    endforeach()
   else()
     gtest_discover_tests(${target}
       NO_PRETTY_VALUES

@@ -24,7 +24,7 @@ struct Registry {
   std::vector<Entry> entries;
 };
 
-// Never destroyed: objects with static lifetime still leave it at exit. In place: to leave it takes no memory.
+// Never destroyed: objects with static lifetime still leave it at exit. In place: leaving takes no memory.
 Registry& registry() {
   alignas(Registry) static std::byte place[sizeof(Registry)];
   static Registry* const instance = new (place) Registry;
