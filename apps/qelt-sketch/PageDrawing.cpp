@@ -34,8 +34,7 @@ struct PixelSize {
   int width, height;
 };
 
-// `page` says where the size comes from.
-PixelSize pixelSizeOf(const PageLayout& layout, const std::string& page) {
+PixelSize pixelSizeOf(const PageLayout& layout, const Options& options) {
   const double width = pixelsFor(layout.width);
   const double height = pixelsFor(layout.height);
   // Not a single comparison holds for a size that is not a number.
@@ -45,7 +44,7 @@ PixelSize pixelSizeOf(const PageLayout& layout, const std::string& page) {
   std::array<char, 128> text{};
   std::snprintf(text.data(), text.size(), ": the picture is too large to draw: %.6g x %.6g pixels", width,
                 height);
-  throw Refusal(page + text.data());
+  throw Refusal((options.page ? "--page" : inputPath(options)) + text.data());
 }
 
 // A layer and the view of the page that a drawable has of it.
@@ -136,7 +135,7 @@ float largestPenSize(const PluginLibrary& plugin, RenderQueue& queue, const Page
 
 Picture drawPage(const PluginLibrary& plugin, RenderQueue& queue, const Page& page, const Options& options,
                  const PageLayout& layout, const DrawableSet& drawables, Progress& progress) {
-  const PixelSize size = pixelSizeOf(layout, options.page ? "--page" : inputPath(options));
+  const PixelSize size = pixelSizeOf(layout, options);
   Drawing drawing(queue, size, layout, drawables, progress);
   {
     PenSession session(plugin, queue, options);

@@ -13,6 +13,7 @@
 #include "math/Matrix3.h"
 #include "math/Matrix4.h"
 #include "pencommon/PenStrokeDrawableRT.h"
+#include "support/FakeLayer.h"
 
 namespace QeltTests {
 
@@ -34,38 +35,6 @@ class FakeQueue : public Qelt::IGLMsgQueue {
 
   std::function<bool(const Qelt::ITask&)> refuses;
   std::vector<std::unique_ptr<Qelt::ITask>> tasks;
-};
-
-// One of a row of tiles, 64 pixels each.
-class FakeTile : public Qelt::ISPSubBitmap {
- public:
-  explicit FakeTile(int left) : mX(left) {}
-  int GetX() const override { return mX; }
-  int GetY() const override { return 0; }
-  int GetWidth() const override { return 64; }
-  int GetHeight() const override { return 64; }
-  const Qelt::Matrix4<float>& GetProjection() const override { return mProjection; }
-  void BeginRender(int) override {}
-  void EndRender(int) override {}
-
- private:
-  int mX;
-  Qelt::Matrix4<float> mProjection;
-};
-
-class FakeLayer : public Qelt::ISPLayer, public Qelt::ISPBitmap {
- public:
-  Qelt::ISPBitmap* GetBitmap() override { return hasBitmap ? this : nullptr; }
-  int GetWidth() const override { return 0; }
-  int GetHeight() const override { return 0; }
-  Qelt::ISPTexture* GetTexture() override { return nullptr; }
-  void SetDebugName(const char*) override {}
-  void SetPixels(const void*, int, int) override {}
-  int GetTileCount() const override { return static_cast<int>(tiles.size()); }
-  Qelt::ISPSubBitmap* GetSubBitmap(int index) override { return &tiles[static_cast<std::size_t>(index)]; }
-
-  std::vector<FakeTile> tiles{FakeTile(0)};
-  bool hasBitmap = true;
 };
 
 class FakeCanvas : public Qelt::ISPPenCanvas {

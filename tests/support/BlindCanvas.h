@@ -1,7 +1,7 @@
 #pragma once
 
 #include "desktop/graphics/PenCanvas.h"
-#include "support/BlindLayer.h"
+#include "support/FakeLayer.h"
 
 namespace QeltTests {
 
@@ -12,7 +12,7 @@ class BlindCanvas final : public QeltDesktop::PenCanvas {
   Qelt::ISPLayer* GetLayer() override { return layer() != nullptr ? PenCanvas::GetLayer() : &mBlindLayer; }
 
  private:
-  BlindLayer mBlindLayer;
+  FakeLayer mBlindLayer{FakeTile(0, 4096)};
 };
 
 }  // namespace QeltTests
