@@ -66,7 +66,8 @@ class QELT_HOST_API PenStrokeDataManager {
   // in use goes with its last use.
   void CreateStrokeData(int runtimeHandle);
   void DropStrokeData(int runtimeHandle);
-  // Chosen here: the inverse scale of the current view, recorded into points as they are stored.
+  // Chosen here: the inverse scale of the view that the calling thread draws for, recorded into points as it
+  // stores them. Each thread has its own, (1, 1) at first: pens on two threads draw for two views.
   void SetInverseScale(Vector2<float> inverseScale);
   Vector2<float> GetInverseScale();
 
@@ -77,7 +78,6 @@ class QELT_HOST_API PenStrokeDataManager {
   struct Entry;
   CriticalSection mLock;
   std::map<int, Entry*> mEntries;
-  Vector2<float> mInverseScale{1.0f, 1.0f};
 };
 
 }  // namespace Qelt

@@ -22,24 +22,24 @@ float inverseLength(const float* column) {
 
 }  // namespace
 
-PenCanvas::PenCanvas(Qelt::IGLMsgQueue* queue, CanvasLayer* layer) : mQueue(queue), mLayer(layer) {
-  setMatrix(mMatrix);
-}
+PenCanvas::PenCanvas(Qelt::IGLMsgQueue* queue, CanvasLayer* layer) : mQueue(queue), mLayer(layer) {}
 
 PenCanvas::~PenCanvas() = default;
 
 void PenCanvas::setMatrix(const Qelt::Matrix3<float>& matrix) {
   mMatrix = matrix;
   const float* const elements = mMatrix.data();
-  Qelt::PenStrokeDataManager::GetInstance()->SetInverseScale(
-      {inverseLength(elements), inverseLength(elements + 3)});
+  mInverseScale = {inverseLength(elements), inverseLength(elements + 3)};
 }
 
 Qelt::IGLMsgQueue* PenCanvas::GetMsgQueue() {
   return mQueue;
 }
 
+// A pen asks when it draws. Whichever canvas was asked last is the one that the drawings stored from here on
+// were computed for.
 const Qelt::Matrix3<float>& PenCanvas::GetMatrix() {
+  Qelt::PenStrokeDataManager::GetInstance()->SetInverseScale(mInverseScale);
   return mMatrix;
 }
 

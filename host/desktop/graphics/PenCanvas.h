@@ -1,6 +1,7 @@
 #pragma once
 
 #include "base/HostApi.h"
+#include "base/Vector.h"
 #include "graphics/ISPPenCanvas.h"
 #include "math/Matrix3.h"
 
@@ -15,12 +16,12 @@ class QELT_HOST_API PenCanvas : public Qelt::ISPPenCanvas {
   PenCanvas(Qelt::IGLMsgQueue* queue, CanvasLayer* layer);
   ~PenCanvas() override;
 
-  // Stroke units to canvas pixels, column-major; the identity at first. Also tells the cache of stored
-  // strokes the scale that their drawings are computed at from now on.
+  // Stroke units to canvas pixels, column-major; the identity at first.
   void setMatrix(const Qelt::Matrix3<float>& matrix);
   CanvasLayer* layer() const { return mLayer; }
 
   Qelt::IGLMsgQueue* GetMsgQueue() override;
+  // Also tells the cache of stored strokes that this is the view they are drawn for now.
   const Qelt::Matrix3<float>& GetMatrix() override;
   Qelt::ISPLayer* GetLayer() override;
   void BeginTile(int index) override;
@@ -30,6 +31,7 @@ class QELT_HOST_API PenCanvas : public Qelt::ISPPenCanvas {
   Qelt::IGLMsgQueue* mQueue;
   CanvasLayer* mLayer;
   Qelt::Matrix3<float> mMatrix;
+  Qelt::Vector2<float> mInverseScale{1.0f, 1.0f};  // of mMatrix: stroke units a pixel in x and y
 };
 
 }  // namespace QeltDesktop

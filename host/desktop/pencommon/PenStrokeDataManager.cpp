@@ -12,6 +12,8 @@ bool isSameScale(float a, float b) {
   return a == b || std::abs(a - b) < 1e-6f * std::abs(b);
 }
 
+thread_local Vector2<float> tInverseScale{1.0f, 1.0f};
+
 }  // namespace
 
 PenStrokePointData::PenStrokePointData() = default;
@@ -129,13 +131,11 @@ void PenStrokeDataManager::DropStrokeData(int runtimeHandle) {
 }
 
 void PenStrokeDataManager::SetInverseScale(Vector2<float> inverseScale) {
-  const AutoCriticalSection guard(&mLock);
-  mInverseScale = inverseScale;
+  tInverseScale = inverseScale;
 }
 
 Vector2<float> PenStrokeDataManager::GetInverseScale() {
-  const AutoCriticalSection guard(&mLock);
-  return mInverseScale;
+  return tInverseScale;
 }
 
 }  // namespace Qelt
