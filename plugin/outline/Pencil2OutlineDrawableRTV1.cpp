@@ -16,6 +16,7 @@
 #include "math/Matrix4.h"
 #include "pencommon/PenGLDataManager.h"
 #include "render/DrawablePosts.h"
+#include "render/ScopeExit.h"
 #include "shaders/Pencil2OutlineShader.h"
 #include "shaders/ShaderRegistry.h"
 
@@ -65,10 +66,19 @@ void Pencil2OutlineDrawableRTV1::SetInverseScale(const Vector2<float>& inverseSc
 }
 
 void Pencil2OutlineDrawableRTV1::Init() {
+  if (mReleased) return;
+  prepare();
+  ManagedObject::Register(this);
+}
+
+void Pencil2OutlineDrawableRTV1::prepare() {
   if (mInnerObject == nullptr) mInnerObject = createStampObject();
   if (mOuterObject == nullptr) mOuterObject = createStampObject();
-  if (mShader == nullptr) mShader = ShaderManager::GetInstance()->GetShader<Pencil2OutlineShader>();
-  ManagedObject::Register(this);
+  if (mShader == nullptr) {
+    mShader = ShaderManager::GetInstance()->GetShader<Pencil2OutlineShader>();
+  } else if (!mShader->isLinked()) {
+    mShader->link();
+  }
 }
 
 void Pencil2OutlineDrawableRTV1::Release() {
@@ -79,38 +89,45 @@ void Pencil2OutlineDrawableRTV1::Release() {
   if (mOuterObject != nullptr) std::exchange(mOuterObject, nullptr)->release();
   SPGraphicsFactory::ReleaseBitmap(std::exchange(mPointTextureBitmap, nullptr));
   mHasPendingData = false;
+  mReleased = true;
 }
 
-// Kept: the point texture is not drawn again; what a bitmap that was drawn into holds after a context loss is
-// the host's affair.
+// Kept: a point texture that was drawn is not drawn again; what a bitmap that was drawn into holds after a
+// context loss is the host's affair. Only what could not be made without a context is made now.
 void Pencil2OutlineDrawableRTV1::RestoreGLObject() {
   log("virtual void Qelt::Pencil2OutlineDrawableRTV1::RestoreGLObject()");
+  if (mReleased) return;
+  prepare();
+  buildPointTexture();
 }
 
 void Pencil2OutlineDrawableRTV1::CreatePenCanvas(int, int, IGLMsgQueue*) {
   Init();
-  if (mPointTextureBitmap == nullptr) buildPointTexture();
+  if (!mReleased) buildPointTexture();
 }
 
 // A square full of alpha: the shader only asks where there is any.
 void Pencil2OutlineDrawableRTV1::buildPointTexture() {
+  if (mPointTextureBitmap != nullptr) return;
   IGLMsgQueue* queue = queueOf(mDataManager);
-  mPointTextureBitmap = SPGraphicsFactory::CreateBitmap(queue, kPointSide, kPointSide, nullptr, false, 0);
-  if (mPointTextureBitmap == nullptr) return;
+  ISPBitmap* bitmap = SPGraphicsFactory::CreateBitmap(queue, kPointSide, kPointSide, nullptr, false, 0);
+  if (bitmap == nullptr) return;
+  // What could not be drawn whole is not kept, so that it is tried again.
+  const ScopeExit dropBitmap([this, bitmap] {
+    if (mPointTextureBitmap == nullptr) SPGraphicsFactory::ReleaseBitmap(bitmap);
+  });
   // Kept: another drawable's name.
-  mPointTextureBitmap->SetDebugName("Marker4OutlineDrawableRTV1::CreatePenCanvas mPointTextureBitmap");
-  ISPCanvas* canvas = SPGraphicsFactory::CreateCanvas(queue, mPointTextureBitmap, 0);
-  if (canvas == nullptr) {
-    SPGraphicsFactory::ReleaseBitmap(std::exchange(mPointTextureBitmap, nullptr));
-    return;
-  }
+  bitmap->SetDebugName("Marker4OutlineDrawableRTV1::CreatePenCanvas mPointTextureBitmap");
+  ISPCanvas* canvas = SPGraphicsFactory::CreateCanvas(queue, bitmap, 0);
+  if (canvas == nullptr) return;
+  const ScopeExit releaseCanvas([canvas] { SPGraphicsFactory::ReleaseCanvas(canvas); });
   canvas->Clear(0);
   SPPaint paint;
   paint.SetColor(kOpaqueBlack);
   paint.SetStyle(SPPaint::kFill);
   paint.SetAntiAlias(true);
   canvas->DrawShape(0.0f, 0.0f, static_cast<float>(kPointSide), paint);
-  SPGraphicsFactory::ReleaseCanvas(canvas);
+  mPointTextureBitmap = bitmap;
 }
 
 void Pencil2OutlineDrawableRTV1::Clear() {
@@ -145,6 +162,7 @@ void Pencil2OutlineDrawableRTV1::Draw(ISPSubBitmap* target, Matrix4<float>& matr
   OpenGLRenderer::enableState(GL_BLEND);
   OpenGLRenderer::setBlendFuncFactors(GL_SRC_ALPHA, GL_ONE_MINUS_SRC_ALPHA, GL_ONE, GL_ONE_MINUS_SRC_ALPHA);
   target->BeginRender(0);
+  const ScopeExit endRender([target] { target->EndRender(0); });
   const Matrix4<float> projection = target->GetProjection() * matrix;
   drawPass(projection, colorOf(GetOutlineColor()), 0.0f, mOuterObject);
 
@@ -153,7 +171,6 @@ void Pencil2OutlineDrawableRTV1::Draw(ISPSubBitmap* target, Matrix4<float>& matr
   drawPass(projection, {}, 1.0f, mInnerObject);
 
   OpenGLRenderer::discardFramebuffer(kDepthAndStencil);
-  target->EndRender(0);
 }
 
 void Pencil2OutlineDrawableRTV1::drawPass(const Matrix4<float>& projection, const Vector4<float>& color,

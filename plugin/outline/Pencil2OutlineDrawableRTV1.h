@@ -1,5 +1,6 @@
 #pragma once
 
+#include <algorithm>
 #include <cstddef>
 #include <vector>
 
@@ -18,6 +19,9 @@ class Pencil2OutlineShader;
 // as the stamp, one larger by the outline size. The large ones are drawn in the outline's colour, then the
 // small ones erase, so that a rim is left.
 //
+// What could not be made, for want of memory or of a GL context, is tried again at the next CreatePenCanvas
+// and when the context is restored. Once released, a drawable never draws again; a host makes a new one.
+//
 // Main thread: AddPoint, Appender, SetInverseScale, unclaimedBatch. Render thread: the rest.
 class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
  public:
@@ -33,7 +37,7 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
   class Appender {
    public:
     // Makes room for so many stamps, so that appending them does not allocate. Throws std::bad_alloc.
-    Appender(Pencil2OutlineDrawableRTV1& renderer, std::size_t stamps)
+    Appender(Pencil2OutlineDrawableRTV1& renderer, int stamps)
         : mInner(renderer.mInnerWriteBuffer, stamps),
           mOuter(renderer.mOuterWriteBuffer, stamps),
           mOutlineSize(renderer.GetOutlineSize()) {}
@@ -42,8 +46,8 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
       const StampLook look{0.0f, tiltFactor, 0.0f, point[1]};
       StampExtent extent = squareExtent(size);
       mInner.add(stampQuad(point[0], extent), look);
-      extent.x += mOutlineSize;
-      extent.y += mOutlineSize;
+      extent.x = std::max(extent.x + mOutlineSize, 0.0f);
+      extent.y = std::max(extent.y + mOutlineSize, 0.0f);
       mOuter.add(stampQuad(point[0], extent), look);
     }
 
@@ -76,6 +80,7 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
   void SetInverseScale(const Vector2<float>& inverseScale);
 
  private:
+  void prepare();
   void buildPointTexture();
   void drawPass(const Matrix4<float>& projection, const Vector4<float>& color, float outlineCase,
                 GraphicsObject* object);
@@ -84,6 +89,7 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
   GraphicsObject* mOuterObject = nullptr;  // enlarged by the outline size
   ISPBitmap* mPointTextureBitmap = nullptr;
   Pencil2OutlineShader* mShader = nullptr;
+  bool mReleased = false;
   Vector2<float> mInverseScale;
   UnclaimedBatch mUnclaimed;
 };

@@ -19,7 +19,7 @@ namespace Qelt {
 // calling operation; main thread. `Drawable` is the host's render drawable class, whose `SetBuffer` and
 // `SendDataToGPU` take `Buffers` vectors.
 //
-// A buffer that could not be allocated leaves the guard inert. What the queue refuses neither leaks nor
+// A first buffer that could not be allocated leaves the guard inert. What the queue refuses neither leaks nor
 // dangles: see UnclaimedBatch.
 template <typename Drawable, std::size_t Buffers = 1>
 class BatchGuard {
@@ -27,7 +27,10 @@ class BatchGuard {
   // From here on every stamp is appended to the guard's buffers. `unclaimed` is the render drawable's.
   BatchGuard(Drawable* drawable, ISPPenCanvas* canvas, UnclaimedBatch* unclaimed) noexcept
       : mDrawable(drawable), mCanvas(canvas), mUnclaimed(unclaimed) {
-    for (auto& buffer : mBuffers) buffer = new (std::nothrow) std::vector<float>;
+    for (auto*& buffer : mBuffers) {
+      buffer = new (std::nothrow) std::vector<float>;
+      if (mBuffers[0] == nullptr) break;
+    }
     setBuffers(mBuffers);
   }
 
@@ -42,8 +45,11 @@ class BatchGuard {
  protected:
   // An exception out of a post ends the process: a batch lost half way would corrupt the next one.
   ~BatchGuard() noexcept {
-    setBuffers({});
-    if (mBuffers[0] != nullptr) handOver(mCanvas->GetMsgQueue());
+    if (mBuffers[0] != nullptr) {
+      IGLMsgQueue* queue = mCanvas->GetMsgQueue();
+      setBuffers({});
+      handOver(queue);
+    }
     for (auto* buffer : mBuffers) delete buffer;
   }
 

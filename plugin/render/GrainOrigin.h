@@ -14,15 +14,14 @@ class GrainOrigin {
     mStartPointPending = true;
   }
 
-  // Converts the start point once after each `set`.
-  void settle(const Matrix4<float>& projection, Vector4<int> viewport) {
-    if (!mStartPointPending) return;
-    transform(projection, viewport);
-    mStartPointPending = false;
-  }
+  // True from each `set` until the next `settle` that had a viewport.
+  bool isPending() const { return mStartPointPending; }
 
-  // Maps the point to clip space and from there into the viewport.
-  void transform(const Matrix4<float>& projection, Vector4<int> viewport) {
+  // Converts the start point: maps it to clip space and from there into the viewport (x, y, width, height in
+  // window pixels). Without a viewport, as while the GL context is lost, the point stays pending.
+  void settle(const Matrix4<float>& projection, Vector4<int> viewport) {
+    if (viewport.z == 0 || viewport.w == 0) return;
+    mStartPointPending = false;
     const float x = mStartPoint.x;
     const float y = mStartPoint.y;
     const float clipX = projection[0] * x + projection[4] * y + projection[12];

@@ -40,6 +40,7 @@ Pixels allocatePixels(std::size_t count) {
 }  // namespace
 
 void PatternTextures::build(IGLMsgQueue* queue, int width, int height, const char* owner) {
+  if (isReleased()) return;
   if (mPatternsTexture == nullptr) {
     mPatternsTexture = createPattern(queue, width, height, owner, "mPatternsTexture");
     if (mPatternsTexture != nullptr) {
@@ -53,7 +54,7 @@ void PatternTextures::build(IGLMsgQueue* queue, int width, int height, const cha
 }
 
 bool PatternTextures::upload(int width, int height, PointSource points) {
-  if (mReleased || width < 0 || height < 0 || width > kGrainSide || height > kGrainSide) return true;
+  if (isReleased() || width < 0 || height < 0 || width > kGrainSide || height > kGrainSide) return true;
   const int grainPixels = width * height;
   // A pattern byte becomes a word: red in memory, the other channels 0.
   Pixels grain = allocatePixels(static_cast<std::size_t>(grainPixels));
@@ -68,25 +69,24 @@ bool PatternTextures::upload(int width, int height, PointSource points) {
     shapes[i] = points == PointSource::StampShapes ? g_pointPtn[i] : g_backgroundPtn[i % kTilePixels];
   }
   if (mPointTexture != nullptr) mPointTexture->SetPixels(shapes.get(), kTileSide, kTiles * kTileSide);
-  mTexturesReady = true;
+  if (mPatternsTexture == nullptr || mPointTexture == nullptr) return false;
+  mState = State::Filled;
   return true;
 }
 
 void PatternTextures::release() {
-  if (!mReleased) {
-    SPGraphicsFactory::ReleaseBitmap(mPatternsTexture);
-    SPGraphicsFactory::ReleaseBitmap(mPointTexture);
-    mReleased = mPatternsTexture != nullptr || mPointTexture != nullptr;
-  }
-  mTexturesReady = false;
+  if (isReleased()) return;
+  SPGraphicsFactory::ReleaseBitmap(mPatternsTexture);
+  SPGraphicsFactory::ReleaseBitmap(mPointTexture);
+  mState = State::Released;
 }
 
 void PatternTextures::bindGrain(int unit) const {
-  if (mPatternsTexture != nullptr) mPatternsTexture->GetTexture()->Bind(unit);
+  mPatternsTexture->GetTexture()->Bind(unit);
 }
 
 void PatternTextures::bindPoints(int unit) const {
-  if (mPointTexture != nullptr) mPointTexture->GetTexture()->Bind(unit);
+  mPointTexture->GetTexture()->Bind(unit);
 }
 
 }  // namespace Qelt

@@ -20,8 +20,8 @@ class PatternTextures {
   // bitmaps' debug names.
   void build(IGLMsgQueue* queue, int width, int height, const char* owner);
 
-  // Uploads the pixels; of the grain the first width x height, in rows of `width`. False when memory ran out:
-  // the upload is left where it is, and `ready` as it was.
+  // Uploads the pixels; of the grain the first width x height, in rows of `width`. False when a bitmap is
+  // missing or memory ran out: the upload is left where it is, and `ready` as it was.
   bool upload(int width, int height, PointSource points);
 
   // Kept: the fields go on holding the released bitmaps, so that a later `build` creates nothing. From then
@@ -29,16 +29,19 @@ class PatternTextures {
   void release();
 
   // True after an upload, until the release.
-  bool ready() const { return mTexturesReady; }
+  bool ready() const { return mState == State::Filled; }
+  bool isReleased() const { return mState == State::Released; }
 
+  // Only while `ready`.
   void bindGrain(int unit) const;
   void bindPoints(int unit) const;
 
  private:
+  enum class State { Blank, Filled, Released };
+
   ISPBitmap* mPatternsTexture = nullptr;
   ISPBitmap* mPointTexture = nullptr;
-  bool mTexturesReady = false;
-  bool mReleased = false;
+  State mState = State::Blank;
 };
 
 }  // namespace Qelt

@@ -4,6 +4,7 @@
 #include "graphics/ISPPenCanvas.h"
 #include "math/Matrix3.h"
 #include "pencommon/PenDrawableRT.h"
+#include "render/ScopeExit.h"
 
 namespace Qelt {
 namespace {
@@ -54,6 +55,9 @@ RectF PenGLRenderMsg::getTransformedRect() const {
 
 void PenGLRenderMsg::run() {
   if (mDrawable == nullptr || mCanvas == nullptr) return;
+  // The batch is deleted by the next task but one, drawn or not, so from here on the drawable must not keep
+  // it.
+  const ScopeExit forgetBatch([this] { mDrawable->Clear(); });
   ISPLayer* layer = mCanvas->GetLayer();
   if (layer == nullptr) return;
   ISPBitmap* bitmap = layer->GetBitmap();
@@ -64,6 +68,7 @@ void PenGLRenderMsg::run() {
   const int tiles = bitmap->GetTileCount();
   for (int i = 0; i < tiles; ++i) {
     mCanvas->BeginTile(i);
+    const ScopeExit endTile([this, i] { mCanvas->EndTile(i); });
     ISPSubBitmap* tile = bitmap->GetSubBitmap(i);
     if (tile != nullptr && tileRect(*tile).IsIntersect(dirty)) {
       IReferenceBitmapSettable* reference = mDrawable->GetReferenceBitmapSettable();
@@ -73,9 +78,7 @@ void PenGLRenderMsg::run() {
       if (depthMap != nullptr && mDepthMapBitmap != nullptr) depthMap->SetDepthMapBitmap(mDepthMapBitmap);
       mDrawable->Draw(tile, mMatrix);
     }
-    mCanvas->EndTile(i);
   }
-  mDrawable->Clear();
 }
 
 }  // namespace Qelt

@@ -22,6 +22,7 @@
 #include "render/GrainOrigin.h"
 #include "render/PatternTextures.h"
 #include "render/RenderVersions.h"
+#include "render/ScopeExit.h"
 #include "render/StampVertices.h"
 #include "render/UnclaimedBatch.h"
 #include "shaders/ShaderRegistry.h"
@@ -33,7 +34,11 @@ namespace Qelt {
 // RenderVersions.h (or the preview's or the prediction's), which holds all that differs. Adds no slots to the
 // host's.
 //
-// Main thread: AddPoint, reserve, SetInverseScale, unclaimedBatch. Render thread: the rest.
+// What could not be prepared, for want of memory or of a GL context, is tried again at the next
+// CreatePenCanvas and when the context is restored. Kept: once released, a drawable never draws again,
+// whatever is called on it; a host makes a new one.
+//
+// Main thread: AddPoint, Appender, reserve, SetInverseScale, unclaimedBatch. Render thread: the rest.
 template <typename HostBase, typename Version>
 class StampRenderer : public HostBase {
   static constexpr const RenderProfile& kProfile = Version::profile;
@@ -54,7 +59,7 @@ class StampRenderer : public HostBase {
   class Appender {
    public:
     // Makes room for so many stamps, so that appending them does not allocate. Throws std::bad_alloc.
-    Appender(StampRenderer& renderer, std::size_t stamps)
+    Appender(StampRenderer& renderer, int stamps)
         : mStamps(renderer.mWriteBuffer, stamps), mInverseScale(renderer.mInverseScale) {}
 
     void AddPoint(const Vector2<float>* point, float size, float alpha, float tiltBlend, int tile) {
@@ -92,29 +97,21 @@ class StampRenderer : public HostBase {
   }
 
   // Makes room for stamps to come. Throws std::bad_alloc.
-  void reserve(std::size_t stamps) { reserveStamps(this->mWriteBuffer, stamps, kFloatsPerStamp); }
+  void reserve(int stamps) { reserveStamps(this->mWriteBuffer, stamps, kFloatsPerStamp); }
 
   UnclaimedBatch* unclaimedBatch() { return &mUnclaimed; }
 
   void Init() final {
     if (kProfile.logsSetup) log("Init()");
-    if (mGraphicsObject == nullptr) {
-      VertexDescriptor descriptor;
-      descriptor.addAttribute(AttributeType::Float, 4, -1);
-      descriptor.addAttribute(AttributeType::Float, 3, -1);
-      descriptor.addAttribute(AttributeType::Float, 2, -1);
-      if (kAntialiased) descriptor.addAttribute(AttributeType::Float, 2, -1);
-      mGraphicsObject =
-          GraphicsFactory::createGraphicsObject(1, GraphicsFactory::kTriangles, descriptor, 0, 0);
-    }
-    if (mShader == nullptr) mShader = ShaderManager::GetInstance()->GetShader<typename Version::Shader>();
-    buildTextures(kGrainSide, kGrainSide);
-    setTextures(kGrainSide, kGrainSide);
+    if (mTextures.isReleased()) return;
+    const bool complete = prepare();
     ManagedObject::Register(this);
+    mPrepared = complete;
   }
 
   void Release() final {
     log("Release()");
+    mPrepared = false;
     ManagedObject::Unregister(this);
     ShaderManager::GetInstance()->ReleaseShader(std::exchange(mShader, nullptr));
     if (mGraphicsObject != nullptr) std::exchange(mGraphicsObject, nullptr)->release();
@@ -123,13 +120,14 @@ class StampRenderer : public HostBase {
 
   void RestoreGLObject() final {
     log("RestoreGLObject()");
-    setTextures(kGrainSide, kGrainSide);
+    if (mTextures.isReleased()) return;
+    mPrepared = false;
+    mPrepared = prepare();
   }
 
   void CreatePenCanvas(int, int, IGLMsgQueue*) final {
     if (kProfile.logsSetup) log("CreatePenCanvas(int, int, Qelt::IGLMsgQueue *)");
-    // All but the first only where memory ran out, here or as the context came back.
-    if (!mTextures.ready() || !mUploaded || mGraphicsObject == nullptr || mShader == nullptr) this->Init();
+    if (!mPrepared) this->Init();
   }
 
   void buildTextures(int width, int height) {
@@ -137,14 +135,15 @@ class StampRenderer : public HostBase {
     mTextures.build(queue, width, height, kProfile.className);
   }
 
-  void setTextures(int width, int height) { mUploaded = mTextures.upload(width, height, kProfile.points); }
+  // Returns false when memory ran out.
+  bool setTextures(int width, int height) { return mTextures.upload(width, height, kProfile.points); }
 
   void Clear() final {
     this->mHasPendingData = false;
-    if (this->mRenderBuffer == nullptr) return;
+    // A cached batch is the host's, which may drop it from here on.
+    if constexpr (kProfile.hasCacheBuffer) this->mCacheBuffer = nullptr;
     // The vector itself is freed by its own task.
-    this->mRenderBuffer->clear();
-    this->mRenderBuffer = nullptr;
+    if (this->mRenderBuffer != nullptr) std::exchange(this->mRenderBuffer, nullptr)->clear();
   }
 
   void Update(bool useCacheBuffer) final {
@@ -157,13 +156,13 @@ class StampRenderer : public HostBase {
   void Draw(ISPSubBitmap* tile, Matrix4<float>& matrix) final {
     const std::vector<float>* batch = currentBatch();
     if (tile == nullptr || batch == nullptr || batch->empty()) return;
-    if (mGraphicsObject == nullptr || mShader == nullptr || !mShader->isLinked() || !mTextures.ready())
-      return;
+    if (mGraphicsObject == nullptr || !canShade() || !mTextures.ready()) return;
 
     tile->BeginRender(0);
+    const ScopeExit endRender([tile] { tile->EndRender(0); });
     const Matrix4<float> projection = tile->GetProjection() * matrix;
     // The first tile after SetStartPoint fixes the grain for the whole stroke.
-    mGrainOrigin.settle(projection, OpenGLRenderer::getViewport());
+    if (mGrainOrigin.isPending()) mGrainOrigin.settle(projection, OpenGLRenderer::getViewport());
 
     OpenGLRenderer::enableState(GL_BLEND);
     OpenGLRenderer::setBlendFuncFactors(GL_SRC_ALPHA, GL_ONE_MINUS_SRC_ALPHA, GL_ONE, GL_ONE_MINUS_SRC_ALPHA);
@@ -182,12 +181,6 @@ class StampRenderer : public HostBase {
     if constexpr (kProfile.hasOpacity) mShader->inputOpacity = this->GetOpacity();
 
     mGraphicsObject->draw(0, -1, true, 0);
-    tile->EndRender(0);
-  }
-
-  // Turns the start point into window pixels under a projection and the current viewport, at once.
-  void transformStartPoint(const Matrix4<float>& projection) {
-    mGrainOrigin.transform(projection, OpenGLRenderer::getViewport());
   }
 
   Vector2<float> grainOrigin() const { return mGrainOrigin.value(); }
@@ -213,15 +206,39 @@ class StampRenderer : public HostBase {
   // Render thread. The final class declares the public operation, so that posted tasks name it.
   void setStartPoint(float x, float y) { mGrainOrigin.set(x, y); }
 
-  // Stroke units a device pixel in x and y. Anything but two finite positive numbers counts as (1, 1).
+  // Stroke units a device pixel in x and y. Anything but two positive numbers that leave stamps finite counts
+  // as (1, 1).
   void setInverseScale(const Vector2<float>& inverseScale) {
-    const auto usable = [](float scale) { return std::isfinite(scale) && scale > 0.0f; };
+    const auto usable = [](float scale) { return scale >= 1e-30f && scale <= 1e30f; };
     mInverseScale =
         usable(inverseScale.x) && usable(inverseScale.y) ? inverseScale : Vector2<float>{1.0f, 1.0f};
   }
 
  private:
   static constexpr int kGrainSide = 150;
+
+  // Makes what is missing and fills the textures; true when all that drawing needs is there.
+  bool prepare() {
+    if (mGraphicsObject == nullptr) {
+      VertexDescriptor descriptor;
+      descriptor.addAttribute(AttributeType::Float, 4, -1);
+      descriptor.addAttribute(AttributeType::Float, 3, -1);
+      descriptor.addAttribute(AttributeType::Float, 2, -1);
+      if (kAntialiased) descriptor.addAttribute(AttributeType::Float, 2, -1);
+      mGraphicsObject =
+          GraphicsFactory::createGraphicsObject(1, GraphicsFactory::kTriangles, descriptor, 0, 0);
+    }
+    if (mShader == nullptr) {
+      mShader = ShaderManager::GetInstance()->GetShader<typename Version::Shader>();
+    } else if (!mShader->isLinked()) {
+      mShader->link();
+    }
+    buildTextures(kGrainSide, kGrainSide);
+    const bool filled = setTextures(kGrainSide, kGrainSide);
+    return filled && mGraphicsObject != nullptr && canShade();
+  }
+
+  bool canShade() const { return mShader != nullptr && mShader->isLinked(); }
 
   const std::vector<float>* currentBatch() const {
     if constexpr (kProfile.hasCacheBuffer) {
@@ -238,7 +255,7 @@ class StampRenderer : public HostBase {
   GraphicsObject* mGraphicsObject = nullptr;
   typename Version::Shader* mShader = nullptr;
   PatternTextures mTextures;
-  bool mUploaded = false;  // the last time their pixels were wanted
+  bool mPrepared = false;  // with all that drawing needs, and known to the host as a managed object
   GrainOrigin mGrainOrigin;
   Vector2<float> mInverseScale{1.0f, 1.0f};
   UnclaimedBatch mUnclaimed;

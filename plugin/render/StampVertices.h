@@ -45,8 +45,8 @@ inline StampExtent squareExtent(float width) {
 }
 
 // A square of the given half width, with a margin of half a device pixel for the rim. A stamp thinner than
-// half a pixel is widened to that and dimmed in proportion; what has no width left to widen is invisible.
-// `inverseScale`: stroke units a device pixel, positive.
+// half a pixel is widened to that and dimmed in proportion; what has no width left to widen, or does not fit
+// into a float, is invisible. `inverseScale`: stroke units a device pixel, positive.
 inline StampExtent antialiasedExtent(float halfWidth, Vector2<float> inverseScale) {
   float a = halfWidth / inverseScale.x;
   float b = halfWidth / inverseScale.y;
@@ -57,14 +57,15 @@ inline StampExtent antialiasedExtent(float halfWidth, Vector2<float> inverseScal
     alphaByWidth = 1.0f / k;
     a *= k;
     b *= k;
-    // A stroke begun at size 0 grows from nothing.
-    if (!std::isfinite(a) || !std::isfinite(b)) return {inverseScale.x, inverseScale.y, 0.0f, 0.0f};
   }
   a += 0.5f;
   b += 0.5f;
   const float m = std::max(a, b);
   const float innerRadius = (m - 1.0f) / m * 0.5f;
-  return {inverseScale.x * a, inverseScale.y * b, innerRadius, alphaByWidth};
+  const float x = inverseScale.x * a;
+  const float y = inverseScale.y * b;
+  if (!std::isfinite(x + y + innerRadius)) return {inverseScale.x, inverseScale.y, 0.0f, 0.0f};
+  return {x, y, innerRadius, alphaByWidth};
 }
 
 inline StampQuad stampQuad(Vector2<float> centre, const StampExtent& extent) {
@@ -73,9 +74,9 @@ inline StampQuad stampQuad(Vector2<float> centre, const StampExtent& extent) {
 }
 
 // Makes room for `count` stamps more, at least doubling so that a long redraw stays linear.
-inline void reserveStamps(std::vector<float>* buffer, std::size_t count, std::size_t floatsPerStamp) {
+inline void reserveStamps(std::vector<float>* buffer, int count, std::size_t floatsPerStamp) {
   if (buffer == nullptr) return;
-  const std::size_t needed = buffer->size() + count * floatsPerStamp;
+  const std::size_t needed = buffer->size() + static_cast<std::size_t>(count) * floatsPerStamp;
   if (needed > buffer->capacity()) buffer->reserve(std::max(needed, 2 * buffer->capacity()));
 }
 
@@ -128,7 +129,7 @@ class StampAppender {
  public:
   // Makes room for `stamps` of them; throws std::bad_alloc before anything is changed. Without a batch all
   // stamps are dropped.
-  StampAppender(std::vector<float>* batch, std::size_t stamps) : mBatch(batch) {
+  StampAppender(std::vector<float>* batch, int stamps) : mBatch(batch) {
     reserveStamps(batch, stamps, kFloats);
   }
   StampAppender(const StampAppender&) = delete;

@@ -40,21 +40,21 @@ class ParameterBinding {
  public:
   ParameterBinding() = default;
   // An exception out of the release ends the process.
-  ~ParameterBinding() {
-    if (mInterface != nullptr) mInterface->release();
-  }
+  ~ParameterBinding() { release(); }
   ParameterBinding(const ParameterBinding&) = delete;
   ParameterBinding& operator=(const ParameterBinding&) = delete;
 
-  // Looks the uniform up. Throws InvalidArgumentException when it has another type.
-  void bind(OpenGLShaderProgram* program, const char* name) {
+  // Looks the uniform up; returns false when the host has no interface to it. Throws InvalidArgumentException
+  // when it has another type.
+  bool bind(OpenGLShaderProgram* program, const char* name) {
+    release();
     mInterface = program->getBindingIntf(name, kBindingAny);
-    if (mInterface == nullptr) return;
+    if (mInterface == nullptr) return false;
     const BindingType found = mInterface->getType();
-    if (found == N || found == kBindingAny) return;
+    if (found == N || found == kBindingAny) return true;
     __android_log_print(kLogInfo, kLogTag, "%s: Found %d but given %d", name, static_cast<int>(found),
                         static_cast<int>(N));
-    std::exchange(mInterface, nullptr)->release();
+    release();
     throw InvalidArgumentException("ParameterBinding<>::bind - invalid parameter type!");
   }
 
@@ -68,6 +68,10 @@ class ParameterBinding {
   }
 
  private:
+  void release() {
+    if (mInterface != nullptr) std::exchange(mInterface, nullptr)->release();
+  }
+
   IParameterBinding* mInterface = nullptr;
 };
 

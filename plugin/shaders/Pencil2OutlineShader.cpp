@@ -2,12 +2,12 @@
 
 namespace Qelt {
 
-Pencil2OutlineShader::Pencil2OutlineShader() : mProgram(szVertexShader, szFragmentShader) {
-  if (mProgram.get() == nullptr) return;
-  uProjectionMatrix.bind(mProgram.get(), "uProjectionMatrix");
-  pointTexture.bind(mProgram.get(), "pointTexture");
-  uInputColor.bind(mProgram.get(), "uInputColor");
-  outlineCase.bind(mProgram.get(), "outlineCase");
+void Pencil2OutlineShader::link() {
+  mLinked = false;
+  OpenGLShaderProgram* program = mProgram.make(szVertexShader, szFragmentShader);
+  mLinked = program != nullptr && uProjectionMatrix.bind(program, "uProjectionMatrix") &&
+            pointTexture.bind(program, "pointTexture") && uInputColor.bind(program, "uInputColor") &&
+            outlineCase.bind(program, "outlineCase");
 }
 
 }  // namespace Qelt

@@ -9,10 +9,13 @@ namespace Qelt {
 class Pencil2OutlineShader {
  public:
   // Throws InvalidArgumentException when a uniform has another type than its binding.
-  Pencil2OutlineShader();
+  Pencil2OutlineShader() { link(); }
 
-  // False when the host could not make the program; nothing can be drawn then.
-  bool isLinked() const { return mProgram.get() != nullptr; }
+  // Makes the program and binds its uniforms, in place of those there were. Throws as the constructor does.
+  void link();
+  // False when the host could not make the program or bind a uniform, for instance for want of a GL context:
+  // then nothing can be drawn, until `link` is called again.
+  bool isLinked() const { return mLinked; }
   void activate() { mProgram.get()->activate(); }
 
   ParameterBinding<kBindingMatrix4> uProjectionMatrix;  // stroke units to clip space
@@ -25,6 +28,7 @@ class Pencil2OutlineShader {
   __attribute__((visibility("default"))) static const char szFragmentShader[];
 
  private:
+  bool mLinked = false;
   ShaderProgram mProgram;
 };
 

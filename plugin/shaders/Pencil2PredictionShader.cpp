@@ -2,9 +2,10 @@
 
 namespace Qelt {
 
-Pencil2PredictionShader::Pencil2PredictionShader() : mProgram(szVertexShader, szFragmentShader) {
-  bind(mProgram);
-  if (mProgram.get() != nullptr) inputOpacity.bind(mProgram.get(), "inputOpacity");
+void Pencil2PredictionShader::link() {
+  mLinked = false;
+  OpenGLShaderProgram* program = mProgram.make(szVertexShader, szFragmentShader);
+  mLinked = program != nullptr && bind(program) && inputOpacity.bind(program, "inputOpacity");
 }
 
 }  // namespace Qelt

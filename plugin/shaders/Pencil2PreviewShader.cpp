@@ -2,8 +2,10 @@
 
 namespace Qelt {
 
-Pencil2PreviewShader::Pencil2PreviewShader() : mProgram(szVertexShader, szFragmentShader) {
-  bind(mProgram);
+void Pencil2PreviewShader::link() {
+  mLinked = false;
+  OpenGLShaderProgram* program = mProgram.make(szVertexShader, szFragmentShader);
+  mLinked = program != nullptr && bind(program);
 }
 
 }  // namespace Qelt

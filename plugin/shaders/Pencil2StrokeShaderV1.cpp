@@ -2,8 +2,10 @@
 
 namespace Qelt {
 
-Pencil2StrokeShaderV1::Pencil2StrokeShaderV1() : mProgram(szVertexShader, szFragmentShader) {
-  bind(mProgram);
+void Pencil2StrokeShaderV1::link() {
+  mLinked = false;
+  OpenGLShaderProgram* program = mProgram.make(szVertexShader, szFragmentShader);
+  mLinked = program != nullptr && bind(program);
 }
 
 }  // namespace Qelt

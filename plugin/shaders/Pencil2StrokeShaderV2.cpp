@@ -2,8 +2,10 @@
 
 namespace Qelt {
 
-Pencil2StrokeShaderV2::Pencil2StrokeShaderV2() : mProgram(szVertexShader, szFragmentShader) {
-  bind(mProgram);
+void Pencil2StrokeShaderV2::link() {
+  mLinked = false;
+  OpenGLShaderProgram* program = mProgram.make(szVertexShader, szFragmentShader);
+  mLinked = program != nullptr && bind(program);
 }
 
 }  // namespace Qelt

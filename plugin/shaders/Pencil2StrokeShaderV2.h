@@ -10,10 +10,13 @@ namespace Qelt {
 class Pencil2StrokeShaderV2 : public StampUniforms {
  public:
   // Throws InvalidArgumentException when a uniform has another type than its binding.
-  Pencil2StrokeShaderV2();
+  Pencil2StrokeShaderV2() { link(); }
 
-  // False when the host could not make the program; nothing can be drawn then.
-  bool isLinked() const { return mProgram.get() != nullptr; }
+  // Makes the program and binds its uniforms, in place of those there were. Throws as the constructor does.
+  void link();
+  // False when the host could not make the program or bind a uniform, for instance for want of a GL context:
+  // then nothing can be drawn, until `link` is called again.
+  bool isLinked() const { return mLinked; }
   void activate() { mProgram.get()->activate(); }
 
   // GLSL ES 3.00, zero-terminated. Exported.
@@ -21,6 +24,7 @@ class Pencil2StrokeShaderV2 : public StampUniforms {
   __attribute__((visibility("default"))) static const char szFragmentShader[];
 
  private:
+  bool mLinked = false;
   ShaderProgram mProgram;
 };
 

@@ -1,5 +1,7 @@
 #pragma once
 
+#include <utility>
+
 #include "gl/GraphicsFactory.h"
 #include "gl/OpenGLShaderProgram.h"
 
@@ -8,19 +10,27 @@ namespace Qelt {
 // A program of a shader class. Render thread.
 class ShaderProgram {
  public:
-  // Null inside when the host cannot make it. The sources must outlive the program.
-  ShaderProgram(const char* vertexSource, const char* fragmentSource)
-      : mProgram(GraphicsFactory::createOpenGLShaderProgram(vertexSource, fragmentSource, nullptr)) {}
-  ~ShaderProgram() {
-    if (mProgram != nullptr) mProgram->release();
-  }
+  ShaderProgram() = default;
+  ~ShaderProgram() { release(); }
   ShaderProgram(const ShaderProgram&) = delete;
   ShaderProgram& operator=(const ShaderProgram&) = delete;
+
+  // Has the host make the program, in place of the one there was. Returns null when the host cannot, for
+  // instance while there is no GL context. The sources must outlive the program.
+  OpenGLShaderProgram* make(const char* vertexSource, const char* fragmentSource) {
+    release();
+    mProgram = GraphicsFactory::createOpenGLShaderProgram(vertexSource, fragmentSource, nullptr);
+    return mProgram;
+  }
 
   OpenGLShaderProgram* get() const { return mProgram; }
 
  private:
-  OpenGLShaderProgram* mProgram;
+  void release() {
+    if (mProgram != nullptr) std::exchange(mProgram, nullptr)->release();
+  }
+
+  OpenGLShaderProgram* mProgram = nullptr;
 };
 
 }  // namespace Qelt

@@ -25,6 +25,9 @@ T* ShaderManager::GetShader() try {
   } else if (found->second.shader == nullptr) {
     // Memory ran out for it once; nobody holds it.
     found->second.shader = new (std::nothrow) T;
+  } else if (T* shader = static_cast<T*>(found->second.shader); !shader->isLinked()) {
+    // It was made while there was no GL context. Others may hold it, so it is mended where it is.
+    shader->link();
   }
   if (found->second.shader != nullptr) ++found->second.references;
   return static_cast<T*>(found->second.shader);

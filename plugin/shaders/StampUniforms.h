@@ -1,7 +1,6 @@
 #pragma once
 
 #include "shaders/ParameterBinding.h"
-#include "shaders/ShaderProgram.h"
 
 namespace Qelt {
 
@@ -20,17 +19,12 @@ class StampUniforms {
  protected:
   StampUniforms() = default;
 
-  // Binds in the order above. A program that the host could not make leaves all unbound.
-  void bind(const ShaderProgram& program) {
-    if (program.get() == nullptr) return;
-    projectionMatrix.bind(program.get(), "ProjectionMatrix");
-    sampler0.bind(program.get(), "sampler0");
-    sampler1.bind(program.get(), "sampler1");
-    inputColor.bind(program.get(), "inputColor");
-    grainOffset.bind(program.get(), "grainOffset");
-    numTilesOfPoints.bind(program.get(), "numTilesOfPoints");
-    textureHeight.bind(program.get(), "textureHeight");
-    textureWidth.bind(program.get(), "textureWidth");
+  // Binds in the order above, up to the first that the host has no interface to; true when it bound all.
+  bool bind(OpenGLShaderProgram* program) {
+    return projectionMatrix.bind(program, "ProjectionMatrix") && sampler0.bind(program, "sampler0") &&
+           sampler1.bind(program, "sampler1") && inputColor.bind(program, "inputColor") &&
+           grainOffset.bind(program, "grainOffset") && numTilesOfPoints.bind(program, "numTilesOfPoints") &&
+           textureHeight.bind(program, "textureHeight") && textureWidth.bind(program, "textureWidth");
   }
 };
 

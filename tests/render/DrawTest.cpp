@@ -1,3 +1,4 @@
+#include <dlfcn.h>
 #include <gmock/gmock.h>
 
 #include <algorithm>
@@ -5,15 +6,19 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstdlib>
+#include <stdexcept>
 #include <string>
 #include <vector>
 
+#include "gl/OpenGLRenderer.h"
 #include "math/Matrix4.h"
+#include "pen/DrawableFactory.h"
 #include "prediction/Pencil2PredictionDrawableRT.h"
 #include "render/Pencil2StrokeDrawableRTV1.h"
 #include "render/Pencil2StrokeDrawableRTV2.h"
 #include "render/Pencil2StrokeDrawableRTV3.h"
 #include "support/DrawableBoard.h"
+#include "support/FakeLayer.h"
 #include "support/StampPicture.h"
 #include "support/Stamps.h"
 
@@ -24,6 +29,8 @@ namespace {
 
 using namespace Qelt;
 using QeltDesktop::RenderQueue;
+
+int viewportQueries = 0;
 
 constexpr int kSide = 256;
 
@@ -157,6 +164,47 @@ TEST_P(Draw, GoesOnAfterTheContextIsLostAndRestored) {
   EXPECT_EQ(differing(undisturbed, board.pixels()), 0);
 }
 
+// Textures, program and buffer are made while there is no context; all of them come with it.
+TEST_P(Draw, WhatWasPreparedWithoutAContextDrawsOnceThereIsOne) {
+  const std::vector<Sample> samples = wave(kLeft, kTop);
+  DrawingBoard board(paper(GetParam()));
+  board.stroke(samples);
+  const Picture undisturbed = board.pixels();
+  for (const bool begins : {false, true}) {
+    board.deleteDrawable();
+    board.layer->clear();
+    board.queue.loseContext();
+    board.drawable.reset(createStrokeDrawable(GetParam(), &board.shared, &board.data));
+    board.drawable->SetCanvas(&board.canvas);
+    if (begins) board.stroke({samples.begin(), samples.begin() + 12});
+    board.queue.finish();
+    board.queue.restoreContext();
+    board.stroke(samples);
+    EXPECT_EQ(differing(undisturbed, board.pixels()), 0) << (begins ? "drawn with meanwhile" : "only made");
+  }
+}
+
+// The start point cannot be found in the window while there is none; it waits for the first tile that is
+// drawn.
+TEST_P(Draw, AStrokeBegunWithoutAContextHasItsOwnGrain) {
+  const std::vector<Sample> samples = wave(kLeft, kTop);
+  const auto secondHalf = [&](bool loses) {
+    DrawingBoard board(paper(GetParam()));
+    board.queue.finish();
+    if (loses) board.queue.loseContext();
+    board.down(samples.front());
+    board.move({samples.begin() + 1, samples.begin() + 12});
+    board.queue.finish();
+    if (loses) board.queue.restoreContext();
+    board.layer->clear();
+    board.move({samples.begin() + 12, samples.end()});
+    return board.pixels();
+  };
+  const Picture expected = secondHalf(false);
+  EXPECT_GT(inked(expected), 300);
+  EXPECT_EQ(differing(secondHalf(true), expected), 0);
+}
+
 // Kept: the grain's size is what the diagonal of a 150-unit square spans in x and in y, which a rotation
 // makes unequal. By 30 degrees: (cos - sin) * 150 / 2 and (sin + cos) * 150 / 2.
 TEST(GrainSize, UnderARotationIsWhatTheDiagonalSpans) {
@@ -255,6 +303,7 @@ TEST_F(RenderDrawable, DrawsTheBufferThatItsUpdateChose) {
 TEST_F(RenderDrawable, SettlesTheGrainOriginWithTheFirstTileDrawn) {
   std::vector<float> live = stampAt(60.37f);
   queue.run([&] {
+    const int before = viewportQueries;
     drawable.SetStartPoint(60.25f, 130.5f);
     drawable.SendDataToGPU(&live);
     drawable.Update(false);
@@ -266,8 +315,28 @@ TEST_F(RenderDrawable, SettlesTheGrainOriginWithTheFirstTileDrawn) {
     EXPECT_NEAR(drawable.grainOrigin().y, 261.0f, 1e-3f);
     drawable.Draw(layer.GetBitmap()->GetSubBitmap(1), identity);
     EXPECT_NEAR(drawable.grainOrigin().x, 120.5f, 1e-3f);
+    EXPECT_EQ(viewportQueries - before, 1);  // by the first tile alone
     drawable.Clear();
   });
+}
+
+// A tile that the host fails on is ended all the same.
+TEST_F(RenderDrawable, EndsTheTileThatAnExceptionLeaves) {
+  struct Tile : FakeTile {
+    using FakeTile::FakeTile;
+    const Matrix4<float>& GetProjection() const override { throw std::runtime_error("out of the host"); }
+    void BeginRender(int) override { ++begun; }
+    void EndRender(int) override { --begun; }
+    int begun = 0;
+  } tile(0);
+  std::vector<float> live = stampAt(60.37f);
+  queue.run([&] {
+    drawable.SendDataToGPU(&live);
+    drawable.Update(false);
+    EXPECT_THROW(drawable.Draw(&tile, identity), std::runtime_error);
+    drawable.Clear();
+  });
+  EXPECT_EQ(tile.begun, 0);
 }
 
 TEST_F(RenderDrawable, DrawsNothingWithoutATileOrABatchOrOnceReleased) {
@@ -349,3 +418,12 @@ TEST(StampPicturesTest, AreAsWorkedOutFragmentByFragment) {
 
 }  // namespace
 }  // namespace QeltTests
+
+// Stands before the host's own, to count.
+Qelt::Vector4<int> Qelt::OpenGLRenderer::getViewport() {
+  using Query = Qelt::Vector4<int> (*)();
+  static const auto query =
+      reinterpret_cast<Query>(dlsym(RTLD_NEXT, "_ZN4Qelt14OpenGLRenderer11getViewportEv"));
+  ++QeltTests::viewportQueries;
+  return query();
+}

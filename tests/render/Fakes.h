@@ -2,6 +2,7 @@
 
 #include <functional>
 #include <memory>
+#include <stdexcept>
 #include <string>
 #include <utility>
 #include <vector>
@@ -40,7 +41,10 @@ class FakeQueue : public Qelt::IGLMsgQueue {
 class FakeCanvas : public Qelt::ISPPenCanvas {
  public:
   explicit FakeCanvas(Events& log) : events(log) {}
-  Qelt::IGLMsgQueue* GetMsgQueue() override { return queue; }
+  Qelt::IGLMsgQueue* GetMsgQueue() override {
+    events.emplace_back("queue");
+    return queue;
+  }
   const Qelt::Matrix3<float>& GetMatrix() override { return matrix; }
   Qelt::ISPLayer* GetLayer() override { return hasLayer ? &layer : nullptr; }
   void BeginTile(int index) override { events.push_back("begin " + std::to_string(index)); }
@@ -72,6 +76,7 @@ class FakeDrawable : public Qelt::PenStrokeDrawableRT, public Qelt::IReferenceBi
   void Update(bool useCache) override { events.emplace_back(useCache ? "update cache" : "update"); }
   void Draw(Qelt::ISPSubBitmap* tile, Qelt::Matrix4<float>&) override {
     events.push_back("draw at " + std::to_string(tile->GetX()));
+    if (throws) throw std::runtime_error("out of the host");
   }
   void Clear() override { events.emplace_back("clear"); }
   Qelt::IReferenceBitmapSettable* GetReferenceBitmapSettable() override {
@@ -82,6 +87,7 @@ class FakeDrawable : public Qelt::PenStrokeDrawableRT, public Qelt::IReferenceBi
 
   Events& events;
   bool takesReference = false;
+  bool throws = false;
 };
 
 }  // namespace QeltTests

@@ -54,7 +54,7 @@ class Guards : public testing::Test {
 TEST_F(Guards, HandABatchOverWithItsMessageAndItsDeletion) {
   draw(66);
   // The drawable appends nowhere before anything is posted.
-  EXPECT_THAT(take(), ElementsAre("buffer", "no buffer"));
+  EXPECT_THAT(take(), ElementsAre("buffer", "queue", "no buffer"));
   EXPECT_THAT(posted(), ElementsAre("Batch", "Render", "DeleteBatch"));
   EXPECT_TRUE(queue.tasks[0]->isGlobalLockAllowed());
   EXPECT_EQ(queue.tasks[0]->mNext, nullptr);
@@ -113,7 +113,9 @@ TEST_F(Guards, StayInertWithoutMemoryForTheBatch) {
     const FailingAllocation first(0);
     const Pencil2V8ReturnCallback guard(&drawable, &canvas, &unclaimed);
     EXPECT_EQ(guard.buffer(), nullptr);
+    EXPECT_THAT(take(), ElementsAre("no buffer"));
   }
+  EXPECT_THAT(take(), IsEmpty());
   EXPECT_THAT(posted(), IsEmpty());
 }
 
@@ -128,6 +130,7 @@ TEST_F(Guards, OfACachedBatchBorrowIt) {
   EXPECT_TRUE(redraw(&cached));
   EXPECT_THAT(posted(), ElementsAre("Batch", "Render"));
   EXPECT_TRUE(dynamic_cast<const PenGLRenderMsg&>(*queue.tasks[1]).mUseCacheBuffer);
+  take();
   queue.run();
   EXPECT_THAT(take(), ElementsAre("cache 54", "update cache", "begin 0", "draw at 0", "end 0", "clear"));
   EXPECT_EQ(cached.size(), 54u);

@@ -73,15 +73,26 @@ TEST_F(RenderMessage, OffersABitmapToThoseWhoTakeOne) {
   }
 }
 
-TEST_F(RenderMessage, DoesNothingAtAllWithoutDrawableCanvasLayerOrBitmap) {
+TEST_F(RenderMessage, DoesNothingAtAllWithoutDrawableOrCanvas) {
   const RectF rect = RectF{10, 10, 20, 20};
   PenGLRenderMsg(nullptr, &canvas, rect, false).run();
   PenGLRenderMsg(&drawable, nullptr, rect, false).run();
+  EXPECT_THAT(events, IsEmpty());
+}
+
+// The batch is deleted right after the message: a drawable that went on holding it would touch freed memory.
+TEST_F(RenderMessage, HasTheBatchForgottenAndTheTileEndedWhicheverWayItEnds) {
+  const RectF rect = RectF{10, 10, 70, 20};
   canvas.layer.hasBitmap = false;
   PenGLRenderMsg(&drawable, &canvas, rect, false).run();
+  EXPECT_THAT(std::exchange(events, {}), ElementsAre("clear"));
   canvas.hasLayer = false;
   PenGLRenderMsg(&drawable, &canvas, rect, false).run();
-  EXPECT_THAT(events, IsEmpty());
+  EXPECT_THAT(std::exchange(events, {}), ElementsAre("clear"));
+
+  canvas.hasLayer = canvas.layer.hasBitmap = drawable.throws = true;
+  EXPECT_THROW(PenGLRenderMsg(&drawable, &canvas, rect, false).run(), std::runtime_error);
+  EXPECT_THAT(events, ElementsAre("update", "begin 0", "draw at 0", "end 0", "clear"));
 }
 
 }  // namespace

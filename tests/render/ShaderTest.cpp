@@ -39,7 +39,10 @@ MATCHER_P2(LogOf, priority, text, "") {
 struct Alive {
   Alive() { ++count; }
   ~Alive() { --count; }
+  bool isLinked() const { return linked; }
+  void link() { linked = true; }
   static inline int count = 0;
+  bool linked = true;
 };
 struct OneShader : Alive {};
 struct OtherShader : Alive {};
@@ -64,6 +67,16 @@ TEST(ShaderRegistryTest, SharesOneShaderAClassAndDestroysItWithItsLastUser) {
   registry().ReleaseShader(other);
   EXPECT_EQ(Alive::count, 0);
   EXPECT_THAT(log.take(), IsEmpty());
+}
+
+// A shader that was made without a GL context is mended where it is: others hold it already.
+TEST(ShaderRegistryTest, LinksAnUnlinkedShaderForTheNextWhoAsks) {
+  const LogCapture log;
+  OneShader* const shader = registry().GetShader<OneShader>();
+  shader->linked = false;
+  EXPECT_EQ(registry().GetShader<OneShader>(), shader);
+  EXPECT_TRUE(shader->linked);
+  for (int i = 0; i < 2; ++i) registry().ReleaseShader(shader);
 }
 
 TEST(ShaderRegistryTest, ReportsMisuseAndLeavesTheRegisteredOneAlone) {
@@ -91,7 +104,9 @@ TEST(ShaderRegistryTest, ReportsMisuseAndLeavesTheRegisteredOneAlone) {
 class FakeProgram : public OpenGLShaderProgram, public IParameterBinding {
  public:
   void activate() override {}
-  IParameterBinding* getBindingIntf(const char*, int) override { return this; }
+  IParameterBinding* getBindingIntf(const char* name, int) override {
+    return name != missing ? this : nullptr;
+  }
   BindingType getType() const override { return kBindingAny; }
   void set(const Matrix4<float>&) override { FAIL(); }
   void set(const Vector2<float>&) override { FAIL(); }
@@ -102,6 +117,7 @@ class FakeProgram : public OpenGLShaderProgram, public IParameterBinding {
 
   float last = 0.0f;
   int releases = 0;
+  std::string missing;
 };
 
 TEST(ParameterBindingTest, TakesAHostThatTellsNoTypeAtItsWordAndGivesTheInterfaceBack) {
@@ -114,6 +130,20 @@ TEST(ParameterBindingTest, TakesAHostThatTellsNoTypeAtItsWordAndGivesTheInterfac
     EXPECT_EQ(program.releases, 0);
   }
   EXPECT_EQ(program.releases, 1);
+}
+
+struct FakeStampShader : StampUniforms {
+  bool bindTo(FakeProgram& program) { return bind(&program); }
+};
+
+// Were it drawn with, the unbound one would throw in the middle of a tile.
+TEST(StampUniformsTest, AreOnlyBoundWhenAllOfThemAre) {
+  FakeProgram program;
+  EXPECT_TRUE(FakeStampShader().bindTo(program));
+  for (const char* name : {"ProjectionMatrix", "sampler1", "textureWidth"}) {
+    program.missing = name;
+    EXPECT_FALSE(FakeStampShader().bindTo(program)) << name;
+  }
 }
 
 // A stamp shader whose colour has no alpha.
@@ -131,7 +161,9 @@ void main() { FragColor = vec4(inputColor, 1.0) * texture(sampler0, vec2(0.5)) *
 
 class WrongShader : public StampUniforms {
  public:
-  WrongShader() : mProgram(kVertex, kFragment) { bind(mProgram); }
+  WrongShader() { link(); }
+  void link() { bind(mProgram.make(kVertex, kFragment)); }
+  bool isLinked() const { return false; }
 
  private:
   ShaderProgram mProgram;

@@ -10,7 +10,7 @@ flat in float innerRadius;
 flat in float alphaByWidth;
 
 uniform sampler2D sampler0;  // paper grain
-uniform sampler2D sampler1;  // stamp shapes, one above the other
+uniform sampler2D sampler1;  // squares of paper grain, one above the other, in place of stamp shapes
 uniform vec4 inputColor;
 uniform vec2 grainOffset;  // window pixels
 uniform float numTilesOfPoints;
@@ -29,7 +29,7 @@ void main() {
   float pointAlpha = texture(sampler1, vec2(fragCoord.x, ((1.0 - fragCoord.y) + pointOffset) / numTilesOfPoints)).r;
   if (pointAlpha == 0.0) discard;
 
-  // Kept: the stamp's shape only decides which fragments exist; its value is not multiplied in.
+  // Kept: the square only decides which fragments exist; its value is not multiplied in.
   vec2 grainCoord = vec2((gl_FragCoord.x - grainOffset.x) / textureWidth, (gl_FragCoord.y - grainOffset.y) / textureHeight);
   float alpha = texture(sampler0, grainCoord).r * secAlpha;
   if (alpha == 0.0) discard;

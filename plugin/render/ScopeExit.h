@@ -1,0 +1,24 @@
+#pragma once
+
+namespace Qelt {
+
+// Calls `leave` at the end of its scope, whichever way the scope is left. An exception out of `leave` is
+// dropped: there may be one under way already, and nothing more could be undone.
+template <typename Leave>
+class ScopeExit {
+ public:
+  explicit ScopeExit(Leave leave) : mLeave(leave) {}
+  ~ScopeExit() {
+    try {
+      mLeave();
+    } catch (...) {
+    }
+  }
+  ScopeExit(const ScopeExit&) = delete;
+  ScopeExit& operator=(const ScopeExit&) = delete;
+
+ private:
+  Leave mLeave;
+};
+
+}  // namespace Qelt
