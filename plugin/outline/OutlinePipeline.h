@@ -26,6 +26,7 @@
 #include "stroke/parts/SampleCleaner.h"
 #include "stroke/parts/SampleSources.h"
 #include "stroke/parts/SegmentPath.h"
+#include "stroke/parts/StampBudget.h"
 #include "stroke/parts/StampRun.h"
 #include "stroke/parts/StampWalk.h"
 
@@ -66,14 +67,16 @@ class OutlinePipeline : public Pencil2OutlineDrawableGL {
       return false;
     }
     if (mRender == nullptr || mCanvas == nullptr || !settings().exist()) return false;
+    mBudget.restart();
 
     // Kept: set at once, not posted; an outline that still waits is drawn in this colour too.
     mRender->SetOutlineColor(static_cast<unsigned int>(GetOutlineColor()));
-    mRender->SetOutlineSize(GetOutlineSize());
+    const float outlineSize = usableOutlineSize();
+    mRender->SetOutlineSize(outlineSize);
     typename Version::ReturnGuard guard(mRender, mCanvas, mRender->unclaimedBatch());
     const Smoothing smoothing = settings().smoothing();
     const bool replayed = replay(sourceOf(*input), *this, rect, smoothing, kStraightGrowth);
-    rect->IncreaseRect(GetOutlineSize());
+    rect->IncreaseRect(outlineSize);
     guard.setRect(*rect);
     postRect(queueOf(mDataManager), mRender, *rect);
     // Kept: true on curves, whatever the replay answered; the straight one's answer counts.
@@ -84,9 +87,12 @@ class OutlinePipeline : public Pencil2OutlineDrawableGL {
 
   SampleCleaner cleaner() const { return kCleaner; }
 
-  // Kept: the size reached goes on from one outline to the next; nothing else does.
-  void beginReplay(const PenSample& start, bool coarseTool, Smoothing) {
+  void restartMoves(bool coarseTool) {
     mMoves.restart(coarseTool ? kProfile.touchSkipDistance : mMoves.minimumMove());
+  }
+
+  // Kept: the size reached goes on from one outline to the next; nothing else does.
+  void beginReplay(const PenSample& start, Smoothing) {
     mPath.start(start.at);
     mAttitude.fill(start.tilt, start.orientation);
     mFirstSegment = true;
@@ -124,7 +130,7 @@ class OutlinePipeline : public Pencil2OutlineDrawableGL {
 
     if (mFirstSegment) {
       placeTap(rect);
-    } else if (isFinite(sample.at)) {
+    } else if (isUsable(sample.at)) {
       placeSegment(mPath.close(sample.at, smoothing), rect);
     }
     return true;
@@ -153,6 +159,9 @@ class OutlinePipeline : public Pencil2OutlineDrawableGL {
       mSize += mSizeStep;
     }
 
+    // Leaves a stamp out, and goes on as if it had been placed.
+    void passOver(float) { mSize += mSizeStep; }
+
     void finish(RectF* rect) {
       mAppender.flush();
       mBox.uniteInto(rect);
@@ -174,17 +183,14 @@ class OutlinePipeline : public Pencil2OutlineDrawableGL {
     const float size = getSize();
     const int count = kProfile.stampCount(length, size);
     const float step = rules::rampStep(mCurrentSize, targetSize(size), count);
-    const int most = std::min(count, kMostStampsPerSegment);
-    RenderDrawable::Appender appender(*mRender, static_cast<std::size_t>(most));
+    const int most = mBudget.left();
+    RenderDrawable::Appender appender(*mRender, std::min({count, kMostStampsPerSegment, most}));
     Run run(appender, mCurrentSize, step, tiltFactor(), stampDirection(mAttitude.meanOrientation()));
-    bool placed = false;
-    const bool cutShort = walkEvenly(mPath.path(), count, length, [&](SmPoint at) {
-      placed = true;
-      run(at);
-    });
+    const WalkResult walk = walkEvenly(mPath.path(), count, length, most, run);
     run.finish(rect);
-    if (cutShort) mCutLog.note(Version::name, length);
-    return placed;
+    mBudget.spend(walk.stamps, Version::name);
+    if (walk.cutShort) mCutLog.note(Version::name, length);
+    return walk.stamps > 0;
   }
 
   // A tap, or a stroke whose moves were all dropped: one stamp where it began.
@@ -194,6 +200,12 @@ class OutlinePipeline : public Pencil2OutlineDrawableGL {
             stampDirection(mAttitude.meanOrientation()));
     run({mPath.last().x, mPath.last().y});
     run.finish(rect);
+  }
+
+  // What does not fit into a vertex counts as 0.
+  float usableOutlineSize() {
+    const float size = GetOutlineSize();
+    return std::fabs(size) <= kFarthest ? size : 0.0f;
   }
 
   float tiltFactor() const { return kProfile.tiltFactor(mAttitude.meanTilt()); }
@@ -208,6 +220,7 @@ class OutlinePipeline : public Pencil2OutlineDrawableGL {
   MoveFilter mMoves;
   PenAttitude<Version::tiltWindow, Version::orientationWindow> mAttitude;
   CutLog mCutLog;
+  StampBudget mBudget;
   bool mFirstSegment = true;  // no segment since the stroke began
   float mCurrentSize = 0.0f;  // reached at the end of the last segment of a move
 };

@@ -1,10 +1,11 @@
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 
-namespace Qelt {
+#include "pencommon/PenSettingData.h"
 
-struct PenSettingData;
+namespace Qelt {
 
 // The record that a pen shares with all its drawables. The pen owns it; drawables read the settings live and
 // never free it. Main thread. A plain record of fixed layout, zeroed before it is filled.
@@ -27,5 +28,24 @@ struct Pencil2Data {
   float mTiltBlend;                // 0 to about 1
   bool mHasLastStroke;             // something new since the last prediction
 };
+
+// The layouts are promised: of the record all of it, of the host's settings the two fields that lead them.
+static_assert(offsetof(PenSettingData, size) == 0 && offsetof(PenSettingData, color) == 4);
+static_assert(offsetof(Pencil2Data, mSettingData) == 0 &&
+              offsetof(Pencil2Data, mCurveEnabled) == sizeof(void*));
+static_assert(offsetof(Pencil2Data, mFixedWidthEnabled) == sizeof(void*) + 1 &&
+              offsetof(Pencil2Data, mFixedWidth) == sizeof(void*) + 4);
+static_assert(offsetof(Pencil2Data, mStartX) == sizeof(void*) + 8 &&
+              offsetof(Pencil2Data, mStartY) == sizeof(void*) + 12 &&
+              offsetof(Pencil2Data, mLastWidth) == sizeof(void*) + 16 &&
+              offsetof(Pencil2Data, mLastStampX) == sizeof(void*) + 20 &&
+              offsetof(Pencil2Data, mLastStampY) == sizeof(void*) + 24 &&
+              offsetof(Pencil2Data, mLastX) == sizeof(void*) + 28 &&
+              offsetof(Pencil2Data, mLastY) == sizeof(void*) + 32 &&
+              offsetof(Pencil2Data, mLastAlpha) == sizeof(void*) + 36 &&
+              offsetof(Pencil2Data, mLastOrientation) == sizeof(void*) + 40 &&
+              offsetof(Pencil2Data, mStampCount) == sizeof(void*) + 44 &&
+              offsetof(Pencil2Data, mTiltBlend) == sizeof(void*) + 48 &&
+              offsetof(Pencil2Data, mHasLastStroke) == sizeof(void*) + 52);
 
 }  // namespace Qelt

@@ -67,11 +67,12 @@ bool Pencil2PredictionDrawableGL::startPen() {
   mTiltBlend = live.mTiltBlend;
   mCarried = kProfile.stampSpacing;
   mCutLog.restart();
+  mBudget.restart();
 
   IGLMsgQueue* queue = queueOf(mDataManager);
   postStartPoint(queue, mRender, {live.mStartX, live.mStartY});
   postPenData(queue, mRender, settings().size(), settings().color());
-  return settings().hasUsableSize() && isFinite(mPath.mid()) && isFinite(mPath.last()) &&
+  return settings().hasUsableSize() && isUsable(mPath.mid()) && isUsable(mPath.last()) &&
          std::isfinite(mWidth) && mWidth > 0.0f && std::isfinite(mAlpha) && std::isfinite(mOrientation) &&
          std::isfinite(mTiltBlend);
 }
@@ -88,16 +89,18 @@ bool Pencil2PredictionDrawableGL::movePen(const MotionEvent& event, RectF* rect)
 }
 
 bool Pencil2PredictionDrawableGL::drawLine(PointF at, bool last, RectF* rect) {
-  if (!isFinite(at)) return false;
+  if (!isUsable(at)) return false;
   const float length = last ? mPath.close(at, Smoothing::Curve) : mPath.extend(at, Smoothing::Curve);
   mPath.setLast(at);
 
   using Run = StampRun<Version>;
-  Run::Appender appender(*mRender, spacedStamps(mCarried, kProfile.stampSpacing, length));
+  const int most = mBudget.left();
+  Run::Appender appender(*mRender, std::min(spacedStamps(mCarried, kProfile.stampSpacing, length), most));
   Run run(appender, {mWidth, mAlpha, 0.0f, 0.0f}, mTiltBlend, stampDirection(mOrientation), mStamps);
-  const WalkResult walk = walkSpaced(mPath.path(), mCarried, kProfile.stampSpacing, length, run);
-  run.finish(rect);
+  const WalkResult walk = walkSpaced(mPath.path(), mCarried, kProfile.stampSpacing, length, most, run);
+  run.finish(mPath.path(), rect);
   mCarried = walk.carry;
+  mBudget.spend(walk.stamps, Version::name);
   if (walk.cutShort) mCutLog.note(Version::name, length);
   const bool placed = run.counter().count() != mStamps.count();
   mStamps = run.counter();

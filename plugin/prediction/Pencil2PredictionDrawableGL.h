@@ -7,6 +7,7 @@
 #include "stroke/parts/CutLog.h"
 #include "stroke/parts/PenSettings.h"
 #include "stroke/parts/SegmentPath.h"
+#include "stroke/parts/StampBudget.h"
 #include "stroke/parts/StampCounter.h"
 #include "stroke/parts/ViewScale.h"
 
@@ -49,6 +50,7 @@ class Pencil2PredictionDrawableGL final : public PenPredictionDrawableGL {
   StampCounter mStamps;
   ViewScale mViewScale;
   CutLog mCutLog;
+  StampBudget mBudget;
   float mCarried = 0.0f;  // where the next stamp lies on the next segment
   // The live stroke's last values.
   float mWidth = 0.0f;

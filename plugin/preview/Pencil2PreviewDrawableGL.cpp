@@ -39,6 +39,7 @@ bool Pencil2PreviewDrawableGL::Draw(const MotionEvent* event, RectF* rect) {
     return false;
   }
   if (!canDraw()) return false;
+  mBudget.restart();
 
   Version::ReturnGuard guard(mRender, mCanvas, mRender->unclaimedBatch());
   const bool result = drawLive(*event, *this, mState, rect, settings().smoothing(), kGrowth);
@@ -54,6 +55,7 @@ bool Pencil2PreviewDrawableGL::RedrawPen(const MotionEvent* event, RectF* rect) 
     return false;
   }
   if (!canDraw()) return false;
+  mBudget.restart();
   IGLMsgQueue* queue = queueOf(mDataManager);
   postRedrawState(queue, mRender);
   postPenData(queue, mRender, settings().size(), settings().color());
@@ -82,7 +84,8 @@ void Pencil2PreviewDrawableGL::beginLive(const PenSample& start, bool coarseTool
   takeSize();
   IGLMsgQueue* queue = queueOf(mDataManager);
   postStartPoint(queue, mRender, start.at);
-  begin(start, coarseTool);
+  restartMoves(coarseTool);
+  begin(start);
   postPenData(queue, mRender, settings().size(), settings().color());
 }
 
@@ -91,10 +94,14 @@ void Pencil2PreviewDrawableGL::beginMove(const MotionEvent& event) {
   if (spaced) mRender->reserve(stampsOfMove(event, mPath, mRepeatDistance));
 }
 
-void Pencil2PreviewDrawableGL::beginReplay(const PenSample& start, bool coarseTool, Smoothing smoothing) {
+void Pencil2PreviewDrawableGL::restartMoves(bool coarseTool) {
+  mMoves.restart(coarseTool ? kProfile.touchSkipDistance : mMoves.minimumMove());
+}
+
+void Pencil2PreviewDrawableGL::beginReplay(const PenSample& start, Smoothing smoothing) {
   // Kept: a straight replay posts no start point; the grain stays where the stroke before it had it.
   if (smoothing == Smoothing::Curve) postStartPoint(queueOf(mDataManager), mRender, start.at);
-  begin(start, coarseTool);
+  begin(start);
 }
 
 void Pencil2PreviewDrawableGL::forgetAlpha() {
@@ -127,7 +134,7 @@ bool Pencil2PreviewDrawableGL::endPen(const MotionEvent& event, RectF* rect, Smo
 
   if (mFirstSegment) {
     placeTap(sample.pressure, rect);
-  } else if (isFinite(sample.at)) {
+  } else if (isUsable(sample.at)) {
     placeSegment(mPath.close(sample.at, smoothing), sample.pressure, rect, smoothing);
   }
   return true;
@@ -142,8 +149,7 @@ void Pencil2PreviewDrawableGL::takeSize() {
   mMoves.setMinimumMove(settings().size() / 5.0f);
 }
 
-void Pencil2PreviewDrawableGL::begin(const PenSample& start, bool coarseTool) {
-  mMoves.restart(coarseTool ? kProfile.touchSkipDistance : mMoves.minimumMove());
+void Pencil2PreviewDrawableGL::begin(const PenSample& start) {
   mPath.start(start.at);
   mWidth = settings().size();
   mAlpha = kNoAlpha;  // no fade-in, and nothing of the stroke before
@@ -167,8 +173,7 @@ bool Pencil2PreviewDrawableGL::placeSegment(float length, float pressure, RectF*
   if (mAlpha < 0.0f) mAlpha = alpha;
   const float blend = kProfile.tiltBlend(mAttitude.meanTilt());
   const float width = kProfile.pointSize(size, blend);
-  // The stroke began with a size that was none.
-  if (!std::isfinite(mWidth)) mWidth = width;
+  beginWidth(size);
 
   // Kept: on curves the walk decides how many stamps there are, and the ramps may run past their targets,
   // which are restored below.
@@ -176,20 +181,17 @@ bool Pencil2PreviewDrawableGL::placeSegment(float length, float pressure, RectF*
   const SegmentRamps ramps{mWidth, mAlpha, rules::rampStep(mWidth, width, count),
                            rules::rampStep(mAlpha, alpha, count)};
   const bool curve = smoothing == Smoothing::Curve;
-  const std::size_t most = curve ? spacedStamps(mCarried, mRepeatDistance, length)
-                                 : static_cast<std::size_t>(std::min(count, kMostStampsPerSegment));
-  Run::Appender appender(*mRender, most);
+  const int most = mBudget.left();
+  const int expected =
+      curve ? spacedStamps(mCarried, mRepeatDistance, length) : std::min(count, kMostStampsPerSegment);
+  Run::Appender appender(*mRender, std::min(expected, most));
   Run run(appender, ramps, blend, stampDirection(mAttitude.meanOrientation()), mStamps);
-  bool cutShort;
-  if (curve) {
-    const WalkResult walk = walkSpaced(mPath.path(), mCarried, mRepeatDistance, length, run);
-    mCarried = walk.carry;
-    cutShort = walk.cutShort;
-  } else {
-    cutShort = walkEvenly(mPath.path(), count, length, run);
-  }
-  run.finish(rect);
-  if (cutShort) mCutLog.note(Version::name, length);
+  const WalkResult walk = curve ? walkSpaced(mPath.path(), mCarried, mRepeatDistance, length, most, run)
+                                : walkEvenly(mPath.path(), count, length, most, run);
+  if (curve) mCarried = walk.carry;
+  run.finish(mPath.path(), rect);
+  mBudget.spend(walk.stamps, Version::name);
+  if (walk.cutShort) mCutLog.note(Version::name, length);
 
   const bool placed = run.counter().count() != mStamps.count();
   mStamps = run.counter();
@@ -203,13 +205,19 @@ void Pencil2PreviewDrawableGL::placeTap(float pressure, RectF* rect) {
   const float alpha =
       kProfile.pressureAlpha(pressure, rules::colorAlpha(settings().color()), settings().size());
   if (mAlpha < 0.0f) mAlpha = alpha;
+  beginWidth(settings().size());
   const float blend = kProfile.tiltBlend(mAttitude.meanTilt());
   Run::Appender appender(*mRender, 1);
   Run run(appender, {kProfile.pointSize(mWidth, blend), alpha, 0.0f, 0.0f}, blend,
           stampDirection(mAttitude.meanOrientation()), mStamps);
   run({mPath.last().x, mPath.last().y});
-  run.finish(rect);
+  run.finish(mPath.path(), rect);
   mStamps = run.counter();
+}
+
+// A stroke that began at a size that is none begins at the first one that is.
+void Pencil2PreviewDrawableGL::beginWidth(float size) {
+  if (!PenSettings::isUsableSize(mWidth)) mWidth = size;
 }
 
 }  // namespace Qelt

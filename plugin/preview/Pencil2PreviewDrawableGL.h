@@ -12,6 +12,7 @@
 #include "stroke/parts/Replay.h"
 #include "stroke/parts/SampleCleaner.h"
 #include "stroke/parts/SegmentPath.h"
+#include "stroke/parts/StampBudget.h"
 #include "stroke/parts/StampCounter.h"
 #include "stroke/parts/StampRun.h"
 #include "stroke/parts/StrokeState.h"
@@ -51,7 +52,8 @@ class Pencil2PreviewDrawableGL final : public PenPreviewDrawableGL {
   const SegmentPath& path() const { return mPath; }
   void beginLive(const PenSample& start, bool coarseTool, Smoothing smoothing);
   void beginMove(const MotionEvent& event);
-  void beginReplay(const PenSample& start, bool coarseTool, Smoothing smoothing);
+  void restartMoves(bool coarseTool);
+  void beginReplay(const PenSample& start, Smoothing smoothing);
   void forgetAlpha();
   bool drawLine(const PenSample& sample, RectF* rect, Smoothing smoothing);
   bool endPen(const MotionEvent& event, RectF* rect, Smoothing smoothing);
@@ -59,7 +61,8 @@ class Pencil2PreviewDrawableGL final : public PenPreviewDrawableGL {
   bool canDraw() const;
   // Takes the numbers that follow the pen size.
   void takeSize();
-  void begin(const PenSample& start, bool coarseTool);
+  void begin(const PenSample& start);
+  void beginWidth(float size);
   // Logs `message` and answers false without a spacing to walk at.
   bool hasSpacing(const char* message) const;
   bool placeSegment(float length, float pressure, RectF* rect, Smoothing smoothing);
@@ -75,6 +78,7 @@ class Pencil2PreviewDrawableGL final : public PenPreviewDrawableGL {
   StampCounter mStamps;
   PatternShift mPatternShift;
   CutLog mCutLog;
+  StampBudget mBudget;
   bool mFirstSegment = true;     // no segment since the pen went down
   float mRepeatDistance = 1.0f;  // between stamps on curves, stroke units
   float mCarried = 0.0f;         // where the next stamp lies on the next curve

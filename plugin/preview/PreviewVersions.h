@@ -44,9 +44,9 @@ struct PreviewVersion {
       .pressureAlpha = rules::pressureAlphaV2,
       .spacingPerSize = 0.08f,
       .stampCount = rules::stampCountV3,
-      .stampSize = rules::stampWidthV4,
-      .stampAlpha = rules::stampAlphaV1,
-      .stampReach = rules::stampReachV4,
+      .stampSize = rules::stampWidthPreview,
+      .stampAlpha = rules::stampAlphaPreview,
+      .stampReach = rules::stampReachPreview,
   };
   static constexpr int tiltWindow = 3;
   static constexpr int orientationWindow = 3;

@@ -29,6 +29,7 @@
 #include "stroke/parts/SampleCleaner.h"
 #include "stroke/parts/SampleSources.h"
 #include "stroke/parts/SegmentPath.h"
+#include "stroke/parts/StampBudget.h"
 #include "stroke/parts/StampCounter.h"
 #include "stroke/parts/StampRun.h"
 #include "stroke/parts/StampWalk.h"
@@ -70,6 +71,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
       return false;
     }
     if (!canDraw()) return false;
+    mBudget.restart();
 
     typename Version::ReturnGuard guard(mRender, mCanvas, mRender->unclaimedBatch());
     passInverseScale();
@@ -88,6 +90,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
       return false;
     }
     if (!canDraw()) return false;
+    mBudget.restart();
     postRedrawBegin();
 
     typename Version::ReturnGuard guard(mRender, mCanvas, mRender->unclaimedBatch());
@@ -101,6 +104,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
       return false;
     }
     if (!canDraw()) return false;
+    mBudget.restart();
     postRedrawBegin();
 
     StrokeCache cache(*stroke);
@@ -143,7 +147,8 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
 
   void beginLive(const PenSample& start, bool coarseTool, Smoothing smoothing) {
     mMoves.setMinimumMove(getSize() / 5.0f);
-    begin(start, coarseTool);
+    restartMoves(coarseTool);
+    begin(start);
     if (smoothing == Smoothing::Curve) {
       postStartPoint(queue(), mRender, start.at);
       publishStart();
@@ -165,7 +170,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
 
     if (mFirstSegment) {
       placeTap(sample.pressure, rect);
-    } else if (isFinite(sample.at)) {
+    } else if (isUsable(sample.at)) {
       placeSegment(mPath.close(sample.at, smoothing), sample.pressure, rect);
       rect->IncreaseRect(kCloseGrowth);
     }
@@ -189,10 +194,14 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
   SampleCleaner cleaner() const { return kCleaner; }
   const SegmentPath& path() const { return mPath; }
 
-  void beginReplay(const PenSample& start, bool coarseTool, Smoothing smoothing) {
+  void restartMoves(bool coarseTool) {
+    mMoves.restart(coarseTool ? kProfile.touchSkipDistance : mMoves.minimumMove());
+  }
+
+  void beginReplay(const PenSample& start, Smoothing smoothing) {
     // Kept: a straight replay posts no start point; the grain stays where the stroke before it had it.
     if (smoothing == Smoothing::Curve) postStartPoint(queue(), mRender, start.at);
-    begin(start, coarseTool);
+    begin(start);
   }
 
   // Runs the replay that the curve option asks for and reports its area.
@@ -254,9 +263,9 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
 
   // --- Segments ---
 
-  // Resets everything that a stroke carries along.
-  void begin(const PenSample& start, bool coarseTool) {
-    mMoves.restart(coarseTool ? kProfile.touchSkipDistance : mMoves.minimumMove());
+  // Resets what a stroke carries along. Kept: all but the pattern's shift, which goes on from stroke to
+  // stroke.
+  void begin(const PenSample& start) {
     mPath.start(start.at);
     mWidth = getSize();
     mAlpha = 0.0f;  // the first segment fades in
@@ -264,7 +273,6 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     mFirstSegment = true;
     mAttitude.fill(start.tilt, start.orientation);
     mStamps.restart();
-    mPatternShift.restart();
     mCutLog.restart();
   }
 
@@ -297,8 +305,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     if (mAlpha < 0.0f) mAlpha = alpha;
     const float blend = kProfile.tiltBlend(mAttitude.meanTilt());
     const float width = kProfile.pointSize(size, blend);
-    // The stroke began with a size that was none.
-    if (!std::isfinite(mWidth)) mWidth = width;
+    beginWidth(size);
 
     const int before = mStamps.count();
     if constexpr (kSpaced) {
@@ -318,12 +325,13 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     const float first = mCarried;
     // The ramps' count is worked out apart from the walk, and may differ from it by one.
     const int count = rules::incremented(rules::saturatedCount((length - first) / kProfile.stampSpacing));
-    Appender appender(*mRender, spacedStamps(first, kProfile.stampSpacing, length));
+    const int most = mBudget.left();
+    Appender appender(*mRender, std::min(spacedStamps(first, kProfile.stampSpacing, length), most));
     StampRun<Version> run = runTo(appender, width, alpha, blend, count);
-    const WalkResult walk = walkSpaced(mPath.path(), first, kProfile.stampSpacing, length, run);
+    const WalkResult walk = walkSpaced(mPath.path(), first, kProfile.stampSpacing, length, most, run);
     finish(run, rect);
     mCarried = walk.carry;
-    if (walk.cutShort) mCutLog.note(Version::name, length);
+    note(walk, length);
   }
 
   // So many stamps a segment; the next one begins with a stamp at its own start.
@@ -335,12 +343,17 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
                             static_cast<double>(length), static_cast<double>(size));
       }
     }
-    const int most = std::min(count, kMostStampsPerSegment);
-    Appender appender(*mRender, static_cast<std::size_t>(most));
+    const int most = mBudget.left();
+    Appender appender(*mRender, std::min({count, kMostStampsPerSegment, most}));
     StampRun<Version> run = runTo(appender, width, alpha, blend, count);
-    const bool cutShort = walkEvenly(mPath.path(), count, length, run);
+    const WalkResult walk = walkEvenly(mPath.path(), count, length, most, run);
     finish(run, rect);
-    if (cutShort) mCutLog.note(Version::name, length);
+    note(walk, length);
+  }
+
+  void note(const WalkResult& walk, float length) {
+    mBudget.spend(walk.stamps, Version::name);
+    if (walk.cutShort) mCutLog.note(Version::name, length);
   }
 
   using Appender = typename RenderDrawable::Appender;
@@ -353,7 +366,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
   }
 
   void finish(StampRun<Version>& run, RectF* rect) {
-    run.finish(rect);
+    run.finish(mPath.path(), rect);
     mStamps = run.counter();
     mLastStamp = run.lastStamp();
     mLastStampAlpha = run.lastAlpha();
@@ -363,12 +376,18 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
   void placeTap(float pressure, RectF* rect) {
     const float alpha = kProfile.pressureAlpha(pressure, rules::colorAlpha(settings().color()), getSize());
     if (mAlpha < 0.0f) mAlpha = alpha;
+    beginWidth(getSize());
     const float blend = kProfile.tiltBlend(mAttitude.meanTilt());
     Appender appender(*mRender, 1);
     StampRun<Version> run(appender, {kProfile.pointSize(mWidth, blend), alpha, 0.0f, 0.0f}, blend,
                           stampDirection(mAttitude.meanOrientation()), mStamps);
     run({mPath.last().x, mPath.last().y});
     finish(run, rect);
+  }
+
+  // A stroke that began at a size that is none begins at the first one that is.
+  void beginWidth(float size) {
+    if (!PenSettings::isUsableSize(mWidth)) mWidth = size;
   }
 
   // --- Small things ---
@@ -428,6 +447,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
   StampCounter mStamps;
   PatternShift mPatternShift;
   CutLog mCutLog;
+  StampBudget mBudget;
   ViewScale mViewScale;
   bool mFirstSegment = true;  // no segment since the pen went down
   float mCarried = 0.0f;      // where the next stamp lies on the next segment

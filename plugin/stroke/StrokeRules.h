@@ -88,22 +88,34 @@ inline int stampCountV3(float length, float size) {
 
 // --- What a stamp is handed over with ---
 
+// When the pen size falls steeply within a stroke, rounding may carry a ramp below 0.
+inline float notNegative(float value) {
+  return value > 0.0f ? value : 0.0f;
+}
+
 // Stamps up to 1 unit wide are drawn 1.3 wide.
 inline float stampWidthV1(float width) {
   return width > 1.0f ? width : 1.3f;
 }
 inline float stampWidthV4(float width) {
-  return width + 1.0f;
+  return notNegative(width) + 1.0f;
 }
 inline float stampHalfWidthV8(float width) {
-  return width * 0.5f;
+  return notNegative(width) * 0.5f;
+}
+// Kept: the preview's ramps may run past their targets, and so below 0, where a stamp shows nothing.
+inline float stampWidthPreview(float width) {
+  return width + 1.0f;
 }
 
 inline float stampAlphaV1(float alpha) {
-  return alpha;
+  return notNegative(alpha);
 }
 inline float stampAlphaV8(float alpha) {
-  return alpha / 6.0f;
+  return notNegative(alpha) / 6.0f;
+}
+inline float stampAlphaPreview(float alpha) {
+  return alpha;
 }
 // Kept: twice as dense as the live stroke, before the prediction's opacity.
 inline float stampAlphaPrediction(float alpha) {
@@ -116,6 +128,9 @@ inline float stampReachV1(float width) {
 }
 inline float stampReachV4(float width) {
   return stampWidthV4(width) / 2.0f;
+}
+inline float stampReachPreview(float width) {
+  return stampWidthPreview(width) / 2.0f;
 }
 // Kept: half of what the stamp covers; the rectangle's final growth makes up for the rest.
 inline float stampReachV8(float width) {

@@ -211,7 +211,7 @@ TEST_P(LiveStroke, ReplacesPressureAndAnglesThatAreNoNumbers) {
             plain);
 }
 
-TEST_P(LiveStroke, PlacesNothingAtASizeThatIsNoneAndFiniteStampsOnceItIsSensible) {
+TEST_P(LiveStroke, PlacesNothingAtASizeThatIsNoneAndBeginsAtTheFirstThatIsOne) {
   for (const float size : {0.0f, -3.0f, kNaN, kInfinity, -kInfinity}) {
     SCOPED_TRACE(size);
     for (const bool curve : {true, false}) {
@@ -223,15 +223,56 @@ TEST_P(LiveStroke, PlacesNothingAtASizeThatIsNoneAndFiniteStampsOnceItIsSensible
       EXPECT_THAT(board.takeStamps(), IsEmpty());
     }
   }
-  for (const float size : {0.0f, -3.0f, kNaN}) {
-    DrawingBoard board({.version = version, .size = size});
-    board.down(kStroke[0]);
-    board.settings.size = 6.0f;
-    board.move({kStroke.begin() + 1, kStroke.end()});
-    const std::vector<float> placed = board.takeFloats();
-    EXPECT_THAT(placed, Not(IsEmpty()));
-    for (const float value : placed) ASSERT_TRUE(std::isfinite(value)) << "begun at size " << size;
+  // Moves that no size drops.
+  const std::vector<Sample> tap = {kStroke[0], kStroke[0]},
+                            line = {kStroke[0], kStroke[1], kStroke[2], kStroke[5]};
+  DrawingBoard usual({.version = version, .size = 6.0f});
+  const std::vector<float> stroke = drawn(usual, line), dot = drawn(usual, tap);
+  for (const float size : {0.0f, -3.0f, kNaN, kInfinity}) {
+    const auto begunAtIt = [&](const std::vector<Sample>& samples) {
+      DrawingBoard board({.version = version, .size = size});
+      board.down(samples.front());
+      board.settings.size = 6.0f;
+      if (samples.size() > 2) board.move({samples.begin() + 1, samples.end()});
+      board.up(samples.back());
+      return board.takeFloats();
+    };
+    EXPECT_EQ(begunAtIt(tap), dot) << "begun at size " << size;
+    // A fifth of infinity is a minimum move that nothing reaches.
+    if (size != kInfinity) {
+      EXPECT_EQ(begunAtIt(line), stroke) << "begun at size " << size;
+    }
   }
+}
+
+// From any size to any other, from event to event: vertices are finite, and no stamp has less than no width
+// or alpha, although the ramps fall by powers of ten and rounding goes with them.
+TEST_P(LiveStroke, StaysFiniteHoweverSizeColourAndViewChange) {
+  const LogCapture log;
+  DrawingBoard board({.version = version});
+  const float sizes[] = {1e30f, 1e-30f, 6.0f, 1e-6f, 1e8f, 0.0f, 3e38f, 1e-38f, -6.0f, kNaN, 1e5f, 2.0f};
+  const float zooms[] = {1.0f, 1e-30f, 1e30f, 1e-38f, 3e38f, 0.0f, kNaN};
+  std::size_t stamps = 0;
+  for (std::size_t i = 0; i < 84; ++i) {
+    board.settings.size = sizes[i % 12];
+    board.settings.color = i % 3 == 0 ? 0xFF000000u : 0u;
+    board.canvas.setMatrix(viewOf(zooms[i % 7]));
+    board.shared.mCurveEnabled = i % 5 != 0;
+    const auto x = static_cast<float>(i % 4 == 3 ? 1e29f : static_cast<float>(i) * 15.0f);
+    if (i % 20 == 0) board.down({0.0f, 0.0f, 0.5f, 0.79f, 1e38f});
+    board.move({{x, x, 0.1f, 0.0f, -1e38f}, {x + 15.0f, x, 1.0f, 0.79f, 3.0f}});
+    if (i % 20 == 19) board.up({x, x, 0.5f});
+    const auto stride = static_cast<std::size_t>(board.stride());
+    for (const std::vector<float>& floats : board.takeBuffers()) {
+      for (const float value : floats) ASSERT_TRUE(std::isfinite(value)) << "event " << i;
+      for (std::size_t at = 0; at < floats.size(); at += 6 * stride) {
+        ++stamps;
+        ASSERT_LE(floats[at], floats[at + 2 * stride]) << "event " << i;
+        ASSERT_GE(floats[at + 4], 0.0f) << "event " << i;
+      }
+    }
+  }
+  EXPECT_GT(stamps, 1000u);
 }
 
 TEST_P(LiveStroke, EndsOnHugeCoordinates) {

@@ -12,6 +12,7 @@
 
 #include "base/PointF.h"
 #include "graphics/SmPath.h"
+#include "stroke/parts/LiveInput.h"
 #include "stroke/parts/MoveFilter.h"
 #include "stroke/parts/PatternShift.h"
 #include "stroke/parts/PenAttitude.h"
@@ -19,6 +20,7 @@
 #include "stroke/parts/SegmentPath.h"
 #include "stroke/parts/StampCounter.h"
 #include "stroke/parts/StampWalk.h"
+#include "support/Board.h"
 
 namespace Qelt {
 namespace {
@@ -178,25 +180,30 @@ class Line {
     mPath.resetPath(0);
   }
 
-  std::vector<float> evenly(int count, float length) {
-    std::vector<float> at;
-    cutShort = walkEvenly(mPath, count, length, [&at](SmPoint point) { at.push_back(point.x); });
-    return at;
+  std::vector<float> evenly(int count, float length, int most = kMostStampsPerSegment) {
+    Places places;
+    result = walkEvenly(mPath, count, length, most, places);
+    passedOver = places.passedOver;
+    return places.at;
   }
 
-  std::vector<float> spaced(float first, float spacing, float length) {
-    std::vector<float> at;
-    const WalkResult result =
-        walkSpaced(mPath, first, spacing, length, [&at](SmPoint point) { at.push_back(point.x); });
-    carry = result.carry;
-    cutShort = result.cutShort;
-    return at;
+  std::vector<float> spaced(float first, float spacing, float length, int most = kMostStampsPerSegment) {
+    Places places;
+    result = walkSpaced(mPath, first, spacing, length, most, places);
+    passedOver = places.passedOver;
+    return places.at;
   }
 
-  float carry = 0.0f;
-  bool cutShort = false;
+  WalkResult result{};
+  std::vector<float> passedOver;
 
  private:
+  struct Places {
+    void operator()(SmPoint point) { at.push_back(point.x); }
+    void passOver(float distance) { passedOver.push_back(distance); }
+    std::vector<float> at, passedOver;
+  };
+
   SmPath mPath;
 };
 
@@ -204,32 +211,44 @@ class Line {
 TEST(SpacedWalkTest, EndsWhereItCanNoLongerAdvance) {
   Line line(33554432.0f);
   EXPECT_LE(line.spaced(16777216.0f, 0.4f, 33554432.0f).size(), 1u);
-  EXPECT_TRUE(line.cutShort);
-  EXPECT_EQ(line.carry, 0.4f);
+  EXPECT_TRUE(line.result.cutShort);
+  EXPECT_EQ(line.result.carry, 0.4f);
 }
 
 TEST(WalksTest, StopWhereThePathHasNoPositionAndGiveAPointItsOneStamp) {
   Line line(1.0f);
   EXPECT_THAT(line.evenly(4, 2.0f), Pointwise(FloatNear(1e-4f), {0.0f, 0.5f, 1.0f}));
-  EXPECT_FALSE(line.cutShort);
+  EXPECT_FALSE(line.result.cutShort);
   EXPECT_THAT(Line(0.0f).evenly(1, 0.0f), ElementsAre(0.0f));
   // A segment shorter than what is carried shortens that.
   EXPECT_THAT(line.spaced(0.75f, 0.5f, 0.25f), IsEmpty());
-  EXPECT_EQ(line.carry, 0.5f);  // 0.75 - 0.25
+  EXPECT_EQ(line.result.carry, 0.5f);  // 0.75 - 0.25
   // A stamp at the very end is taken.
   EXPECT_THAT(line.spaced(0.5f, 0.5f, 1.0f), SizeIs(2));
-  EXPECT_EQ(line.carry, 0.5f);
+  EXPECT_EQ(line.result.carry, 0.5f);
 }
 
 TEST(WalksTest, EndAtTheBoundOnStamps) {
   Line line(1e6f);
   EXPECT_EQ(line.spaced(0.4f, 0.4f, 1e6f).size(), static_cast<std::size_t>(kMostStampsPerSegment));
-  EXPECT_TRUE(line.cutShort);
-  EXPECT_EQ(line.carry, 0.4f);
+  EXPECT_TRUE(line.result.cutShort);
+  EXPECT_EQ(line.result.carry, 0.4f);
   EXPECT_EQ(line.evenly(1'000'000, 1e6f).size(), static_cast<std::size_t>(kMostStampsPerSegment));
-  EXPECT_TRUE(line.cutShort);
+  EXPECT_TRUE(line.result.cutShort);
   EXPECT_EQ(line.evenly(kMostStampsPerSegment, 1e6f).size(), static_cast<std::size_t>(kMostStampsPerSegment));
-  EXPECT_FALSE(line.cutShort);
+  EXPECT_FALSE(line.result.cutShort);
+}
+
+// Past the bound of a call the rest of a segment is only walked: the carry is what it would have been.
+TEST(WalksTest, PassOverWhatIsBeyondTheMostWanted) {
+  Line line(10.0f);
+  EXPECT_THAT(line.spaced(1.0f, 4.0f, 10.0f, 2), ElementsAre(1.0f, 5.0f));
+  EXPECT_THAT(line.passedOver, ElementsAre(9.0f));
+  EXPECT_EQ(line.result.carry, 3.0f);
+  EXPECT_EQ(line.result.stamps, 3);
+  EXPECT_THAT(line.evenly(4, 10.0f, 1), ElementsAre(0.0f));
+  EXPECT_THAT(line.passedOver, ElementsAre(2.5f, 5.0f, 7.5f));
+  EXPECT_EQ(line.result.stamps, 4);
 }
 
 TEST(WalksTest, EndOnPathsWithoutAFiniteLength) {
@@ -237,8 +256,8 @@ TEST(WalksTest, EndOnPathsWithoutAFiniteLength) {
        {std::numeric_limits<float>::infinity(), std::numeric_limits<float>::quiet_NaN()}) {
     Line line(length);
     EXPECT_THAT(line.spaced(0.4f, 0.4f, length), IsEmpty());
-    EXPECT_EQ(line.carry, 0.4f);
-    EXPECT_TRUE(line.cutShort);
+    EXPECT_EQ(line.result.carry, 0.4f);
+    EXPECT_TRUE(line.result.cutShort);
     EXPECT_THAT(line.evenly(std::numeric_limits<int>::max(), length), IsEmpty());
   }
 }
@@ -251,12 +270,19 @@ TEST(SpacedStampsTest, NeverReservesTooLittle) {
     const float first = lengths(random) * 0.01f;
     Line line(length);
     const std::size_t placed = line.spaced(first, 0.4f, length).size();
-    const std::size_t reserved = spacedStamps(first, 0.4f, length);
+    const auto reserved = static_cast<std::size_t>(spacedStamps(first, 0.4f, length));
     ASSERT_GE(reserved, placed) << first << " on " << length;
     ASSERT_LE(reserved, placed + 2) << first << " on " << length;
   }
-  EXPECT_EQ(spacedStamps(0.4f, 0.4f, 1e30f), static_cast<std::size_t>(kMostStampsPerSegment));
-  EXPECT_EQ(spacedStamps(0.4f, 0.4f, std::numeric_limits<float>::quiet_NaN()), 0u);
+  EXPECT_EQ(spacedStamps(0.4f, 0.4f, 1e30f), kMostStampsPerSegment);
+  EXPECT_EQ(spacedStamps(0.4f, 0.4f, std::numeric_limits<float>::quiet_NaN()), 0);
+
+  // A point that is dropped asks for no room: from (0, 0) over (4, 0) to (8, 0), 20 stamps and two a point.
+  SegmentPath path;
+  path.start({0.0f, 0.0f});
+  EXPECT_EQ(stampsOfMove(QeltTests::motionEvent(kActionMove, {{4.0f, 0.0f}, {kNaN, 0.0f}, {8.0f, 0.0f}}),
+                         path, 0.4f),
+            26);
 }
 
 // From (0, 0) over (10, 0) to (10, 10): mid points (5, 0) and (10, 5); the curve between them is controlled

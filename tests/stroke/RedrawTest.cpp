@@ -27,6 +27,7 @@ using QeltDesktop::Batch;
 using QeltDesktop::StoredStroke;
 using testing::ElementsAre;
 using testing::IsEmpty;
+using testing::Not;
 
 constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
 
@@ -207,6 +208,39 @@ TEST_P(Redraw, OfNothingReportsTheErrorAndHandsAnEmptyBatchOver) {
     // No point that a stroke could start from is no point at all.
     isNothing(*board.stored({{kNaN, 1.0f}, {1.0f, kNaN}}));
   }
+}
+
+// Kept: even the redraw of nothing sets how moves are thinned out: a finger's, of which the first of two
+// short ones is dropped, in the middle of a stylus's stroke.
+TEST_P(Redraw, OfNothingThinsTheMovesOfTheStrokeUnderWay) {
+  DrawingBoard board({.version = version});
+  board.down({10.0f, 10.0f});
+  board.redraw(motionEvent(Qelt::kActionUp, {{1.0f, 1.0f}}, Qelt::kToolFinger));
+  board.takeBatches();
+  board.move({{20.0f, 10.0f}});
+  EXPECT_THAT(board.takeStamps(), IsEmpty());
+  board.move({{29.0f, 10.0f}});
+  EXPECT_THAT(board.takeStamps(), Not(IsEmpty()));
+}
+
+// Two canvases with views of their own: each is drawn for its own scale, whichever was made or moved last.
+TEST(RedrawForTwoViews, ComputesAndKeepsEachForItsOwn) {
+  DrawingBoard board;
+  StrokeOnPage stroke(board.stored(kStroke));
+  const Batch plain = redrawn(board, *stroke);
+  board.canvas.setMatrix(viewOf(4.0f));
+  const Batch enlarged = redrawn(board, *stroke);
+  EXPECT_NE(enlarged.buffers, plain.buffers);
+  QeltDesktop::PenCanvas other(&board.queue, nullptr);
+  EXPECT_TRUE(redrawn(board, *stroke).cached);
+  board.drawable->SetCanvas(&other);
+  const Batch anew = redrawn(board, *stroke);
+  EXPECT_FALSE(anew.cached);
+  EXPECT_EQ(anew.buffers, plain.buffers);
+  board.canvas.setMatrix(viewOf(2.0f));
+  EXPECT_TRUE(redrawn(board, *stroke).cached);
+  board.drawable->SetCanvas(&board.canvas);
+  EXPECT_FALSE(redrawn(board, *stroke).cached);
 }
 
 // Wherever they stand, points that are not finite are as if they had not been; the stroke begins at the first

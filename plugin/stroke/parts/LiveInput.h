@@ -1,7 +1,5 @@
 #pragma once
 
-#include <cstddef>
-
 #include "base/PointF.h"
 #include "base/RectF.h"
 #include "engine/MotionEvent.h"
@@ -32,7 +30,7 @@ inline PenSample takeCurrentSample(const MotionEvent& event, const SampleCleaner
 
 // How many stamps a move will place at a spacing, at the most; for making room at once, as a batch that grows
 // from segment to segment is copied again and again. Curves are no longer than the way from point to point.
-inline std::size_t stampsOfMove(const MotionEvent& event, const SegmentPath& path, float spacing) {
+inline int stampsOfMove(const MotionEvent& event, const SegmentPath& path, float spacing) {
   constexpr float kMostAtOnce = 8192.0f;  // 2 MB; what is beyond grows by doubling
   const int history = event.GetHistorySize();
   PointF from = path.last();
@@ -40,11 +38,12 @@ inline std::size_t stampsOfMove(const MotionEvent& event, const SegmentPath& pat
   for (int i = 0; i <= history; ++i) {
     const PointF to = i < history ? PointF{event.GetHistoricalX(i), event.GetHistoricalY(i)}
                                   : PointF{event.GetX(0), event.GetY(0)};
+    if (!isUsable(to)) continue;  // it will be dropped
     way += distanceBetween(from, to);
     from = to;
   }
   const float stamps = way / spacing + 2.0f * static_cast<float>(history + 1);
-  return static_cast<std::size_t>(stamps < kMostAtOnce ? stamps : kMostAtOnce);
+  return static_cast<int>(stamps < kMostAtOnce ? stamps : kMostAtOnce);
 }
 
 // Hands the samples of a move to take(sample), oldest first, the current one last.
@@ -71,7 +70,7 @@ inline PenSample endSample(const MotionEvent& event, const SampleCleaner& cleane
   substituteTouchPressure(event, cleaner);
   const PenSample sample = takeCurrentSample(event, cleaner);
   path.setToJoint(rect);
-  if (isFinite(sample.at)) rect->MakeRect(&sample.at);
+  if (isUsable(sample.at)) rect->MakeRect(&sample.at);
   rect->IncreaseRect(growth);
   return sample;
 }
@@ -88,7 +87,7 @@ bool drawLive(const MotionEvent& event, Pen& pen, StrokeState& state, RectF* rec
   switch (event.GetAction()) {
     case kActionDown: {
       const PointF at{event.GetX(0), event.GetY(0)};
-      if (!isFinite(at)) return false;
+      if (!isUsable(at)) return false;
       state.down();
       substituteTouchPressure(event, pen.cleaner());
       pen.beginLive(takeCurrentSample(event, pen.cleaner()),

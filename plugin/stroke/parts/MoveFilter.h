@@ -33,7 +33,7 @@ class MoveFilter {
 
   // Whether the move from `last` to `at` becomes a segment. A point that is not finite never does.
   bool accepts(PointF last, PointF at) {
-    if (!isFinite(at)) return false;
+    if (!isUsable(at)) return false;
     const float distance = distanceBetween(last, at);
     if (distance < mMinimumMove) return false;
     if (distance < mSkipDistance) {

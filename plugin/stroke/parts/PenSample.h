@@ -14,8 +14,12 @@ struct PenSample {
   float orientation;  // radians, clockwise from up
 };
 
-inline bool isFinite(PointF point) {
-  return std::isfinite(point.x) && std::isfinite(point.y);
+// Farther off, in stroke units, sums and differences of points would no longer fit into a float.
+inline constexpr float kFarthest = 1e30f;
+
+// False for a point that is not finite, or too far off to draw to: such points are dropped.
+inline bool isUsable(PointF point) {
+  return std::fabs(point.x) <= kFarthest && std::fabs(point.y) <= kFarthest;
 }
 
 }  // namespace Qelt

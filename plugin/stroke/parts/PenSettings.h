@@ -21,8 +21,10 @@ class PenSettings {
   bool exist() const { return mRecord != nullptr; }
 
   float size() const { return exist() ? mRecord->size : 0.0f; }  // stroke units
-  // A pen without a sensible size places nothing.
-  bool hasUsableSize() const { return std::isfinite(size()) && size() > 0.0f; }
+  // A pen whose size is not positive or not finite places nothing. Nor does one so small or so large that a
+  // stamp's width or alpha would not fit into a float.
+  static bool isUsableSize(float size) { return size >= 1e-30f && size <= 1e30f; }
+  bool hasUsableSize() const { return isUsableSize(size()); }
   std::uint32_t color() const { return exist() ? mRecord->color : 0u; }  // ARGB
 
   // Straight without a record.

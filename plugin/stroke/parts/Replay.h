@@ -16,20 +16,22 @@ template <typename Source>
 int firstUsablePoint(const Source& source) {
   const int count = source.count();
   for (int i = 0; i < count; ++i) {
-    if (isFinite(source.point(i))) return i;
+    if (isUsable(source.point(i))) return i;
   }
   return -1;
 }
 
 // Feeds a whole stroke to a pen:
 //   pen.cleaner()                                  the version's SampleCleaner
-//   pen.beginReplay(start, coarseTool, smoothing)  the first sample
+//   pen.restartMoves(coarseTool)                   ahead of everything, even where nothing follows
+//   pen.beginReplay(start, smoothing)              the first sample
 //   pen.drawLine(sample, rect, smoothing)          every later one
 //   pen.endPen(upEvent, rect, smoothing)           the end; false when it leaves the rectangle alone
 // `rect` becomes the start point and takes in what the pen reports; a straight replay also takes in every
 // point and grows by `straightGrowth` at the end. False with error 7 when there is no point to start from.
 template <typename Source, typename Pen>
 bool replay(Source source, Pen& pen, RectF* rect, Smoothing smoothing, float straightGrowth) {
+  pen.restartMoves(source.isCoarse());
   const int first = firstUsablePoint(source);
   if (first < 0) {
     Error::SetError(Error::kInvalidArgument);
@@ -43,14 +45,14 @@ bool replay(Source source, Pen& pen, RectF* rect, Smoothing smoothing, float str
 
   source.prepare(cleaner);
   const PenSample start = sample(first);
-  pen.beginReplay(start, source.isCoarse(), smoothing);
+  pen.beginReplay(start, smoothing);
   rect->Set(start.at.x, start.at.y, start.at.x, start.at.y);
 
   const int count = source.count();
   for (int i = first + 1; i < count; ++i) {
     const PenSample next = sample(i);
     pen.drawLine(next, rect, smoothing);
-    if (smoothing == Smoothing::Straight && isFinite(next.at)) rect->MakeRect(&next.at);
+    if (smoothing == Smoothing::Straight && isUsable(next.at)) rect->MakeRect(&next.at);
   }
 
   MotionEvent up = source.upEvent(cleaner);  // not const: the end writes its corrections into it

@@ -37,7 +37,8 @@ struct SampleCleaner {
 
   bool exceedsCap(float reported) const { return knownTilt(reported) > tiltCap; }
 
-  static float orientation(float reported) { return std::isfinite(reported) ? reported : 0.0f; }
+  // What is not finite, or so large that a mean would not be, counts as 0.
+  static float orientation(float reported) { return std::fabs(reported) <= 1e30f ? reported : 0.0f; }
 };
 
 // A stylus on a touch screen reports no pressure.

@@ -25,7 +25,7 @@ struct SegmentRamps {
 
 // The stamps of one segment: hands them to the render drawable and gathers the area they cover. `Version`
 // names the RenderDrawable, and in its profile stampSize, stampAlpha and stampReach, the hand-over. Local
-// state, so that the walk runs in registers.
+// state, so that the walk runs in registers. Place of the walks in StampWalk.h.
 template <typename Version>
 class StampRun {
   static constexpr const auto& kProfile = Version::profile;
@@ -39,20 +39,28 @@ class StampRun {
     mStamp[1] = direction;
   }
 
+  // Places a stamp.
   void operator()(SmPoint at) {
     mStamp[0] = {at.x, at.y};
     mBox.add(at.x, at.y, kProfile.stampReach(mRamps.width));
     mAppender.AddPoint(mStamp, kProfile.stampSize(mRamps.width), kProfile.stampAlpha(mRamps.alpha), mBlend,
                        mCounter.next());
-    mLastAlpha = mRamps.alpha;
-    mRamps.width += mRamps.widthStep;
-    mRamps.alpha += mRamps.alphaStep;
+    advance();
   }
 
-  // All stamps are in the batch from here on, and their area in `rect`.
-  void finish(RectF* rect) {
+  // Leaves the stamp at that distance out, and goes on as if it had been placed.
+  void passOver(float distance) {
+    mCounter.next();
+    mPassedOver = distance;
+    advance();
+  }
+
+  // All stamps are in the batch from here on, and their area in `rect`. `path`: the segment's.
+  void finish(const SmPath& path, RectF* rect) {
     mAppender.flush();
     mBox.uniteInto(rect);
+    SmPoint at;
+    if (mPassedOver >= 0.0f && path.getPosTan(mPassedOver, &at, nullptr)) mStamp[0] = {at.x, at.y};
   }
 
   StampCounter counter() const { return mCounter; }
@@ -61,10 +69,17 @@ class StampRun {
   float lastAlpha() const { return mLastAlpha; }
 
  private:
+  void advance() {
+    mLastAlpha = mRamps.alpha;
+    mRamps.width += mRamps.widthStep;
+    mRamps.alpha += mRamps.alphaStep;
+  }
+
   Appender& mAppender;
   SegmentRamps mRamps;
   float mBlend;
   float mLastAlpha = 0.0f;
+  float mPassedOver = -1.0f;  // where the last stamp left out would lie; below 0: none was
   StampCounter mCounter;
   DirtyBox mBox;
   Vector2<float> mStamp[2];  // centre, direction

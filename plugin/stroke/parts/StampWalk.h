@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <cmath>
-#include <cstddef>
 
 #include "graphics/SmPath.h"
 #include "stroke/StrokeRules.h"
@@ -15,47 +14,61 @@ namespace Qelt {
 inline constexpr int kMostStampsPerSegment = 262144;
 
 struct WalkResult {
-  float carry;    // where the first stamp of the next segment lies on it
+  float carry;    // where the first stamp of the next segment lies on it; 0 of an even walk
   bool cutShort;  // the walk ended before the path did
+  int stamps;     // placed and passed over
 };
 
 // How many stamps a spaced walk will place, at the most.
-inline std::size_t spacedStamps(float first, float spacing, float length) {
+inline int spacedStamps(float first, float spacing, float length) {
   if (!(first <= length)) return 0;
   // One more than the quotient for the stamp at its start, one more for rounding.
   const int count = rules::saturatedCount((length - first) / spacing);
-  return static_cast<std::size_t>(std::min(count, kMostStampsPerSegment - 2)) + 2;
+  return std::min(count, kMostStampsPerSegment - 2) + 2;
 }
 
-// Calls place(point) every `spacing` along the path, from distance `first` on. A walk that cannot go on, or
-// has placed too many stamps, ends as if it had ended on its spacing.
+// Calls place(point) every `spacing` along the path, from distance `first` on, `most` times; from there on
+// place.passOver(distance). A walk that cannot go on, or has come by too many stamps, ends as if it had ended
+// on its spacing.
 template <typename Place>
-WalkResult walkSpaced(const SmPath& path, float first, float spacing, float length, Place&& place) {
+WalkResult walkSpaced(const SmPath& path, float first, float spacing, float length, int most, Place&& place) {
   float distance = first;
-  for (int steps = 0; distance <= length; ++steps) {
-    if (steps == kMostStampsPerSegment) return {spacing, true};
-    SmPoint at;
-    if (path.getPosTan(distance, &at, nullptr)) place(at);
+  int stamps = 0;
+  for (; distance <= length; ++stamps) {
+    if (stamps == kMostStampsPerSegment) return {spacing, true, stamps};
+    if (stamps < most) {
+      SmPoint at;
+      if (path.getPosTan(distance, &at, nullptr)) place(at);
+    } else {
+      place.passOver(distance);
+    }
     const float next = distance + spacing;
-    if (!(next > distance)) return {spacing, true};
+    if (!(next > distance)) return {spacing, true, stamps + 1};
     distance = next;
   }
   const float carry = distance - length;
-  return std::isfinite(carry) ? WalkResult{carry, false} : WalkResult{spacing, true};
+  if (!std::isfinite(carry)) return {spacing, true, stamps};
+  return {carry, false, stamps};
 }
 
 // Calls place(point) `count` times at even distances from the path's start on, one step short of its end;
-// stops early where the path has no position. True when the walk was cut short by the bound.
+// after `most` of them place.passOver(distance). Stops early where the path has no position. Cut short only
+// by the bound.
 template <typename Place>
-bool walkEvenly(const SmPath& path, int count, float length, Place&& place) {
+WalkResult walkEvenly(const SmPath& path, int count, float length, int most, Place&& place) {
   const float step = length / static_cast<float>(count);
   const int stamps = std::min(count, kMostStampsPerSegment);
   for (int i = 0; i < stamps; ++i) {
-    SmPoint at;
-    if (!path.getPosTan(static_cast<float>(i) * step, &at, nullptr)) break;
-    place(at);
+    const float distance = static_cast<float>(i) * step;
+    if (i < most) {
+      SmPoint at;
+      if (!path.getPosTan(distance, &at, nullptr)) return {0.0f, stamps < count, i};
+      place(at);
+    } else {
+      place.passOver(distance);
+    }
   }
-  return stamps < count;
+  return {0.0f, stamps < count, stamps};
 }
 
 }  // namespace Qelt
