@@ -72,11 +72,15 @@ TEST_F(StrokeCache, ADroppedEntryGoesWithItsLastUseAndOneMadeAnewMeanwhileIsEmpt
   }
 }
 
+// That is the canvas that a pen asked for its matrix last, not the one that was made or moved last.
 TEST_F(StrokeCache, PointsRecordTheScaleOfTheViewThatTheyWereStoredIn) {
   QeltDesktop::PenCanvas canvas(nullptr, nullptr);
   Qelt::Matrix3<float> zoom;
   zoom.setScale(4.0f, 2.0f);
   canvas.setMatrix(zoom);
+  canvas.GetMatrix();
+  QeltDesktop::PenCanvas other(nullptr, nullptr);
+  other.setMatrix(Qelt::Matrix3<float>());
   PenStrokeData data;
   PenStrokePointData* const points = pointsOf({1});
   EXPECT_TRUE(data.SetPointData(points));
