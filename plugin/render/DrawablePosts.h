@@ -8,9 +8,11 @@
 #include "pencommon/PenGLDataManager.h"
 #include "render/Posting.h"
 
-// What main-thread drawables have their render-thread partners told. Without a queue nothing is. Main thread.
+// What main-thread drawables have their render-thread partners told. Without a queue nothing is. Main thread,
+// but for `queueOf`.
 namespace Qelt {
 
+// Either thread.
 inline IGLMsgQueue* queueOf(PenGLDataManager* manager) {
   return manager != nullptr ? manager->GetMsgQueue() : nullptr;
 }

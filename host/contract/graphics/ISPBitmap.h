@@ -38,12 +38,12 @@ class QELT_HOST_API ISPSubBitmap {
   virtual ~ISPSubBitmap();
 };
 
-// An RGBA8 picture on the GPU. Made by any thread, filled and read on the render thread. Slots chosen here.
+// An RGBA8 picture on the GPU. Render thread: off it a bitmap cannot be made. Slots chosen here.
 class QELT_HOST_API ISPBitmap {
  public:
   virtual int GetWidth() const = 0;
   virtual int GetHeight() const = 0;
-  virtual ISPTexture* GetTexture() = 0;
+  virtual ISPTexture* GetTexture() = 0;  // never null
   virtual void SetDebugName(const char* name) = 0;
   // Replaces the top left width x height pixels: 4 bytes each, red first, rows top down and tightly
   // packed. The first row is texture coordinate 0. The data is copied; an empty area does nothing.

@@ -14,7 +14,7 @@ class QELT_HOST_API PenStrokeDrawableRT : public PenDrawableRT {
   virtual void SetBuffer(std::vector<float>* buffer);
   // Render thread: the batch that `Update(false)` uploads, borrowed until `Clear`.
   virtual void SendDataToGPU(std::vector<float>* buffer);
-  // Render thread: the batch that `Update(true)` uploads, borrowed until the next one.
+  // Render thread: the batch that `Update(true)` uploads, borrowed until `Clear`.
   virtual void SetCacheBuffer(std::vector<float>* buffer);
 
  protected:
