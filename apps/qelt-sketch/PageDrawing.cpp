@@ -50,8 +50,9 @@ PixelSize pixelSizeOf(const PageLayout& layout, const Options& options) {
 // A layer and the view of the page that a drawable has of it.
 class Layer {
  public:
-  Layer(RenderQueue& queue, PixelSize size, const Qelt::Matrix3<float>& matrix)
-      : mPixels(queue, size.width, size.height), mCanvas(&queue, &mPixels) {
+  Layer(RenderQueue& queue, PixelSize size, const Qelt::Matrix3<float>& matrix,
+        int tileSize = CanvasLayer::kTileSize)
+      : mPixels(queue, size.width, size.height, tileSize), mCanvas(&queue, &mPixels) {
     mCanvas.setMatrix(matrix);
   }
 
@@ -70,7 +71,7 @@ class Drawing : public PlayObserver {
       : mQueue(queue), mProgress(progress) {
     if (drawables.outline) mOutline.emplace(queue, size, layout.matrix);
     if (drawables.stroke || drawables.preview) mStroke.emplace(queue, size, layout.matrix);
-    if (drawables.prediction) mPrediction.emplace(queue, size, layout.matrix);
+    if (drawables.prediction) mPrediction.emplace(queue, size, layout.matrix, CanvasLayer::kOneTile);
     mCanvases.stroke = drawables.stroke ? mStroke->canvas() : nullptr;
     mCanvases.preview = drawables.preview ? mStroke->canvas() : nullptr;
     mCanvases.outline = mOutline ? mOutline->canvas() : nullptr;

@@ -194,13 +194,16 @@ TEST_P(Layer, KeepsItsPixelsAndEveryWrapperWorksOnAfterEachOfTwoLosses) {
 }
 
 TEST_P(Layer, SaysClearlyWhatCannotBeDrawn) {
-  try {
-    const CanvasLayer layer(queue, 1 << 20, 10);
-    FAIL();
-  } catch (const std::runtime_error& error) {
-    EXPECT_THAT(error.what(), HasSubstr("1048576 x 10"));
+  for (const int tile : {CanvasLayer::kTileSize, CanvasLayer::kOneTile}) {
+    try {
+      const CanvasLayer layer(queue, 1 << 20, 10, tile);
+      FAIL();
+    } catch (const std::runtime_error& error) {
+      EXPECT_THAT(error.what(), HasSubstr("1048576 x 10"));
+    }
   }
   EXPECT_EQ(CanvasLayer(queue, 1030, 600).GetBitmap()->GetTileCount(), 6) << "tiles are of 512 pixels";
+  EXPECT_EQ(CanvasLayer(queue, 1030, 600, CanvasLayer::kOneTile).GetBitmap()->GetTileCount(), 1);
   EXPECT_THROW(CanvasLayer(queue, 0, 10), std::runtime_error);
   EXPECT_THROW(CanvasLayer(queue, 10, 10, 0), std::runtime_error);
   RenderQueue blind(GetParam(), RenderQueue::GL::None);

@@ -290,6 +290,29 @@ TEST_F(Program, LaysOutlinesUnderAndPredictionsOverTheStrokes) {
   EXPECT_EQ(draw("--predict 3 --opacity 1").bytes, plain.bytes);
 }
 
+// The page's tiles meet at column 512. A prediction beside it, whose stamps hang 2 pixels over it, looks as
+// it does 200 pixels to the left.
+TEST_F(Program, DrawsPredictionsWholeAcrossTheBordersOfTiles) {
+  const auto draw = [this](const std::string& x) {
+    std::string line;
+    for (const char* const y : {"10.3", "20.3", "30.3", "40.3", "50.3"}) line += x + " " + y + ",";
+    const std::string ink =
+        write("line.inkml", "<ink><brush><brushProperty name='width' value='20'/></brush><trace>" + line + x +
+                                " 60.3</trace></ink>");
+    return Program::draw("--page 640x120 --predict 3 --opacity 1 --points 6", ink);
+  };
+  const Rgba beside = draw("504.3"), apart = draw("304.3");
+  int inked = 0, differing = 0;
+  for (std::uint32_t y = 66; y < 86; ++y) {  // the live stroke ends above
+    for (std::uint32_t x = 312; x < 316; ++x) {
+      inked += apart.at(x, y)[0] < 255 ? 1 : 0;
+      differing += std::abs(beside.at(x + 200, y)[0] - apart.at(x, y)[0]) > 8 ? 1 : 0;
+    }
+  }
+  EXPECT_GT(inked, 20);
+  EXPECT_LE(differing, 2);
+}
+
 TEST_F(Program, DrawsThePreviewAndTheSheet) {
   const std::string out = path("out.png").string();
   ASSERT_EQ(run("preview --size 6 --color '#FF0000FF' -o '" + out + "'").status, 0);

@@ -105,6 +105,9 @@ void GlDevice::forgetProgram(GLuint program) {
 
 void GlDevice::readLimits() {
   gl(glGetIntegerv)(GL_MAX_TEXTURE_SIZE, &mMaxTextureSize);
+  GLint viewport[2] = {};
+  gl(glGetIntegerv)(GL_MAX_VIEWPORT_DIMS, viewport);
+  mMaxViewportSize = std::min(viewport[0], viewport[1]);
   mDescription = glText(GL_RENDERER) + ", " + glText(GL_VERSION);
 }
 

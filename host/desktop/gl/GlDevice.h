@@ -73,7 +73,9 @@ class QELT_HOST_API GlDevice {
   // Makes a program the current one, without asking GL when it is so already.
   void useProgram(GLuint program);
   void forgetProgram(GLuint program);
+  // The longest sides that a texture may have, and that can be drawn into at once.
   int maxTextureSize() const { return mMaxTextureSize; }
+  int maxViewportSize() const { return mMaxViewportSize; }
   // Renderer and version of the context, for people.
   const std::string& description() const { return mDescription; }
 
@@ -87,6 +89,7 @@ class QELT_HOST_API GlDevice {
   std::vector<GlResource*> mResources;
   GLuint mProgram = 0;
   int mMaxTextureSize = 0;
+  int mMaxViewportSize = 0;
   std::string mDescription;
 };
 

@@ -1,5 +1,6 @@
 #include "desktop/graphics/CanvasLayer.h"
 
+#include <algorithm>
 #include <stdexcept>
 #include <string>
 
@@ -22,7 +23,10 @@ CanvasLayer::CanvasLayer(RenderQueue& queue, int width, int height, int tileSize
   const bool ran = mQueue.run([&] {
     const GlDevice* const device = GlDevice::live();
     if (device == nullptr) throw std::runtime_error("a page needs OpenGL, and there is none");
-    const int most = device->maxTextureSize();
+    // A tile is drawn into at once, a page is not.
+    const bool drawable = std::min(std::max(width, height), tileSize) <= device->maxViewportSize();
+    const int most =
+        drawable ? device->maxTextureSize() : std::min(device->maxTextureSize(), device->maxViewportSize());
     if (width > most || height > most) {
       throw std::runtime_error("a page of " + size + " is larger than OpenGL can draw here (" +
                                std::to_string(most) + " x " + std::to_string(most) + ")");

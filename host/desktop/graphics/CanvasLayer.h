@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstdint>
+#include <limits>
 #include <memory>
 #include <vector>
 
@@ -18,9 +19,14 @@ class RenderQueue;
 // queue, which outlives the layer; drawn into on the render thread.
 class QELT_HOST_API CanvasLayer : public Qelt::ISPLayer {
  public:
-  // Sizes in pixels. Throws std::runtime_error with one clear line when the page is larger than GL can
-  // draw, or the queue has no GL.
-  CanvasLayer(RenderQueue& queue, int width, int height, int tileSize = 512);
+  static constexpr int kTileSize = 512;
+  // Makes the whole layer one tile. Overlays that predictions are drawn into want it: a prediction's stamps
+  // reach further than the rectangle that it reports, and a pen draws only into the tiles that this meets.
+  static constexpr int kOneTile = std::numeric_limits<int>::max();
+
+  // Sizes in pixels. Throws std::runtime_error with one clear line when the page, or one tile of it, is
+  // larger than GL can draw, or the queue has no GL; a layer of one tile is refused too, never split.
+  CanvasLayer(RenderQueue& queue, int width, int height, int tileSize = kTileSize);
   ~CanvasLayer() override;
   CanvasLayer(const CanvasLayer&) = delete;
   CanvasLayer& operator=(const CanvasLayer&) = delete;
