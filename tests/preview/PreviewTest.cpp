@@ -225,6 +225,24 @@ TEST(Preview, WithoutASizeCurvesLogAndNothingIsPlaced) {
   EXPECT_THAT(board.takeStamps(), IsEmpty());
 }
 
+// A size that is none when the pen goes down gives way to the first that is one, in segments and taps alike.
+// (Curves have no spacing to be walked at then.)
+TEST(Preview, BegunWithoutASizeTakesItsWidthFromTheFirstThatIsOne) {
+  const auto drawn = [](float begun, bool taps) {
+    Panel board(panel(begun));
+    board.shared.mCurveEnabled = false;
+    board.down({0.0f, 0.0f});
+    board.settings.size = 10.0f;
+    if (!taps) board.move({{40.0f, 0.0f}, {80.0f, 20.0f}});
+    board.up({80.0f, 20.0f});
+    return board.takeFloats();
+  };
+  for (const float none : {0.0f, -3.0f, std::numeric_limits<float>::quiet_NaN()}) {
+    EXPECT_EQ(drawn(none, false), drawn(10.0f, false)) << none;
+    EXPECT_EQ(drawn(none, true), drawn(10.0f, true)) << none;
+  }
+}
+
 TEST(Preview, RefusesWhatIsMissing) {
   Panel board(panel(10.0f));
   const MotionEvent event = board.recorded(kSampleStroke);
