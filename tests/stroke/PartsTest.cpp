@@ -11,7 +11,9 @@
 #include <vector>
 
 #include "base/PointF.h"
+#include "base/RectF.h"
 #include "graphics/SmPath.h"
+#include "stroke/parts/DirtyBox.h"
 #include "stroke/parts/MoveFilter.h"
 #include "stroke/parts/PatternShift.h"
 #include "stroke/parts/PenAttitude.h"
@@ -280,6 +282,23 @@ TEST(SegmentPathTest, RunsFromMidPointToMidPointAroundTheInputPoint) {
   // The closing one ends at the up point itself.
   path.setLast({10.0f, 10.0f});
   EXPECT_FLOAT_EQ(path.close({10.0f, 12.0f}, Smoothing::Curve), 7.0f);
+}
+
+// Whatever is no number about a stamp, first or last: the box is that of the other two stamps.
+TEST(DirtyBoxTest, LeavesOutEdgesThatAreNoNumbers) {
+  for (const auto& [x, y, reach] : {std::array{kNaN, 5.0f, 1.0f}, {5.0f, kNaN, 1.0f}, {5.0f, 5.0f, kNaN}}) {
+    for (const int bad : {0, 1, 2}) {
+      DirtyBox box;
+      for (int stamp = 0; stamp < 3; ++stamp) {
+        if (stamp == bad) box.add(x, y, reach);
+        box.add(static_cast<float>(5 * (stamp % 2)), 5.0f, 2.0f);
+      }
+      RectF rect{3.0f, 4.0f, 3.0f, 4.0f};
+      box.uniteInto(&rect);
+      EXPECT_THAT((std::array{rect.left, rect.top, rect.right, rect.bottom}),
+                  ElementsAre(-2.0f, 3.0f, 7.0f, 7.0f));
+    }
+  }
 }
 
 TEST(StampCounterTest, LetsTheShapesTakeTurnsEvenPastTheLargestCount) {
