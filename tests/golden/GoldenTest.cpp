@@ -6,6 +6,7 @@
 #include <clocale>
 #include <cmath>
 #include <cstddef>
+#include <cstdint>
 #include <cstdlib>
 #include <filesystem>
 #include <locale>
@@ -267,7 +268,9 @@ void flushDenormals() {
 #if defined __x86_64__
   __builtin_ia32_ldmxcsr(__builtin_ia32_stmxcsr() | 0x8040u);  // to zero, as results and as operands
 #elif defined __aarch64__
-  __builtin_aarch64_set_fpcr(__builtin_aarch64_get_fpcr() | 1u << 24);
+  std::uint64_t control = 0;
+  asm volatile("mrs %0, fpcr" : "=r"(control));
+  asm volatile("msr fpcr, %0" : : "r"(control | 1u << 24));
 #else
   GTEST_SKIP() << "not known how on this processor";
 #endif

@@ -238,12 +238,18 @@ TEST_P(EveryKind, LeavesNothingChangedButWhatItDrewWith) {
 
 // --- The view ---
 
+// Each call under a view of its own, however far behind the render thread is.
 TEST_P(EveryKind, KeepsTheViewItWasPostedUnder) {
-  const auto drawn = [this](bool moves) {
+  const auto drawn = [this](bool keepsUp) {
     PenBoard board(page());
-    board.canvas.setMatrix(viewOf(0.8f, 9.0f, 5.0f));
-    board.draw(kind, wave());
-    if (moves) board.canvas.setMatrix(viewOf(1.3f, -20.0f, 8.0f));
+    float zoom = 0.7f;
+    board.draw(kind, wave(), [&](const PenBoard::Call& call) {
+      board.canvas.setMatrix(viewOf(zoom, 9.0f, 5.0f));
+      zoom += 0.15f;
+      call(&board.rect);
+      if (keepsUp) board.queue.finish();
+    });
+    board.canvas.setMatrix(viewOf(2.0f, -60.0f, -20.0f));
     return board.pixels();
   };
   EXPECT_TRUE(drawn(true) == drawn(false));
