@@ -1,8 +1,16 @@
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <algorithm>
+#include <cfenv>
+#include <clocale>
 #include <cmath>
 #include <cstddef>
+#include <cstdint>
+#include <cstdlib>
+#include <filesystem>
+#include <locale>
+#include <map>
 #include <string>
 #include <vector>
 
@@ -90,10 +98,7 @@ std::vector<Sample> fingerMoves(float skipDistance) {
           {x + 1.1f * skipDistance, y + 0.5f * skipDistance, 0.9f}};
 }
 
-class Golden : public testing::TestWithParam<int> {};
-
-TEST_P(Golden, StampsAreThoseOfTheReleaseToTheLastBit) {
-  const int version = GetParam();
+Trace strokeTrace(int version) {
   Trace trace;
   trace.emplace_back("curve, size 2, stylus");
   BoardOptions options{.version = version, .size = 2.0f, .color = 0x60203040u};
@@ -108,8 +113,10 @@ TEST_P(Golden, StampsAreThoseOfTheReleaseToTheLastBit) {
   options.tool = Qelt::kToolFinger;
   options.source = Qelt::kSourceTouchScreen;
   traceStroke(trace, options, 1.0f, fingerMoves(version == 8 ? 20.0f : 50.0f));
-  expectGoldenTrace(trace, "stamps-v" + std::to_string(version) + ".txt");
+  return trace;
 }
+
+class Golden : public testing::TestWithParam<int> {};
 
 // A wave under growing pressure, shading with the pen laid down, and a straight hairline, thinner than a
 // pixel.
@@ -177,18 +184,18 @@ BoardOptions page(int version = 8) {
   return {.version = version, .size = 7.0f, .color = 0xFF203040u, .width = 160, .height = 80, .tile = 64};
 }
 
-class OutlineGolden : public testing::TestWithParam<int> {};
-
-TEST_P(OutlineGolden, StampsAreThoseOfTheReleaseToTheLastBit) {
+Trace outlineTrace(int version) {
   Trace trace;
   for (const bool curve : {true, false}) {
-    OutlineBoard board({.version = GetParam(), .size = curve ? 2.0f : 0.8f, .curve = curve});
+    OutlineBoard board({.version = version, .size = curve ? 2.0f : 0.8f, .curve = curve});
     board.drawable->SetOutlineSize(1.5f);
     board.outline(kShortHand);
     traceCall(trace, board);
   }
-  expectGoldenTrace(trace, "outline-stamps-v" + std::to_string(GetParam()) + ".txt");
+  return trace;
 }
+
+class OutlineGolden : public testing::TestWithParam<int> {};
 
 TEST_P(OutlineGolden, PictureIsThatOfTheRelease) {
   OutlineBoard board(page(GetParam()));
@@ -200,7 +207,7 @@ TEST_P(OutlineGolden, PictureIsThatOfTheRelease) {
 
 INSTANTIATE_TEST_SUITE_P(Versions, OutlineGolden, testing::ValuesIn(outlineVersions()), versionName);
 
-TEST(PreviewGolden, StampsAreThoseOfTheReleaseToTheLastBit) {
+Trace previewTrace() {
   Trace trace;
   for (const bool curve : {true, false}) {
     PreviewBoard board({.size = curve ? 5.0f : 0.8f, .color = 0x60203040u, .curve = curve});
@@ -211,7 +218,7 @@ TEST(PreviewGolden, StampsAreThoseOfTheReleaseToTheLastBit) {
     board.up(kShortHand[5]);
     traceCall(trace, board);
   }
-  expectGoldenTrace(trace, "preview-stamps.txt");
+  return trace;
 }
 
 TEST(PreviewGolden, PictureIsThatOfTheRelease) {
@@ -238,13 +245,13 @@ void leaveStroke(Qelt::Pencil2Data& shared) {
 
 const std::vector<Sample> kAhead = {{40.13f, 52.77f}, {71.59f, 44.31f}, {105.23f, 20.87f}, {139.61f, 33.93f}};
 
-TEST(PredictionGolden, StampsAreThoseOfTheReleaseToTheLastBit) {
+Trace predictionTrace() {
   Trace trace;
   PredictionBoard board;
   leaveStroke(board.shared);
   board.move(kAhead);
   traceCall(trace, board);
-  expectGoldenTrace(trace, "prediction-stamps.txt");
+  return trace;
 }
 
 TEST(PredictionGolden, PictureIsThatOfTheRelease) {
@@ -254,6 +261,81 @@ TEST(PredictionGolden, PictureIsThatOfTheRelease) {
   board.move(kAhead);
   expectGoldenPicture(pictureOf(board), "prediction-picture.pgm");
 }
+
+// --- All stamps, on threads that a host has set up in its own way ---
+
+void flushDenormals() {
+#if defined __x86_64__
+  __builtin_ia32_ldmxcsr(__builtin_ia32_stmxcsr() | 0x8040u);  // to zero, as results and as operands
+#elif defined __aarch64__
+  std::uint64_t control = 0;
+  asm volatile("mrs %0, fpcr" : "=r"(control));
+  asm volatile("msr fpcr, %0" : : "r"(control | 1u << 24));
+#else
+  GTEST_SKIP() << "not known how on this processor";
+#endif
+}
+
+void writeCommasToStreams() {
+  struct Comma : std::numpunct<char> {
+    char do_decimal_point() const override { return ','; }
+    char do_thousands_sep() const override { return '.'; }
+    std::string do_grouping() const override { return "\3"; }
+  };
+  std::locale::global(std::locale(std::locale::classic(), new Comma));
+}
+
+// The C library's locales are files. Few machines have one with a comma; most can make one.
+void writeCommas() {
+  const std::string folder = testing::TempDir() + "qelt-locale-" + std::to_string(getpid());
+  std::filesystem::create_directory(folder);
+  const std::string make = "localedef -i de_DE -f UTF-8 '" + folder + "/de_DE.UTF-8' 2> /dev/null";
+  if (std::system(make.c_str()) == 0) setenv("LOCPATH", folder.c_str(), 1);
+  const bool found = std::setlocale(LC_ALL, "de_DE.UTF-8") != nullptr;
+  unsetenv("LOCPATH");
+  std::filesystem::remove_all(folder);
+  if (!found) GTEST_SKIP() << "there is no locale with a comma, nor a way to make one";
+}
+
+struct Surroundings {
+  const char* name;
+  void (*set)();
+};
+
+class GoldenStamps : public testing::TestWithParam<Surroundings> {
+ protected:
+  GoldenStamps() {
+    fegetenv(&mFloats);
+    GetParam().set();
+  }
+  ~GoldenStamps() override { restore(); }
+  void restore() {
+    fesetenv(&mFloats);
+    std::locale::global(std::locale::classic());
+    std::setlocale(LC_ALL, "C");
+  }
+
+ private:
+  std::fenv_t mFloats;
+};
+
+TEST_P(GoldenStamps, AreThoseOfTheReleaseToTheLastBit) {
+  std::map<std::string, Trace> traces;
+  for (const int version : allVersions()) traces["stamps-v" + std::to_string(version)] = strokeTrace(version);
+  for (const int version : outlineVersions())
+    traces["outline-stamps-v" + std::to_string(version)] = outlineTrace(version);
+  traces["preview-stamps"] = previewTrace();
+  traces["prediction-stamps"] = predictionTrace();
+  restore();
+  for (const auto& [file, trace] : traces) expectGoldenTrace(trace, file + ".txt");
+}
+
+INSTANTIATE_TEST_SUITE_P(Surroundings, GoldenStamps,
+                         testing::Values(Surroundings{"Usual", [] {}},
+                                         Surroundings{"DenormalsFlushed", flushDenormals},
+                                         Surroundings{"CommasInStreams", writeCommasToStreams},
+                                         Surroundings{"CommaLocale", writeCommas}),
+                         [](const auto& test) { return std::string(test.param.name); });
 
 }  // namespace
 }  // namespace QeltTests

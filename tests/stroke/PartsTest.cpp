@@ -11,7 +11,9 @@
 #include <vector>
 
 #include "base/PointF.h"
+#include "base/RectF.h"
 #include "graphics/SmPath.h"
+#include "stroke/parts/DirtyBox.h"
 #include "stroke/parts/LiveInput.h"
 #include "stroke/parts/MoveFilter.h"
 #include "stroke/parts/PatternShift.h"
@@ -306,6 +308,24 @@ TEST(SegmentPathTest, RunsFromMidPointToMidPointAroundTheInputPoint) {
   // The closing one ends at the up point itself.
   path.setLast({10.0f, 10.0f});
   EXPECT_FLOAT_EQ(path.close({10.0f, 12.0f}, Smoothing::Curve), 7.0f);
+}
+
+// Whatever is no number about a stamp, first or last: the box is that of the other two.
+TEST(DirtyBoxTest, LeavesOutEdgesThatAreNoNumbers) {
+  for (const auto& [x, y, reach] : {std::array{kNaN, 5.0f, 1.0f}, {5.0f, kNaN, 1.0f}, {5.0f, 5.0f, kNaN}}) {
+    for (const int bad : {0, 1, 2}) {
+      DirtyBox box;
+      if (bad == 0) box.add(x, y, reach);
+      box.add(0.0f, 0.0f, 2.0f);
+      if (bad == 1) box.add(x, y, reach);
+      box.add(9.0f, 9.0f, 2.0f);
+      if (bad == 2) box.add(x, y, reach);
+      RectF rect{3.0f, 4.0f, 3.0f, 4.0f};
+      box.uniteInto(&rect);
+      EXPECT_THAT((std::array{rect.left, rect.top, rect.right, rect.bottom}),
+                  ElementsAre(-2.0f, -2.0f, 11.0f, 11.0f));
+    }
+  }
 }
 
 TEST(StampCounterTest, LetsTheShapesTakeTurnsEvenPastTheLargestCount) {

@@ -401,8 +401,29 @@ TEST(PublishedStateTest, IsWrittenByVersions4And7And8AndOnlyOnCurves) {
       board.up(at(112.0f, 50.25f, 0.6f));
       EXPECT_EQ(shared.mLastX, 108.4f);  // the end publishes nothing
       EXPECT_EQ(shared.mStampCount, version == 8 ? 10 : 3);
+
+      board.down(at(200.0f, 50.25f, 0.9f));
+      EXPECT_EQ(shared.mTiltBlend, 0.0f);
+      EXPECT_EQ(shared.mStampCount, 0);
     }
   }
+}
+
+// A thin slow stroke: many a step is too short for a stamp, and leaves the last one standing.
+TEST(PublishedStateTest, KnowsTheLastStampThatWasPlaced) {
+  DrawingBoard board({.size = 0.5f});
+  board.down({10.0f, 10.0f});
+  Stamp last;
+  int stepsWithout = 0;
+  for (int step = 1; step <= 30; ++step) {
+    board.move({{10.0f + 0.15f * static_cast<float>(step), 10.0f}});
+    const std::vector<Stamp> stamps = board.takeStamps();
+    if (!stamps.empty()) last = stamps.back();
+    stepsWithout += stamps.empty() ? 1 : 0;
+    ASSERT_NEAR(board.shared.mLastStampX, last.x, 1e-4f) << "step " << step;
+    ASSERT_NEAR(board.shared.mLastAlpha, last.x == 0.0f ? -1.0f : last.alpha * 6.0f, 1e-3f);
+  }
+  EXPECT_GT(stepsWithout, 10);
 }
 
 }  // namespace

@@ -44,7 +44,7 @@ void Board::unwatch() {
 }
 
 bool Board::send(int action, const std::vector<Sample>& samples) {
-  return send(motionEvent(action, samples, options.tool, options.source));
+  return send(motionEvent(action, samples, options.tool, options.source, options.clock));
 }
 
 bool Board::send(const MotionEvent& event) {
@@ -64,13 +64,15 @@ void Board::stroke(const std::vector<Sample>& samples, int batch) {
 
 MotionEvent Board::recorded(std::vector<Sample> samples) const {
   samples.push_back(samples.back());
-  return motionEvent(Qelt::kActionUp, samples, options.tool, options.source);
+  return motionEvent(Qelt::kActionUp, samples, options.tool, options.source, options.clock);
 }
 
 std::unique_ptr<StoredStroke> Board::stored(const std::vector<Sample>& samples, bool hasAngles) const {
   auto stroke = std::make_unique<StoredStroke>(options.tool, hasAngles);
-  std::int64_t time = 0;
-  for (const Sample& s : samples) stroke->addPoint({s.x, s.y}, time += 4, s.pressure, s.tilt, s.orientation);
+  int number = 0;
+  for (const Sample& s : samples) {
+    stroke->addPoint({s.x, s.y}, options.clock(++number), s.pressure, s.tilt, s.orientation);
+  }
   return stroke;
 }
 
@@ -98,17 +100,21 @@ std::vector<std::string> Board::takePosts() {
   return std::exchange(mPosts, {});
 }
 
-MotionEvent motionEvent(int action, const std::vector<Sample>& samples, int tool, int source) {
+std::int64_t everyFourMilliseconds(int number) {
+  return 4 * number;
+}
+
+MotionEvent motionEvent(int action, const std::vector<Sample>& samples, int tool, int source, Clock clock) {
   const auto coordsOf = [](const Sample& s) {
     return Qelt::PointerCoords{s.x, s.y, s.pressure, s.tilt, s.orientation};
   };
   const Qelt::PointerProperties pointer{0, tool};
-  std::int64_t time = 4;
+  int number = 0;
   Qelt::PointerCoords coords = coordsOf(samples.front());
-  MotionEvent event(0, time, action, 1, &pointer, &coords, 0, source, 0);
+  MotionEvent event(clock(0), clock(++number), action, 1, &pointer, &coords, 0, source, 0);
   for (std::size_t i = 1; i < samples.size(); ++i) {
     coords = coordsOf(samples[i]);
-    event.AddBatch(time += 4, &coords);
+    event.AddBatch(clock(++number), &coords);
   }
   return event;
 }
@@ -118,7 +124,13 @@ std::string taskName(const Qelt::ITask& task) {
   const char* const mangled = typeid(task).name();
   const std::unique_ptr<char, void (*)(void*)> demangled(
       abi::__cxa_demangle(mangled, nullptr, nullptr, &status), std::free);
-  const std::string type = status == 0 ? demangled.get() : mangled;
+  // Each C++ library keeps its templates in an inline namespace of its own.
+  std::string type = status == 0 ? demangled.get() : mangled;
+  for (std::size_t at = 0; (at = type.find("std::__", at)) != std::string::npos; at += 5) {
+    if (const std::size_t end = type.find("::", at + 5); end != std::string::npos) {
+      type.erase(at + 5, end + 2 - (at + 5));
+    }
+  }
   // What the type says, and whom it concerns; the first that fits.
   static constexpr const char* kNames[][2] = {{"PenGLRenderMsg", "Render"},
                                               {"Delete<std::vector<float", "DeleteBatch"},

@@ -21,6 +21,13 @@ std::size_t byteCount(int width, int height) {
   return static_cast<std::size_t>(width) * static_cast<std::size_t>(height) * 4;
 }
 
+// Pixels are read from the first byte on, in rows of that length; 0: as long as what is uploaded is wide.
+void setUnpacking(int rowLength) {
+  gl(glPixelStorei)(GL_UNPACK_ROW_LENGTH, rowLength);
+  gl(glPixelStorei)(GL_UNPACK_SKIP_ROWS, 0);
+  gl(glPixelStorei)(GL_UNPACK_SKIP_PIXELS, 0);
+}
+
 }  // namespace
 
 void GlTexture::SetFilter(int filterParameter, int glValue) {
@@ -85,9 +92,9 @@ void GlBitmap::SetPixels(const void* pixels, int width, int height) {
   const int rows = std::min(height, mHeight);
   if (pixels == nullptr || columns <= 0 || rows <= 0 || !isLive()) return;
   bindTexture();
-  gl(glPixelStorei)(GL_UNPACK_ROW_LENGTH, width);
+  setUnpacking(width);
   gl(glTexSubImage2D)(GL_TEXTURE_2D, 0, 0, 0, columns, rows, GL_RGBA, GL_UNSIGNED_BYTE, pixels);
-  gl(glPixelStorei)(GL_UNPACK_ROW_LENGTH, 0);
+  setUnpacking(0);
 }
 
 Qelt::ISPSubBitmap* GlBitmap::GetSubBitmap(int index) {
@@ -107,6 +114,9 @@ bool GlBitmap::beginRender(int x, int y, int width, int height) {
   gl(glViewport)(x, y, width, height);
   gl(glScissor)(x, y, width, height);
   gl(glEnable)(GL_SCISSOR_TEST);
+  // Pens set blending and what they draw with; whatever else could keep colour out is seen to here.
+  gl(glDisable)(GL_CULL_FACE);
+  gl(glColorMask)(GL_TRUE, GL_TRUE, GL_TRUE, GL_TRUE);
   return true;
 }
 
@@ -149,6 +159,7 @@ void GlBitmap::makeTexture() {
   if (mSaved.empty()) mSaved.resize(byteCount(mWidth, mHeight));
   gl(glGenTextures)(1, &mTexture);
   bindTexture();
+  setUnpacking(0);
   gl(glTexImage2D)(GL_TEXTURE_2D, 0, GL_RGBA8, mWidth, mHeight, 0, GL_RGBA, GL_UNSIGNED_BYTE, mSaved.data());
   for (const auto& [name, value] : mParameters) gl(glTexParameteri)(GL_TEXTURE_2D, name, value);
   mSaved = {};
