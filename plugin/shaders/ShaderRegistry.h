@@ -1,5 +1,7 @@
 #pragma once
 
+#include <algorithm>
+#include <cstring>
 #include <memory>
 #include <new>
 #include <typeinfo>
@@ -40,16 +42,19 @@ template <typename T>
 void ShaderManager::ReleaseShader(T* shader) {
   if (shader == nullptr) return;
   const AutoCriticalSection lock(&mLock);
-  const Key key(typeid(T).name());
-  const auto found = mShaders.find(key);
+  const char* const name = typeid(T).name();
+  // Found by its text: a key takes memory, and giving back must not.
+  const auto found = std::find_if(mShaders.begin(), mShaders.end(), [name](const auto& entry) {
+    return std::strcmp(entry.first.GetText(), name) == 0;
+  });
   if (found == mShaders.end()) {
     __android_log_print(kLogError, kLogTag, "%s. Shader (%s) not in shader manager (not found).",
-                        "ReleaseShader", key.GetText());
+                        "ReleaseShader", name);
     return;
   }
   if (found->second.shader != shader) {
     __android_log_print(kLogError, kLogTag, "%s. Shader (%s) not in shader manager (pointer mismatch).",
-                        "ReleaseShader", typeid(T).name());
+                        "ReleaseShader", name);
     return;
   }
   if (found->second.references == 1) {
