@@ -40,6 +40,8 @@ bool GlResource::isLive() const {
 
 void GlResource::save() {}
 
+void GlResource::dropSaved() noexcept {}
+
 GlDevice::GlDevice() : mContext(std::make_unique<EglContext>()) {
   makeCurrent();
   readLimits();
@@ -76,7 +78,12 @@ void GlDevice::lose() {
   if (isLost()) return;
   ManagedObjects::release(this);
   const std::vector<GlResource*> all = resources();
-  for (GlResource* resource : all) resource->save();
+  try {
+    for (GlResource* resource : all) resource->save();
+  } catch (...) {
+    for (GlResource* resource : all) resource->dropSaved();
+    throw;
+  }
   for (GlResource* resource : all) resource->forget();
   mContext->clearCurrent();
   mContext.reset();
@@ -85,11 +92,13 @@ void GlDevice::lose() {
 
 void GlDevice::restore() {
   if (!isLost()) return;
+  // All that may throw stands ahead of the change.
+  const std::vector<GlResource*> all = resources();
   auto context = std::make_unique<EglContext>();
   context->makeCurrent();
-  mContext = std::move(context);
   readLimits();
-  for (GlResource* resource : resources()) resource->remake();
+  mContext = std::move(context);
+  for (GlResource* resource : all) resource->remake();
   ManagedObjects::restore(this);
 }
 

@@ -34,11 +34,14 @@ class QELT_HOST_API GlResource {
  private:
   friend class GlDevice;
 
-  // The context is still there and about to go: last chance to read something back.
+  // The context is still there and about to go: last chance to read something back. May throw
+  // std::bad_alloc: the context stays then.
   virtual void save();
+  // The context stays after all: what was saved is not needed.
+  virtual void dropSaved() noexcept;
   // The names are gone; no GL may be called.
   virtual void forget() = 0;
-  // There is a context again.
+  // There is a context again. Must not throw.
   virtual void remake() = 0;
 
   GlDevice* mDevice;
@@ -65,9 +68,11 @@ class QELT_HOST_API GlDevice {
 
   bool isLost() const { return mContext == nullptr; }
   // Drops the context: managed objects hear of it first, then resources save and forget. Twice counts once.
+  // Throws std::bad_alloc when there is no memory to save with; the context is still there then.
   void lose();
   // Makes a new context and everything in it: resources first, then managed objects hear of it. Throws
-  // std::runtime_error when there is no context to be had; nothing has changed then.
+  // std::runtime_error when there is no context to be had, std::bad_alloc when there is no memory; nothing
+  // has changed then.
   void restore();
 
   // Makes a program the current one, without asking GL when it is so already.

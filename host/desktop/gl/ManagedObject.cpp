@@ -2,10 +2,10 @@
 
 #include <algorithm>
 #include <cstddef>
+#include <cstdint>
 #include <exception>
 #include <mutex>
 #include <new>
-#include <string>
 #include <vector>
 
 #include "desktop/base/Log.h"
@@ -17,11 +17,13 @@ namespace {
 struct Entry {
   Qelt::ManagedObject* object;
   const QeltDesktop::GlDevice* device;
+  std::uint64_t told;  // the last notice it has heard of
 };
 
 struct Registry {
   std::mutex lock;
   std::vector<Entry> entries;
+  std::uint64_t notices = 0;
 };
 
 // Never destroyed: objects with static lifetime still leave it at exit. In place: leaving takes no memory.
@@ -33,26 +35,27 @@ Registry& registry() {
 
 using Notice = void (Qelt::ManagedObject::*)();
 
+// Takes no memory: an object that were not told would stay without its contents. Objects may come and go
+// meanwhile; one that comes is not told.
 void notify(const QeltDesktop::GlDevice* device, Notice notice) {
-  std::vector<Entry> told;
-  {
-    const std::lock_guard guard(registry().lock);
-    told = registry().entries;
-  }
-  for (const Entry& entry : told) {
-    if (entry.device != device) continue;
+  std::uint64_t number = 0;
+  for (;;) {
+    Qelt::ManagedObject* next = nullptr;
     {
-      // An object told before may have taken this one away.
       const std::lock_guard guard(registry().lock);
-      const auto& now = registry().entries;
-      const bool stillThere = std::any_of(now.begin(), now.end(),
-                                          [&](const Entry& other) { return other.object == entry.object; });
-      if (!stillThere) continue;
+      if (number == 0) number = ++registry().notices;
+      auto& entries = registry().entries;
+      const auto found = std::find_if(entries.begin(), entries.end(), [&](const Entry& entry) {
+        return entry.device == device && entry.told < number;
+      });
+      if (found == entries.end()) return;
+      found->told = number;
+      next = found->object;
     }
     try {
-      (entry.object->*notice)();
+      (next->*notice)();
     } catch (const std::exception& error) {
-      QeltDesktop::logError(std::string("a managed object threw on a change of context: ") + error.what());
+      QeltDesktop::logError("a managed object threw on a change of context", error.what());
     } catch (...) {
       QeltDesktop::logError("a managed object threw on a change of context");
     }
@@ -73,7 +76,8 @@ void ManagedObject::Register(ManagedObject* object) {
   auto& entries = registry().entries;
   const auto found = std::find_if(entries.begin(), entries.end(),
                                   [&](const Entry& entry) { return entry.object == object; });
-  if (found == entries.end()) entries.push_back({object, QeltDesktop::GlDevice::current()});
+  if (found != entries.end()) return;
+  entries.push_back({object, QeltDesktop::GlDevice::current(), registry().notices});
 }
 
 void ManagedObject::Unregister(ManagedObject* object) {

@@ -146,6 +146,11 @@ void GlBitmap::save() {
   if (mOnLoss == OnLoss::Keep) mSaved = readPixels();
 }
 
+// An empty list assigned would leave the memory with the vector.
+void GlBitmap::dropSaved() noexcept {
+  mSaved = std::vector<std::uint8_t>();
+}
+
 void GlBitmap::forget() {
   mTexture = mFramebuffer = 0;
 }
@@ -155,14 +160,15 @@ void GlBitmap::remake() {
 }
 
 void GlBitmap::makeTexture() {
-  // Drivers need not zero a new texture.
-  if (mSaved.empty()) mSaved.resize(byteCount(mWidth, mHeight));
   gl(glGenTextures)(1, &mTexture);
   bindTexture();
   setUnpacking(0);
-  gl(glTexImage2D)(GL_TEXTURE_2D, 0, GL_RGBA8, mWidth, mHeight, 0, GL_RGBA, GL_UNSIGNED_BYTE, mSaved.data());
+  gl(glTexImage2D)(GL_TEXTURE_2D, 0, GL_RGBA8, mWidth, mHeight, 0, GL_RGBA, GL_UNSIGNED_BYTE,
+                   mSaved.empty() ? nullptr : mSaved.data());
   for (const auto& [name, value] : mParameters) gl(glTexParameteri)(GL_TEXTURE_2D, name, value);
-  mSaved = {};
+  // Drivers need not zero a new texture.
+  if (mSaved.empty()) clear(0.0f, 0.0f, 0.0f, 0.0f);
+  dropSaved();
 }
 
 bool GlBitmap::bindFramebuffer() {

@@ -81,6 +81,7 @@ class QELT_HOST_API GlBitmap final : public Qelt::ISPBitmap, public GlResource {
   friend class GlTexture;
 
   void save() override;
+  void dropSaved() noexcept override;
   void forget() override;
   void remake() override;
 

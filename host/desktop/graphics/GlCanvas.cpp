@@ -61,26 +61,21 @@ Qelt::Vector4<float> premultiplied(unsigned int argb) {
 
 GlCanvas::GlCanvas(GlBitmap& bitmap) : mBitmap(bitmap) {
   mBitmap.keepPixels();
-  mProgram = Qelt::GraphicsFactory::createOpenGLShaderProgram(kVertexShader, kFragmentShader, nullptr);
+  mProgram.reset(Qelt::GraphicsFactory::createOpenGLShaderProgram(kVertexShader, kFragmentShader, nullptr));
   if (mProgram != nullptr) {
-    mEdges = mProgram->getBindingIntf("edges", Qelt::kBindingVector4);
-    mColor = mProgram->getBindingIntf("color", Qelt::kBindingVector4);
-    mAntiAlias = mProgram->getBindingIntf("antiAlias", Qelt::kBindingFloat);
+    mEdges.reset(mProgram->getBindingIntf("edges", Qelt::kBindingVector4));
+    mColor.reset(mProgram->getBindingIntf("color", Qelt::kBindingVector4));
+    mAntiAlias.reset(mProgram->getBindingIntf("antiAlias", Qelt::kBindingFloat));
   }
   Qelt::VertexDescriptor layout;
   layout.addAttribute(Qelt::AttributeType::Float, 2, -1);
-  mQuad = Qelt::GraphicsFactory::createGraphicsObject(1, Qelt::GraphicsFactory::kTriangles, layout, 0, 0);
+  mQuad.reset(
+      Qelt::GraphicsFactory::createGraphicsObject(1, Qelt::GraphicsFactory::kTriangles, layout, 0, 0));
   constexpr std::array<float, 12> kCorners{-1, -1, 1, -1, -1, 1, -1, 1, 1, -1, 1, 1};
   if (mQuad != nullptr) mQuad->updateBuffer(0, kCorners.data(), 6);
 }
 
-GlCanvas::~GlCanvas() {
-  for (Qelt::IParameterBinding* binding : {mEdges, mColor, mAntiAlias}) {
-    if (binding != nullptr) binding->release();
-  }
-  if (mProgram != nullptr) mProgram->release();
-  if (mQuad != nullptr) mQuad->release();
-}
+GlCanvas::~GlCanvas() = default;
 
 bool GlCanvas::isReady() const {
   return mEdges != nullptr && mColor != nullptr && mAntiAlias != nullptr && mQuad != nullptr;

@@ -1,5 +1,7 @@
 #pragma once
 
+#include <memory>
+
 #include "graphics/ISPCanvas.h"
 
 namespace Qelt {
@@ -27,12 +29,14 @@ class GlCanvas final : public Qelt::ISPCanvas {
   void DrawShape(float x, float y, float size, const Qelt::SPPaint& paint) override;
 
  private:
+  struct Release {
+    void operator()(auto* object) const { object->release(); }
+  };
+
   GlBitmap& mBitmap;
-  Qelt::OpenGLShaderProgram* mProgram = nullptr;
-  Qelt::IParameterBinding* mEdges = nullptr;
-  Qelt::IParameterBinding* mColor = nullptr;
-  Qelt::IParameterBinding* mAntiAlias = nullptr;
-  Qelt::GraphicsObject* mQuad = nullptr;
+  std::unique_ptr<Qelt::OpenGLShaderProgram, Release> mProgram;
+  std::unique_ptr<Qelt::IParameterBinding, Release> mEdges, mColor, mAntiAlias;
+  std::unique_ptr<Qelt::GraphicsObject, Release> mQuad;
 };
 
 }  // namespace QeltDesktop

@@ -35,7 +35,9 @@ PenDrawableGL::~PenDrawableGL() {
 
 void PenDrawableGL::SetCanvas(ISPPenCanvas* canvas) {
   mCanvas = canvas;
-  if (canvas != nullptr) mCanvasQueue = canvas->GetMsgQueue();
+  // One that was there stays: what was posted there still refers to the drawable.
+  IGLMsgQueue* const queue = canvas != nullptr ? canvas->GetMsgQueue() : nullptr;
+  if (queue != nullptr) mCanvasQueue = queue;
   prepareDrawableRT();
 }
 

@@ -1,6 +1,7 @@
 #include "pencommon/PenStrokeDataManager.h"
 
 #include <cmath>
+#include <new>
 
 namespace Qelt {
 
@@ -109,8 +110,12 @@ void PenStrokeDataManager::CreateStrokeData(int runtimeHandle) {
   const AutoCriticalSection guard(&mLock);
   const auto [place, isNew] = mEntries.try_emplace(runtimeHandle, nullptr);
   if (isNew) {
-    place->second = new Entry;
-  } else if (place->second->isDropped) {
+    place->second = new (std::nothrow) Entry;
+    if (place->second != nullptr) return;
+    mEntries.erase(place);
+    throw std::bad_alloc();
+  }
+  if (place->second->isDropped) {
     // Still in use from before: it starts over empty.
     place->second->isDropped = false;
     place->second->data.SetPointData(nullptr);
