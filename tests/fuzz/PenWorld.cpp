@@ -6,9 +6,11 @@
 #include <iterator>
 #include <string_view>
 #include <typeinfo>
+#include <utility>
 
 #include "base/List.h"
 #include "base/String.h"
+#include "desktop/gl/CallTask.h"
 #include "math/Matrix3.h"
 #include "pencommon/IPenMorphable.h"
 #include "pencommon/PenDrawableRT.h"
@@ -16,6 +18,8 @@
 #include "pencommon/PenPredictionDrawableGL.h"
 #include "pencommon/PenPreviewDrawableGL.h"
 #include "pencommon/PenStrokeDataManager.h"
+#include "support/BatchCheck.h"
+#include "support/HostFaults.h"
 
 namespace QeltTests {
 
@@ -33,15 +37,6 @@ constexpr float kFarOut = 2000.0f;  // stroke units
 constexpr float kFinePen = 0.05f;   // stroke units
 constexpr std::size_t kMostFloats = 60'000'000;
 constexpr std::size_t kMostStrokes = 4;
-
-// Floats in one stamp of a render drawable.
-std::size_t floatsPerStamp(const Qelt::PenDrawableRT& drawable) {
-  const std::string_view name = typeid(drawable).name();
-  const auto is = [name](std::string_view part) { return name.find(part) != std::string_view::npos; };
-  if (is("OutlineDrawableRT")) return 6 * 7;
-  if (is("StrokeDrawableRTV3") || is("PredictionDrawableRT")) return 6 * 11;
-  return 6 * 9;
-}
 
 }  // namespace
 
@@ -69,6 +64,7 @@ PenWorld::PenWorld(const QeltDesktop::PluginLibrary& library, QeltDesktop::Rende
     : mLibrary(library),
       mQueue(queue),
       mCanvas(&queue, layer),
+      mOther(&queue, layer),
       mBlank(&queue, nullptr),
       mData(&queue),
       mQueueless(nullptr) {
@@ -81,6 +77,8 @@ PenWorld::PenWorld(const QeltDesktop::PluginLibrary& library, QeltDesktop::Rende
 }
 
 PenWorld::~PenWorld() {
+  HostFaults::open();
+  mQueue.restoreContext();
   for (auto& pen : mPens) pen.reset();
   mQueue.accept = nullptr;
   // What dying pens could not post, the next one that dies posts for them.
@@ -216,8 +214,8 @@ void PenWorld::ask(FuzzInput& input, Qelt::Pen& pen) {
 }
 
 Qelt::ISPPenCanvas* PenWorld::pickCanvas(FuzzInput& input) {
-  Qelt::ISPPenCanvas* const choices[] = {&mCanvas, &mCanvas, &mBlank, nullptr};
-  return choices[input.pick(4)];
+  Qelt::ISPPenCanvas* const choices[] = {&mCanvas, &mCanvas, &mBlank, nullptr, &mOther};
+  return choices[input.pick(5)];
 }
 
 float PenWorld::coordinate(FuzzInput& input) {
@@ -375,21 +373,39 @@ void PenWorld::changeView(FuzzInput& input) {
     default:
       break;
   }
-  static_cast<QeltDesktop::PenCanvas&>(input.flag() ? mBlank : mCanvas).setMatrix(matrix);
+  QeltDesktop::PenCanvas* const choices[] = {&mCanvas, &mBlank, &mOther};
+  choices[input.pick(3)]->setMatrix(matrix);
+  const int target = input.pick(16);
+  if (target < 4) mCanvas.setTarget(static_cast<Target>(target));
 }
 
 void PenWorld::changeQueue(FuzzInput& input) {
-  switch (input.pick(3)) {
+  switch (input.pick(6)) {
     case 0:
       mRefusals = static_cast<std::uint32_t>(input.word());
       break;
     case 1:
       mRefusals = 0;
       break;
-    default:
+    case 2:
       mQueue.loseContext();
       if (input.flag()) mQueue.finish();
       mQueue.restoreContext();
+      break;
+    case 3:
+      // Lost between the tasks that wait and those to come, for as long as it takes.
+      QeltDesktop::postCall(mQueue, [this] { mQueue.loseContext(); });
+      break;
+    case 4:
+      QeltDesktop::postCall(mQueue, [this] { mQueue.restoreContext(); });
+      break;
+    default:
+      // Some call of the host's fails, or none does any more.
+      if (const int number = input.byte(); number < 192) {
+        HostFaults::fail(1 + number, input.flag());
+      } else {
+        HostFaults::open();
+      }
       break;
   }
 }
@@ -405,9 +421,8 @@ void PenWorld::note(bool answer, const RectF& rect) {
 }
 
 void PenWorld::note(const QeltDesktop::Batch& batch) {
-  const std::size_t stamp = floatsPerStamp(*batch.drawable);
+  if (const char* const fault = faultOf(batch); fault != nullptr) breakOff("a pen", fault);
   for (const std::vector<float>& buffer : batch.buffers) {
-    if (buffer.size() % stamp != 0) breakOff("a pen", "a batch that is not of whole stamps");
     mFloats += buffer.size();
     const std::size_t count = buffer.size();
     mix(&count, sizeof count);

@@ -18,12 +18,13 @@
 #include "model/ObjectStroke.h"
 #include "pencommon/Pen.h"
 #include "pencommon/PenStrokeDrawableGL.h"
-#include "support/BlindCanvas.h"
+#include "support/StageCanvas.h"
 
 namespace QeltTests {
 
-// A host that does what its input says, in any order: two pens, two canvases, a few stored strokes, one queue
-// that may refuse. It keeps to what a host owes a pen, and to nothing more: what it lends outlives its use.
+// A host that does what its input says, in any order: two pens, three canvases whose views differ and whose
+// layers come and go, a few stored strokes, one queue that may refuse, calls that fail, a context that is
+// lost for a while. It keeps to what a host owes a pen, and to nothing more: what it lends outlives its use.
 // Aborts the process where a pen breaks its word. One at a time; the caller's thread is main and render
 // thread.
 class PenWorld {
@@ -67,7 +68,7 @@ class PenWorld {
 
   const QeltDesktop::PluginLibrary& mLibrary;
   QeltDesktop::RenderQueue& mQueue;
-  BlindCanvas mCanvas;
+  StageCanvas mCanvas, mOther;
   QeltDesktop::PenCanvas mBlank;  // has no layer at all
   QeltDesktop::PenDataManager mData, mQueueless;
   std::unique_ptr<Qelt::Pen> mPens[2];
