@@ -2,52 +2,102 @@
 
 #include <link.h>
 #include <pthread.h>
+#include <unwind.h>
 
 #include <atomic>
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <iterator>
 #include <mutex>
 #include <new>
 #include <stdexcept>
+#include <string_view>
+
+#include "PlugInCall.h"
 
 namespace {
+
+enum class Owner { PlugIn, Host, Other };
 
 // What stands before every block.
 struct Header {
   std::uint64_t mark;
   void* base;        // what malloc gave
   std::size_t size;  // of the block itself
-  Header* previous;  // of the plug-in's living blocks; null for the host's
+  Header* previous;  // of the living blocks of plug-in and host
   Header* next;
   std::uintptr_t caller;
-  long number;  // of the plug-in's allocations
-  bool ofPlugIn;
+  long number;  // of their allocations
+  Owner owner;
 };
 
 constexpr std::uint64_t kAlive = 0x51454C5441110CADu;
 constexpr std::uint64_t kDeleted = 0xDEADDEADDEADDEADu;
 
-std::atomic<std::uintptr_t> codeBegin{0}, codeEnd{0};
-std::atomic<long> blocks{0}, ownBlocks{0}, ownAllocations{0}, deletionsOfNothing{0}, thrown{0};
-std::atomic<long> askedSince{0}, failFrom{0}, failTo{0};  // failing: from <= number <= to
+// Where a loaded library lies.
+struct Code {
+  std::atomic<std::uintptr_t> begin{0}, end{0};
+  bool holds(std::uintptr_t address) const {
+    return address >= begin.load(std::memory_order_relaxed) && address < end.load(std::memory_order_relaxed);
+  }
+};
 
-// Guards the list of the plug-in's living blocks. Not a std::mutex's business to allocate, nor this one's.
+constexpr const char* kHostNames[] = {"libQeltBase.so", "libQeltModel.so",    "libQeltEngine.so",
+                                      "libQeltGL.so",   "libQeltGraphics.so", "libQeltPenCommon.so"};
+Code plugIn, standardLibrary, hosts[std::size(kHostNames)];
+std::atomic<long> blocks{0}, ownBlocks{0}, hostsBlocks{0}, ownAllocations{0}, watched{0},
+    deletionsOfNothing{0}, thrown{0};
+std::atomic<long> askedSince{0}, failFrom{0}, failTo{0};  // failing: from <= number <= to
+std::atomic<bool> everyones{false};                       // are numbered, not the plug-in's alone
+
+// Guards the list of the living blocks of plug-in and host. Not a std::mutex's business to allocate, nor this
+// one's.
 std::mutex listLock;
 Header* living = nullptr;
 
-bool isOfPlugIn(const void* caller) {
-  const auto address = reinterpret_cast<std::uintptr_t>(caller);
-  return address >= codeBegin.load(std::memory_order_relaxed) &&
-         address < codeEnd.load(std::memory_order_relaxed);
+Owner ownerOf(std::uintptr_t caller) {
+  if (plugIn.holds(caller)) return Owner::PlugIn;
+  for (const Code& host : hosts) {
+    if (host.holds(caller)) return Owner::Host;
+  }
+  return Owner::Other;
 }
 
-void* allocate(std::size_t size, std::size_t alignment, const void* caller) {
-  const bool ofPlugIn = isOfPlugIn(caller);
-  long number = 0;
-  if (ofPlugIn) {
-    number = ownAllocations.fetch_add(1) + 1;
+// Whether it is plug-in or host that called the standard library, which asks.
+bool asksForOneOfUs() {
+  struct Search {
+    bool inLibrary = false, isOurs = false;
+  } search;
+  _Unwind_Backtrace(
+      [](_Unwind_Context* context, void* data) {
+        auto& found = *static_cast<Search*>(data);
+        const std::uintptr_t at = _Unwind_GetIP(context);
+        const bool isLibrary = standardLibrary.holds(at);
+        found.inLibrary = found.inLibrary || isLibrary;
+        // Before the library stands what is in this file.
+        if (isLibrary || !found.inLibrary) return _URC_NO_REASON;
+        found.isOurs = ownerOf(at) != Owner::Other;
+        return _URC_END_OF_STACK;
+      },
+      &search);
+  return search.isOurs;
+}
+
+// Whether this is one of the allocations that are numbered for failing.
+bool isNumbered(Owner owner, std::uintptr_t caller) {
+  if (!everyones.load(std::memory_order_relaxed)) return owner == Owner::PlugIn;
+  if (!QeltTests::PlugInCall::isUnderWay() || failFrom.load() == INT64_MAX) return false;
+  return owner != Owner::Other || (standardLibrary.holds(caller) && asksForOneOfUs());
+}
+
+void* allocate(std::size_t size, std::size_t alignment, const void* callerAddress) {
+  const auto caller = reinterpret_cast<std::uintptr_t>(callerAddress);
+  const Owner owner = ownerOf(caller);
+  const long number = owner != Owner::Other ? watched.fetch_add(1) + 1 : 0;
+  if (owner == Owner::PlugIn) ownAllocations.fetch_add(1);
+  if (isNumbered(owner, caller)) {
     const long asked = askedSince.fetch_add(1) + 1;
     if (asked >= failFrom.load() && asked <= failTo.load()) return nullptr;
   }
@@ -59,13 +109,12 @@ void* allocate(std::size_t size, std::size_t alignment, const void* caller) {
   const auto start = reinterpret_cast<std::uintptr_t>(base) + sizeof(Header);
   const std::uintptr_t block = (start + alignment - 1) / alignment * alignment;
   auto* const header = reinterpret_cast<Header*>(block) - 1;
-  *header = {kAlive, base,    size, nullptr, nullptr, reinterpret_cast<std::uintptr_t>(caller),
-             number, ofPlugIn};
+  *header = {kAlive, base, size, nullptr, nullptr, caller, number, owner};
   blocks.fetch_add(1, std::memory_order_relaxed);
   auto* const memory = reinterpret_cast<void*>(block);
-  if (ofPlugIn) {
-    std::memset(memory, 0xCD, size);
-    ownBlocks.fetch_add(1);
+  if (owner != Owner::Other) {
+    if (owner == Owner::PlugIn) std::memset(memory, 0xCD, size);
+    (owner == Owner::PlugIn ? ownBlocks : hostsBlocks).fetch_add(1);
     const std::lock_guard hold(listLock);
     header->next = living;
     if (living != nullptr) living->previous = header;
@@ -83,9 +132,9 @@ void release(void* memory) {
   }
   header->mark = kDeleted;
   blocks.fetch_sub(1, std::memory_order_relaxed);
-  if (header->ofPlugIn) {
-    ownBlocks.fetch_sub(1);
-    std::memset(memory, 0xDD, header->size);
+  if (header->owner != Owner::Other) {
+    (header->owner == Owner::PlugIn ? ownBlocks : hostsBlocks).fetch_sub(1);
+    if (header->owner == Owner::PlugIn) std::memset(memory, 0xDD, header->size);
     const std::lock_guard hold(listLock);
     (header->previous != nullptr ? header->previous->next : living) = header->next;
     if (header->next != nullptr) header->next->previous = header->previous;
@@ -93,14 +142,16 @@ void release(void* memory) {
   std::free(header->base);
 }
 
-struct Search {
-  const char* path;
-  bool found;
-};
-
-int findLibrary(dl_phdr_info* info, std::size_t, void* data) {
-  auto* const search = static_cast<Search*>(data);
-  if (info->dlpi_name == nullptr || std::strcmp(info->dlpi_name, search->path) != 0) return 0;
+// Notes where a library lies if it is one that is looked for.
+int note(dl_phdr_info* info, std::size_t, void* plugInPath) {
+  const std::string_view path = info->dlpi_name != nullptr ? info->dlpi_name : "";
+  const std::string_view name = path.substr(path.rfind('/') + 1);
+  Code* code = path == static_cast<const char*>(plugInPath) ? &plugIn : nullptr;
+  if (name.substr(0, 13) == "libstdc++.so.") code = &standardLibrary;
+  for (std::size_t i = 0; i < std::size(hosts); ++i) {
+    if (name == kHostNames[i]) code = &hosts[i];
+  }
+  if (code == nullptr) return 0;
   std::uintptr_t begin = UINTPTR_MAX, end = 0;
   for (int i = 0; i < info->dlpi_phnum; ++i) {
     const ElfW(Phdr)& segment = info->dlpi_phdr[i];
@@ -109,10 +160,9 @@ int findLibrary(dl_phdr_info* info, std::size_t, void* data) {
     begin = at < begin ? at : begin;
     end = at + segment.p_memsz > end ? at + segment.p_memsz : end;
   }
-  codeBegin = begin;
-  codeEnd = end;
-  search->found = true;
-  return 1;
+  code->begin = begin;
+  code->end = end;
+  return 0;
 }
 
 }  // namespace
@@ -120,12 +170,13 @@ int findLibrary(dl_phdr_info* info, std::size_t, void* data) {
 namespace QeltTests {
 
 void AllocationGate::watch(const std::string& libraryPath) {
-  Search search{libraryPath.c_str(), false};
-  dl_iterate_phdr(findLibrary, &search);
-  if (!search.found) throw std::runtime_error("not loaded: " + libraryPath);
+  plugIn.begin = plugIn.end = 0;
+  dl_iterate_phdr(note, const_cast<char*>(libraryPath.c_str()));
+  if (plugIn.end == 0) throw std::runtime_error("not loaded: " + libraryPath);
 }
 
-void AllocationGate::fail(long number, bool andAllAfter) {
+void AllocationGate::fail(long number, bool andAllAfter, Whose whose) {
+  everyones = whose == Whose::Everyones;
   askedSince = 0;
   failTo = andAllAfter ? INT64_MAX : number;
   failFrom = number;
@@ -141,12 +192,20 @@ long AllocationGate::plugInBlocks() {
   return ownBlocks;
 }
 
+long AllocationGate::hostBlocks() {
+  return hostsBlocks;
+}
+
 long AllocationGate::allBlocks() {
   return blocks;
 }
 
 long AllocationGate::plugInAllocations() {
   return ownAllocations;
+}
+
+long AllocationGate::watchedAllocations() {
+  return watched;
 }
 
 long AllocationGate::thrownFailures() {
@@ -160,7 +219,7 @@ long AllocationGate::badDeletions() {
 long AllocationGate::numberOf(const void* address) {
   const std::lock_guard hold(listLock);
   for (const Header* header = living; header != nullptr; header = header->next) {
-    if (header + 1 == address) return header->number;
+    if (header + 1 == address && header->owner == Owner::PlugIn) return header->number;
   }
   return 0;
 }
@@ -172,9 +231,16 @@ std::string AllocationGate::livingSince(long after) {
     const std::lock_guard hold(listLock);
     for (const Header* header = living; header != nullptr && length < 2000; header = header->next) {
       if (header->number <= after) continue;
+      const char* name = "plug-in";
+      std::uintptr_t begin = plugIn.begin;
+      for (std::size_t i = 0; i < std::size(hosts); ++i) {
+        if (!hosts[i].holds(header->caller)) continue;
+        name = kHostNames[i];
+        begin = hosts[i].begin;
+      }
       length +=
-          std::snprintf(text + length, sizeof text - static_cast<std::size_t>(length), " 0x%zx(%zu bytes)",
-                        static_cast<std::size_t>(header->caller - codeBegin), header->size);
+          std::snprintf(text + length, sizeof text - static_cast<std::size_t>(length), " %s 0x%zx(%zu bytes)",
+                        name, static_cast<std::size_t>(header->caller - begin), header->size);
     }
   }
   return std::string(text, static_cast<std::size_t>(length));

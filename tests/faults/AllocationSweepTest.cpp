@@ -16,8 +16,10 @@ class AllocationSweep : public testing::TestWithParam<Scenario> {};
 TEST_P(AllocationSweep, LeavesThePenAsGoodAsNew) {
   SweepGround ground(GetParam().picture);
   RecordProperty("failures",
-                 ground.survivesEach(GetParam(), "allocation", AllocationGate::fail,
-                                     [](long number) { return AllocationGate::open() >= number; }));
+                 ground.survivesEach(
+                     GetParam(), "allocation",
+                     [](long number, bool andAllAfter) { AllocationGate::fail(number, andAllAfter); },
+                     [](long number) { return AllocationGate::open() >= number; }));
 }
 
 INSTANTIATE_TEST_SUITE_P(Scenarios, AllocationSweep, testing::ValuesIn(scenarios()),

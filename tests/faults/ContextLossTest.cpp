@@ -1,11 +1,18 @@
 // The GL context goes and comes back, twice, between any two tasks of the render thread: the picture at the
-// end is the one drawn without it.
+// end is the one drawn without it. It goes before any task and comes back before a later one: what is drawn
+// from there on is what is drawn without.
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <functional>
+#include <map>
+#include <set>
 #include <string>
+#include <utility>
 
 #include "Stage.h"
+#include "desktop/gl/CallTask.h"
 #include "gl/ITask.h"
 #include "support/LogCapture.h"
 #include "support/Versions.h"
@@ -15,20 +22,6 @@ namespace {
 
 using QeltDesktop::RenderQueue;
 
-class LossTask final : public Qelt::ITask {
- public:
-  explicit LossTask(RenderQueue& queue) : mQueue(queue) {}
-  void run() override {
-    for (int i = 0; i < 2; ++i) {
-      mQueue.loseContext();
-      mQueue.restoreContext();
-    }
-  }
-
- private:
-  RenderQueue& mQueue;
-};
-
 struct Case {
   const char* name;
   int version;
@@ -37,21 +30,38 @@ struct Case {
 
 class ContextLoss : public testing::TestWithParam<Case> {
  protected:
-  // Draws with a loss ahead of the given post, from 1; 0 for none.
-  std::vector<std::uint8_t> picture(long lossBefore) {
+  // What is drawn with a call made on the render thread ahead of one post or another, from 1.
+  using Call = std::function<void()>;
+  std::vector<std::uint8_t> picture(std::map<long, Call> calls) {
     mLayer.clear();
     Stage stage(mQueue, &mLayer, GetParam().version);
     mPosts = 0;
-    mQueue.accept = [this, lossBefore](const Qelt::ITask&) {
-      if (++mPosts == lossBefore) mQueue.Post(new LossTask(mQueue));
+    mQueue.accept = [&](const Qelt::ITask&) {
+      if (const auto call = calls.find(++mPosts); call != calls.end()) {
+        const auto accept = std::exchange(mQueue.accept, nullptr);
+        QeltDesktop::postCall(mQueue, call->second);
+        mQueue.accept = accept;
+      }
       return true;
     };
     GetParam().draw(stage);
     mQueue.finish();
     mQueue.accept = nullptr;
+    mQueue.restoreContext();
     return mLayer.readPixels();
   }
 
+  const Call mLose = [this] { mQueue.loseContext(); };
+  const Call mLoseTwice = [this] {
+    for (int i = 0; i < 2; ++i) {
+      mQueue.loseContext();
+      mQueue.restoreContext();
+    }
+  };
+  const Call mRestoreAndWipe = [this] {
+    mQueue.restoreContext();
+    mLayer.clear();
+  };
   LogCapture mLog;
   RenderQueue mQueue{RenderQueue::Mode::Caller, RenderQueue::GL::Context};
   QeltDesktop::CanvasLayer mLayer{mQueue, 160, 120, 128};
@@ -59,13 +69,29 @@ class ContextLoss : public testing::TestWithParam<Case> {
 };
 
 TEST_P(ContextLoss, LeavesThePictureAsItIsWithout) {
-  const std::vector<std::uint8_t> expected = picture(0);
+  const std::vector<std::uint8_t> expected = picture({});
   const long posts = mPosts;
   ASSERT_NE(expected, std::vector<std::uint8_t>(expected.size())) << "nothing was drawn";
   for (long number = 1; number <= posts; ++number) {
-    EXPECT_TRUE(picture(number) == expected) << "loss before task " << number << " of " << posts;
+    EXPECT_TRUE(picture({{number, mLoseTwice}}) == expected)
+        << "loss before task " << number << " of " << posts;
   }
   RecordProperty("losses", static_cast<int>(2 * posts));
+}
+
+TEST_P(ContextLoss, ForAWhileSparesWhatComesAfterwards) {
+  picture({});
+  const long posts = mPosts;
+  int losses = 0;
+  for (long back = 2; back <= posts; ++back) {
+    const std::vector<std::uint8_t> expected = picture({{back, mRestoreAndWipe}});
+    for (const long lost : std::set<long>{1, std::max(back - 4, 1l), back - 1}) {
+      EXPECT_TRUE(picture({{lost, mLose}, {back, mRestoreAndWipe}}) == expected)
+          << "lost before task " << lost << ", back before task " << back << " of " << posts;
+      ++losses;
+    }
+  }
+  RecordProperty("losses", losses);
 }
 
 INSTANTIATE_TEST_SUITE_P(Strokes, ContextLoss,

@@ -1,5 +1,7 @@
 #include "Scenarios.h"
 
+#include <stdexcept>
+
 #include "pencommon/PenStrokeDrawableGL.h"
 
 namespace QeltTests {
@@ -64,6 +66,13 @@ std::vector<Scenario> scenarios() {
        },
        false, true},
   };
+}
+
+Scenario scenario(const std::string& name) {
+  for (const Scenario& one : scenarios()) {
+    if (one.name == name) return one;
+  }
+  throw std::logic_error("no scenario " + name);
 }
 
 }  // namespace QeltTests

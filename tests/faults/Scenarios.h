@@ -1,5 +1,6 @@
 #pragma once
 
+#include <string>
 #include <vector>
 
 #include "Stage.h"
@@ -17,5 +18,8 @@ struct Scenario {
 // Where a pen dies, it dies with work queued. Those with a picture: textures, shaders, buffers; loss of the
 // context.
 std::vector<Scenario> scenarios();
+
+// The one of that name.
+Scenario scenario(const std::string& name);
 
 }  // namespace QeltTests

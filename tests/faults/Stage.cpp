@@ -3,7 +3,9 @@
 #include <cmath>
 #include <new>
 #include <stdexcept>
+#include <utility>
 
+#include "PlugInCall.h"
 #include "base/RectF.h"
 #include "desktop/pencommon/BatchObserver.h"
 #include "math/Matrix3.h"
@@ -12,6 +14,7 @@
 #include "pencommon/PenPredictionDrawableGL.h"
 #include "pencommon/PenPreviewDrawableGL.h"
 #include "pencommon/PenStrokeDataManager.h"
+#include "support/BatchCheck.h"
 #include "support/Board.h"
 
 namespace QeltTests {
@@ -47,7 +50,27 @@ MotionEvent recordedStroke() {
   return eventOf(Qelt::kActionUp, all, 0, all.size());
 }
 
+// Where batches go that are compared, and what was wrong with any.
+Drawn* recording = nullptr;
+std::string wrong;
+
+void look(const QeltDesktop::Batch& batch) {
+  if (const char* const fault = faultOf(batch); fault != nullptr && wrong.empty()) wrong = fault;
+  if (recording == nullptr) return;
+  recording->batches.insert(recording->batches.end(), batch.buffers.begin(), batch.buffers.end());
+  recording->cached.push_back(batch.cached);
+}
+
 }  // namespace
+
+std::string Stage::watchBatches() {
+  QeltDesktop::setBatchObserver(look);
+  return std::exchange(wrong, std::string());
+}
+
+void Stage::watchNoBatches() {
+  QeltDesktop::setBatchObserver(nullptr);
+}
 
 std::string difference(const Drawn& drawn, const Drawn& expected) {
   const auto ofLists = [](const char* name, const auto& some, const auto& others) {
@@ -61,14 +84,22 @@ std::string difference(const Drawn& drawn, const Drawn& expected) {
   };
   std::string found = ofLists("step", drawn.steps, expected.steps);
   if (found.empty()) found = ofLists("batch", drawn.batches, expected.batches);
+  if (found.empty() && drawn.cached != expected.cached) found = "hits of the cache";
   return found.empty() && drawn.pixels != expected.pixels ? "pixels" : found;
 }
 
 Stage::Stage(QeltDesktop::RenderQueue& queue, QeltDesktop::CanvasLayer* layer, int version)
-    : mVersion(version), mQueue(queue), mLayer(layer), mCanvas(&queue, layer), mData(&queue) {}
+    : mVersion(version),
+      mQueue(queue),
+      mLayer(layer),
+      mCanvases{{&queue, layer},
+                {&queue, nullptr, Target::NoLayer},
+                {&queue, layer, Target::NoBitmap},
+                {&queue, layer, Target::NoTiles}},
+      mData(&queue) {}
 
 Stage::~Stage() {
-  mPen.reset();
+  deletePen();
   mQueue.finish();
   turnPage();
 }
@@ -80,24 +111,55 @@ const QeltDesktop::PluginLibrary& Stage::library() {
 
 void Stage::makePen() {
   if (mPen != nullptr) return;
+  const PlugInCall call;
   mPen.reset(library().createPen());
   if (mPen == nullptr) return;
   mPen->setPenDataManager(&mData);
+  setUsualPen();
+}
+
+void Stage::deletePen() {
+  const PlugInCall call;
+  mPen.reset();
+}
+
+void Stage::setUsualPen() {
   mPen->setVersion(mVersion);
   mPen->SetScreenResolution(400, 600);
   mPen->SetSize(kSize);
   mPen->SetColor(kInk);
 }
 
-void Stage::deletePen() {
-  mPen.reset();
+void Stage::setUsual(Qelt::PenDrawableGL& drawable) {
+  zoom(1.0f);
+  const PlugInCall call;
+  setUsualPen();
+  mPen->GetMorphable()->SetFixedWidthEnabled(false);
+  mPen->GetMorphable()->SetCurveEnabled(true);
+  drawable.SetCanvas(canvas(Target::Whole));
 }
 
 template <typename Call>
-void Stage::drawing(Call&& call) {
+void Stage::hostCall(Call&& call) {
+  const PlugInCall inside;
+  try {
+    call();
+  } catch (const std::bad_alloc&) {
+  }
+}
+
+void Stage::finish() {
+  const PlugInCall call;
+  mQueue.finish();
+}
+
+template <typename Call>
+void Stage::drawing(Qelt::PenDrawableGL& drawable, Call&& call) {
+  if (beforeCall) beforeCall(*this, drawable);
   RectF rect;
   bool answer = false;
   try {
+    const PlugInCall inside;
     answer = call(&rect);
   } catch (const std::bad_alloc&) {
     ++mRefusedBatches;
@@ -111,8 +173,9 @@ void Stage::drawing(Call&& call) {
 
 template <typename Drawable>
 Drawable* Stage::onCanvas(Drawable* (Qelt::Pen::*getter)()) {
+  const PlugInCall call;
   Drawable* const drawable = mPen == nullptr ? nullptr : (mPen.get()->*getter)();
-  if (drawable != nullptr) drawable->SetCanvas(&mCanvas);
+  if (drawable != nullptr) drawable->SetCanvas(canvas(Target::Whole));
   return drawable;
 }
 
@@ -126,7 +189,8 @@ StoredStroke& Stage::newStroke() {
   for (const Sample& sample : samples()) {
     mPage.back()->addPoint({sample.x, sample.y}, time += 4, sample.pressure, sample.tilt, sample.orientation);
   }
-  PenStrokeDataManager::GetInstance()->CreateStrokeData(mPage.back()->GetRuntimeHandle());
+  hostCall(
+      [this] { PenStrokeDataManager::GetInstance()->CreateStrokeData(mPage.back()->GetRuntimeHandle()); });
   return *mPage.back();
 }
 
@@ -134,8 +198,8 @@ template <typename Drawable>
 void Stage::send(Drawable* drawable, int action, const std::vector<Sample>& from, std::size_t begin,
                  std::size_t end, bool finishes) {
   const MotionEvent event = eventOf(action, from, begin, end);
-  drawing([&](RectF* rect) { return drawable->Draw(&event, rect); });
-  if (finishes) mQueue.finish();
+  drawing(*drawable, [&](RectF* rect) { return drawable->Draw(&event, rect); });
+  if (finishes) finish();
 }
 
 void Stage::drawStroke(Qelt::PenStrokeDrawableGL* drawable, bool finishes, bool ends) {
@@ -169,9 +233,9 @@ void Stage::straight() {
 }
 
 template <typename Drawable, typename Input>
-void Stage::redrawTwice(Drawable* drawable, const Input& input) {
+void Stage::redrawTwice(Drawable& drawable, const Input& input) {
   for (int i = 0; i < 2; ++i) {
-    drawing([&](RectF* rect) { return drawable->RedrawPen(&input, rect); });
+    drawing(drawable, [&](RectF* rect) { return drawable.RedrawPen(&input, rect); });
   }
 }
 
@@ -180,21 +244,21 @@ void Stage::redraw(bool finishes) {
   Qelt::PenStrokeDrawableGL* drawable = strokeDrawable();
   if (drawable == nullptr) return;
   const auto keepUp = [&] {
-    if (finishes) mQueue.finish();
+    if (finishes) finish();
   };
   StoredStroke& stroke = newStroke();
-  redrawTwice(drawable, stroke);  // a miss, then a hit
+  redrawTwice(*drawable, stroke);  // a miss, then a hit
   keepUp();
   stroke.SetRedrawingCacheDirtyFlag();
-  redrawTwice(drawable, stroke);
+  redrawTwice(*drawable, stroke);
   keepUp();
   MotionEvent recorded = recordedStroke();
-  redrawTwice(drawable, recorded);
+  redrawTwice(*drawable, recorded);
   keepUp();
   mPen->GetMorphable()->SetCurveEnabled(false);
   StoredStroke& straight = newStroke();
-  redrawTwice(drawable, straight);
-  redrawTwice(drawable, recorded);
+  redrawTwice(*drawable, straight);
+  redrawTwice(*drawable, recorded);
   mPen->GetMorphable()->SetCurveEnabled(true);
   keepUp();
 }
@@ -208,9 +272,9 @@ void Stage::outline(bool finishes) {
   const StoredStroke& stroke = newStroke();
   MotionEvent recorded = recordedStroke();
   for (int i = 0; i < 2; ++i) {
-    drawing([&](RectF* rect) { return drawable->DrawOutline(&stroke, rect); });
-    drawing([&](RectF* rect) { return drawable->DrawOutline(&recorded, rect); });
-    if (finishes) mQueue.finish();
+    drawing(*drawable, [&](RectF* rect) { return drawable->DrawOutline(&stroke, rect); });
+    drawing(*drawable, [&](RectF* rect) { return drawable->DrawOutline(&recorded, rect); });
+    if (finishes) finish();
   }
 }
 
@@ -223,8 +287,8 @@ void Stage::preview(bool finishes) {
   send(drawable, Qelt::kActionMove, all, 1, 6, finishes);
   send(drawable, Qelt::kActionUp, all, 9, 10, finishes);
   MotionEvent recorded = recordedStroke();
-  drawing([&](RectF* rect) { return drawable->RedrawPen(&recorded, rect); });
-  if (finishes) mQueue.finish();
+  drawing(*drawable, [&](RectF* rect) { return drawable->RedrawPen(&recorded, rect); });
+  if (finishes) finish();
 }
 
 void Stage::predict(bool finishes) {
@@ -249,6 +313,48 @@ void Stage::prepareAll() {
   if (mVersion == 8) onCanvas(&Qelt::Pen::GetPredictionStrokeDrawableGL);
 }
 
+void Stage::everyKind() {
+  live();
+  redraw();
+  outline();
+  preview();
+  predict();
+}
+
+void Stage::oneOfEach() {
+  makePen();
+  const MotionEvent recorded = recordedStroke();
+  if (auto* const drawable = strokeDrawable()) redrawTwice(*drawable, newStroke());
+  if (auto* const drawable = onCanvas(&Qelt::Pen::GetOutlineDrawableGL)) {
+    drawable->SetOutlineSize(2.0f);
+    drawing(*drawable, [&](RectF* rect) { return drawable->DrawOutline(&recorded, rect); });
+  }
+  if (auto* const drawable = onCanvas(&Qelt::Pen::GetPreviewDrawableGL))
+    drawing(*drawable, [&](RectF* rect) { return drawable->RedrawPen(&recorded, rect); });
+  if (auto* const drawable = onCanvas(&Qelt::Pen::GetPredictionStrokeDrawableGL))
+    send(drawable, Qelt::kActionMove, samples(), 2, 5, false);
+  finish();
+}
+
+bool Stage::redrawsLastOf(Stage& other) {
+  if (other.mPage.empty()) return true;
+  makePen();
+  mPen->GetMorphable()->SetCurveEnabled(other.pen()->GetMorphable()->IsCurveEnabled());
+  Qelt::PenStrokeDrawableGL* const drawable = strokeDrawable();
+  StoredStroke& stroke = *other.mPage.back();
+  finish();
+  Drawn* const outer = std::exchange(recording, nullptr);
+  Drawn drawn[2];
+  for (Drawn& into : drawn) {
+    recording = &into;
+    drawing(*drawable, [&](RectF* rect) { return drawable->RedrawPen(&stroke, rect); });
+    finish();
+    stroke.SetRedrawingCacheDirtyFlag();
+  }
+  recording = outer;
+  return drawn[0].batches == drawn[1].batches;
+}
+
 void Stage::turnPage() {
   for (const auto& stroke : mPage) {
     PenStrokeDataManager::GetInstance()->DropStrokeData(stroke->GetRuntimeHandle());
@@ -259,36 +365,35 @@ void Stage::turnPage() {
 void Stage::zoom(float factor) {
   Qelt::Matrix3<float> matrix;
   matrix[0] = matrix[4] = factor;
-  mCanvas.setMatrix(matrix);
+  for (StageCanvas& canvas : mCanvases) canvas.setMatrix(matrix);
 }
 
 void Stage::loseAndRestoreContext() {
-  mQueue.loseContext();
-  mQueue.restoreContext();
+  hostCall([this] { mQueue.loseContext(); });
+  hostCall([this] { mQueue.restoreContext(); });
 }
 
-Drawn Stage::drawEverything() {
+Drawn Stage::drawEverything(float zoomFactor) {
+  mQueue.restoreContext();
   mQueue.finish();
-  Drawn drawn;
-  zoom(1.0f);
+  Drawn* const outer = std::exchange(recording, nullptr);
   makePen();
+  setUsual(*mPen->GetStrokeDrawableGL());
+  zoom(zoomFactor);
   // An outline's first segment grows from the width that the outline before it ended with, and a prediction
   // from the last stroke's end: one of each sets both, and what follows starts alike.
   outline();
   mQueue.finish();
   if (mLayer != nullptr) mLayer->clear();
+  Drawn drawn;
+  recording = &drawn;
   mRecord = &drawn;
-  QeltDesktop::setBatchObserver([&drawn](QeltDesktop::Batch batch) {
-    for (std::vector<float>& buffer : batch.buffers) drawn.batches.push_back(std::move(buffer));
-  });
-  live();
-  redraw();
-  outline();
-  preview();
-  predict();
+  QeltDesktop::setBatchObserver(look);
+  mLayer != nullptr ? oneOfEach() : everyKind();
   mQueue.finish();
-  QeltDesktop::setBatchObserver(nullptr);
+  recording = outer;
   mRecord = nullptr;
+  if (outer == nullptr) watchNoBatches();
   if (mLayer != nullptr) drawn.pixels = mLayer->readPixels();
   return drawn;
 }

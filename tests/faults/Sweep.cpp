@@ -2,12 +2,22 @@
 
 namespace QeltTests {
 
-SweepGround::SweepGround(bool picture)
-    : mQueue(QeltDesktop::RenderQueue::Mode::Caller,
+namespace {
+
+// The gate knows plug-in and host before the ground makes anything of theirs.
+Failing watched(Failing failing) {
+  AllocationGate::watch(Stage::library().path());
+  return failing;
+}
+
+}  // namespace
+
+SweepGround::SweepGround(bool picture, Failing failing)
+    : mFailing(watched(failing)),
+      mQueue(QeltDesktop::RenderQueue::Mode::Caller,
              picture ? QeltDesktop::RenderQueue::GL::Context : QeltDesktop::RenderQueue::GL::None),
       mFresh(9) {
   if (picture) mLayer = std::make_unique<QeltDesktop::CanvasLayer>(mQueue, 160, 120, 128);
-  AllocationGate::watch(Stage::library().path());
 }
 
 SweepGround::~SweepGround() = default;
@@ -24,7 +34,8 @@ const Drawn& SweepGround::fresh(int version) {
 SweepGround::Counts SweepGround::settle() {
   mQueue.finish();
   mLog.take();
-  return {AllocationGate::plugInBlocks(), AllocationGate::allBlocks(), AllocationGate::badDeletions()};
+  return {AllocationGate::plugInBlocks(), AllocationGate::hostBlocks(), AllocationGate::allBlocks(),
+          AllocationGate::badDeletions()};
 }
 
 }  // namespace QeltTests
