@@ -44,8 +44,7 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
 
     void AddPoint(const Vector2<float>* point, float size, float tiltFactor) {
       const StampLook look{0.0f, tiltFactor, 0.0f, point[1]};
-      // A ramp may overshoot its target.
-      StampExtent extent = squareExtent(std::max(size, 0.0f));
+      StampExtent extent = squareExtent(size);
       mInner.add(stampQuad(point[0], extent), look);
       extent.x = std::max(extent.x + mOutlineSize, 0.0f);
       extent.y = std::max(extent.y + mOutlineSize, 0.0f);

@@ -2,7 +2,6 @@
 
 #include <GLES3/gl3.h>
 
-#include <algorithm>
 #include <cmath>
 #include <cstddef>
 #include <limits>
@@ -66,12 +65,10 @@ class StampRenderer : public HostBase {
     void AddPoint(const Vector2<float>* point, float size, float alpha, float tiltBlend, int tile) {
       // Most stamps are as large as the one before; the divisions of an extent cost a third of a stamp.
       if (size != mSize) {
-        mExtent = extent(std::max(size, 0.0f));
+        mExtent = extent(size);
         mSize = size;
       }
-      // A ramp may overshoot its target, and a prediction begin ahead of any stroke.
-      mStamps.add(stampQuad(point[0], mExtent),
-                  {std::max(alpha, 0.0f), tiltBlend, static_cast<float>(tile), point[1]});
+      mStamps.add(stampQuad(point[0], mExtent), {alpha, tiltBlend, static_cast<float>(tile), point[1]});
     }
 
     // The buffer holds all stamps from here on.
