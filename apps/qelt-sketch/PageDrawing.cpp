@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <array>
 #include <cmath>
+#include <cstdint>
 #include <cstdio>
 #include <optional>
 #include <string>
@@ -17,6 +18,7 @@
 #include "desktop/graphics/CanvasLayer.h"
 #include "desktop/graphics/Compose.h"
 #include "desktop/graphics/PenCanvas.h"
+#include "desktop/pencommon/BatchObserver.h"
 
 namespace QeltDesktop {
 namespace {
@@ -24,6 +26,12 @@ namespace {
 // 256 MiB a layer.
 constexpr double kMostPixels = 67'108'864.0;
 constexpr double kLongestSide = 32'767.0;
+
+// How far the pen may be ahead of the render thread, which is some ten times as slow: a single call may go
+// beyond it.
+constexpr std::uint64_t kMostWaitingBytes = 16 << 20;
+// What the tasks of a call take besides its batch, roughly.
+constexpr std::uint64_t kTaskBytes = 1024;
 
 // Whole pixels; what rounding errors leave over is none.
 double pixelsFor(double length) {
@@ -88,13 +96,15 @@ class Drawing : public PlayObserver {
   void predictionEnds() override { mPrediction->pixels().clear(); }
 
   void call(const DrawableCall&, const std::function<bool(Qelt::RectF*)>& make) override {
+    const std::uint64_t before = writtenBytes();
     Qelt::RectF rect;
     make(&rect);
+    mWaitingBytes += writtenBytes() - before + kTaskBytes;
+    if (mWaitingBytes > kMostWaitingBytes) letQueueCatchUp();
   }
 
   void strokeEnds() override {
-    // Keeps the tasks that wait, and their batches, to a stroke's worth.
-    mQueue.finish();
+    letQueueCatchUp();
     mProgress.step();
   }
 
@@ -108,8 +118,14 @@ class Drawing : public PlayObserver {
   }
 
  private:
+  void letQueueCatchUp() {
+    mQueue.finish();
+    mWaitingBytes = 0;
+  }
+
   RenderQueue& mQueue;
   Progress& mProgress;
+  std::uint64_t mWaitingBytes = 0;
   std::optional<Layer> mOutline, mStroke, mPrediction;
   Canvases mCanvases;
 };

@@ -6,7 +6,12 @@
 
 namespace QeltDesktop {
 
-// Writes one line to the Android log under the tag the pens use, priority error. Any thread.
-QELT_HOST_API void logError(const std::string& text) noexcept;
+// Writes one line to the Android log under the tag the pens use, priority error. Any thread. Takes no memory.
+QELT_HOST_API void logError(const char* text) noexcept;
+// The same of "what: detail"; a long detail is cut.
+QELT_HOST_API void logError(const char* what, const char* detail) noexcept;
+inline void logError(const std::string& text) noexcept {
+  logError(text.c_str());
+}
 
 }  // namespace QeltDesktop

@@ -5,7 +5,6 @@
 #include <exception>
 #include <mutex>
 #include <new>
-#include <string>
 #include <vector>
 
 #include "desktop/base/Log.h"
@@ -52,7 +51,7 @@ void notify(const QeltDesktop::GlDevice* device, Notice notice) {
     try {
       (entry.object->*notice)();
     } catch (const std::exception& error) {
-      QeltDesktop::logError(std::string("a managed object threw on a change of context: ") + error.what());
+      QeltDesktop::logError("a managed object threw on a change of context", error.what());
     } catch (...) {
       QeltDesktop::logError("a managed object threw on a change of context");
     }
