@@ -5,7 +5,9 @@
 #include <cmath>
 #include <cstdint>
 #include <cstdio>
+#include <new>
 #include <optional>
+#include <stdexcept>
 #include <string>
 #include <vector>
 
@@ -14,6 +16,7 @@
 #include "ProgramFiles.h"
 #include "Progress.h"
 #include "Refusal.h"
+#include "desktop/gl/GlVertexObject.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/graphics/CanvasLayer.h"
 #include "desktop/graphics/Compose.h"
@@ -118,14 +121,19 @@ class Drawing : public PlayObserver {
   }
 
  private:
+  // A picture that lacks something is none.
   void letQueueCatchUp() {
     mQueue.finish();
     mWaitingBytes = 0;
+    if (GlVertexObject::undrawnBatches() != mUndrawnBefore) throw std::bad_alloc();
+    if (mQueue.droppedTasks() != mDroppedBefore) throw std::runtime_error("a render task failed (see --log)");
   }
 
   RenderQueue& mQueue;
   Progress& mProgress;
   std::uint64_t mWaitingBytes = 0;
+  const std::uint64_t mUndrawnBefore = GlVertexObject::undrawnBatches();
+  const std::uint64_t mDroppedBefore = mQueue.droppedTasks();
   std::optional<Layer> mOutline, mStroke, mPrediction;
   Canvases mCanvases;
 };

@@ -71,11 +71,11 @@ void PagePlayer::play(PlayObserver& observer) {
     for (std::size_t i = 0; i < mPage.traces.size(); ++i) {
       try {
         playTrace(i, observer);
+        observer.strokeEnds();
       } catch (const std::bad_alloc&) {
         throw Refusal(inputPath(mOptions) + ": trace " + std::to_string(i + 1) +
                       ": out of memory while drawing it");
       }
-      observer.strokeEnds();
     }
   }
 }
@@ -150,9 +150,12 @@ void PagePlayer::playStored(std::size_t index, PlayObserver& observer) {
                   [&](Qelt::RectF* rect) { return mOutline->DrawOutline(stroke, rect); });
   }
   if (mStroke != nullptr) {
-    observer.call({DrawableKind::Stroke, index, "RedrawPen", std::nullopt},
-                  [&](Qelt::RectF* rect) { return mStroke->RedrawPen(stroke, rect); });
-    boundCache(index);
+    observer.call({DrawableKind::Stroke, index, "RedrawPen", std::nullopt}, [&](Qelt::RectF* rect) {
+      const bool drawn = mStroke->RedrawPen(stroke, rect);
+      // Here and now: the observer may wait for the render thread, which takes as much again.
+      boundCache(index);
+      return drawn;
+    });
   }
 }
 

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <array>
+#include <atomic>
 #include <cstdint>
 #include <cstdio>
 #include <limits>
@@ -23,6 +24,16 @@ namespace {
 
 // Those with batches of several slices that the running task has uploaded.
 thread_local GlVertexObject* tFirstLarge = nullptr;
+
+std::atomic<std::uint64_t> gUndrawn{0};
+
+// Drivers take memory as they draw and crash when there is none: is there some left?
+bool hasRoomForDriver() {
+  constexpr std::size_t kRoom = std::size_t{128} << 20;
+  void* const room = ::operator new(kRoom, std::nothrow);
+  ::operator delete(room);
+  return room != nullptr;
+}
 
 // Strips, fans and loops hang together; what is separate looks the same in slices, drawn in order.
 bool isSeparate(GLenum primitive) {
@@ -59,6 +70,7 @@ void GlVertexObject::updateBuffer(int index, const void* data, int vertexCount) 
     return;
   }
   empty(buffer);
+  ++gUndrawn;
   std::array<char, 128> line{};
   std::snprintf(line.data(), line.size(), "there is no memory to draw a batch of %d vertices of %zu bytes",
                 vertices, strideBytes());
@@ -87,7 +99,7 @@ bool GlVertexObject::upload(Buffer& buffer, const void* data, int vertices) {
     if (!good) return false;
     done += most;
   }
-  return true;
+  return buffer.slices.size() == 1 || hasRoomForDriver();
 }
 
 void GlVertexObject::draw(int first, int count, bool, int instances) {
@@ -113,6 +125,10 @@ void GlVertexObject::draw(int first, int count, bool, int instances) {
 
 void GlVertexObject::release() {
   delete this;
+}
+
+std::uint64_t GlVertexObject::undrawnBatches() {
+  return gUndrawn;
 }
 
 void GlVertexObject::dropLargeBatches() {

@@ -3,6 +3,7 @@
 #include <GLES3/gl3.h>
 
 #include <cstddef>
+#include <cstdint>
 #include <vector>
 
 #include "base/HostApi.h"
@@ -16,9 +17,9 @@ namespace QeltDesktop {
 // uploads first. A batch that there is no memory for is logged in one line and not drawn. Render thread.
 //
 // A large batch of points, lines or triangles lies in slices, each a store and a draw of its own: drivers
-// that count bytes in 32 bits crash on a store of some gigabytes. It goes with the render task that uploaded
-// it, so that a page drawn once does not hold that memory from then on; a batch of one slice stays until the
-// next.
+// that count bytes in 32 bits crash on a store of some gigabytes. Such a batch goes with the render task that
+// uploaded it, so that a page drawn once does not hold that memory from then on; a batch of one slice stays
+// until the next.
 class QELT_HOST_API GlVertexObject final : public Qelt::GraphicsObject, public GlResource {
  public:
   // Vertices a slice. A multiple of 6, so that a border cuts through no line and no triangle, and the two
@@ -35,6 +36,9 @@ class QELT_HOST_API GlVertexObject final : public Qelt::GraphicsObject, public G
   // In a batch of several slices `first` is a multiple of 6.
   void draw(int first, int count, bool useVertexState, int instances) override;
   void release() override;
+
+  // How many batches there was no memory for since the process began. Any thread.
+  static std::uint64_t undrawnBatches();
 
   // A render task has ended: drops the batches of several slices that it uploaded on this thread.
   static void dropLargeBatches();

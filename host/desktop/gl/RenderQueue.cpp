@@ -29,16 +29,19 @@ namespace QeltDesktop {
 
 namespace {
 
-// Takes no memory: its end may be what the task ran into.
-void runAndDelete(Qelt::ITask* task) noexcept {
+// False when the task threw. Takes no memory: its end may be what the task ran into.
+bool runAndDelete(Qelt::ITask* task) noexcept {
+  bool ran = false;
   try {
     task->run();
+    ran = true;
   } catch (const std::exception& error) {
     logError("a render task threw and was dropped", error.what());
   } catch (...) {
     logError("a render task threw and was dropped");
   }
   delete task;
+  return ran;
 }
 
 // A call that somebody waits for, in that somebody's own memory: it can be posted when there is no other.
@@ -178,10 +181,11 @@ void RenderQueue::runNext(std::unique_lock<std::mutex>& lock) {
   if (mFirst == nullptr) mLast = nullptr;
   mTaskRuns = true;
   lock.unlock();
-  runAndDelete(task);
+  const bool ran = runAndDelete(task);
   GlVertexObject::dropLargeBatches();
   lock.lock();
   mTaskRuns = false;
+  if (!ran) ++mDropped;
   if (++mRan < mWakeAt) return;
   mWakeAt = kNobodyWaits;
   mProgress.notify_all();
@@ -283,6 +287,11 @@ void RenderQueue::restoreContext() {
   run([this] {
     if (mDevice != nullptr) mDevice->restore();
   });
+}
+
+std::uint64_t RenderQueue::droppedTasks() {
+  const std::lock_guard guard(mMutex);
+  return mDropped;
 }
 
 std::string RenderQueue::rendererName() const {

@@ -60,6 +60,9 @@ class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
   void loseContext();
   void restoreContext();
 
+  // How many tasks threw. Any thread.
+  std::uint64_t droppedTasks();
+
   // Renderer and version of the context, for people; "none" without GL.
   std::string rendererName() const;
 
@@ -96,6 +99,7 @@ class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
   Qelt::ITask* mLast = nullptr;
   std::uint64_t mPosted = 0;
   std::uint64_t mRan = 0;
+  std::uint64_t mDropped = 0;
   std::uint64_t mWakeAt = kNobodyWaits;  // the least count of run tasks that somebody waits for
   bool mClosed = false;
   bool mThreadWaits = false;
