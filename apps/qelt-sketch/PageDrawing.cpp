@@ -3,8 +3,11 @@
 #include <algorithm>
 #include <array>
 #include <cmath>
+#include <cstdint>
 #include <cstdio>
+#include <new>
 #include <optional>
+#include <stdexcept>
 #include <string>
 #include <vector>
 
@@ -13,10 +16,12 @@
 #include "ProgramFiles.h"
 #include "Progress.h"
 #include "Refusal.h"
+#include "desktop/gl/GlVertexObject.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/graphics/CanvasLayer.h"
 #include "desktop/graphics/Compose.h"
 #include "desktop/graphics/PenCanvas.h"
+#include "desktop/pencommon/BatchObserver.h"
 
 namespace QeltDesktop {
 namespace {
@@ -24,6 +29,12 @@ namespace {
 // 256 MiB a layer.
 constexpr double kMostPixels = 67'108'864.0;
 constexpr double kLongestSide = 32'767.0;
+
+// How far the pen may be ahead of the render thread, which is some ten times as slow: a single call may go
+// beyond it.
+constexpr std::uint64_t kMostWaitingBytes = 16 << 20;
+// What the tasks of a call take besides its batch, roughly.
+constexpr std::uint64_t kTaskBytes = 1024;
 
 // Whole pixels; what rounding errors leave over is none.
 double pixelsFor(double length) {
@@ -89,13 +100,15 @@ class Drawing : public PlayObserver {
   void predictionEnds() override { mPrediction->pixels().clear(); }
 
   void call(const DrawableCall&, const std::function<bool(Qelt::RectF*)>& make) override {
+    const std::uint64_t before = writtenBytes();
     Qelt::RectF rect;
     make(&rect);
+    mWaitingBytes += writtenBytes() - before + kTaskBytes;
+    if (mWaitingBytes > kMostWaitingBytes) letQueueCatchUp();
   }
 
   void strokeEnds() override {
-    // Keeps the tasks that wait, and their batches, to a stroke's worth.
-    mQueue.finish();
+    letQueueCatchUp();
     mProgress.step();
   }
 
@@ -109,8 +122,19 @@ class Drawing : public PlayObserver {
   }
 
  private:
+  // A picture that lacks something is none.
+  void letQueueCatchUp() {
+    mQueue.finish();
+    mWaitingBytes = 0;
+    if (GlVertexObject::undrawnBatches() != mUndrawnBefore) throw std::bad_alloc();
+    if (mQueue.droppedTasks() != mDroppedBefore) throw std::runtime_error("a render task failed (see --log)");
+  }
+
   RenderQueue& mQueue;
   Progress& mProgress;
+  std::uint64_t mWaitingBytes = 0;
+  const std::uint64_t mUndrawnBefore = GlVertexObject::undrawnBatches();
+  const std::uint64_t mDroppedBefore = mQueue.droppedTasks();
   std::optional<Layer> mOutline, mStroke, mPrediction;
   Canvases mCanvases;
 };

@@ -1,7 +1,9 @@
 #include "PagePlayer.h"
 
+#include <new>
 #include <string>
 
+#include "ProgramFiles.h"
 #include "Refusal.h"
 #include "engine/MotionEvent.h"
 #include "pencommon/Pen.h"
@@ -13,6 +15,9 @@
 
 namespace QeltDesktop {
 namespace {
+
+// The cached drawings of a page, until its last pass.
+constexpr std::size_t kMostCachedBytes = std::size_t{256} << 20;
 
 // The pen's drawable of one kind, on its canvas; null when there is no canvas.
 template <typename Drawable>
@@ -48,6 +53,7 @@ PagePlayer::PagePlayer(PenSession& session, const Page& page, const Options& opt
   if (options.mode == Mode::Stroke) {
     for (std::size_t i = 0; i < page.traces.size(); ++i) {
       mStoredStrokes.push_back(storedStroke(page.traces[i], pointerOf(i)));
+      mCachedBytesOf.push_back(0);
       Qelt::PenStrokeDataManager::GetInstance()->CreateStrokeData(mStoredStrokes.back()->GetRuntimeHandle());
     }
   }
@@ -63,8 +69,13 @@ void PagePlayer::play(PlayObserver& observer) {
   for (int pass = 0; pass < mOptions.repeat; ++pass) {
     observer.passBegins();
     for (std::size_t i = 0; i < mPage.traces.size(); ++i) {
-      playTrace(i, observer);
-      observer.strokeEnds();
+      try {
+        playTrace(i, observer);
+        observer.strokeEnds();
+      } catch (const std::bad_alloc&) {
+        throw Refusal(inputPath(mOptions) + ": trace " + std::to_string(i + 1) +
+                      ": out of memory while drawing it");
+      }
     }
   }
 }
@@ -139,9 +150,34 @@ void PagePlayer::playStored(std::size_t index, PlayObserver& observer) {
                   [&](Qelt::RectF* rect) { return mOutline->DrawOutline(stroke, rect); });
   }
   if (mStroke != nullptr) {
-    observer.call({DrawableKind::Stroke, index, "RedrawPen", std::nullopt},
-                  [&](Qelt::RectF* rect) { return mStroke->RedrawPen(stroke, rect); });
+    observer.call({DrawableKind::Stroke, index, "RedrawPen", std::nullopt}, [&](Qelt::RectF* rect) {
+      const bool drawn = mStroke->RedrawPen(stroke, rect);
+      // Here and now: the observer may wait for the render thread, which takes as much again.
+      boundCache(index);
+      return drawn;
+    });
   }
+}
+
+// Drops the stroke's cached drawing where the page's would take too much; each pass then works it out again.
+void PagePlayer::boundCache(std::size_t index) {
+  const int handle = mStoredStrokes[index]->GetRuntimeHandle();
+  auto* const manager = Qelt::PenStrokeDataManager::GetInstance();
+  Qelt::PenStrokeData* const data = manager->GetStrokeData(handle);
+  if (data == nullptr) return;
+  std::size_t bytes = 0;
+  if (Qelt::PenStrokePointData* const points = data->GetPointData(); points != nullptr) {
+    bytes = points->mBuffer->size() * sizeof(float);
+    points->Unref();
+  }
+  mCachedBytes += bytes - mCachedBytesOf[index];
+  mCachedBytesOf[index] = bytes;
+  if (mCachedBytes > kMostCachedBytes) {
+    data->SetPointData(nullptr);
+    mCachedBytes -= bytes;
+    mCachedBytesOf[index] = 0;
+  }
+  manager->ReleaseStrokeData(handle);
 }
 
 Pointer PagePlayer::pointerOf(std::size_t index) const {

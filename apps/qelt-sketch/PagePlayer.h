@@ -63,6 +63,7 @@ class PagePlayer {
   PagePlayer(const PagePlayer&) = delete;
   PagePlayer& operator=(const PagePlayer&) = delete;
 
+  // Throws Refusal, with the number of the trace, when there is no memory to draw one.
   void play(PlayObserver& observer);
 
  private:
@@ -70,6 +71,7 @@ class PagePlayer {
   void playLive(std::size_t index, PlayObserver& observer);
   void playRecorded(std::size_t index, PlayObserver& observer);
   void playStored(std::size_t index, PlayObserver& observer);
+  void boundCache(std::size_t index);
   void predict(std::size_t index, std::size_t sample, PlayObserver& observer);
   Pointer pointerOf(std::size_t index) const;
 
@@ -81,6 +83,8 @@ class PagePlayer {
   Qelt::PenPreviewDrawableGL* mPreview = nullptr;
   Qelt::IPenPredictionDrawableGL* mPrediction = nullptr;
   std::vector<std::unique_ptr<StoredStroke>> mStoredStrokes;  // one a trace, in stroke mode
+  std::vector<std::size_t> mCachedBytesOf;                    // of each of them
+  std::size_t mCachedBytes = 0;
 };
 
 }  // namespace QeltDesktop

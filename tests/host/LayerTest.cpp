@@ -5,10 +5,13 @@
 #include <cmath>
 #include <cstddef>
 #include <cstdint>
+#include <limits>
 #include <memory>
 #include <stdexcept>
+#include <utility>
 #include <vector>
 
+#include "desktop/gl/GlVertexObject.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/graphics/CanvasLayer.h"
 #include "gl/GraphicsFactory.h"
@@ -26,6 +29,7 @@
 namespace {
 
 using QeltDesktop::CanvasLayer;
+using QeltDesktop::GlVertexObject;
 using QeltDesktop::RenderQueue;
 using testing::HasSubstr;
 
@@ -64,14 +68,14 @@ void main() {
 // Draws a quad into a layer with one of the shaders above, kept over context losses as a pen keeps its own.
 class Painter {
  public:
-  explicit Painter(const char* fragmentShader) {
+  explicit Painter(const char* fragmentShader, int sliceVertices = GlVertexObject::kSliceVertices) {
     program = Qelt::GraphicsFactory::createOpenGLShaderProgram(kVertexShader, fragmentShader, nullptr);
     projection = program->getBindingIntf("projection", 0);
     picture = program->getBindingIntf("picture", Qelt::kBindingInt);
     Qelt::VertexDescriptor layout;
     layout.addAttribute(Qelt::AttributeType::Float, 2, -1);
     layout.addAttribute(Qelt::AttributeType::Float, 2, -1);
-    quad = Qelt::GraphicsFactory::createGraphicsObject(1, Qelt::GraphicsFactory::kTriangles, layout, 0, 0);
+    quad = new GlVertexObject(1, GL_TRIANGLES, layout, sliceVertices);
   }
   ~Painter() {
     // Uniforms may outlive their program.
@@ -180,16 +184,16 @@ TEST_P(Layer, KeepsItsPixelsAndEveryWrapperWorksOnAfterEachOfTwoLosses) {
     queue.restoreContext();
     queue.restoreContext();
     EXPECT_EQ(layer.readPixels(), left);
-    // The vertices uploaded before the loss are still there.
+    // No vertices are left to draw until the next are uploaded.
     layer.clear();
     queue.run([&] { painter->draw(*layer.GetBitmap()); });
+    EXPECT_EQ(layer.readPixels(), std::vector<std::uint8_t>(left.size()));
+    queue.run([&] {
+      painter->setQuad(0, 0, 50, 100);
+      painter->draw(*layer.GetBitmap());
+    });
     EXPECT_EQ(layer.readPixels(), left);
   }
-  queue.loseContext();
-  queue.run([&] { painter->setQuad(0, 0, kSize, kSize); });
-  queue.restoreContext();
-  queue.run([&] { painter->draw(*layer.GetBitmap()); });
-  EXPECT_EQ(pixelAt(layer.readPixels(), kSize, 99, 99)[0], 99);
   queue.run([&] { painter.reset(); });
 }
 
@@ -365,6 +369,58 @@ TEST_P(Layer, VertexCountsAreHeldToWhatWasUploaded) {
     painter.quad->updateBuffer(0, nullptr, 6);
     painter.draw(*layer.GetBitmap());
   });
+  EXPECT_EQ(layer.readPixels(), std::vector<std::uint8_t>(8 * 8 * 4));
+}
+
+// Overlapping triangles, each pair of a blue of its own: what is drawn last shows.
+TEST_P(Layer, ALargeBatchLooksTheSameInSlicesAndGoesWithItsTask) {
+  std::vector<float> vertices;
+  for (int i = 0; i < 40; ++i) {
+    const auto left = static_cast<float>(i % 8 * 3), top = static_cast<float>(i / 8 * 4);
+    const float blue = static_cast<float>(i) / 40.0f;
+    for (const auto& [x, y] : {std::pair{0, 0}, {0, 10}, {10, 0}, {10, 0}, {0, 10}, {10, 10}}) {
+      vertices.insert(vertices.end(),
+                      {left + static_cast<float>(x), top + static_cast<float>(y), blue, 0.0f});
+    }
+  }
+  constexpr int kStamp = 6;
+  CanvasLayer layer(queue, 32, 32, 20);
+  const auto picture = [&](int sliceVertices, int first, int count, bool inLaterTask) {
+    layer.clear();
+    std::unique_ptr<Painter> painter;
+    queue.run([&] {
+      painter = std::make_unique<Painter>(kWindowShader, sliceVertices);
+      painter->quad->updateBuffer(0, vertices.data(), 40 * kStamp);
+      if (!inLaterTask) painter->draw(*layer.GetBitmap(), first, count);
+    });
+    if (inLaterTask) queue.run([&] { painter->draw(*layer.GetBitmap(), first, count); });
+    queue.run([&] { painter.reset(); });
+    return layer.readPixels();
+  };
+  const int whole = 40 * kStamp;
+  EXPECT_EQ(picture(whole, 0, -1, true), picture(whole, 0, -1, false));
+  EXPECT_EQ(picture(kStamp, 0, -1, true), std::vector<std::uint8_t>(32 * 32 * 4));
+  for (const auto& [first, count] : {std::pair{0, -1}, {0, 51}, {7 * kStamp, -1}, {5 * kStamp, 100}}) {
+    const std::vector<std::uint8_t> expected = picture(whole, first, count, false);
+    for (const int slice : {kStamp, 7 * kStamp, 39 * kStamp}) {
+      EXPECT_EQ(picture(slice, first, count, false), expected) << slice << ": " << first << ", " << count;
+    }
+  }
+}
+
+TEST_P(Layer, ABatchThatThereIsNoMemoryForIsLoggedOnceAndNotDrawn) {
+  CanvasLayer layer(queue, 8, 8);
+  queue.run([&] {
+    constexpr int kMost = std::numeric_limits<int>::max();
+    Painter painter(kWindowShader, kMost);
+    painter.setQuad(0, 0, 8, 8);
+    const float none = 0.0f;
+    painter.quad->updateBuffer(0, &none, kMost);  // 32 GiB, and no driver looks at what it has no room for
+    painter.draw(*layer.GetBitmap());
+  });
+  const auto lines = log.take();
+  ASSERT_EQ(lines.size(), 1u);
+  EXPECT_THAT(lines[0].text, HasSubstr("no memory to draw a batch of 2147483647 vertices"));
   EXPECT_EQ(layer.readPixels(), std::vector<std::uint8_t>(8 * 8 * 4));
 }
 

@@ -2,7 +2,10 @@
 #include <gtest/gtest.h>
 
 #include <atomic>
+#include <chrono>
+#include <future>
 #include <memory>
+#include <new>
 #include <set>
 #include <stdexcept>
 #include <string>
@@ -80,13 +83,16 @@ TEST_P(Queue, RefusesWithoutTakingOwnershipAndIgnoresNull) {
   EXPECT_EQ(accepted, 1);
 }
 
-TEST_P(Queue, PostingAsksForNoMemory) {
+// So a layer, too, can go while there is none; and a task that runs out of it takes nothing else along.
+TEST_P(Queue, AsksForNoMemory) {
   if (!QeltTests::countsAllocations()) GTEST_SKIP();
   std::atomic<int> alive{0}, ran{0};
   RenderQueue queue(GetParam(), RenderQueue::GL::None);
   auto* const task = new CountedTask(alive, ran);
+  postCall(queue, [] { throw std::bad_alloc(); });
   const QeltTests::FailingAllocation first(0);
   EXPECT_TRUE(queue.Post(task));
+  EXPECT_TRUE(queue.run([&] { EXPECT_EQ(ran, 1); }));
   queue.finish();
   EXPECT_FALSE(first.hasFailed());
   EXPECT_EQ(alive, 0);
@@ -130,6 +136,68 @@ TEST_P(Queue, LogsWhatATaskThrowsAndHandsBackWhatACallThrows) {
   EXPECT_THAT(lines[0].text, testing::HasSubstr("pencil broke"));
   EXPECT_EQ(lines[1].priority, 6);
   EXPECT_THROW(queue.run([] { throw std::logic_error("no"); }), std::logic_error);
+}
+
+TEST_P(Queue, DiesWithOneClearLineWhenItsOwnTaskDestroysIt) {
+  GTEST_FLAG_SET(death_test_style, "threadsafe");
+  auto* const queue = new RenderQueue(GetParam(), RenderQueue::GL::None);
+  EXPECT_DEATH(queue->run([&] { delete queue; }), "destroyed by one of its own tasks");
+  delete queue;
+}
+
+TEST(QueueThreads, NoOtherThreadIsTakenForTheOneThatHasEnded) {
+  RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::None);
+  std::thread::id ended;
+  queue.run([&] { ended = std::this_thread::get_id(); });
+  queue.shutDown();
+  // The system hands out the numbers of ended threads again, mostly at once.
+  bool met = false;
+  for (int i = 0; i < 100 && !met; ++i) {
+    std::thread([&] {
+      met = std::this_thread::get_id() == ended;
+      EXPECT_FALSE(met && queue.run([] { FAIL(); }));
+    }).join();
+  }
+  if (!met) GTEST_SKIP() << "no thread got the number";
+}
+
+// A task posted while somebody waits may itself wait for that somebody.
+TEST(QueueThreads, NobodyWaitsForWhatIsPostedLater) {
+  RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::None);
+  bool came = false;
+  for (int i = 0; i < 1000 && !came; ++i) {
+    std::promise<void> bothPosted, calling, returned;
+    bool called = false;
+    // What is posted meanwhile is taken from the queue together.
+    postCall(queue, [&] { bothPosted.get_future().wait(); });
+    std::thread waits([&] {
+      calling.set_value();
+      queue.run([&] { called = true; });
+      returned.set_value();
+    });
+    calling.get_future().wait();
+    std::this_thread::sleep_for(std::chrono::milliseconds(1));
+    postCall(queue, [&] {
+      if (!called) return;  // this one came first: once more
+      came = true;
+      EXPECT_EQ(returned.get_future().wait_for(std::chrono::seconds(10)), std::future_status::ready);
+    });
+    bothPosted.set_value();
+    waits.join();
+    queue.finish();
+  }
+  EXPECT_TRUE(came);
+}
+
+TEST(QueueThreads, MayGoAsSoonAsTheLastTaskHasRun) {
+  for (int i = 0; i < 200; ++i) {
+    std::promise<void> ran;
+    auto queue = std::make_unique<RenderQueue>(RenderQueue::Mode::Thread, RenderQueue::GL::None);
+    std::thread poster([&queue = *queue, &ran] { postCall(queue, [&ran] { ran.set_value(); }); });
+    ran.get_future().wait();
+    queue.reset();  // the poster may still be on its way out of `Post`
+    poster.join();
+  }
 }
 
 TEST(QueueThreads, ManyPostersKeepTheirOwnOrderOnOneThreadThatIsNoneOfThem) {

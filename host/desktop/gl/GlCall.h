@@ -9,6 +9,9 @@ namespace QeltDesktop {
 // Logs every error GL has noted since the last call. Render thread.
 QELT_HOST_API void reportGlErrors(const char* file, int line);
 
+// Takes every error GL has noted since the last call, unlogged; true when there was none. Render thread.
+QELT_HOST_API bool takeGlErrors();
+
 #ifdef NDEBUG
 
 // A GL function, ready to be called: gl(glBindBuffer)(GL_ARRAY_BUFFER, name).

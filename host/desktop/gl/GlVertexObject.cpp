@@ -1,15 +1,16 @@
+#include "desktop/gl/GlVertexObject.h"
+
 #include <algorithm>
-#include <cstddef>
+#include <array>
+#include <atomic>
 #include <cstdint>
+#include <cstdio>
 #include <limits>
 #include <new>
-#include <vector>
 
+#include "desktop/base/Log.h"
 #include "desktop/gl/GlCall.h"
-#include "desktop/gl/GlDevice.h"
 #include "gl/GraphicsFactory.h"
-#include "gl/GraphicsObject.h"
-#include "gl/VertexDescriptor.h"
 
 namespace Qelt {
 
@@ -21,104 +22,203 @@ namespace QeltDesktop {
 
 namespace {
 
-class GlVertexObject final : public Qelt::GraphicsObject, public GlResource {
- public:
-  GlVertexObject(int bufferCount, GLenum primitive, const Qelt::VertexDescriptor& layout)
-      : mPrimitive(primitive), mLayout(layout), mBuffers(static_cast<std::size_t>(bufferCount)) {
-    if (isLive()) makeNames();
-  }
+// Those with batches of several slices that the running task has uploaded.
+thread_local GlVertexObject* tFirstLarge = nullptr;
 
-  ~GlVertexObject() override {
-    if (!isLive()) return;
-    for (const Buffer& buffer : mBuffers) {
-      gl(glDeleteVertexArrays)(1, &buffer.array);
-      gl(glDeleteBuffers)(1, &buffer.store);
-    }
-  }
+std::atomic<std::uint64_t> gUndrawn{0};
 
-  void updateBuffer(int index, const void* data, int vertexCount) override {
-    if (index < 0 || static_cast<std::size_t>(index) >= mBuffers.size()) return;
-    Buffer& buffer = mBuffers[static_cast<std::size_t>(index)];
-    const int vertices = data != nullptr ? std::max(vertexCount, 0) : 0;
-    const auto* const bytes = static_cast<const std::uint8_t*>(data);
-    // A copy stays here for the next context.
-    buffer.data.assign(bytes, bytes + static_cast<std::size_t>(vertices) * strideBytes());
-    buffer.vertices = vertices;
-    if (isLive()) upload(buffer);
-  }
+// Drivers take memory as they draw and crash when there is none: is there some left?
+bool hasRoomForDriver() {
+  constexpr std::size_t kRoom = std::size_t{128} << 20;
+  void* const room = ::operator new(kRoom, std::nothrow);
+  ::operator delete(room);
+  return room != nullptr;
+}
 
-  void draw(int first, int count, bool, int instances) override {
-    if (!isLive()) return;
-    for (const Buffer& buffer : mBuffers) {
-      const int begin = std::clamp(first, 0, buffer.vertices);
-      const int rest = buffer.vertices - begin;
-      const int drawn = count < 0 ? rest : std::min(count, rest);
-      if (drawn == 0) continue;
-      gl(glBindVertexArray)(buffer.array);
-      if (instances > 0) {
-        gl(glDrawArraysInstanced)(mPrimitive, begin, drawn, instances);
-      } else {
-        gl(glDrawArrays)(mPrimitive, begin, drawn);
-      }
-      gl(glBindVertexArray)(0);
-    }
-  }
-
-  void release() override { delete this; }
-
- private:
-  struct Buffer {
-    GLuint array = 0;
-    GLuint store = 0;
-    int vertices = 0;
-    std::vector<std::uint8_t> data;
-  };
-
-  void forget() override {
-    for (Buffer& buffer : mBuffers) buffer.array = buffer.store = 0;
-  }
-
-  void remake() override { makeNames(); }
-
-  std::size_t strideBytes() const { return static_cast<std::size_t>(mLayout.getStride()) * sizeof(float); }
-
-  void makeNames() {
-    for (Buffer& buffer : mBuffers) {
-      gl(glGenVertexArrays)(1, &buffer.array);
-      gl(glGenBuffers)(1, &buffer.store);
-      gl(glBindVertexArray)(buffer.array);
-      gl(glBindBuffer)(GL_ARRAY_BUFFER, buffer.store);
-      std::size_t offset = 0;
-      for (int i = 0; i < mLayout.getAttributeCount(); ++i) {
-        const auto location = static_cast<GLuint>(i);
-        gl(glEnableVertexAttribArray)(location);
-        // GL takes an offset into the buffer as a pointer.
-        gl(glVertexAttribPointer)(
-            location, mLayout.getComponents(i), GL_FLOAT, GL_FALSE, static_cast<GLsizei>(strideBytes()),
-            reinterpret_cast<const void*>(offset));  // NOLINT(performance-no-int-to-ptr)
-        offset += static_cast<std::size_t>(mLayout.getComponents(i)) * sizeof(float);
-      }
-      gl(glBindVertexArray)(0);
-      gl(glBindBuffer)(GL_ARRAY_BUFFER, 0);
-      upload(buffer);
-    }
-  }
-
-  void upload(Buffer& buffer) {
-    if (buffer.data.empty()) return;
-    gl(glBindBuffer)(GL_ARRAY_BUFFER, buffer.store);
-    const auto size = static_cast<GLsizeiptr>(buffer.data.size());
-    // A store of its own for each batch: draws of the last one may still be under way.
-    gl(glBufferData)(GL_ARRAY_BUFFER, size, buffer.data.data(), GL_DYNAMIC_DRAW);
-    gl(glBindBuffer)(GL_ARRAY_BUFFER, 0);
-  }
-
-  GLenum mPrimitive;
-  Qelt::VertexDescriptor mLayout;
-  std::vector<Buffer> mBuffers;
-};
+// Strips, fans and loops hang together; what is separate looks the same in slices, drawn in order.
+bool isSeparate(GLenum primitive) {
+  return primitive == GL_POINTS || primitive == GL_LINES || primitive == GL_TRIANGLES;
+}
 
 }  // namespace
+
+GlVertexObject::GlVertexObject(int bufferCount, GLenum primitive, const Qelt::VertexDescriptor& layout,
+                               int sliceVertices)
+    : mPrimitive(primitive),
+      mLayout(layout),
+      mSliceVertices(isSeparate(primitive) ? sliceVertices : std::numeric_limits<int>::max()),
+      mBuffers(static_cast<std::size_t>(bufferCount)) {
+  if (isLive()) remake();
+}
+
+GlVertexObject::~GlVertexObject() {
+  unlinkLarge();
+  if (!isLive()) return;
+  for (Buffer& buffer : mBuffers) {
+    setSliceCount(buffer, 0);
+  }
+}
+
+void GlVertexObject::updateBuffer(int index, const void* data, int vertexCount) {
+  if (index < 0 || static_cast<std::size_t>(index) >= mBuffers.size() || !isLive()) return;
+  Buffer& buffer = mBuffers[static_cast<std::size_t>(index)];
+  const int vertices = data != nullptr ? std::max(vertexCount, 0) : 0;
+  buffer.vertices = 0;
+  if (upload(buffer, data, vertices)) {
+    buffer.vertices = vertices;
+    if (buffer.slices.size() > 1) linkLarge();
+    return;
+  }
+  empty(buffer);
+  ++gUndrawn;
+  std::array<char, 128> line{};
+  std::snprintf(line.data(), line.size(), "there is no memory to draw a batch of %d vertices of %zu bytes",
+                vertices, strideBytes());
+  logError(line.data());
+}
+
+bool GlVertexObject::upload(Buffer& buffer, const void* data, int vertices) {
+  const auto* bytes = static_cast<const std::uint8_t*>(data);
+  const auto count = static_cast<std::size_t>(vertices);
+  const auto most = static_cast<std::size_t>(mSliceVertices);
+  if (!setSliceCount(buffer, std::max<std::size_t>(1, count / most + (count % most > 0 ? 1 : 0))))
+    return false;
+  takeGlErrors();  // whatever others left
+  std::size_t done = 0;
+  for (const Slice& slice : buffer.slices) {
+    const std::size_t size = std::min(count - done, most) * strideBytes();
+    glBindBuffer(GL_ARRAY_BUFFER, slice.store);
+    // A store of its own for each batch: draws of the last one may still be under way.
+    glBufferData(GL_ARRAY_BUFFER, static_cast<GLsizeiptr>(size), nullptr, GL_DYNAMIC_DRAW);
+    bool good = takeGlErrors();
+    if (good && size > 0) {
+      glBufferSubData(GL_ARRAY_BUFFER, 0, static_cast<GLsizeiptr>(size), bytes + done * strideBytes());
+      good = takeGlErrors();
+    }
+    glBindBuffer(GL_ARRAY_BUFFER, 0);
+    if (!good) return false;
+    done += most;
+  }
+  return buffer.slices.size() == 1 || hasRoomForDriver();
+}
+
+void GlVertexObject::draw(int first, int count, bool, int instances) {
+  if (!isLive()) return;
+  for (const Buffer& buffer : mBuffers) {
+    const int begin = std::clamp(first, 0, buffer.vertices);
+    int left = count < 0 ? buffer.vertices - begin : std::min(count, buffer.vertices - begin);
+    int from = begin % mSliceVertices;
+    for (auto slice = static_cast<std::size_t>(begin / mSliceVertices); left > 0; ++slice) {
+      const int drawn = std::min(left, mSliceVertices - from);
+      gl(glBindVertexArray)(buffer.slices[slice].array);
+      if (instances > 0) {
+        gl(glDrawArraysInstanced)(mPrimitive, from, drawn, instances);
+      } else {
+        gl(glDrawArrays)(mPrimitive, from, drawn);
+      }
+      gl(glBindVertexArray)(0);
+      left -= drawn;
+      from = 0;
+    }
+  }
+}
+
+void GlVertexObject::release() {
+  delete this;
+}
+
+std::uint64_t GlVertexObject::undrawnBatches() {
+  return gUndrawn;
+}
+
+void GlVertexObject::dropLargeBatches() {
+  for (GlVertexObject** link = &tFirstLarge; *link != nullptr;) {
+    GlVertexObject* const object = *link;
+    // Another queue's, whose task this thread goes on with later.
+    if (!object->isLive()) {
+      link = &object->mNextLarge;
+      continue;
+    }
+    *link = object->mNextLarge;
+    for (Buffer& buffer : object->mBuffers) {
+      if (buffer.slices.size() > 1) object->empty(buffer);
+    }
+  }
+}
+
+void GlVertexObject::linkLarge() {
+  unlinkLarge();
+  mNextLarge = tFirstLarge;
+  tFirstLarge = this;
+}
+
+void GlVertexObject::unlinkLarge() {
+  for (GlVertexObject** link = &tFirstLarge; *link != nullptr; link = &(*link)->mNextLarge) {
+    if (*link != this) continue;
+    *link = mNextLarge;
+    return;
+  }
+}
+
+void GlVertexObject::empty(Buffer& buffer) {
+  buffer.vertices = 0;
+  setSliceCount(buffer, 1);
+  glBindBuffer(GL_ARRAY_BUFFER, buffer.slices.front().store);
+  glBufferData(GL_ARRAY_BUFFER, 0, nullptr, GL_DYNAMIC_DRAW);
+  glBindBuffer(GL_ARRAY_BUFFER, 0);
+}
+
+bool GlVertexObject::setSliceCount(Buffer& buffer, std::size_t count) {
+  std::vector<Slice>& slices = buffer.slices;
+  while (slices.size() > count) {
+    gl(glDeleteVertexArrays)(1, &slices.back().array);
+    gl(glDeleteBuffers)(1, &slices.back().store);
+    slices.pop_back();
+  }
+  try {
+    slices.reserve(count);
+  } catch (const std::bad_alloc&) {
+    return false;
+  }
+  while (slices.size() < count) makeNames(slices.emplace_back());
+  return true;
+}
+
+void GlVertexObject::forget() {
+  unlinkLarge();
+  for (Buffer& buffer : mBuffers) {
+    buffer.slices.resize(1);
+    buffer.slices.front() = {};
+    buffer.vertices = 0;
+  }
+}
+
+void GlVertexObject::remake() {
+  for (Buffer& buffer : mBuffers) makeNames(buffer.slices.front());
+}
+
+std::size_t GlVertexObject::strideBytes() const {
+  return static_cast<std::size_t>(mLayout.getStride()) * sizeof(float);
+}
+
+void GlVertexObject::makeNames(Slice& slice) {
+  gl(glGenVertexArrays)(1, &slice.array);
+  gl(glGenBuffers)(1, &slice.store);
+  gl(glBindVertexArray)(slice.array);
+  gl(glBindBuffer)(GL_ARRAY_BUFFER, slice.store);
+  std::size_t offset = 0;
+  for (int i = 0; i < mLayout.getAttributeCount(); ++i) {
+    const auto location = static_cast<GLuint>(i);
+    gl(glEnableVertexAttribArray)(location);
+    // GL takes an offset into the buffer as a pointer.
+    gl(glVertexAttribPointer)(location, mLayout.getComponents(i), GL_FLOAT, GL_FALSE,
+                              static_cast<GLsizei>(strideBytes()),
+                              reinterpret_cast<const void*>(offset));  // NOLINT(performance-no-int-to-ptr)
+    offset += static_cast<std::size_t>(mLayout.getComponents(i)) * sizeof(float);
+  }
+  gl(glBindVertexArray)(0);
+  gl(glBindBuffer)(GL_ARRAY_BUFFER, 0);
+}
 
 }  // namespace QeltDesktop
 

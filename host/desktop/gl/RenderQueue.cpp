@@ -1,12 +1,17 @@
 #include "desktop/gl/RenderQueue.h"
 
+#include <algorithm>
+#include <array>
+#include <cstddef>
+#include <cstdlib>
 #include <exception>
 #include <future>
+#include <new>
 #include <utility>
 
 #include "desktop/base/Log.h"
-#include "desktop/gl/CallTask.h"
 #include "desktop/gl/GlDevice.h"
+#include "desktop/gl/GlVertexObject.h"
 #include "gl/ITask.h"
 
 namespace Qelt {
@@ -24,16 +29,42 @@ namespace QeltDesktop {
 
 namespace {
 
-void runAndDelete(Qelt::ITask* task) noexcept {
+// False when the task threw. Takes no memory: its end may be what the task ran into.
+bool runAndDelete(Qelt::ITask* task) noexcept {
+  bool ran = false;
   try {
     task->run();
+    ran = true;
   } catch (const std::exception& error) {
-    logError(std::string("a render task threw and was dropped: ") + error.what());
+    logError("a render task threw and was dropped", error.what());
   } catch (...) {
     logError("a render task threw and was dropped");
   }
   delete task;
+  return ran;
 }
+
+// A call that somebody waits for, in that somebody's own memory: it can be posted when there is no other.
+class WaitedCall final : public Qelt::ITask {
+ public:
+  WaitedCall(const std::function<void()>& call, std::exception_ptr& thrown) : mCall(call), mThrown(thrown) {}
+  void run() override {
+    try {
+      mCall();
+    } catch (...) {
+      mThrown = std::current_exception();
+    }
+  }
+
+  static void* operator new(std::size_t, void* place) noexcept { return place; }
+  // The queue deletes what it has run; the place is not the heap's.
+  static void operator delete(void*) noexcept {}
+  static void operator delete(void*, void*) noexcept {}
+
+ private:
+  const std::function<void()>& mCall;
+  std::exception_ptr& mThrown;
+};
 
 // In `Caller` mode the context is current only while tasks run, so that several queues share a thread.
 class CurrentDevice {
@@ -68,6 +99,7 @@ RenderQueue::RenderQueue(Mode mode, GL gl) : mMode(mode), mRunner(std::this_thre
   mThread = std::thread([this, gl, opened = std::move(opened)]() mutable {
     try {
       openDevice(gl);
+      const std::lock_guard guard(mMutex);
       mRunner = std::this_thread::get_id();
     } catch (...) {
       opened.set_exception(std::current_exception());
@@ -85,6 +117,15 @@ RenderQueue::RenderQueue(Mode mode, GL gl) : mMode(mode), mRunner(std::this_thre
 }
 
 RenderQueue::~RenderQueue() {
+  bool inside = false;
+  {
+    const std::lock_guard guard(mMutex);
+    inside = isInsideTask();
+  }
+  if (inside) {
+    logError("a render queue was destroyed by one of its own tasks");
+    std::abort();
+  }
   shutDown();
 }
 
@@ -98,32 +139,28 @@ void RenderQueue::openDevice(GL gl) {
 bool RenderQueue::Post(Qelt::ITask* task) {
   if (task == nullptr) return true;
   if (accept && !accept(*task)) return false;
-  return enqueue(task, false);
+  return enqueue(task, false) != kRefused;
 }
 
-bool RenderQueue::enqueue(Qelt::ITask* task, bool internal) {
-  bool wake = false;
-  {
-    const std::lock_guard guard(mMutex);
-    if (mClosed) return false;
-    // Told under the lock: once it is in the queue the task may be gone any moment.
-    if (!internal && onAccepted) onAccepted(*task);
-    task->mNext = nullptr;
-    (mLast != nullptr ? mLast->mNext : mFirst) = task;
-    mLast = task;
-    ++mPosted;
-    wake = mThreadWaits;
-    mThreadWaits = false;
-  }
-  if (wake) mWork.notify_one();
-  return true;
+std::uint64_t RenderQueue::enqueue(Qelt::ITask* task, bool internal) {
+  const std::lock_guard guard(mMutex);
+  if (mClosed) return kRefused;
+  // Told under the lock: once it is in the queue the task may be gone any moment.
+  if (!internal && onAccepted) onAccepted(*task);
+  task->mNext = nullptr;
+  (mLast != nullptr ? mLast->mNext : mFirst) = task;
+  mLast = task;
+  // Woken under the lock: once that is free the queue itself may be gone.
+  if (mThreadWaits) mWork.notify_one();
+  mThreadWaits = false;
+  return ++mPosted;
 }
 
 void RenderQueue::threadMain() {
   std::unique_lock lock(mMutex);
   for (;;) {
     if (mFirst != nullptr) {
-      runBatch(lock);
+      runNext(lock);
       continue;
     }
     if (mClosed) break;
@@ -133,23 +170,24 @@ void RenderQueue::threadMain() {
   }
   lock.unlock();
   mDevice.reset();
+  lock.lock();
+  // The system gives the number of a thread that has ended to another.
+  mRunner = {};
 }
 
-void RenderQueue::runBatch(std::unique_lock<std::mutex>& lock) {
-  Qelt::ITask* task = mFirst;
-  mFirst = mLast = nullptr;
-  mBatchRuns = true;
+void RenderQueue::runNext(std::unique_lock<std::mutex>& lock) {
+  Qelt::ITask* const task = mFirst;
+  mFirst = task->mNext;
+  if (mFirst == nullptr) mLast = nullptr;
+  mTaskRuns = true;
   lock.unlock();
-  std::uint64_t count = 0;
-  while (task != nullptr) {
-    Qelt::ITask* const next = task->mNext;
-    runAndDelete(task);
-    ++count;
-    task = next;
-  }
+  const bool ran = runAndDelete(task);
+  GlVertexObject::dropLargeBatches();
   lock.lock();
-  mBatchRuns = false;
-  mRan += count;
+  mTaskRuns = false;
+  if (!ran) ++mDropped;
+  if (++mRan < mWakeAt) return;
+  mWakeAt = kNobodyWaits;
   mProgress.notify_all();
 }
 
@@ -157,24 +195,35 @@ bool RenderQueue::isRunner() const {
   return std::this_thread::get_id() == mRunner;
 }
 
-void RenderQueue::waitFor(std::uint64_t sequence) {
-  std::unique_lock lock(mMutex);
-  if (mMode == Mode::Thread) {
-    if (!isRunner()) mProgress.wait(lock, [&] { return mRan >= sequence; });
-    return;
+bool RenderQueue::canWait() const {
+  return mMode == Mode::Thread || isRunner();
+}
+
+GlDevice* RenderQueue::callersDevice() const {
+  return mMode == Mode::Caller ? mDevice.get() : nullptr;
+}
+
+bool RenderQueue::isInsideTask() const {
+  return isRunner() && (mMode == Mode::Thread || mTaskRuns);
+}
+
+void RenderQueue::waitFor(std::unique_lock<std::mutex>& lock, std::uint64_t last) {
+  while (mRan < last) {
+    if (mMode == Mode::Caller) {
+      runNext(lock);
+    } else {
+      // Those who wait for more look again and wait on.
+      mWakeAt = std::min(mWakeAt, last);
+      mProgress.wait(lock);
+    }
   }
-  if (!isRunner() || mBatchRuns) return;
-  const CurrentDevice current(mDevice.get());
-  while (mRan < sequence) runBatch(lock);
 }
 
 void RenderQueue::finish() {
-  std::uint64_t sequence = 0;
-  {
-    const std::lock_guard guard(mMutex);
-    sequence = mPosted;
-  }
-  waitFor(sequence);
+  std::unique_lock lock(mMutex);
+  if (mRan == mPosted || isInsideTask() || !canWait()) return;
+  const CurrentDevice current(callersDevice());
+  waitFor(lock, mPosted);
 }
 
 void RenderQueue::runPending() {
@@ -185,26 +234,27 @@ bool RenderQueue::run(const std::function<void()>& call) {
   bool inside = false;
   {
     const std::lock_guard guard(mMutex);
-    inside = isRunner() && (mMode == Mode::Thread || mBatchRuns);
+    inside = isInsideTask();
+    if (!canWait()) return false;
   }
   if (inside) {
     call();
     return true;
   }
+  // Before the call is in the queue: it may throw, and the call goes with this frame.
+  const CurrentDevice current(callersDevice());
   std::exception_ptr thrown;
-  auto guarded = [&call, &thrown] {
-    try {
-      call();
-    } catch (...) {
-      thrown = std::current_exception();
-    }
-  };
-  auto* const task = new CallTask<decltype(guarded)>(guarded);
-  if (!enqueue(task, true)) {
+  alignas(WaitedCall) std::array<std::byte, sizeof(WaitedCall)> place;
+  auto* const task = new (place.data()) WaitedCall(call, thrown);
+  const std::uint64_t number = enqueue(task, true);
+  if (number == kRefused) {
     delete task;
     return false;
   }
-  finish();
+  {
+    std::unique_lock lock(mMutex);
+    waitFor(lock, number);
+  }
   if (thrown) std::rethrow_exception(thrown);
   return true;
 }
@@ -213,10 +263,11 @@ void RenderQueue::shutDown() {
   {
     const std::lock_guard guard(mMutex);
     mClosed = true;
+    mWork.notify_one();
+    if (isInsideTask()) return;
   }
-  mWork.notify_one();
   if (mMode == Mode::Thread) {
-    if (mThread.joinable() && !isRunner()) mThread.join();
+    if (mThread.joinable()) mThread.join();
     return;
   }
   finish();
@@ -236,6 +287,11 @@ void RenderQueue::restoreContext() {
   run([this] {
     if (mDevice != nullptr) mDevice->restore();
   });
+}
+
+std::uint64_t RenderQueue::droppedTasks() {
+  const std::lock_guard guard(mMutex);
+  return mDropped;
 }
 
 std::string RenderQueue::rendererName() const {

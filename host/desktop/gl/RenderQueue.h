@@ -3,6 +3,7 @@
 #include <condition_variable>
 #include <cstdint>
 #include <functional>
+#include <limits>
 #include <memory>
 #include <mutex>
 #include <string>
@@ -16,12 +17,13 @@ namespace QeltDesktop {
 class GlDevice;
 
 // The render thread: a queue of tasks, the thread that runs them in posting order, and the GL context they
-// draw with. A task runs once and is then deleted; what it throws is logged and goes no further. Posting
-// allocates nothing.
+// draw with. A task runs once and is then deleted; what it throws is logged and goes no further. Posting,
+// waiting and `run` allocate nothing.
 //
-// `Post` and `run` may be called from any thread; everything else by the thread that made the queue. In
-// `Caller` mode there is no thread: tasks run on the thread that made the queue, inside `finish`,
-// `runPending` and `run`, and so does the destructor's rest; no other thread may call those.
+// `Post`, `run`, `finish`, `loseContext` and `restoreContext` may be called from any thread; `shutDown` and
+// the destructor by the thread that made the queue. In `Caller` mode there is no thread: tasks run on the
+// thread that made the queue, inside `finish`, `runPending`, `run` and the end of the queue; on any other
+// thread only `Post` does anything there.
 class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
  public:
   enum class Mode { Thread, Caller };
@@ -29,30 +31,37 @@ class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
 
   // Throws std::runtime_error with one clear line when a context is wanted and there is none.
   RenderQueue(Mode mode, GL gl);
-  // As `shutDown`. GL wrappers that are still there become inert.
+  // As `shutDown`. GL wrappers that are still there become inert. No other thread may be inside a call by
+  // then, but for a `Post` whose task has run. A task must not destroy its own queue: that logs one line and
+  // aborts.
   ~RenderQueue() override;
   RenderQueue(const RenderQueue&) = delete;
   RenderQueue& operator=(const RenderQueue&) = delete;
 
   bool Post(Qelt::ITask* task) override;
 
-  // Waits until everything posted so far has run. Inside a task it returns at once.
+  // Waits until everything posted so far has run, and for nothing that is posted later. Inside a task it
+  // returns at once.
   void finish();
   // `Caller` mode: runs everything posted so far; otherwise does nothing.
   void runPending();
   // Runs a call on the render thread after everything posted so far, and waits for it; inside a task it runs
   // at once. What the call throws is thrown here. False, and nothing ran, when the queue has been shut
-  // down. Neither `accept` nor `onAccepted` sees it.
+  // down, or has no thread and is another thread's. Neither `accept` nor `onAccepted` sees it.
   bool run(const std::function<void()>& call);
-  // Refuses posts from now on, runs what was posted, ends the thread and destroys the context.
+  // Refuses posts from now on, runs what was posted, ends the thread and destroys the context. Inside a task
+  // it only refuses posts.
   void shutDown();
 
   // Loses the GL context and makes another: managed objects hear of both, and the host's GL wrappers come
-  // back: buffers with their data, programs with their bindings, layers and what a canvas drew into with
-  // their pixels, other bitmaps zeroed. Each waits, and throws std::runtime_error when there is no context to
+  // back: vertex buffers empty, programs with their bindings, layers and what a canvas drew into with their
+  // pixels, other bitmaps zeroed. Each waits, and throws std::runtime_error when there is no context to
   // be had. Without GL they do nothing.
   void loseContext();
   void restoreContext();
+
+  // How many tasks threw. Any thread.
+  std::uint64_t droppedTasks();
 
   // Renderer and version of the context, for people; "none" without GL.
   std::string rendererName() const;
@@ -64,27 +73,39 @@ class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
   std::function<bool(const Qelt::ITask&)> accept;
 
  private:
-  bool enqueue(Qelt::ITask* task, bool internal);
+  static constexpr std::uint64_t kRefused = 0;
+  static constexpr std::uint64_t kNobodyWaits = std::numeric_limits<std::uint64_t>::max();
+
+  // The task's number, counted from 1.
+  std::uint64_t enqueue(Qelt::ITask* task, bool internal);
   void threadMain();
   void openDevice(GL gl);
-  // Takes all that is queued and runs it. Called with the lock held, which is let go meanwhile.
-  void runBatch(std::unique_lock<std::mutex>& lock);
+
+  // With the lock held; the two that run tasks or wait let go of it meanwhile.
+  void runNext(std::unique_lock<std::mutex>& lock);
+  void waitFor(std::unique_lock<std::mutex>& lock, std::uint64_t last);
   bool isRunner() const;
-  void waitFor(std::uint64_t sequence);
+  bool isInsideTask() const;
+  // In `Caller` mode only the one thread runs tasks.
+  bool canWait() const;
+  // The device to be made current where tasks run on the caller's thread.
+  GlDevice* callersDevice() const;
 
   const Mode mMode;
-  mutable std::mutex mMutex;  // guards what follows, to the blank line
+  std::mutex mMutex;  // guards what follows, to the blank line
   std::condition_variable mWork;
   std::condition_variable mProgress;
   Qelt::ITask* mFirst = nullptr;
   Qelt::ITask* mLast = nullptr;
   std::uint64_t mPosted = 0;
   std::uint64_t mRan = 0;
+  std::uint64_t mDropped = 0;
+  std::uint64_t mWakeAt = kNobodyWaits;  // the least count of run tasks that somebody waits for
   bool mClosed = false;
   bool mThreadWaits = false;
-  bool mBatchRuns = false;
+  bool mTaskRuns = false;
+  std::thread::id mRunner;  // nobody's once the thread has ended
 
-  std::thread::id mRunner;
   std::unique_ptr<GlDevice> mDevice;  // used by the runner alone
   std::string mRendererName;
   std::thread mThread;

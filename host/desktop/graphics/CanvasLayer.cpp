@@ -4,6 +4,7 @@
 #include <stdexcept>
 #include <string>
 
+#include "desktop/base/Log.h"
 #include "desktop/gl/GlDevice.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/graphics/GlBitmap.h"
@@ -41,7 +42,11 @@ CanvasLayer::CanvasLayer(RenderQueue& queue, int width, int height, int tileSize
 }
 
 CanvasLayer::~CanvasLayer() {
-  mQueue.run([this] { mBitmap.reset(); });
+  try {
+    mQueue.run([this] { mBitmap.reset(); });
+  } catch (...) {
+    logError("a page could not be given back to OpenGL; it goes with the context");
+  }
 }
 
 Qelt::ISPBitmap* CanvasLayer::GetBitmap() {

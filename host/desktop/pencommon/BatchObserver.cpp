@@ -11,8 +11,19 @@ namespace {
 std::mutex gLock;  // guards gObserver
 std::function<void(Batch)> gObserver;
 std::atomic<bool> gObserved{false};  // spares the usual case the lock
+std::atomic<std::uint64_t> gWrittenBytes{0};
 
 }  // namespace
+
+std::uint64_t writtenBytes() {
+  return gWrittenBytes;
+}
+
+void countWritten(std::initializer_list<const std::vector<float>*> buffers) {
+  for (const std::vector<float>* buffer : buffers) {
+    if (buffer != nullptr) gWrittenBytes += buffer->size() * sizeof(float);
+  }
+}
 
 void setBatchObserver(std::function<void(Batch)> observer) {
   const std::lock_guard guard(gLock);

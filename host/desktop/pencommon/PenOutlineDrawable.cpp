@@ -53,6 +53,7 @@ void PenOutlineDrawableRT::SendDataToGPU(std::vector<float>* buffer) {
 }
 
 void PenOutlineDrawableRT::SetBuffer(std::vector<float>* inner, std::vector<float>* outer) {
+  if (inner == nullptr) QeltDesktop::countWritten({mInnerWriteBuffer, mOuterWriteBuffer});
   mInnerWriteBuffer = inner;
   mOuterWriteBuffer = outer;
 }

@@ -18,6 +18,7 @@ PenPredictionDrawableRT::PenPredictionDrawableRT(PenGLDataManager* manager) : Pe
 PenPredictionDrawableRT::~PenPredictionDrawableRT() = default;
 
 void PenPredictionDrawableRT::SetBuffer(std::vector<float>* buffer) {
+  if (buffer == nullptr) QeltDesktop::countWritten({mWriteBuffer});
   mWriteBuffer = buffer;
 }
 

@@ -13,6 +13,7 @@ PenPreviewDrawableRT::PenPreviewDrawableRT(PenGLDataManager* manager) : PenDrawa
 PenPreviewDrawableRT::~PenPreviewDrawableRT() = default;
 
 void PenPreviewDrawableRT::SetBuffer(std::vector<float>* buffer) {
+  if (buffer == nullptr) QeltDesktop::countWritten({mWriteBuffer});
   mWriteBuffer = buffer;
 }
 

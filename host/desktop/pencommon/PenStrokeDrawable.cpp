@@ -13,6 +13,7 @@ PenStrokeDrawableRT::PenStrokeDrawableRT(PenGLDataManager* manager) : PenDrawabl
 PenStrokeDrawableRT::~PenStrokeDrawableRT() = default;
 
 void PenStrokeDrawableRT::SetBuffer(std::vector<float>* buffer) {
+  if (buffer == nullptr) QeltDesktop::countWritten({mWriteBuffer});
   mWriteBuffer = buffer;
 }
 

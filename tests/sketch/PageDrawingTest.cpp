@@ -1,0 +1,58 @@
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cstdint>
+#include <stdexcept>
+
+#include "Ink.h"
+#include "Options.h"
+#include "PageDrawing.h"
+#include "PageLayout.h"
+#include "Progress.h"
+#include "desktop/engine/PluginLibrary.h"
+#include "desktop/gl/RenderQueue.h"
+#include "desktop/pencommon/BatchObserver.h"
+#include "support/LogCapture.h"
+
+namespace {
+
+using QeltDesktop::Batch;
+using QeltDesktop::RenderQueue;
+
+// Draws a zigzag of 200 far points, 40 MB of vertices in all, in a queue that runs nothing by itself.
+void drawZigzag() {
+  QeltDesktop::Page page{{{}}};
+  for (int i = 0; i < 200; ++i) {
+    page.traces[0].samples.push_back(
+        {.x = i % 2 == 0 ? 0.0f : 600.0f, .y = static_cast<float>(i), .time = 4.0 * i});
+  }
+  const QeltDesktop::PluginLibrary plugin(QELT_PLUGIN_PATH);
+  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
+  QeltDesktop::Progress progress("drawing stroke", 1);
+  QeltDesktop::Options options;
+  QeltDesktop::drawPage(plugin, queue, page, options, QeltDesktop::layOut({0, 0, 32, 32}, 1, 0),
+                        drawablesFor(options), progress);
+}
+
+TEST(PageDrawing, IsOnlySoFarAheadOfTheRenderThread) {
+  const std::uint64_t before = QeltDesktop::writtenBytes();
+  std::uint64_t drawn = 0, mostWaiting = 0;
+  QeltDesktop::setBatchObserver([&](const Batch& batch) {
+    mostWaiting = std::max(mostWaiting, QeltDesktop::writtenBytes() - before - drawn);
+    drawn += batch.buffers[0].size() * sizeof(float);
+  });
+  drawZigzag();
+  QeltDesktop::setBatchObserver({});
+  EXPECT_EQ(QeltDesktop::writtenBytes() - before, drawn);
+  EXPECT_GT(drawn, 32'000'000u);
+  EXPECT_LT(mostWaiting, 20'000'000u);
+}
+
+TEST(PageDrawing, OfWhichSomethingWasLostIsNoPicture) {
+  const QeltTests::LogCapture log;
+  QeltDesktop::setBatchObserver([](const Batch&) { throw std::runtime_error("lost"); });
+  EXPECT_THROW(drawZigzag(), std::runtime_error);
+  QeltDesktop::setBatchObserver({});
+}
+
+}  // namespace
