@@ -27,6 +27,8 @@ thread_local GlVertexObject* tFirstLarge = nullptr;
 
 std::atomic<std::uint64_t> gUndrawn{0};
 
+constexpr std::size_t kAlwaysFits = std::size_t{1} << 20;  // bytes
+
 // Drivers take memory as they draw and crash when there is none: is there some left?
 bool hasRoomForDriver() {
   constexpr std::size_t kRoom = std::size_t{128} << 20;
@@ -83,17 +85,19 @@ bool GlVertexObject::upload(Buffer& buffer, const void* data, int vertices) {
   const auto most = static_cast<std::size_t>(mSliceVertices);
   if (!setSliceCount(buffer, std::max<std::size_t>(1, count / most + (count % most > 0 ? 1 : 0))))
     return false;
-  takeGlErrors();  // whatever others left
+  // Asking for errors waits for some drivers; a batch of a live event always fits.
+  const bool asks = count * strideBytes() > kAlwaysFits;
+  if (asks) takeGlErrors();  // whatever others left
   std::size_t done = 0;
   for (const Slice& slice : buffer.slices) {
     const std::size_t size = std::min(count - done, most) * strideBytes();
     glBindBuffer(GL_ARRAY_BUFFER, slice.store);
     // A store of its own for each batch: draws of the last one may still be under way.
     glBufferData(GL_ARRAY_BUFFER, static_cast<GLsizeiptr>(size), nullptr, GL_DYNAMIC_DRAW);
-    bool good = takeGlErrors();
+    bool good = !asks || takeGlErrors();
     if (good && size > 0) {
       glBufferSubData(GL_ARRAY_BUFFER, 0, static_cast<GLsizeiptr>(size), bytes + done * strideBytes());
-      good = takeGlErrors();
+      good = !asks || takeGlErrors();
     }
     glBindBuffer(GL_ARRAY_BUFFER, 0);
     if (!good) return false;
