@@ -7,12 +7,12 @@
 
 #include "desktop/engine/PluginLibrary.h"
 #include "desktop/gl/RenderQueue.h"
+#include "desktop/graphics/PenCanvas.h"
 #include "desktop/pencommon/BatchObserver.h"
 #include "desktop/pencommon/PenDataManager.h"
 #include "pencommon/Pen.h"
 #include "pencommon/PenPreviewDrawableGL.h"
 #include "pencommon/PenStrokeDrawableGL.h"
-#include "support/BlindCanvas.h"
 #include "support/Board.h"
 
 namespace QeltTests {
@@ -45,7 +45,7 @@ class TwoPens : public testing::Test {
       }
     }
 
-    BlindCanvas canvas;
+    QeltDesktop::PenCanvas canvas;
     QeltDesktop::PenDataManager data;
     std::unique_ptr<Qelt::Pen> pen;
   };
