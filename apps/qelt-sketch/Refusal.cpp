@@ -5,24 +5,19 @@
 #include <cstddef>
 #include <cstdio>
 
+#include "Utf8.h"
+
 namespace QeltDesktop {
 namespace {
 
-unsigned char byteAt(const std::string& text, std::size_t at) {
-  return at < text.size() ? static_cast<unsigned char>(text[at]) : 0;
-}
-
-// The bytes of the character that begins at `at`; 0 for a control character and for a stray byte.
+// The bytes of the character at `at`; 0 for a control character and for a stray byte.
 std::size_t shownBytes(const std::string& text, std::size_t at) {
-  const unsigned char first = byteAt(text, at);
-  if (first < 0x80) return first >= 0x20 && first != 0x7F ? 1 : 0;
-  const std::size_t count = first >= 0xF0 ? 4 : first >= 0xE0 ? 3 : 2;
-  if (first < 0xC2 || first > 0xF4) return 0;
-  for (std::size_t i = 1; i < count; ++i) {
-    if ((byteAt(text, at + i) & 0xC0) != 0x80) return 0;
-  }
+  const auto first = static_cast<unsigned char>(text[at]);
+  const std::size_t count = utf8BytesAt(text, at);
   // U+0080 to U+009F are control characters too.
-  return first == 0xC2 && byteAt(text, at + 1) < 0xA0 ? 0 : count;
+  const bool control = first < 0x20 || first == 0x7F ||
+                       (first == 0xC2 && count == 2 && static_cast<unsigned char>(text[at + 1]) < 0xA0);
+  return control ? 0 : count;
 }
 
 }  // namespace
@@ -36,7 +31,8 @@ std::string printable(const std::string& text) {
       continue;
     }
     std::array<char, 8> code{};
-    std::snprintf(code.data(), code.size(), "\\x%02X", static_cast<unsigned int>(byteAt(text, at)));
+    std::snprintf(code.data(), code.size(), "\\x%02X",
+                  static_cast<unsigned int>(static_cast<unsigned char>(text[at])));
     shown += text[at] == '\n' ? "\\n" : code.data();
     ++at;
   }
