@@ -410,7 +410,7 @@ TEST_F(Program, LeavesNoUnfinishedFileToTheNextRun) {
   writeInk();
   const auto end = [&](const std::string& before, const std::string& signal, int repeat) {
     return sh("(" + before + "; exec $sketch trace ink.inkml -o big --repeat " + std::to_string(repeat) +
-              ") & pid=$!; until ls -A | grep -q '\\.part$' || ! kill -0 $pid; do :; done; "
+              ") & pid=$!; until ls -l /proc/$pid/fd | grep -q '\\.part$' || ! kill -0 $pid; do :; done; "
               "readlink /proc/$pid/fd/2; kill -" +
               signal + " $pid; wait $pid");
   };
