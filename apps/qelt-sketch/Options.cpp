@@ -152,7 +152,7 @@ void addInput(CLI::App& app, Options& options) {
 }
 
 constexpr const char* kLimits =
-    "\nLimits: a page's elements nest at most 200 deep; a picture has at most 32767 pixels a side and "
+    "Limits: a page's elements nest at most 200 deep; a picture has at most 32767 pixels a side and "
     "67108864 "
     "in all.";
 

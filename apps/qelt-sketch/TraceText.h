@@ -26,7 +26,7 @@ class TraceText {
   // The source outlives it.
   explicit TraceText(const SourceText& source) : mSource(source) {}
 
-  void add(const XmlText& text);
+  void add(const XmlText& added);
   // Nothing but space.
   bool isBlank() const;
   // No more points than that.
