@@ -6,6 +6,7 @@
 #include "PenSession.h"
 #include "ProgramFiles.h"
 #include "Refusal.h"
+#include "StandardOutput.h"
 #include "desktop/engine/PluginLibrary.h"
 #include "desktop/gl/RenderQueue.h"
 
@@ -19,7 +20,7 @@ using VersionRow = const std::int32_t[2];  // stroke version, outline version
 
 void infoCommand(const Options& options) {
   const PluginLibrary plugin(pluginPath(options));
-  std::printf("plug-in      %s\n", plugin.path().c_str());
+  std::printf("plug-in      %s\n", printable(plugin.path()).c_str());
   const auto* const table = static_cast<VersionRow*>(plugin.symbol("versionTable"));
   if (table == nullptr) throw Refusal(plugin.path() + ": the plug-in has no versionTable");
 
@@ -35,7 +36,7 @@ void infoCommand(const Options& options) {
   for (int version = 0; version < kVersionRows; ++version) {
     std::printf("%17d  %14d  %15d\n", version, table[version][0], table[version][1]);
   }
-  if (std::fflush(stdout) != 0) throw Refusal("standard output cannot be written");
+  finishStandardOutput();
 }
 
 }  // namespace QeltDesktop

@@ -4,16 +4,9 @@
 #include <optional>
 #include <vector>
 
-namespace QeltDesktop {
+#include "Samples.h"
 
-// One point of recorded pen input.
-struct Sample {
-  float x = 0.0f, y = 0.0f;  // stroke units, y down; always finite
-  float pressure = 1.0f;     // 0 to 1, not checked
-  float tilt = 0.0f;         // radians from upright
-  float orientation = 0.0f;  // radians, clockwise from up, above -pi to pi
-  double time = 0.0;         // milliseconds
-};
+namespace QeltDesktop {
 
 // What a page says of the pen a trace was drawn with; what it leaves open is the pen's own.
 struct Brush {
@@ -24,7 +17,7 @@ struct Brush {
 
 // One stroke of the page.
 struct Trace {
-  std::vector<Sample> samples;  // never empty
+  Samples samples;  // never empty
   Brush brush;
   std::optional<int> tool;  // Qelt::ToolType
 };

@@ -151,6 +151,11 @@ void addInput(CLI::App& app, Options& options) {
   app.add_option("INPUT", options.input, "page of W3C InkML (default: the sample page)")->type_name("");
 }
 
+constexpr const char* kLimits =
+    "Limits: a page's elements nest at most 200 deep; a picture has at most 32767 pixels a side and "
+    "67108864 "
+    "in all.";
+
 void addOutput(CLI::App& app, Options& options, const char* help) {
   app.add_option("-o,--output", options.output, help)->required()->type_name("FILE");
 }
@@ -193,7 +198,7 @@ void addDrawing(CLI::App& app, Options& options) {
   addValue<OutlineOptions>(app, "--outline", options.outline, kOutline,
                            "draw every stroke's outline under the strokes");
   addValue<int>(app, "--predict", options.predict, kPredictionCount,
-                "live: K predicted samples after every move event");
+                "live: K predicted samples, at most 10000, after every move event");
   addValue<float>(app, "--opacity", options.opacity, kShare, "of the prediction, 0 to 1 (default 0.5)");
   addValue<int>(app, "--points", options.points, kCount,
                 "stop after the first N points of the last trace, the pen still down");
@@ -256,6 +261,7 @@ std::variant<Options, UsageEnd> parseOptions(int argc, const char* const* argv) 
                                                     {sheet, Command::Sheet},
                                                     {info, Command::Info}};
   for (const auto& [command, value] : commands) addPlugin(*command, options);
+  for (CLI::App* const command : {draw, trace, sheet}) command->footer(kLimits);
 
   try {
     app.parse(argc, argv);

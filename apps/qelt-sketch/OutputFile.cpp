@@ -1,74 +1,107 @@
 #include "OutputFile.h"
 
+#include <fcntl.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
-#include <array>
 #include <cerrno>
-#include <csignal>
-#include <cstddef>
 #include <cstring>
-#include <filesystem>
-#include <system_error>
+#include <optional>
 #include <utility>
 
+#include "OutputPlace.h"
 #include "Refusal.h"
+#include "UnfinishedFile.h"
 
 namespace QeltDesktop {
 namespace {
 
-// The unfinished file, for the signal handler: a handler may only touch what is ready for it.
-std::array<char, 4096> gUnfinished{};
-volatile std::sig_atomic_t gHasUnfinished = 0;
-
-extern "C" void removeUnfinished(int signal) {
-  if (gHasUnfinished) unlink(gUnfinished.data());
-  // The handler was reset as it was called: this ends the process as the signal would have.
-  raise(signal);
+bool isSameFile(const struct stat& one, const std::string& path) {
+  struct stat other {};
+  return stat(path.c_str(), &other) == 0 && one.st_dev == other.st_dev && one.st_ino == other.st_ino;
 }
 
-void rememberUnfinished(const std::string& path) {
-  if (path.size() >= gUnfinished.size()) return;
-  std::memcpy(gUnfinished.data(), path.c_str(), path.size() + 1);
-  gHasUnfinished = 1;
-  struct sigaction action {};
-  action.sa_handler = removeUnfinished;
-  action.sa_flags = static_cast<int>(SA_RESETHAND);
-  for (const int signal : {SIGINT, SIGTERM, SIGHUP}) sigaction(signal, &action, nullptr);
+// The owner, where the process may give files away, and the permissions of the file to replace.
+bool takeOver(int file, const struct stat& older) {
+  constexpr mode_t kPermissions = 07777, kSetId = S_ISUID | S_ISGID;
+  const bool sameOwner = fchown(file, older.st_uid, older.st_gid) == 0;
+  return fchmod(file, older.st_mode & (sameOwner ? kPermissions : kPermissions & ~kSetId)) == 0;
 }
 
 }  // namespace
 
-OutputFile::OutputFile(const std::string& path, const std::string& input) : mShownPath(path), mPath(path) {
+OutputFile::OutputFile(const std::string& path, const std::string& input) : mShownPath(path) {
   if (path == "-") {
     mFile = stdout;
     return;
   }
-  namespace fs = std::filesystem;
-  std::error_code error;
-  const fs::file_status status = fs::status(path, error);
-  if (fs::is_directory(status)) {
-    errno = EISDIR;
-    refuse();
+  OutputPlace place = outputPlaceOf(path);
+  if (place.descriptor) {
+    struct stat opened {};
+    if (fstat(*place.descriptor, &opened) != 0) refuse();
+    place.present = opened;
   }
-  if (fs::is_regular_file(status) && !input.empty() && fs::equivalent(path, input, error))
+  const bool isRegular = place.present && S_ISREG(place.present->st_mode);
+  if (isRegular && !input.empty() && isSameFile(*place.present, input))
     throw Refusal(path + ": cannot be written: it is the page to read");
-  if (fs::exists(status) && !fs::is_regular_file(status)) {
-    mFile = std::fopen(path.c_str(), "wb");
+  if (place.descriptor || (place.present && !isRegular)) {
+    openStraight(place);
   } else {
-    // A symbolic link stays one: its target is replaced.
-    const fs::path target = fs::canonical(path, error);
-    if (!error) mPath = target.string();
-    mTemporaryPath = mPath + ".part" + std::to_string(getpid());
-    mFile = std::fopen(mTemporaryPath.c_str(), "wb");
-    if (mFile != nullptr) rememberUnfinished(mTemporaryPath);
+    openBeside(std::move(place));
   }
-  if (mFile == nullptr) refuse();
 }
 
 OutputFile::~OutputFile() {
-  if (mFile == nullptr || mFile == stdout) return;
-  std::fclose(mFile);
+  if (mFile != nullptr && mFile != stdout) std::fclose(mFile);
   removeTemporary();
+}
+
+void OutputFile::openStraight(const OutputPlace& place) {
+  if (!place.descriptor && S_ISDIR(place.present->st_mode)) {
+    errno = EISDIR;
+    refuse();
+  }
+  // A descriptor is shared, not opened again: what was written through it before is not lost.
+  FileDescriptor file(place.descriptor ? fcntl(*place.descriptor, F_DUPFD_CLOEXEC, 0)
+                                       : openat(place.folder.number(), place.name.c_str(),
+                                                O_WRONLY | O_NOCTTY | O_NOFOLLOW | O_CLOEXEC));
+  if (!file || (mFile = fdopen(file.number(), "wb")) == nullptr) refuse();
+  file.release();
+}
+
+void OutputFile::openBeside(OutputPlace place) {
+  constexpr unsigned int kAnybody = 0666, kOwner = 0600, kWritable = 0222;
+  mFolder = std::move(place.folder);
+  mName = std::move(place.name);
+  if (place.present) {
+    const struct stat& older = *place.present;
+    // The administrator may write everything; what is marked as read-only is refused all the same.
+    if ((older.st_mode & kWritable) == 0) {
+      errno = EACCES;
+      refuse();
+    }
+    if (faccessat(mFolder.number(), mName.c_str(), W_OK, AT_EACCESS) != 0) refuse();
+    if (older.st_nlink > 1)
+      throw Refusal(mShownPath + ": cannot be written: it has another name too (a hard link), " +
+                    "which would keep the older content");
+  }
+  removeAbandoned(mFolder.number(), mName);
+  FileDescriptor file =
+      makeUnfinished(mFolder.number(), mName, place.present ? kOwner : kAnybody, mTemporaryName);
+  if (!file) {
+    mTemporaryName.clear();
+    refuse();
+  }
+  guardUnfinished(mFolder.number(), mTemporaryName);
+  const bool ready = (!place.present || takeOver(file.number(), *place.present)) &&
+                     (mFile = fdopen(file.number(), "wb")) != nullptr;
+  if (!ready) {
+    const int error = errno;
+    removeTemporary();
+    errno = error;
+    refuse();
+  }
+  file.release();
 }
 
 void OutputFile::write(std::string_view bytes) {
@@ -76,28 +109,29 @@ void OutputFile::write(std::string_view bytes) {
 }
 
 void OutputFile::commit() {
-  if (mFile == stdout) {
-    if (std::fflush(mFile) != 0) refuse();
-    return;
+  flush();
+  if (mFile == stdout) return;
+  if (!mTemporaryName.empty()) {
+    const int folder = mFolder.number();
+    if (renameat(folder, mTemporaryName.c_str(), folder, mName.c_str()) != 0) refuse();
+    mTemporaryName.clear();
+    forgetUnfinished();
   }
-  // Some file systems tell only here that they are full.
-  if (std::fclose(std::exchange(mFile, nullptr)) != 0) abandon();
-  if (mTemporaryPath.empty()) return;
-  if (std::rename(mTemporaryPath.c_str(), mPath.c_str()) != 0) abandon();
-  gHasUnfinished = 0;
+  if (std::fclose(std::exchange(mFile, nullptr)) != 0) refuse();
+}
+
+// The file takes its place only once its bytes are safe: a machine that fails leaves the older one or this.
+void OutputFile::flush() {
+  if (std::fflush(mFile) != 0) refuse();
+  // Some file systems have nothing to synchronise, and some tell only here that they are full.
+  if (!mTemporaryName.empty() && fsync(fileno(mFile)) != 0 && errno != EINVAL && errno != EROFS) refuse();
 }
 
 void OutputFile::removeTemporary() {
-  if (mTemporaryPath.empty()) return;
-  std::remove(mTemporaryPath.c_str());
-  gHasUnfinished = 0;
-}
-
-void OutputFile::abandon() {
-  const int error = errno;
-  removeTemporary();
-  errno = error;
-  refuse();
+  if (mTemporaryName.empty()) return;
+  unlinkat(mFolder.number(), mTemporaryName.c_str(), 0);
+  mTemporaryName.clear();
+  forgetUnfinished();
 }
 
 void OutputFile::refuse() const {

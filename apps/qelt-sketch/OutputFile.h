@@ -4,10 +4,19 @@
 #include <string>
 #include <string_view>
 
+#include "FileDescriptor.h"
+
 namespace QeltDesktop {
 
+struct OutputPlace;
+
 // A file that is there whole or not at all: written beside its place under another name and moved there by
-// `commit`. What is not a regular file ("-" for standard output, a device, a pipe) is written straight.
+// `commit`. Symbolic links stay and are followed; the permissions of an older file stay, and one that nobody
+// may write, or that has a second name (a hard link), is refused. What is not a regular file ("-" for
+// standard output, /dev/stdout and other descriptors, a device, a pipe) is written straight.
+//
+// While the file is unfinished, a signal that ends the process removes it, unless the process was started
+// with that signal ignored. What SIGKILL leaves behind the next run onto the same file removes.
 class OutputFile {
  public:
   // Throws Refusal when the file cannot be written, or is `input`: what is read is not lost.
@@ -21,13 +30,16 @@ class OutputFile {
   void commit();
 
  private:
+  void openStraight(const OutputPlace& place);
+  void openBeside(OutputPlace place);
   void removeTemporary();
-  [[noreturn]] void abandon();
+  void flush();
   [[noreturn]] void refuse() const;
 
   std::string mShownPath;
-  std::string mPath;
-  std::string mTemporaryPath;  // empty when written straight
+  FileDescriptor mFolder;
+  std::string mName;           // in mFolder
+  std::string mTemporaryName;  // there too; empty when written straight
   std::FILE* mFile = nullptr;
 };
 

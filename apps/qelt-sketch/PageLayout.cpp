@@ -31,7 +31,7 @@ float pageMargin(float largestPenSize, float outlineSize) {
 
 PageArea pageArea(const Page& page, const std::optional<PageSize>& size, float margin) {
   if (size) return {0.0f, 0.0f, size->width, size->height};
-  const Sample& first = page.traces.front().samples.front();
+  const Sample first = page.traces.front().samples.front();
   float left = first.x, top = first.y, right = first.x, bottom = first.y;
   for (const Trace& trace : page.traces) {
     for (const Sample& sample : trace.samples) {

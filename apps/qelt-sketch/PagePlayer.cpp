@@ -109,7 +109,7 @@ void PagePlayer::playLive(std::size_t index, PlayObserver& observer) {
 }
 
 void PagePlayer::predict(std::size_t index, std::size_t sample, PlayObserver& observer) {
-  const std::vector<Sample>& samples = mPage.traces[index].samples;
+  const Samples& samples = mPage.traces[index].samples;
   const Qelt::MotionEvent event =
       predictedEvent(samples[sample - 1], samples[sample], pointerOf(index), mOptions.predict);
   observer.call({DrawableKind::Prediction, index, "Draw", event.GetAction()},

@@ -23,7 +23,12 @@ std::string besideProgram(const char* pathFromProgram) {
 }  // namespace
 
 std::string pluginPath(const Options& options) {
-  return options.plugin ? *options.plugin : besideProgram(QELT_PLUGIN_FROM_PROGRAM);
+  if (!options.plugin) return besideProgram(QELT_PLUGIN_FROM_PROGRAM);
+  // The loader looks for a name without a folder among the system's libraries alone.
+  std::error_code error;
+  const fs::path asked = *options.plugin;
+  return !asked.has_parent_path() && fs::exists(asked, error) ? (fs::path(".") / asked).string()
+                                                              : asked.string();
 }
 
 std::string inputPath(const Options& options) {

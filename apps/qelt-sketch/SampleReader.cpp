@@ -8,8 +8,6 @@
 namespace QeltDesktop {
 namespace {
 
-constexpr double kMillisecondsAPoint = 1000.0 / 240.0;
-
 // The point's values by what they mean; unknown where there is no such channel or no value yet.
 using Readings = std::array<Reading, static_cast<std::size_t>(Quantity::Time) + 1>;
 
@@ -47,9 +45,10 @@ void setAttitude(Sample& sample, const Readings& readings, bool hasSphericalAngl
 
 }  // namespace
 
-std::vector<Sample> readSamples(const TraceText& text, const TraceFormat& format) {
+Samples readSamples(const TraceText& text, const TraceFormat& format) {
   const bool hasSphericalAngles = format.has(Quantity::Elevation) || format.has(Quantity::Azimuth);
-  std::vector<Sample> samples;
+  Samples samples;
+  samples.reserve(text.mostPoints());
   text.forEachPoint(format, [&](const std::vector<Reading>& point) {
     Readings readings;
     float maxForce = 0.0f;
@@ -67,7 +66,7 @@ std::vector<Sample> readSamples(const TraceText& text, const TraceFormat& format
     if (force.known) sample.pressure = maxForce > 0.0f ? force.nearest / maxForce : force.nearest;
     setAttitude(sample, readings, hasSphericalAngles);
     const Reading& time = of(readings, Quantity::Time);
-    sample.time = time.known ? time.value : static_cast<double>(samples.size()) * kMillisecondsAPoint;
+    sample.time = time.known ? time.value : usualTime(samples.size());
     samples.push_back(sample);
   });
   return samples;

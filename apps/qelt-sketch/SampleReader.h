@@ -1,8 +1,6 @@
 #pragma once
 
-#include <vector>
-
-#include "Ink.h"
+#include "Samples.h"
 #include "TraceFormat.h"
 #include "TraceText.h"
 
@@ -11,6 +9,6 @@ namespace QeltDesktop {
 // Turns the points of a trace into samples: pressure as a share of its maximum, tilt from elevation or from
 // the tilts along x and y, times from T or 240 points a second. What is not recorded reads as pressure 1,
 // tilt 0, orientation 0. Throws Refusal when a point is malformed.
-std::vector<Sample> readSamples(const TraceText& text, const TraceFormat& format);
+Samples readSamples(const TraceText& text, const TraceFormat& format);
 
 }  // namespace QeltDesktop

@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <cmath>
 #include <cstdint>
-#include <span>
 
 #include "base/PointF.h"
 
@@ -23,14 +22,16 @@ Qelt::PointerCoords coordsOf(const Sample& sample) {
           .orientation = sample.orientation};
 }
 
-// One event: the last sample is current, those before it are history.
-Qelt::MotionEvent eventOf(std::span<const Sample> samples, double downTime, int action,
-                          const Pointer& pointer) {
+// One event of `count` samples from `first` on: the last one is current, those before it are history.
+Qelt::MotionEvent eventOf(const Samples& samples, std::size_t first, std::size_t count, double downTime,
+                          int action, const Pointer& pointer) {
   const Qelt::PointerProperties properties{.id = 0, .toolType = pointer.tool};
-  const Qelt::PointerCoords first = coordsOf(samples.front());
-  Qelt::MotionEvent event(wholeMilliseconds(downTime), wholeMilliseconds(samples.front().time), action, 1,
-                          &properties, &first, 0, pointer.source, 0);
-  for (const Sample& sample : samples.subspan(1)) {
+  const Sample begin = samples[first];
+  const Qelt::PointerCoords place = coordsOf(begin);
+  Qelt::MotionEvent event(wholeMilliseconds(downTime), wholeMilliseconds(begin.time), action, 1, &properties,
+                          &place, 0, pointer.source, 0);
+  for (std::size_t i = first + 1; i < first + count; ++i) {
+    const Sample sample = samples[i];
     const Qelt::PointerCoords coords = coordsOf(sample);
     event.AddBatch(wholeMilliseconds(sample.time), &coords);
   }
@@ -50,16 +51,15 @@ Pointer pointerFor(const Trace& trace, std::optional<int> tool, std::optional<in
 }
 
 void cutLastTrace(Page& page, int points) {
-  std::vector<Sample>& samples = page.traces.back().samples;
-  samples.resize(std::min(samples.size(), static_cast<std::size_t>(points)));
+  page.traces.back().samples.cut(static_cast<std::size_t>(points));
 }
 
 void feedLive(const Trace& trace, const Pointer& pointer, int batch, bool penStaysDown,
               const std::function<void(LiveEvent&)>& take) {
-  const std::span<const Sample> samples(trace.samples);
+  const Samples& samples = trace.samples;
   const double downTime = samples.front().time;
   const auto feed = [&](std::size_t first, std::size_t count, int action) {
-    LiveEvent live{eventOf(samples.subspan(first, count), downTime, action, pointer), first + count - 1};
+    LiveEvent live{eventOf(samples, first, count, downTime, action, pointer), first + count - 1};
     take(live);
   };
   feed(0, 1, Qelt::kActionDown);
@@ -72,8 +72,10 @@ void feedLive(const Trace& trace, const Pointer& pointer, int batch, bool penSta
 }
 
 Qelt::MotionEvent recordedEvent(const Trace& trace, const Pointer& pointer) {
-  const Sample& last = trace.samples.back();
-  Qelt::MotionEvent event = eventOf(trace.samples, trace.samples.front().time, Qelt::kActionUp, pointer);
+  const Samples& samples = trace.samples;
+  const Sample last = samples.back();
+  Qelt::MotionEvent event =
+      eventOf(samples, 0, samples.size(), samples.front().time, Qelt::kActionUp, pointer);
   const Qelt::PointerCoords coords = coordsOf(last);
   event.AddBatch(wholeMilliseconds(last.time), &coords);
   return event;
@@ -91,14 +93,15 @@ std::unique_ptr<StoredStroke> storedStroke(const Trace& trace, const Pointer& po
 
 Qelt::MotionEvent predictedEvent(const Sample& previous, const Sample& last, const Pointer& pointer,
                                  int count) {
-  std::vector<Sample> samples(static_cast<std::size_t>(count), last);
+  Samples samples;
   for (int k = 1; k <= count; ++k) {
-    Sample& sample = samples[static_cast<std::size_t>(k - 1)];
+    Sample sample = last;
     sample.x = last.x + static_cast<float>(k) * (last.x - previous.x);
     sample.y = last.y + static_cast<float>(k) * (last.y - previous.y);
     sample.time = last.time + k * (last.time - previous.time);
+    samples.push_back(sample);
   }
-  return eventOf(samples, last.time, Qelt::kActionMove, pointer);
+  return eventOf(samples, 0, samples.size(), last.time, Qelt::kActionMove, pointer);
 }
 
 }  // namespace QeltDesktop

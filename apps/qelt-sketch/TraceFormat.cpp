@@ -9,7 +9,6 @@
 #include <string_view>
 #include <utility>
 
-#include "InkmlNode.h"
 #include "NumberText.h"
 
 namespace QeltDesktop {
@@ -52,25 +51,24 @@ std::optional<double> unitNamed(Quantity quantity, const std::string& unit) {
   return 1.0;  // positions are stroke units and pressure is a share of its maximum, whatever they were
 }
 
-Channel readChannel(const SourceText& source, const pugi::xml_node& node) {
-  const std::string name = textOf(node, "name");
-  if (name.empty()) throw refusalAt(source, node, "channel without a name", "");
+Channel readChannel(const SourceText& source, const ChannelText& text) {
+  const auto malformed = [&](const std::string& what, const std::string& value) {
+    return source.refusalAt(text.offset, what, value);
+  };
+  if (text.name.empty()) throw malformed("channel without a name", "");
   Channel channel;
-  channel.quantity = quantityNamed(name);
-  channel.boolean = textOf(node, "type") == "boolean";
+  channel.quantity = quantityNamed(text.name);
+  channel.boolean = text.type == "boolean";
   if (channel.boolean && channel.quantity != Quantity::Ignored) {
-    throw refusalAt(source, node, "channel " + name + " cannot be", "boolean");
+    throw malformed("channel " + text.name + " cannot be", "boolean");
   }
-  const std::string unit = textOf(node, "units");
-  const std::optional<double> known = unitNamed(channel.quantity, unit);
-  if (!known) throw refusalAt(source, node, "unknown unit of channel " + name, unit);
+  const std::optional<double> known = unitNamed(channel.quantity, text.units);
+  if (!known) throw malformed("unknown unit of channel " + text.name, text.units);
   channel.unit = *known;
-  if (channel.quantity == Quantity::Force && attributeOf(node, "max")) {
-    const std::string text = textOf(node, "max");
-    const std::optional<float> max = parseFloat(text);
+  if (channel.quantity == Quantity::Force && text.max) {
+    const std::optional<float> max = parseFloat(*text.max);
     if (!max || !std::isfinite(*max) || *max <= 0.0f) {
-      throw refusalAt(source, node, "max of channel F must be a number above 0",
-                      text.empty() ? "\"\"" : text);
+      throw malformed("max of channel F must be a number above 0", text.max->empty() ? "\"\"" : *text.max);
     }
     channel.max = *max;
   }
@@ -89,26 +87,31 @@ TraceFormat plainFormat() {
           .regularCount = 2};
 }
 
-TraceFormat readTraceFormat(const SourceText& source, const pugi::xml_node& node) {
+ChannelText::ChannelText(const XmlElement& element)
+    : offset(element.offset()),
+      name(element.text("name")),
+      type(element.text("type")),
+      units(element.text("units")),
+      max(element.attribute("max")) {}
+
+TraceFormat traceFormatOf(const SourceText& source, std::size_t offset,
+                          const std::vector<ChannelText>& regular,
+                          const std::vector<ChannelText>& intermittent) {
   TraceFormat format;
   std::set<std::string> names;
-  const auto take = [&](const pugi::xml_node& channel) {
-    format.channels.push_back(readChannel(source, channel));
-    const std::string name = textOf(channel, "name");
-    if (!names.insert(name).second) throw refusalAt(source, channel, "channel named twice", name);
-  };
-  for (const pugi::xml_node& child : node) {
-    if (isElement(child, "channel")) take(child);
-  }
-  format.regularCount = format.channels.size();
-  for (const pugi::xml_node& child : node) {
-    if (!isElement(child, "intermittentChannels")) continue;
-    for (const pugi::xml_node& channel : child) {
-      if (isElement(channel, "channel")) take(channel);
+  const auto take = [&](const std::vector<ChannelText>& channels) {
+    for (const ChannelText& channel : channels) {
+      format.channels.push_back(readChannel(source, channel));
+      if (!names.insert(channel.name).second) {
+        throw source.refusalAt(channel.offset, "channel named twice", channel.name);
+      }
     }
-  }
+  };
+  take(regular);
+  format.regularCount = format.channels.size();
+  take(intermittent);
   for (const auto& [quantity, name] : {std::pair{Quantity::X, "X"}, std::pair{Quantity::Y, "Y"}}) {
-    if (!format.has(quantity)) throw refusalAt(source, node, "traceFormat without channel", name);
+    if (!format.has(quantity)) throw source.refusalAt(offset, "traceFormat without channel", name);
   }
   return format;
 }

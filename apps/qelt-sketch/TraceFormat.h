@@ -1,12 +1,12 @@
 #pragma once
 
 #include <cstddef>
+#include <optional>
 #include <string>
 #include <vector>
 
-#include <pugixml.hpp>
-
 #include "SourceText.h"
+#include "XmlWalk.h"
 
 namespace QeltDesktop {
 
@@ -31,7 +31,19 @@ struct TraceFormat {
 // X, then Y: the format of traces that no traceFormat speaks of.
 TraceFormat plainFormat();
 
-// Reads a <traceFormat>; throws Refusal when it is malformed or lacks X or Y.
-TraceFormat readTraceFormat(const SourceText& source, const pugi::xml_node& node);
+// A <channel> as it is written.
+struct ChannelText {
+  explicit ChannelText(const XmlElement& element);
+
+  std::size_t offset;
+  std::string name, type, units;
+  std::optional<std::string> max;
+};
+
+// The format of a <traceFormat> at that offset, of the channels that stand in it and of those in its
+// <intermittentChannels>; throws Refusal when it is malformed or lacks X or Y.
+TraceFormat traceFormatOf(const SourceText& source, std::size_t offset,
+                          const std::vector<ChannelText>& regular,
+                          const std::vector<ChannelText>& intermittent);
 
 }  // namespace QeltDesktop

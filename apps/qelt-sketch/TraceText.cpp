@@ -6,7 +6,6 @@
 #include <optional>
 #include <string_view>
 
-#include "InkmlNode.h"
 #include "NumberText.h"
 
 namespace QeltDesktop {
@@ -43,7 +42,7 @@ class TraceText::Scanner {
  public:
   Scanner(const TraceText& trace, const TraceFormat& format)
       : mTrace(trace),
-        mText(trace.mText),
+        mText(trace.text()),
         mFormat(format),
         mStates(format.channels.size()),
         mPoint(format.channels.size()) {}
@@ -149,7 +148,7 @@ class TraceText::Scanner {
       while (isDigit(peek())) ++mAt;
     }
     checkNumberEnds();
-    const std::string_view text = std::string_view(mText).substr(start, mAt - start);
+    const std::string_view text = mText.substr(start, mAt - start);
     const std::optional<double> value = parseDouble(text);
     const std::optional<float> nearest = parseFloat(text);
     if (!value || !nearest) throw badValue("not a number");
@@ -166,7 +165,10 @@ class TraceText::Scanner {
       const char c = peek();
       value = value * 16.0 + (isDigit(c) ? c - '0' : (c | 0x20) - 'a' + 10);
     }
-    if (mAt == start || mAt - start > kMostDigits) throw badValue("not a number");
+    if (mAt == start) throw badValue("not a number");
+    if (mAt - start > kMostDigits) {
+      throw badValue("more than " + std::to_string(kMostDigits) + " hexadecimal digits");
+    }
     checkNumberEnds();
     if (negative) value = -value;
     return {.known = true, .value = value, .nearest = static_cast<float>(value)};
@@ -178,8 +180,12 @@ class TraceText::Scanner {
   }
 
   std::string textUntil(std::size_t start, bool (*isEnd)(char)) const {
-    const auto first = mText.begin() + static_cast<std::ptrdiff_t>(start);
-    return std::string(first, std::find_if(first, mText.end(), isEnd));
+    constexpr std::size_t kEnough = 4096;  // a refusal shows far less
+    const std::string_view rest = mText.substr(start, kEnough);
+    std::string found(rest.begin(), std::find_if(rest.begin(), rest.end(), isEnd));
+    // XML counts "\r\n" as one.
+    for (std::size_t at = 0; (at = found.find("\r\n", at)) != std::string::npos;) found.erase(at, 1);
+    return found;
   }
 
   Refusal badValue(const std::string& what) const {
@@ -198,7 +204,7 @@ class TraceText::Scanner {
   }
 
   const TraceText& mTrace;
-  const std::string& mText;
+  std::string_view mText;
   const TraceFormat& mFormat;
   std::vector<ChannelState> mStates;
   std::vector<Reading> mPoint;
@@ -207,17 +213,42 @@ class TraceText::Scanner {
   std::size_t mValueStart = 0;
 };
 
-TraceText::TraceText(const SourceText& source, const pugi::xml_node& trace) : mSource(source) {
-  for (const pugi::xml_node& child : trace) {
-    if (child.type() == pugi::node_pcdata || child.type() == pugi::node_cdata) {
-      mPieces.push_back({mText.size(), lineOf(source, child)});
-      mText += child.value();
-    } else if (child.type() == pugi::node_element && localName(child) != "annotation" &&
-               localName(child) != "annotationXML") {
-      throw refusalAt(source, child, "element that a trace cannot hold", child.name());
-    }
+void TraceText::add(const XmlText& added) {
+  const std::string_view source = mSource.text();
+  const bool goesOn = !mPieces.empty() && added.offset == mSourceEnd;
+  if (!mCopied && (added.replaced || (!goesOn && !mPieces.empty()))) {
+    mCopy = text();
+    mCopied = true;
   }
-  if (trimmed(mText).empty()) throw refusalAt(source, trace, "trace without points", "");
+  // What stands between two pieces only counts where it ends a line.
+  if (mPieces.empty() || lineEndsIn(source.substr(mSourceEnd, added.offset - mSourceEnd)) > 0)
+    mPieces.push_back({mCopied ? mCopy.size() : 0, added.offset});
+  mSourceEnd = added.offset + added.length;
+  if (!mCopied) return;
+  if (!added.replaced) {
+    mCopy += source.substr(added.offset, added.length);
+  } else if (trimmed(added.value).empty()) {
+    mCopy += ' ';  // a line end that is written as a reference ends no line of the source
+  } else {
+    mCopy += added.value;
+  }
+}
+
+std::string_view TraceText::text() const {
+  if (mCopied) return mCopy;
+  if (mPieces.empty()) return {};
+  const std::size_t start = mPieces.front().offset;
+  return std::string_view(mSource.text()).substr(start, mSourceEnd - start);
+}
+
+bool TraceText::isBlank() const {
+  const std::string_view all = text();
+  return std::all_of(all.begin(), all.end(), isSpace);
+}
+
+std::size_t TraceText::mostPoints() const {
+  const std::string_view all = text();
+  return static_cast<std::size_t>(std::count(all.begin(), all.end(), ',')) + 1;
 }
 
 void TraceText::forEachPoint(const TraceFormat& format,
@@ -226,13 +257,12 @@ void TraceText::forEachPoint(const TraceFormat& format,
   while (!scanner.atEnd()) take(scanner.readPoint());
 }
 
-int TraceText::lineAt(std::size_t offset) const {
-  const auto next = std::upper_bound(mPieces.begin(), mPieces.end(), offset,
-                                     [](std::size_t at, const Piece& piece) { return at < piece.start; });
+int TraceText::lineAt(std::size_t at) const {
+  const auto next =
+      std::upper_bound(mPieces.begin(), mPieces.end(), at,
+                       [](std::size_t offset, const Piece& piece) { return offset < piece.start; });
   const Piece& piece = *std::prev(next);
-  const auto first = mText.begin() + static_cast<std::ptrdiff_t>(piece.start);
-  const auto last = mText.begin() + static_cast<std::ptrdiff_t>(std::min(offset, mText.size()));
-  return piece.line + static_cast<int>(std::count(first, last, '\n'));
+  return mSource.lineAt(piece.offset) + lineEndsIn(text().substr(piece.start, at - piece.start));
 }
 
 }  // namespace QeltDesktop

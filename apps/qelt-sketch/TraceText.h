@@ -3,12 +3,12 @@
 #include <cstddef>
 #include <functional>
 #include <string>
+#include <string_view>
 #include <vector>
-
-#include <pugixml.hpp>
 
 #include "SourceText.h"
 #include "TraceFormat.h"
+#include "XmlWalk.h"
 
 namespace QeltDesktop {
 
@@ -19,10 +19,18 @@ struct Reading {
   float nearest = 0.0f;  // of a plain number the float nearest to the decimal, rounded once
 };
 
-// The characters of a <trace>, without comments, and the lines they come from.
+// The characters of a <trace>, without comments, and the lines they come from. As long as they stand in one
+// piece in the source they are not copied.
 class TraceText {
  public:
-  TraceText(const SourceText& source, const pugi::xml_node& trace);
+  // The source outlives it.
+  explicit TraceText(const SourceText& source) : mSource(source) {}
+
+  void add(const XmlText& added);
+  // Nothing but space.
+  bool isBlank() const;
+  // No more points than that.
+  std::size_t mostPoints() const;
 
   // Hands over the points in order, one reading a channel. An omitted intermittent value and "?" leave the
   // channel's reading as it was; "*" repeats the number before it under the same prefix. Differences add up
@@ -34,16 +42,20 @@ class TraceText {
 
  private:
   class Scanner;
+  // Characters with no line end between them in the source that is not one of them.
   struct Piece {
-    std::size_t start;  // in mText
-    int line;
+    std::size_t start;   // in the text
+    std::size_t offset;  // in the source
   };
 
-  int lineAt(std::size_t offset) const;
+  std::string_view text() const;
+  int lineAt(std::size_t at) const;
 
   const SourceText& mSource;
-  std::string mText;
   std::vector<Piece> mPieces;
+  std::size_t mSourceEnd = 0;  // of the last piece
+  std::string mCopy;           // empty while the text is the one piece
+  bool mCopied = false;
 };
 
 }  // namespace QeltDesktop

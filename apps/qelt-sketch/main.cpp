@@ -1,29 +1,73 @@
+#include <fcntl.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <csignal>
+#include <cstddef>
 #include <cstdio>
 #include <exception>
 #include <new>
+#include <string>
 #include <variant>
 
 #include "Commands.h"
 #include "Options.h"
 #include "Refusal.h"
+#include "StandardOutput.h"
+
+namespace {
+
+// A file opened later must not become standard output or error, where others write. Reading the first and
+// writing the second of these fails, as it would on what is closed.
+void fillStandardDescriptors() {
+  constexpr int kModes[] = {O_WRONLY, O_RDONLY, O_WRONLY};
+  for (int number = STDIN_FILENO; number <= STDERR_FILENO; ++number) {
+    if (fcntl(number, F_GETFD) < 0) open("/dev/null", kModes[number]);
+  }
+}
+
+int endNotDone(const std::string& line) {
+  std::fprintf(stderr, "%s\n", QeltDesktop::printable(line).c_str());
+  return 1;
+}
+
+int end(const QeltDesktop::UsageEnd& usage) {
+  if (usage.status != 0) {
+    std::string shown;
+    for (std::size_t start = 0; start < usage.text.size();) {
+      const std::size_t lineEnd = std::min(usage.text.find('\n', start), usage.text.size());
+      shown += QeltDesktop::printable(usage.text.substr(start, lineEnd - start)) + '\n';
+      start = lineEnd + 1;
+    }
+    std::fputs(shown.c_str(), stderr);
+    return usage.status;
+  }
+  std::fputs(usage.text.c_str(), stdout);
+  QeltDesktop::finishStandardOutput();
+  return 0;
+}
+
+}  // namespace
 
 int main(int argc, char** argv) {
-  constexpr int kNotDone = 1;
+  fillStandardDescriptors();
+  // A file that grows beyond what is allowed is told like one that finds the disk full.
+  std::signal(SIGXFSZ, SIG_IGN);
   try {
     const std::variant<QeltDesktop::Options, QeltDesktop::UsageEnd> parsed =
         QeltDesktop::parseOptions(argc, argv);
-    if (const auto* const end = std::get_if<QeltDesktop::UsageEnd>(&parsed)) {
-      std::fputs(end->text.c_str(), end->status == 0 ? stdout : stderr);
-      return end->status;
-    }
+    if (const auto* const usage = std::get_if<QeltDesktop::UsageEnd>(&parsed)) return end(*usage);
     QeltDesktop::runCommand(std::get<QeltDesktop::Options>(parsed));
     return 0;
   } catch (const std::bad_alloc&) {
     std::fputs("qelt-sketch: out of memory\n", stderr);
+    return 1;
   } catch (const QeltDesktop::Refusal& refusal) {
-    std::fprintf(stderr, "%s\n", refusal.what());
+    return endNotDone(refusal.what());
   } catch (const std::exception& error) {
-    std::fprintf(stderr, "qelt-sketch: %s\n", error.what());
+    return endNotDone(std::string("qelt-sketch: ") + error.what());
+  } catch (...) {
+    // A plug-in throws what it likes.
+    return endNotDone("qelt-sketch: stopped by an exception of unknown type");
   }
-  return kNotDone;
 }

@@ -1,7 +1,11 @@
 #include "InkmlReader.h"
 
 #include <gmock/gmock.h>
+#include <malloc.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
+#include <chrono>
 #include <cmath>
 #include <cstddef>
 #include <cstdio>
@@ -25,7 +29,7 @@ Page read(const std::string& text) {
 }
 
 // A page of one trace, in the channels given.
-std::vector<Sample> samplesOf(const std::string& channels, const std::string& trace) {
+Samples samplesOf(const std::string& channels, const std::string& trace) {
   const Page page =
       read("<ink><traceFormat>" + channels + "</traceFormat><trace>" + trace + "</trace></ink>");
   return page.traces.at(0).samples;
@@ -34,7 +38,7 @@ std::vector<Sample> samplesOf(const std::string& channels, const std::string& tr
 constexpr const char* kXY = R"(<channel name="X"/><channel name="Y"/>)";
 
 // The points alone.
-std::vector<std::pair<float, float>> pointsOf(const std::vector<Sample>& samples) {
+std::vector<std::pair<float, float>> pointsOf(const Samples& samples) {
   std::vector<std::pair<float, float>> points;
   for (const Sample& sample : samples) points.emplace_back(sample.x, sample.y);
   return points;
@@ -52,7 +56,7 @@ std::string refusalOf(const std::string& text) {
 TEST(InkmlReader, ReadsXAndYWithoutATraceFormat) {
   const Page page = read("<ink><trace>1 2, 3.5 -4e1</trace></ink>");
   ASSERT_EQ(page.traces.size(), 1u);
-  const std::vector<Sample>& samples = page.traces[0].samples;
+  const Samples& samples = page.traces[0].samples;
   ASSERT_EQ(samples.size(), 2u);
   EXPECT_EQ(samples[1].x, 3.5f);
   EXPECT_EQ(samples[1].y, -40.0f);
@@ -211,7 +215,7 @@ TEST(InkmlReader, ReadsTextAroundCommentsCharacterDataAndEntities) {
 TEST(InkmlReader, ReadsFilesOfUtf16AndRefusesWhatIsNoFile) {
   std::string bytes("\xFF\xFE", 2);
   for (const char c : std::string("<ink>\n<trace>1 2</trace></ink>")) bytes += {c, '\0'};
-  const std::string path = testing::TempDir() + "qelt-utf16.inkml";
+  const std::string path = testing::TempDir() + "qelt-utf16-" + std::to_string(getpid());
   std::ofstream(path, std::ios::binary) << bytes;
   EXPECT_EQ(readInkmlFile(path).traces.at(0).samples.at(0).y, 2.0f);
   std::remove(path.c_str());
@@ -265,6 +269,9 @@ TEST(InkmlReader, RefusesWhatIsMalformedWithFileLineAndValue) {
       {trace("* 2"), "2: nothing before it to repeat: *"},
       {trace("\n? 10, 20 20"), "3: point without a place: ? 10"},
       {trace("1 T"), "2: not a number: T"},
+      {trace("1 2,\n3 4&#0;, 5 6"), "3: not XML: reference to invalid character number: &#0;"},
+      {trace("1 &#10;2, <!--\n-->3 &nbsp;, 5 6"), "3: not a number: &nbsp;"},
+      {trace("1 #1234567890abc"), "2: more than 12 hexadecimal digits: #1234567890abc"},
       {trace("1 2<br/>"), "2: element that a trace cannot hold: br"},
       {format(R"(<channel name="X"/>)"), "1: traceFormat without channel: Y"},
       {format(R"(<channel name="Y"/>)"), "1: traceFormat without channel: X"},
@@ -297,6 +304,133 @@ TEST(InkmlReader, RefusesWhatIsMalformedWithFileLineAndValue) {
     EXPECT_TRUE(refusal.starts_with("page.inkml:" + wanted)) << refusal << "\nof " << text;
     EXPECT_EQ(refusal.find('\n'), std::string::npos) << refusal;
   }
+}
+
+std::string times(int count, const std::string& text) {
+  std::string all;
+  for (int i = 0; i < count; ++i) all += text;
+  return all;
+}
+
+// "x0" refers to "x1" and so on; the last one to `end`.
+std::string chain(const std::string& element, const std::string& reference, int count,
+                  const std::string& end) {
+  std::string all;
+  for (int i = 0; i < count; ++i) {
+    const std::string next = i + 1 < count ? "x" + std::to_string(i + 1) : end;
+    all += "<" + element + " xml:id='x" + std::to_string(i) + "' " + reference + "='#" + next + "'/>";
+  }
+  return all;
+}
+
+// Each took half a minute and more when every trace looked at everything again.
+TEST(InkmlReader, TakesNoLongerForATraceOfALargePage) {
+  constexpr int kMany = 20000;
+  const auto start = std::chrono::steady_clock::now();
+  const std::string ends = "<brush xml:id='end'><brushProperty name='width' value='7'/></brush>";
+  EXPECT_EQ(read("<ink><context xml:id='c'>" + times(kMany, "<annotation/>") + "</context>" +
+                 times(kMany, "<trace contextRef='#c'>1 2</trace>") + "</ink>")
+                .traces.size(),
+            20000u);
+  EXPECT_EQ(read("<ink><brush xml:id='b'>" + times(kMany, "<brushProperty name='width' value='7'/>") +
+                 "</brush>" + times(kMany, "<trace brushRef='#b'>1 2</trace>") + "</ink>")
+                .traces.back()
+                .brush.width,
+            7.0f);
+  const std::string traces = times(kMany, "<trace brushRef='#x0'>1 2</trace>") + "</ink>";
+  EXPECT_EQ(
+      read("<ink>" + chain("brush", "brushRef", kMany, "end") + ends + traces).traces.back().brush.width,
+      7.0f);
+  EXPECT_EQ(refusalOf("<ink>" + chain("brush", "brushRef", kMany, "x0") + traces),
+            "page.inkml:1: brushRef leads back to itself");
+  const std::string inContext = "<trace contextRef='#x0'>1 2</trace>";
+  EXPECT_EQ(read("<ink>" + chain("context", "contextRef", kMany, "c") + "<context xml:id='c'>" + ends +
+                 "</context>" + times(kMany, inContext) + "</ink>")
+                .traces.back()
+                .brush.width,
+            7.0f);
+  EXPECT_EQ(refusalOf("<ink>" + chain("context", "contextRef", kMany, "x0") + inContext + "</ink>"),
+            "page.inkml:1: contextRef leads back to itself");
+  EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(15));
+}
+
+// Bytes, from /proc/self/status.
+double memory(const std::string& line) {
+  std::ifstream status("/proc/self/status");
+  for (std::string word; status >> word;) {
+    double kilobytes = 0.0;
+    if (word == line && status >> kilobytes) return kilobytes * 1024.0;
+  }
+  return 0.0;
+}
+
+// How far reading a file takes the process beyond what it held before, as a multiple of the file.
+double growthOf(const std::string& text) {
+  const std::string path = testing::TempDir() + "qelt-growth-" + std::to_string(getpid());
+  std::ofstream(path, std::ios::binary) << text;
+  const pid_t child = fork();
+  if (child == 0) {
+    // Neither memory that others gave back nor their peak counts.
+    malloc_trim(0);
+    std::ofstream("/proc/self/clear_refs") << 5;
+    const double before = memory("VmRSS:");
+    const Page page = readInkmlFile(path);
+    const double growth = (memory("VmHWM:") - before) / static_cast<double>(text.size());
+    _exit(page.traces.empty() ? 255 : static_cast<int>(growth * 10.0));
+  }
+  int status = 0;
+  waitpid(child, &status, 0);
+  std::remove(path.c_str());
+  return WIFEXITED(status) ? WEXITSTATUS(status) / 10.0 : -1.0;
+}
+
+TEST(InkmlReader, HoldsNoMoreThanThreeTimesItsFile) {
+  if (QELT_SANITIZED) GTEST_SKIP() << "the sanitizers have a memory of their own";
+  // Larger than what the allocator keeps ready.
+  const std::string ink = times(2'000'000, "123.5 456,") + "7 8";
+  for (const std::string& text :
+       {"<ink><trace>" + ink + "</trace></ink>", "<ink><trace><!-- -->" + ink + "<!-- --> </trace></ink>",
+        "<ink>" + times(100'000, "<trace>" + ink.substr(0, 200) + "7 8</trace>\n") + "</ink>"}) {
+    const double growth = growthOf(text);
+
+    EXPECT_GE(growth, 1.0) << text.substr(0, 30);
+    EXPECT_LE(growth, 3.0) << text.substr(0, 30);
+  }
+}
+
+TEST(InkmlReader, TakesATextForWhatItIsWhateverItCallsItself) {
+  for (const std::string& start : {std::string("\n <?xml version='1.0' encoding='UTF-16'?>"),
+                                   std::string("<?xml version='1.0' encoding='ISO-8859-1'?><!--\xE4-->"),
+                                   std::string("<?xml version='1.0' encoding='windows-1252'?><!--\x80-->"),
+                                   std::string("\xEF\xBB\xBF<!DOCTYPE ink SYSTEM 'ink.dtd'>")}) {
+    EXPECT_EQ(read(start + "<ink><trace>1 2,3<!-- \n --> 4</trace></ink>").traces.at(0).samples.size(), 2u);
+    EXPECT_EQ(refusalOf(start + "<ink><trace>1 2,&quot;3<!-- \n --> x</trace></ink>").substr(11),
+              std::to_string(start[0] == '\n' ? 3 : 2) + ": not a number: x");
+  }
+}
+
+TEST(Samples, ComeOutBitForBit) {
+  const std::vector<Sample> in{{.x = 1.0f, .y = -0.0f},
+                               {.time = usualTime(1)},
+                               {.orientation = NAN},
+                               {.tilt = -0.0f, .time = 1e300},
+                               {.pressure = 0.5f}};
+  Samples samples;
+  for (const Sample& sample : in) samples.push_back(sample);
+  ASSERT_EQ(samples.size(), in.size());
+  const auto values = [](const Sample& s) {
+    return std::vector<double>{s.x, s.y, s.pressure, s.tilt, s.orientation, s.time};
+  };
+  for (std::size_t i = 0; i < in.size(); ++i) {
+    for (std::size_t value = 0; value < 6; ++value) {
+      const double wanted = values(in[i])[value], got = values(samples[i])[value];
+      EXPECT_TRUE(std::isnan(wanted) ? std::isnan(got)
+                                     : wanted == got && std::signbit(wanted) == std::signbit(got))
+          << i;
+    }
+  }
+  samples.cut(1);
+  EXPECT_EQ(samples.size(), 1u);
 }
 
 TEST(InkmlReader, RefusesNestingThatWouldEatTheStack) {

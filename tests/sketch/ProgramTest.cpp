@@ -2,9 +2,12 @@
 
 #include <gtest/gtest.h>
 #include <spng.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
+#include <unistd.h>
 
 #include <algorithm>
+#include <csignal>
 #include <cstddef>
 #include <cstdint>
 #include <cstdio>
@@ -66,10 +69,9 @@ void expectHas(const Json& line, const Json& wanted) {
 class Program : public testing::Test {
  protected:
   Program() {
-    const testing::TestInfo* const test = testing::UnitTest::GetInstance()->current_test_info();
-    mFolder = fs::path(testing::TempDir()) / ("qelt-sketch-" + std::string(test->name()));
-    fs::remove_all(mFolder);
-    fs::create_directories(mFolder);
+    std::string folder = testing::TempDir() + "qelt-sketch-XXXXXX";
+    if (mkdtemp(folder.data()) == nullptr) std::abort();
+    mFolder = folder;
   }
   ~Program() override { fs::remove_all(mFolder); }
 
@@ -93,14 +95,35 @@ class Program : public testing::Test {
             line + "</trace><trace>90.1 30.1</trace></ink>");
   }
 
+  // Standard error is what the program itself says: a GL driver may have something to say too.
   Ran run(const std::string& arguments) const {
+    static const std::vector<std::string> fromDriver = linesOf(sh("$sketch info >/dev/null").err);
+    Ran ran = sh("$sketch " + arguments);
+    std::string own;
+    for (const std::string& line : linesOf(ran.err)) {
+      if (std::find(fromDriver.begin(), fromDriver.end(), line) == fromDriver.end()) own += line + '\n';
+    }
+    ran.err = own;
+    return ran;
+  }
+
+  // What a shell does in the test's folder; $sketch is the program.
+  Ran sh(const std::string& commands) const {
     // The GL driver leaves a few caches behind as it is unloaded; the threaded tests look for leaks.
-    const std::string command = "ASAN_OPTIONS=detect_leaks=0 " QELT_EMULATOR " '" QELT_SKETCH_PATH "' " +
-                                arguments + " >'" + path("stdout").string() + "' 2>'" +
-                                path("stderr").string() + "'";
-    const int status = std::system(command.c_str());
+    const std::string prepare = "export ASAN_OPTIONS=detect_leaks=0; sketch='" QELT_EMULATOR
+                                " " QELT_SKETCH_PATH "'; cd '" +
+                                mFolder.string() + "'; exec >stdout 2>stderr; ";
+    const std::string script = write("script", prepare + commands);
+    const int status = std::system(("sh '" + script + "'").c_str());
     return {WIFEXITED(status) ? WEXITSTATUS(status) : -1, contentsOf(path("stdout")),
             contentsOf(path("stderr"))};
+  }
+
+  static std::vector<std::string> linesOf(const std::string& text) {
+    std::vector<std::string> lines;
+    std::istringstream stream(text);
+    for (std::string line; std::getline(stream, line);) lines.push_back(line);
+    return lines;
   }
 
   std::vector<Json> trace(const std::string& arguments) const {
@@ -370,6 +393,88 @@ TEST_F(Program, SaysInOneLineWhatCannotBeDoneAndLeavesAnOlderFileAlone) {
   EXPECT_EQ(run("draw '" + ink + "' -o '" + path("link.png").string() + "'").status, 0);
   EXPECT_TRUE(fs::is_symlink(path("link.png")));
   EXPECT_GT(decoded(older).width, 0u);
+}
+
+// What is to be written over is kept, refused or followed, whole.
+TEST_F(Program, RespectsWhatStandsWhereItWrites) {
+  writeInk();
+  const struct {
+    std::string prepare, output, wanted;  // shell; wanted: what stays true
+    int status;
+    std::string says;
+  } cases[] = {
+      {"echo old >a; chmod 600 a", "a", "test $(stat -c %a a) = 600", 0, ""},
+      {"umask 027", "b", "test $(stat -c %a b) = 640", 0, ""},
+      {"echo old >c; chmod 400 c", "c", "test $(stat -c %a-%s c) = 400-4", 1, "Permission denied"},
+      {"echo old >d; ln d d2", "d", "cmp d d2 && test $(cat d) = old", 1, "(a hard link)"},
+      {"ln -s e2 e", "e", "test -L e && test -s e2", 0, ""},
+      {"mkdir f; ln -s ../g2 f/g; ln -s f/g g", "g", "test -L g && test -L f/g && test -s g2", 0, ""},
+      {"ln -s h h", "h", "test -L h", 1, "symbolic links"},
+      {":", "$(printf '%0255d' 1)", "rm $(printf '%0255d' 1)", 0, ""},
+      {"echo old >i; exec 3>>i", "/dev/fd/3", "test \"$(head -n 1 i)\" = old && test $(wc -l <i) -gt 2", 0,
+       ""},
+      {"echo old; exec 4>&1", "/dev/stdout", "test \"$(head -n 1 stdout)\" = old", 0, ""},
+      {"mkfifo j; cat j >j2 & :", "j", "wait; test -s j2", 0, ""},
+      {"ulimit -f 1", "k", "! test -e k", 1, "File too large"},
+      {"exec 2>l; exec >&-", "-", "grep -q 'cannot be written' l", 1, ""},
+      {"mkdir m; chmod 1777 m; echo old >m2; ln -s ../m2 m/m; chown -h 1234 m/m 2>/dev/null || exec false",
+       "m/m", "test $(cat m2) = old", 1, geteuid() == 0 ? "another user put a link there" : ""}};
+  for (const auto& [prepare, output, wanted, status, says] : cases) {
+    const Ran ran = sh(prepare + "; $sketch trace ink.inkml --repeat 20 -o " + output + "; status=$?; " +
+                       wanted + " || exit 99; exit $status");
+    EXPECT_EQ(ran.status, status) << output << "\n" << ran.err;
+    EXPECT_NE(ran.err.find(says), std::string::npos) << output << "\n" << ran.err;
+    EXPECT_FALSE(holdsUnfinished()) << output;
+  }
+}
+
+// A run that is ended while its file is unfinished.
+TEST_F(Program, LeavesNoUnfinishedFileToTheNextRun) {
+  writeInk();
+  const auto end = [&](const std::string& before, const std::string& signal, int repeat) {
+    return sh("(" + before + "; exec $sketch trace ink.inkml -o big --repeat " + std::to_string(repeat) +
+              ") & pid=$!; until ls -l /proc/$pid/fd | grep -q '\\.part$' || ! kill -0 $pid; do :; done; "
+              "readlink /proc/$pid/fd/2; kill -" +
+              signal + " $pid; wait $pid");
+  };
+  constexpr int kEndless = 10'000'000;
+  for (const int signal : {SIGHUP, SIGTERM, SIGXCPU}) {
+    EXPECT_EQ(end(":", std::to_string(signal), kEndless).status, 128 + signal);
+    EXPECT_FALSE(holds("big") || holdsUnfinished()) << signal;
+  }
+  EXPECT_EQ(end(":", "KILL", kEndless).status, 128 + SIGKILL);
+  EXPECT_TRUE(holdsUnfinished());
+  // It is ignored where it was, and what is opened for writing is not taken for standard error.
+  const Ran ignored = end("trap '' HUP; exec 2>&-", "HUP", 4000);
+  EXPECT_EQ(ignored.status, 0) << ignored.err;
+  EXPECT_EQ(ignored.out, "/dev/null\n");
+  EXPECT_TRUE(holds("big"));
+  EXPECT_FALSE(holdsUnfinished());
+}
+
+TEST_F(Program, EndsEveryFailureInOneLine) {
+  const std::string ink = writeInk();
+  const struct {
+    std::string command, says;
+  } cases[] = {{"$sketch --help >/dev/full", "standard output cannot be written: No space left on device\n"},
+               {"$sketch info >/dev/full", "standard output cannot be written: No space left on device\n"},
+               {"$sketch trace ink.inkml -o t --plugin '" QELT_THROWING_PLUGIN "'",
+                "qelt-sketch: stopped by an exception of unknown type\n"},
+               {"$sketch trace \"$(printf 'a\\033[31m\\n\\302\\233\\377\\303\\274b')\" -o t",
+                "a\\x1B[31m\\n\\xC2\\x9B\\xFF\u00fcb: cannot be read: No such file or directory\n"}};
+  for (const auto& [command, says] : cases) {
+    const Ran ran = sh(command);
+    EXPECT_EQ(ran.status, 1) << command;
+    EXPECT_TRUE(ran.err.ends_with(says)) << command << "\n" << ran.err;
+  }
+  EXPECT_FALSE(holds("t") || holdsUnfinished());
+}
+
+TEST_F(Program, FindsPlugInsInItsFolderAndItsLibrariesFromWhereItStands) {
+  const Ran ran = sh("cp '" QELT_PLUGIN_PATH "' local.so; $sketch info --plugin local.so");
+  EXPECT_NE(ran.out.find("./local.so"), std::string::npos) << ran.err;
+  EXPECT_NE(contentsOf(QELT_SKETCH_PATH).find("$ORIGIN/../../host/desktop"), std::string::npos);
+  EXPECT_NE(contentsOf(QELT_PLUGIN_PATH).find("$ORIGIN/../host/desktop"), std::string::npos);
 }
 
 TEST_F(Program, TellsWrongUsageFromHelp) {

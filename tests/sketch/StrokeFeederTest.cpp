@@ -96,9 +96,7 @@ TEST(StrokeFeeder, RecordedEventAndStoredStrokeHoldEveryPoint) {
   EXPECT_EQ(recordedEvent(line(1), kStylus).GetHistorySize(), 1);
 
   // Times that no clock shows.
-  Trace odd = line(2);
-  odd.samples[0].time = -1e300;
-  odd.samples[1].time = 1e300;
+  const Trace odd{.samples = {{.time = -1e300}, {.time = 1e300}}, .brush = {}, .tool = {}};
   EXPECT_LT(recordedEvent(odd, kStylus).GetDownTime(), 0);
   EXPECT_GT(recordedEvent(odd, kStylus).GetEventTime(), 0);
 }
