@@ -382,7 +382,8 @@ Drawn Stage::drawEverything(float zoomFactor) {
   zoom(zoomFactor);
   // An outline's first segment grows from the width that the outline before it ended with, and a prediction
   // from the last stroke's end: one of each sets both, and what follows starts alike.
-  outline();
+  outline(false);
+  live(false);
   mQueue.finish();
   if (mLayer != nullptr) mLayer->clear();
   Drawn drawn;
