@@ -381,10 +381,12 @@ Drawn Stage::drawEverything(float zoomFactor) {
   setUsual(*mPen->GetStrokeDrawableGL());
   zoom(zoomFactor);
   // An outline's first segment grows from the width that the outline before it ended with, and a prediction
-  // from the last stroke's end: one of each sets both, and what follows starts alike.
+  // from the last stroke's end: one of each sets both, and what follows starts alike. Nobody looks at them.
+  mCanvases[0].setTarget(Target::NoTiles);
   outline(false);
   live(false);
   mQueue.finish();
+  mCanvases[0].setTarget(Target::Whole);
   if (mLayer != nullptr) mLayer->clear();
   Drawn drawn;
   recording = &drawn;
