@@ -19,6 +19,7 @@ class QELT_HOST_API PenCanvas : public Qelt::ISPPenCanvas {
   // Stroke units to canvas pixels, column-major; the identity at first.
   void setMatrix(const Qelt::Matrix3<float>& matrix);
   CanvasLayer* layer() const { return mLayer; }
+  Qelt::IGLMsgQueue* queue() const { return mQueue; }
 
   Qelt::IGLMsgQueue* GetMsgQueue() override;
   // Also tells the cache of stored strokes that this is the view they are drawn for now.

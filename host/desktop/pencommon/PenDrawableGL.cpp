@@ -18,6 +18,12 @@ IGLMsgQueue* queueOf(PenGLDataManager* manager, IGLMsgQueue* ofCanvas) {
   return queue != nullptr ? queue : ofCanvas;
 }
 
+// A canvas of ours tells its queue even where a subclass has none to give for the moment.
+IGLMsgQueue* queueOf(ISPPenCanvas* canvas) {
+  if (const auto* const ours = dynamic_cast<const QeltDesktop::PenCanvas*>(canvas)) return ours->queue();
+  return canvas != nullptr ? canvas->GetMsgQueue() : nullptr;
+}
+
 // Runs a call once the queue has run everything it took: there, while it still runs, else here.
 template <typename Call>
 void runAfterAll(IGLMsgQueue* queue, Call call) {
@@ -36,8 +42,7 @@ PenDrawableGL::~PenDrawableGL() {
 void PenDrawableGL::SetCanvas(ISPPenCanvas* canvas) {
   mCanvas = canvas;
   // One that was there stays: what was posted there still refers to the drawable.
-  IGLMsgQueue* const queue = canvas != nullptr ? canvas->GetMsgQueue() : nullptr;
-  if (queue != nullptr) mCanvasQueue = queue;
+  if (IGLMsgQueue* const queue = queueOf(canvas); queue != nullptr) mCanvasQueue = queue;
   prepareDrawableRT();
 }
 
