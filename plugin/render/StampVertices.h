@@ -48,6 +48,7 @@ inline StampExtent squareExtent(float width) {
 // half a pixel is widened to that and dimmed in proportion; what has no width left to widen, or does not fit
 // into a float, is invisible. `inverseScale`: stroke units a device pixel, positive.
 inline StampExtent antialiasedExtent(float halfWidth, Vector2<float> inverseScale) {
+  constexpr float kMostPixels = 1e37f;
   float a = halfWidth / inverseScale.x;
   float b = halfWidth / inverseScale.y;
   const float thinner = a < b ? a : b;
@@ -61,11 +62,10 @@ inline StampExtent antialiasedExtent(float halfWidth, Vector2<float> inverseScal
   a += 0.5f;
   b += 0.5f;
   const float m = std::max(a, b);
+  // Written so that it also holds where the widening above made NaN of a: b is then NaN or infinite.
+  if (!(m <= kMostPixels)) return {inverseScale.x, inverseScale.y, 0.0f, 0.0f};
   const float innerRadius = (m - 1.0f) / m * 0.5f;
-  const float x = inverseScale.x * a;
-  const float y = inverseScale.y * b;
-  if (!std::isfinite(x + y + innerRadius)) return {inverseScale.x, inverseScale.y, 0.0f, 0.0f};
-  return {x, y, innerRadius, alphaByWidth};
+  return {inverseScale.x * a, inverseScale.y * b, innerRadius, alphaByWidth};
 }
 
 inline StampQuad stampQuad(Vector2<float> centre, const StampExtent& extent) {

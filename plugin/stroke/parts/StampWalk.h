@@ -32,20 +32,25 @@ inline int spacedStamps(float first, float spacing, float length) {
 // on its spacing.
 template <typename Place>
 WalkResult walkSpaced(const SmPath& path, float first, float spacing, float length, int most, Place&& place) {
+  const int bound = std::min(most, kMostStampsPerSegment);
   float distance = first;
   int stamps = 0;
-  for (; distance <= length; ++stamps) {
-    if (stamps == kMostStampsPerSegment) return {spacing, true, stamps};
-    if (stamps < most) {
-      SmPoint at;
-      if (path.getPosTan(distance, &at, nullptr)) place(at);
-    } else {
-      place.passOver(distance);
-    }
+  const auto goesOn = [&distance, spacing] {
     const float next = distance + spacing;
-    if (!(next > distance)) return {spacing, true, stamps + 1};
+    const bool isFarther = next > distance;
     distance = next;
+    return isFarther;
+  };
+  for (; distance <= length && stamps < bound; ++stamps) {
+    SmPoint at;
+    if (path.getPosTan(distance, &at, nullptr)) place(at);
+    if (!goesOn()) return {spacing, true, stamps + 1};
   }
+  for (; distance <= length && stamps < kMostStampsPerSegment; ++stamps) {
+    place.passOver(distance);
+    if (!goesOn()) return {spacing, true, stamps + 1};
+  }
+  if (distance <= length) return {spacing, true, stamps};
   const float carry = distance - length;
   if (!std::isfinite(carry)) return {spacing, true, stamps};
   return {carry, false, stamps};
@@ -58,16 +63,14 @@ template <typename Place>
 WalkResult walkEvenly(const SmPath& path, int count, float length, int most, Place&& place) {
   const float step = length / static_cast<float>(count);
   const int stamps = std::min(count, kMostStampsPerSegment);
-  for (int i = 0; i < stamps; ++i) {
-    const float distance = static_cast<float>(i) * step;
-    if (i < most) {
-      SmPoint at;
-      if (!path.getPosTan(distance, &at, nullptr)) return {0.0f, stamps < count, i};
-      place(at);
-    } else {
-      place.passOver(distance);
-    }
+  const int bound = std::min(most, stamps);
+  int i = 0;
+  for (; i < bound; ++i) {
+    SmPoint at;
+    if (!path.getPosTan(static_cast<float>(i) * step, &at, nullptr)) return {0.0f, stamps < count, i};
+    place(at);
   }
+  for (; i < stamps; ++i) place.passOver(static_cast<float>(i) * step);
   return {0.0f, stamps < count, stamps};
 }
 
