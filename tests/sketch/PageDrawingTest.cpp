@@ -21,11 +21,11 @@ using QeltDesktop::RenderQueue;
 
 // Draws a zigzag of 200 far points, 40 MB of vertices in all, in a queue that runs nothing by itself.
 void drawZigzag() {
-  QeltDesktop::Page page{{{}}};
+  QeltDesktop::Page page;
   for (int i = 0; i < 200; ++i) {
-    page.traces[0].samples.push_back(
-        {.x = i % 2 == 0 ? 0.0f : 600.0f, .y = static_cast<float>(i), .time = 4.0 * i});
+    page.traces.addSample({.x = i % 2 == 0 ? 0.0f : 600.0f, .y = static_cast<float>(i), .time = 4.0 * i});
   }
+  page.traces.finishTrace(QeltDesktop::kNoNumber, {});
   const QeltDesktop::PluginLibrary plugin(QELT_PLUGIN_PATH);
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
   QeltDesktop::Progress progress("drawing stroke", 1);
