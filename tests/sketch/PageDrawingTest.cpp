@@ -2,14 +2,19 @@
 
 #include <algorithm>
 #include <cstdint>
+#include <functional>
+#include <new>
 #include <stdexcept>
 
+#include "CallRecorder.h"
 #include "Ink.h"
 #include "Options.h"
+#include "OutputFile.h"
 #include "PageDrawing.h"
 #include "PageLayout.h"
 #include "Progress.h"
 #include "desktop/engine/PluginLibrary.h"
+#include "desktop/gl/CallTask.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/pencommon/BatchObserver.h"
 #include "support/LogCapture.h"
@@ -53,6 +58,19 @@ TEST(PageDrawing, OfWhichSomethingWasLostIsNoPicture) {
   QeltDesktop::setBatchObserver([](const Batch&) { throw std::runtime_error("lost"); });
   EXPECT_THROW(drawZigzag(), std::runtime_error);
   QeltDesktop::setBatchObserver({});
+}
+
+TEST(CallRecorder, LeavesNoCallWithoutItsBatches) {
+  const QeltTests::LogCapture log;
+  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
+  QeltDesktop::OutputFile file("/dev/null");
+  QeltDesktop::CallRecorder recorder(queue, file, QeltDesktop::DrawableKind::Stroke, 8);
+  const auto call = [&](const std::function<void()>& task) {
+    recorder.call({QeltDesktop::DrawableKind::Stroke, 0, "Draw", {}},
+                  [&](Qelt::RectF*) { return QeltDesktop::postCall(queue, task); });
+  };
+  EXPECT_NO_THROW(call([] {}));
+  EXPECT_THROW(call([] { throw std::bad_alloc(); }), std::runtime_error);
 }
 
 }  // namespace
