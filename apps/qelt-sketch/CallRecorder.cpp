@@ -58,7 +58,11 @@ std::string readableTypeName(const char* mangled) {
 }
 
 CallRecorder::CallRecorder(RenderQueue& queue, OutputFile& file, DrawableKind wanted, int renderingVersion)
-    : mQueue(queue), mFile(file), mWanted(wanted), mStride(floatsPerVertex(wanted, renderingVersion)) {
+    : mQueue(queue),
+      mWatch(queue),
+      mFile(file),
+      mWanted(wanted),
+      mStride(floatsPerVertex(wanted, renderingVersion)) {
   mQueue.onAccepted = [this](const Qelt::ITask& task) {
     if (mInCall) mPosted.push_back(&typeNameOf(task));
   };
@@ -77,7 +81,7 @@ void CallRecorder::call(const DrawableCall& call, const std::function<bool(Qelt:
   const bool result = make(&rect);
   mInCall = false;
   // What the call posted hands its batches over now.
-  mQueue.finish();
+  mWatch.finish();
   if (call.drawable == mWanted) writeLine(call, result, rect);
 }
 

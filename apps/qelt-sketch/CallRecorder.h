@@ -9,6 +9,7 @@
 
 #include "OutputFile.h"
 #include "PagePlayer.h"
+#include "QueueWatch.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/pencommon/BatchObserver.h"
 
@@ -31,6 +32,7 @@ class CallRecorder : public PlayObserver {
   CallRecorder(const CallRecorder&) = delete;
   CallRecorder& operator=(const CallRecorder&) = delete;
 
+  // Throws std::runtime_error when a task of the call fails, as its batches are then missing.
   void call(const DrawableCall& call, const std::function<bool(Qelt::RectF*)>& make) override;
 
  private:
@@ -38,6 +40,7 @@ class CallRecorder : public PlayObserver {
   const std::string& typeNameOf(const Qelt::ITask& task);
 
   RenderQueue& mQueue;
+  QueueWatch mWatch;
   OutputFile& mFile;
   DrawableKind mWanted;
   int mStride;

@@ -1,12 +1,13 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <deque>
-#include <map>
+#include <memory_resource>
 #include <optional>
 #include <string>
 #include <string_view>
-#include <vector>
+#include <utility>
 
 #include "Ink.h"
 #include "Refusal.h"
@@ -40,7 +41,8 @@ class Definitions {
   explicit Definitions(const SourceText& source);
 
   std::size_t traceCount() const { return mTraceCount; }
-  // The tool that a group's own annotation names; throws Refusal for an unknown one.
+  // The tool that a group's own annotation names; throws Refusal for an unknown one. Only for the groups that
+  // are drawn: those within nothing but groups.
   std::optional<int> toolOfGroup(std::size_t group) const;
   const TraceFormat& format(std::size_t format) const { return mFormats[format]; }
 
@@ -48,41 +50,65 @@ class Definitions {
   // ("#DefaultBrush"). These throw Refusal for a reference to what is not there, or back to itself.
   std::optional<std::size_t> brushNamed(const Reference& reference) const;
   std::optional<std::size_t> contextNamed(const Reference& reference) const;
-  // A brush with what it takes over from those it refers to.
-  const Brush& brush(std::size_t brush);
+  // A brush with what it takes over from those it refers to: its number among `takeBrushes`, or kNoNumber
+  // when that is nothing.
+  std::uint32_t brush(std::size_t brush);
   // A context's brush: its own, the one it refers to, or that of the context it builds on. Its format in the
   // same way; an ink source brings one too.
   std::optional<std::size_t> brushOfContext(std::size_t context);
   std::optional<std::size_t> formatOfContext(std::size_t context);
+  // What the brushes say, to be taken once all traces are read.
+  std::deque<Brush> takeBrushes() { return std::move(mBrushTexts); }
 
  private:
+  // A page may consist of definitions as short as "<brush/>". So that they take little more memory than their
+  // text, each has a small record of numbers, and what few definitions have is kept elsewhere.
+
   class Collector;
   enum class Kind { Brush, Context, Format, Source };
-  enum class State { Unknown, Asked, Known };
+  enum State : std::uint32_t { kUnknown, kAsked, kKnown };
 
   struct BrushEntry {
-    std::size_t offset;
-    Reference base;
-    Brush brush;  // its own properties; once known, those taken over too
-    State state = State::Unknown;
+    std::uint32_t text = kNoNumber;       // once known, with what is taken over too
+    std::uint32_t base : 30 = kNoNumber;  // a reference
+    std::uint32_t state : 2 = kUnknown;
   };
   // Found along a chain of contexts.
   struct Found {
-    std::optional<std::size_t> index;
-    State state = State::Unknown;
+    std::uint32_t number : 30 = kNoNumber;
+    std::uint32_t state : 2 = kUnknown;
   };
   struct ContextEntry {
-    std::size_t offset;
-    Reference brushReference, formatReference, sourceReference, base;
-    std::optional<std::size_t> ownBrush, ownFormat, ownSource;
+    std::uint32_t part = kNoNumber;  // the last one
     Found brush, format;
   };
-  struct Named {
-    Kind kind;
-    std::size_t index;
+  // What a context refers to, or the first of a kind that stands in it.
+  enum class Part : std::uint8_t { BrushRef, FormatRef, SourceRef, Base, OwnBrush, OwnFormat, OwnSource };
+  struct ContextPart {
+    Part part;
+    std::uint32_t number;
+    std::uint32_t before;  // the context's part before this one
+  };
+  // A reference that is kept, as it is written.
+  struct KeptReference {
+    std::size_t offset;
+    const char* name;
+  };
+  struct Id {
+    const char* name;
+    std::size_t offset;
+    std::uint32_t number : 30;
+    std::uint32_t kind : 2;
   };
 
+  const char* keptText(std::string_view text);
+  std::uint32_t keptReference(const Reference& reference);
+  Reference referenceOf(std::uint32_t kept, const char* attribute) const;
+  void sortIds();
   std::optional<std::size_t> named(const Reference& reference, Kind kind) const;
+  std::optional<std::uint32_t> partOf(const ContextEntry& context, Part part) const;
+  std::optional<std::size_t> referredTo(const ContextEntry& context, Part part, const char* attribute,
+                                        Kind kind) const;
   std::optional<std::size_t> brushIn(const ContextEntry& context) const;
   std::optional<std::size_t> formatIn(const ContextEntry& context) const;
   std::optional<std::size_t> alongContexts(std::size_t context, Found ContextEntry::*result,
@@ -90,13 +116,18 @@ class Definitions {
                                                const);
 
   const SourceText& mSource;
+  std::pmr::monotonic_buffer_resource mTexts;  // of ids and references
   std::deque<BrushEntry> mBrushes;
+  std::deque<Brush> mBrushTexts;
   std::deque<ContextEntry> mContexts;
-  std::vector<TraceFormat> mFormats;
-  std::vector<std::optional<std::size_t>> mSources;  // the format of each
-  std::map<std::string, Named> mById;
-  std::vector<std::optional<int>> mGroupTools;
-  std::map<std::size_t, Refusal> mMalformedTools;  // by group
+  std::deque<ContextPart> mContextParts;
+  std::deque<TraceFormat> mFormats;
+  std::deque<std::uint32_t> mSources;  // the format of each
+  std::deque<KeptReference> mReferences;
+  std::deque<Id> mIds;  // sorted by name, once the document is read
+  std::deque<std::uint8_t> mGroupTools;
+  // The first group that is drawn and names a tool that there is not, and what there is to say of it.
+  std::optional<std::pair<std::size_t, Refusal>> mMalformedTool;
   std::size_t mTraceCount = 0;
 };
 

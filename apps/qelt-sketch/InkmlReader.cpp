@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <cstddef>
+#include <cstdint>
 #include <optional>
 #include <string_view>
 #include <utility>
@@ -25,6 +26,7 @@ class TraceCollector final : public XmlVisitor {
 
   Page takePage() {
     if (mPage.traces.empty()) throw mSource.refusalAt(mInkOffset, "no trace in the page", "");
+    mPage.traces.setBrushes(mDefinitions.takeBrushes());
     return std::move(mPage);
   }
 
@@ -160,12 +162,13 @@ class TraceCollector final : public XmlVisitor {
     return mLastFormat ? mDefinitions.format(*mLastFormat) : mPlainFormat;
   }
 
-  Brush brushFor(const Scope& scope) {
+  // Its number among the brushes of the page.
+  std::uint32_t brushFor(const Scope& scope) {
     std::optional<std::size_t> brush = scope.brush;
     const std::optional<std::size_t> context = scope.context ? scope.context : mCurrentContext;
     if (!brush && context) brush = mDefinitions.brushOfContext(*context);
     if (!brush) brush = mLastBrush;
-    return brush ? mDefinitions.brush(*brush) : Brush{};
+    return brush ? mDefinitions.brush(*brush) : kNoNumber;
   }
 
   void readTrace(const OpenTrace& open) {
@@ -175,12 +178,13 @@ class TraceCollector final : public XmlVisitor {
       throw mSource.refusalAt(open.stranger->offset, "element that a trace cannot hold", open.stranger->name);
     }
     if (open.text.isBlank()) throw mSource.refusalAt(open.offset, "trace without points", "");
-    Trace trace;
-    trace.samples = readSamples(open.text, formatFor(scope));
-    trace.brush = brushFor(scope);
-    trace.tool = scope.tool;
-    // A pen in the air leaves nothing on the paper.
-    if (!open.penUp) mPage.traces.push_back(std::move(trace));
+    readSamples(open.text, formatFor(scope), mPage.traces);
+    const std::uint32_t brush = brushFor(scope);
+    if (open.penUp) {
+      mPage.traces.dropTrace();  // a pen in the air leaves nothing on the paper
+    } else {
+      mPage.traces.finishTrace(brush, scope.tool);
+    }
   }
 
   const SourceText& mSource;

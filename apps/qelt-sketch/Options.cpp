@@ -9,7 +9,9 @@
 
 #include <CLI/CLI.hpp>
 
+#include "Definitions.h"
 #include "NumberText.h"
+#include "PageDrawing.h"
 #include "Refusal.h"
 #include "engine/MotionEvent.h"
 
@@ -151,10 +153,11 @@ void addInput(CLI::App& app, Options& options) {
   app.add_option("INPUT", options.input, "page of W3C InkML (default: the sample page)")->type_name("");
 }
 
-constexpr const char* kLimits =
-    "Limits: a page's elements nest at most 200 deep; a picture has at most 32767 pixels a side and "
-    "67108864 "
-    "in all.";
+std::string limits() {
+  return "Limits: a page's elements nest at most " + std::to_string(kDeepestNesting) +
+         " deep; a picture has at most " + std::to_string(kLongestSide) + " pixels a side and " +
+         std::to_string(kMostPixels) + " in all.";
+}
 
 void addOutput(CLI::App& app, Options& options, const char* help) {
   app.add_option("-o,--output", options.output, help)->required()->type_name("FILE");
@@ -261,7 +264,7 @@ std::variant<Options, UsageEnd> parseOptions(int argc, const char* const* argv) 
                                                     {sheet, Command::Sheet},
                                                     {info, Command::Info}};
   for (const auto& [command, value] : commands) addPlugin(*command, options);
-  for (CLI::App* const command : {draw, trace, sheet}) command->footer(kLimits);
+  for (CLI::App* const command : {draw, trace, sheet}) command->footer(limits());
 
   try {
     app.parse(argc, argv);

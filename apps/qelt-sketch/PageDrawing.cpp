@@ -5,9 +5,7 @@
 #include <cmath>
 #include <cstdint>
 #include <cstdio>
-#include <new>
 #include <optional>
-#include <stdexcept>
 #include <string>
 #include <vector>
 
@@ -15,8 +13,8 @@
 #include "PenSession.h"
 #include "ProgramFiles.h"
 #include "Progress.h"
+#include "QueueWatch.h"
 #include "Refusal.h"
-#include "desktop/gl/GlVertexObject.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/graphics/CanvasLayer.h"
 #include "desktop/graphics/Compose.h"
@@ -25,10 +23,6 @@
 
 namespace QeltDesktop {
 namespace {
-
-// 256 MiB a layer.
-constexpr double kMostPixels = 67'108'864.0;
-constexpr double kLongestSide = 32'767.0;
 
 // How far the pen may be ahead of the render thread, which is some ten times as slow: a single call may go
 // beyond it.
@@ -52,9 +46,10 @@ PixelSize pixelSizeOf(const PageLayout& layout, const Options& options) {
   if (width <= kLongestSide && height <= kLongestSide && width * height <= kMostPixels) {
     return {static_cast<int>(width), static_cast<int>(height)};
   }
-  std::array<char, 128> text{};
-  std::snprintf(text.data(), text.size(), ": the picture is too large to draw: %.6g x %.6g pixels", width,
-                height);
+  std::array<char, 192> text{};
+  std::snprintf(text.data(), text.size(),
+                ": the picture is too large to draw: %.6g x %.6g pixels, at most %d a side and %d in all",
+                width, height, kLongestSide, kMostPixels);
   throw Refusal((options.page ? "--page" : inputPath(options)) + text.data());
 }
 
@@ -79,7 +74,7 @@ class Drawing : public PlayObserver {
  public:
   Drawing(RenderQueue& queue, PixelSize size, const PageLayout& layout, const DrawableSet& drawables,
           Progress& progress)
-      : mQueue(queue), mProgress(progress) {
+      : mWatch(queue), mProgress(progress) {
     if (drawables.outline) mOutline.emplace(queue, size, layout.matrix);
     if (drawables.stroke || drawables.preview) mStroke.emplace(queue, size, layout.matrix);
     if (drawables.prediction) mPrediction.emplace(queue, size, layout.matrix, CanvasLayer::kOneTile);
@@ -124,17 +119,13 @@ class Drawing : public PlayObserver {
  private:
   // A picture that lacks something is none.
   void letQueueCatchUp() {
-    mQueue.finish();
+    mWatch.finish();
     mWaitingBytes = 0;
-    if (GlVertexObject::undrawnBatches() != mUndrawnBefore) throw std::bad_alloc();
-    if (mQueue.droppedTasks() != mDroppedBefore) throw std::runtime_error("a render task failed (see --log)");
   }
 
-  RenderQueue& mQueue;
+  QueueWatch mWatch;
   Progress& mProgress;
   std::uint64_t mWaitingBytes = 0;
-  const std::uint64_t mUndrawnBefore = GlVertexObject::undrawnBatches();
-  const std::uint64_t mDroppedBefore = mQueue.droppedTasks();
   std::optional<Layer> mOutline, mStroke, mPrediction;
   Canvases mCanvases;
 };

@@ -11,6 +11,10 @@ class PluginLibrary;
 class Progress;
 class RenderQueue;
 
+// A picture's pixels: on a side, and in all, which is 256 MiB a layer.
+constexpr int kLongestSide = 32'767;
+constexpr int kMostPixels = 67'108'864;
+
 // Which drawables take part in a picture, each on a layer of its own: outlines under strokes (or the
 // preview), predictions on top.
 struct DrawableSet {

@@ -109,7 +109,7 @@ void PagePlayer::playLive(std::size_t index, PlayObserver& observer) {
 }
 
 void PagePlayer::predict(std::size_t index, std::size_t sample, PlayObserver& observer) {
-  const Samples& samples = mPage.traces[index].samples;
+  const Samples samples = mPage.traces[index].samples;
   const Qelt::MotionEvent event =
       predictedEvent(samples[sample - 1], samples[sample], pointerOf(index), mOptions.predict);
   observer.call({DrawableKind::Prediction, index, "Draw", event.GetAction()},
@@ -120,7 +120,7 @@ void PagePlayer::predict(std::size_t index, std::size_t sample, PlayObserver& ob
 void PagePlayer::playRecorded(std::size_t index, PlayObserver& observer) {
   const bool live = mOptions.mode == Mode::Live;
   if (live && mOutline == nullptr) return;
-  const Trace& trace = mPage.traces[index];
+  const Trace trace = mPage.traces[index];
   const auto play = [&](DrawableKind drawable, const char* operation, const auto& draw) {
     // The pen corrects the event it is given: each drawable gets its own, and none is a constant.
     Qelt::MotionEvent event = recordedEvent(trace, pointerOf(index));

@@ -26,7 +26,7 @@ Page samplePanel() {
   constexpr double kInset = 50.0, kSwing = 42.0;        // stroke units
   constexpr double kLightest = 0.15, kHeaviest = 0.75;  // pressure
   constexpr double kMostTilt = 0.55;                    // radians
-  Trace trace;
+  Page page;
   for (int i = 0; i < kSamples; ++i) {
     const double along = static_cast<double>(i) / (kSamples - 1);
     const double swell = std::pow(std::sin(along * std::numbers::pi), 2.0);
@@ -36,10 +36,9 @@ Page samplePanel() {
     sample.pressure = static_cast<float>(kLightest + (kHeaviest - kLightest) * swell);
     sample.tilt = static_cast<float>(kMostTilt * swell);
     sample.time = i * 1000.0 / 240.0;
-    trace.samples.push_back(sample);
+    page.traces.addSample(sample);
   }
-  Page page;
-  page.traces.push_back(trace);
+  page.traces.finishTrace(kNoNumber, std::nullopt);
   return page;
 }
 

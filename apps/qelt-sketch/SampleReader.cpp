@@ -45,10 +45,9 @@ void setAttitude(Sample& sample, const Readings& readings, bool hasSphericalAngl
 
 }  // namespace
 
-Samples readSamples(const TraceText& text, const TraceFormat& format) {
+void readSamples(const TraceText& text, const TraceFormat& format, Traces& traces) {
   const bool hasSphericalAngles = format.has(Quantity::Elevation) || format.has(Quantity::Azimuth);
-  Samples samples;
-  samples.reserve(text.mostPoints());
+  std::size_t count = 0;
   text.forEachPoint(format, [&](const std::vector<Reading>& point) {
     Readings readings;
     float maxForce = 0.0f;
@@ -66,10 +65,10 @@ Samples readSamples(const TraceText& text, const TraceFormat& format) {
     if (force.known) sample.pressure = maxForce > 0.0f ? force.nearest / maxForce : force.nearest;
     setAttitude(sample, readings, hasSphericalAngles);
     const Reading& time = of(readings, Quantity::Time);
-    sample.time = time.known ? time.value : usualTime(samples.size());
-    samples.push_back(sample);
+    sample.time = time.known ? time.value : usualTime(count);
+    traces.addSample(sample);
+    ++count;
   });
-  return samples;
 }
 
 }  // namespace QeltDesktop

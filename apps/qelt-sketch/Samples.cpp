@@ -1,17 +1,15 @@
 #include "Samples.h"
 
-#include <algorithm>
 #include <array>
 #include <bit>
 #include <stdexcept>
-#include <utility>
 
 namespace QeltDesktop {
 namespace {
 
 using TimeWords = std::array<std::uint32_t, 2>;
 
-enum Column : std::uint8_t { kPressure = 1, kTilt = 2, kOrientation = 4, kTime = 8 };
+enum Column : Columns { kPressure = 1, kTilt = 2, kOrientation = 4, kTime = 8 };
 
 constexpr struct {
   Column column;
@@ -23,14 +21,25 @@ std::uint32_t bitsOf(float value) {
 }
 
 // The columns in which a sample says something.
-std::uint8_t columnsOf(const Sample& sample, std::size_t index) {
+Columns columnsOf(const Sample& sample, std::size_t index) {
   const Sample plain;
-  std::uint8_t columns = 0;
+  Columns columns = 0;
   for (const auto& [column, member] : kFloats) {
     if (bitsOf(sample.*member) != bitsOf(plain.*member)) columns |= column;
   }
   if (std::bit_cast<TimeWords>(sample.time) != std::bit_cast<TimeWords>(usualTime(index))) columns |= kTime;
   return columns;
+}
+
+void writeSample(PackedWords& words, std::size_t at, const Sample& sample, Columns columns) {
+  words[at++] = bitsOf(sample.x);
+  words[at++] = bitsOf(sample.y);
+  for (const auto& [column, member] : kFloats) {
+    if ((columns & column) != 0) words[at++] = bitsOf(sample.*member);
+  }
+  if ((columns & kTime) != 0) {
+    for (const std::uint32_t word : std::bit_cast<TimeWords>(sample.time)) words[at++] = word;
+  }
 }
 
 }  // namespace
@@ -40,24 +49,32 @@ double usualTime(std::size_t index) {
   return static_cast<double>(index) * kMillisecondsAPoint;
 }
 
-Samples::Samples(std::initializer_list<Sample> samples) {
-  for (const Sample& sample : samples) push_back(sample);
+void PackedWords::resize(std::size_t size) {
+  const std::size_t blocks = size / kBlock + (size % kBlock != 0 ? 1 : 0);
+  if (blocks < mBlocks.size()) mBlocks.resize(blocks);
+  while (mBlocks.size() < blocks) {
+    if (!mBlocks.empty()) mBlocks.back().resize(kBlock);
+    mBlocks.emplace_back().reserve(kBlock);
+  }
+  if (blocks > 0) mBlocks.back().resize(size - (blocks - 1) * kBlock);
+  mSize = size;
 }
 
-std::size_t Samples::wordsEach() const {
-  return 2 + static_cast<std::size_t>(std::popcount(unsigned{mColumns})) + ((mColumns & kTime) != 0 ? 1 : 0);
+std::size_t wordsPerSample(Columns columns) {
+  return 2 + static_cast<std::size_t>(std::popcount(unsigned{columns})) + ((columns & kTime) != 0 ? 1 : 0);
 }
 
 Sample Samples::operator[](std::size_t index) const {
-  const std::uint32_t* word = mWords.data() + index * wordsEach();
+  const PackedWords& words = *mWords;
+  std::size_t at = mFirst + index * wordsPerSample(mColumns);
   Sample sample;
-  sample.x = std::bit_cast<float>(*word++);
-  sample.y = std::bit_cast<float>(*word++);
+  sample.x = std::bit_cast<float>(words[at++]);
+  sample.y = std::bit_cast<float>(words[at++]);
   for (const auto& [column, member] : kFloats) {
-    if ((mColumns & column) != 0) sample.*member = std::bit_cast<float>(*word++);
+    if ((mColumns & column) != 0) sample.*member = std::bit_cast<float>(words[at++]);
   }
   sample.time =
-      (mColumns & kTime) != 0 ? std::bit_cast<double>(TimeWords{word[0], word[1]}) : usualTime(index);
+      (mColumns & kTime) != 0 ? std::bit_cast<double>(TimeWords{words[at], words[at + 1]}) : usualTime(index);
   return sample;
 }
 
@@ -66,37 +83,22 @@ Sample Samples::at(std::size_t index) const {
   return (*this)[index];
 }
 
-void Samples::reserve(std::size_t size) {
-  mWords.reserve(size * wordsEach());
+void SamplePacker::add(PackedWords& words, const Sample& sample) {
+  const Columns columns = columnsOf(sample, mSize);
+  if ((columns & ~mColumns) != 0) widen(words, mColumns | columns);
+  const std::size_t each = wordsPerSample(mColumns);
+  words.resize(mFirst + (mSize + 1) * each);
+  writeSample(words, mFirst + mSize * each, sample, mColumns);
+  ++mSize;
 }
 
-void Samples::push_back(const Sample& sample) {
-  const std::uint8_t columns = columnsOf(sample, size());
-  if ((columns & ~mColumns) != 0) widen(columns);
-  append(sample);
-}
-
-void Samples::append(const Sample& sample) {
-  mWords.push_back(bitsOf(sample.x));
-  mWords.push_back(bitsOf(sample.y));
-  for (const auto& [column, member] : kFloats) {
-    if ((mColumns & column) != 0) mWords.push_back(bitsOf(sample.*member));
-  }
-  if ((mColumns & kTime) != 0) {
-    for (const std::uint32_t word : std::bit_cast<TimeWords>(sample.time)) mWords.push_back(word);
-  }
-}
-
-void Samples::widen(std::uint8_t columns) {
-  Samples wider;
-  wider.mColumns = mColumns | columns;
-  wider.reserve(std::max(mWords.capacity() / wordsEach(), size() + 1));
-  for (const Sample& sample : *this) wider.append(sample);
-  *this = std::move(wider);
-}
-
-void Samples::cut(std::size_t size) {
-  mWords.resize(std::min(size, this->size()) * wordsEach());
+// Where it lies: from the last sample to the first, as each moves on into what has been moved already.
+void SamplePacker::widen(PackedWords& words, Columns columns) {
+  const Samples narrow(words, mFirst, mSize, mColumns);
+  const std::size_t each = wordsPerSample(columns);
+  words.resize(mFirst + mSize * each);
+  for (std::size_t i = mSize; i-- > 0;) writeSample(words, mFirst + i * each, narrow[i], columns);
+  mColumns = columns;
 }
 
 }  // namespace QeltDesktop

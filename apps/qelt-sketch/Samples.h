@@ -2,7 +2,6 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <initializer_list>
 #include <iterator>
 #include <vector>
 
@@ -20,38 +19,52 @@ struct Sample {
 // When the sample of that index was taken where nothing says so: 240 a second.
 double usualTime(std::size_t index);
 
-// The samples of a trace, packed: what was not recorded takes no memory. A page of places alone is held in
-// little more than the file it was read from. They come out bit for bit as they went in.
+// The numbers that samples are packed into. They lie in blocks, so that adding to a large page never copies
+// what is there already.
+class PackedWords {
+ public:
+  std::size_t size() const { return mSize; }
+  std::uint32_t& operator[](std::size_t index) { return mBlocks[index / kBlock][index % kBlock]; }
+  std::uint32_t operator[](std::size_t index) const { return mBlocks[index / kBlock][index % kBlock]; }
+  // Leaves the first `size` of them, or adds zeros.
+  void resize(std::size_t size);
+
+ private:
+  static constexpr std::size_t kBlock = 16384;
+
+  std::vector<std::vector<std::uint32_t>> mBlocks;
+  std::size_t mSize = 0;
+};
+
+// Which of pressure, tilt, orientation and time the samples of a trace hold; what was not recorded takes no
+// memory. A page of places alone is held in little more than the file it was read from.
+using Columns = std::uint8_t;
+std::size_t wordsPerSample(Columns columns);
+
+// The samples of one trace: a view of words that are kept elsewhere, and only good as long as those stay. The
+// samples come out bit for bit as they went in.
 class Samples {
  public:
   class Iterator;
 
-  Samples() = default;
-  Samples(std::initializer_list<Sample> samples);
+  Samples(const PackedWords& words, std::size_t first, std::size_t size, Columns columns)
+      : mWords(&words), mFirst(first), mSize(size), mColumns(columns) {}
 
-  std::size_t size() const { return mWords.size() / wordsEach(); }
-  bool empty() const { return mWords.empty(); }
+  std::size_t size() const { return mSize; }
+  bool empty() const { return mSize == 0; }
   Sample operator[](std::size_t index) const;
   // Throws std::out_of_range.
   Sample at(std::size_t index) const;
   Sample front() const { return (*this)[0]; }
-  Sample back() const { return (*this)[size() - 1]; }
+  Sample back() const { return (*this)[mSize - 1]; }
   Iterator begin() const;
   Iterator end() const;
 
-  // Makes room for that many in all.
-  void reserve(std::size_t size);
-  void push_back(const Sample& sample);
-  // Leaves the first `size`, if there are more.
-  void cut(std::size_t size);
-
  private:
-  std::size_t wordsEach() const;
-  void widen(std::uint8_t columns);
-  void append(const Sample& sample);
-
-  std::vector<std::uint32_t> mWords;
-  std::uint8_t mColumns = 0;  // which of pressure, tilt, orientation and time are held
+  const PackedWords* mWords;
+  std::size_t mFirst;
+  std::size_t mSize;
+  Columns mColumns;
 };
 
 class Samples::Iterator {
@@ -62,16 +75,17 @@ class Samples::Iterator {
   using pointer = const Sample*;
   using reference = Sample;
 
-  Iterator(const Samples& samples, std::size_t index) : mSamples(&samples), mIndex(index) {}
-  Sample operator*() const { return (*mSamples)[mIndex]; }
+  Iterator(const Samples& samples, std::size_t index) : mSamples(samples), mIndex(index) {}
+  Sample operator*() const { return mSamples[mIndex]; }
   Iterator& operator++() {
     ++mIndex;
     return *this;
   }
-  bool operator==(const Iterator& other) const = default;
+  // Of the same samples.
+  bool operator==(const Iterator& other) const { return mIndex == other.mIndex; }
 
  private:
-  const Samples* mSamples;
+  Samples mSamples;
   std::size_t mIndex;
 };
 
@@ -79,7 +93,28 @@ inline Samples::Iterator Samples::begin() const {
   return {*this, 0};
 }
 inline Samples::Iterator Samples::end() const {
-  return {*this, size()};
+  return {*this, mSize};
 }
+
+// Packs the samples of one trace behind whatever the words hold already.
+class SamplePacker {
+ public:
+  SamplePacker() = default;
+  explicit SamplePacker(std::size_t first) : mFirst(first) {}
+
+  // Always the same words, with nothing added to them by others in between.
+  void add(PackedWords& words, const Sample& sample);
+
+  std::size_t first() const { return mFirst; }
+  std::size_t size() const { return mSize; }
+  Columns columns() const { return mColumns; }
+
+ private:
+  void widen(PackedWords& words, Columns columns);
+
+  std::size_t mFirst = 0;
+  std::size_t mSize = 0;
+  Columns mColumns = 0;
+};
 
 }  // namespace QeltDesktop

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cmath>
 #include <cstdint>
+#include <vector>
 
 #include "base/PointF.h"
 
@@ -23,7 +24,8 @@ Qelt::PointerCoords coordsOf(const Sample& sample) {
 }
 
 // One event of `count` samples from `first` on: the last one is current, those before it are history.
-Qelt::MotionEvent eventOf(const Samples& samples, std::size_t first, std::size_t count, double downTime,
+template <typename SampleList>
+Qelt::MotionEvent eventOf(const SampleList& samples, std::size_t first, std::size_t count, double downTime,
                           int action, const Pointer& pointer) {
   const Qelt::PointerProperties properties{.id = 0, .toolType = pointer.tool};
   const Sample begin = samples[first];
@@ -51,7 +53,7 @@ Pointer pointerFor(const Trace& trace, std::optional<int> tool, std::optional<in
 }
 
 void cutLastTrace(Page& page, int points) {
-  page.traces.back().samples.cut(static_cast<std::size_t>(points));
+  page.traces.cutLast(static_cast<std::size_t>(points));
 }
 
 void feedLive(const Trace& trace, const Pointer& pointer, int batch, bool penStaysDown,
@@ -93,7 +95,7 @@ std::unique_ptr<StoredStroke> storedStroke(const Trace& trace, const Pointer& po
 
 Qelt::MotionEvent predictedEvent(const Sample& previous, const Sample& last, const Pointer& pointer,
                                  int count) {
-  Samples samples;
+  std::vector<Sample> samples;
   for (int k = 1; k <= count; ++k) {
     Sample sample = last;
     sample.x = last.x + static_cast<float>(k) * (last.x - previous.x);

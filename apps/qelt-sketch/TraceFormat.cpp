@@ -98,6 +98,7 @@ TraceFormat traceFormatOf(const SourceText& source, std::size_t offset,
                           const std::vector<ChannelText>& regular,
                           const std::vector<ChannelText>& intermittent) {
   TraceFormat format;
+  format.channels.reserve(regular.size() + intermittent.size());
   std::set<std::string> names;
   const auto take = [&](const std::vector<ChannelText>& channels) {
     for (const ChannelText& channel : channels) {

@@ -217,7 +217,12 @@ void TraceText::add(const XmlText& added) {
   const std::string_view source = mSource.text();
   const bool goesOn = !mPieces.empty() && added.offset == mSourceEnd;
   if (!mCopied && (added.replaced || (!goesOn && !mPieces.empty()))) {
-    mCopy = text();
+    const std::string_view start = text();
+    // Up to the next end tag, most likely the trace's own: a copy that grows piece by piece is held twice at
+    // times.
+    const std::size_t end = std::min(source.find("</", added.offset), source.size());
+    mCopy.reserve(start.size() + (end - added.offset));
+    mCopy = start;
     mCopied = true;
   }
   // What stands between two pieces only counts where it ends a line.
@@ -244,11 +249,6 @@ std::string_view TraceText::text() const {
 bool TraceText::isBlank() const {
   const std::string_view all = text();
   return std::all_of(all.begin(), all.end(), isSpace);
-}
-
-std::size_t TraceText::mostPoints() const {
-  const std::string_view all = text();
-  return static_cast<std::size_t>(std::count(all.begin(), all.end(), ',')) + 1;
 }
 
 void TraceText::forEachPoint(const TraceFormat& format,

@@ -29,8 +29,6 @@ class TraceText {
   void add(const XmlText& added);
   // Nothing but space.
   bool isBlank() const;
-  // No more points than that.
-  std::size_t mostPoints() const;
 
   // Hands over the points in order, one reading a channel. An omitted intermittent value and "?" leave the
   // channel's reading as it was; "*" repeats the number before it under the same prefix. Differences add up

@@ -2,14 +2,19 @@
 
 #include <algorithm>
 #include <cstdint>
+#include <functional>
+#include <new>
 #include <stdexcept>
 
+#include "CallRecorder.h"
 #include "Ink.h"
 #include "Options.h"
+#include "OutputFile.h"
 #include "PageDrawing.h"
 #include "PageLayout.h"
 #include "Progress.h"
 #include "desktop/engine/PluginLibrary.h"
+#include "desktop/gl/CallTask.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/pencommon/BatchObserver.h"
 #include "support/LogCapture.h"
@@ -21,11 +26,11 @@ using QeltDesktop::RenderQueue;
 
 // Draws a zigzag of 200 far points, 40 MB of vertices in all, in a queue that runs nothing by itself.
 void drawZigzag() {
-  QeltDesktop::Page page{{{}}};
+  QeltDesktop::Page page;
   for (int i = 0; i < 200; ++i) {
-    page.traces[0].samples.push_back(
-        {.x = i % 2 == 0 ? 0.0f : 600.0f, .y = static_cast<float>(i), .time = 4.0 * i});
+    page.traces.addSample({.x = i % 2 == 0 ? 0.0f : 600.0f, .y = static_cast<float>(i), .time = 4.0 * i});
   }
+  page.traces.finishTrace(QeltDesktop::kNoNumber, {});
   const QeltDesktop::PluginLibrary plugin(QELT_PLUGIN_PATH);
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
   QeltDesktop::Progress progress("drawing stroke", 1);
@@ -53,6 +58,19 @@ TEST(PageDrawing, OfWhichSomethingWasLostIsNoPicture) {
   QeltDesktop::setBatchObserver([](const Batch&) { throw std::runtime_error("lost"); });
   EXPECT_THROW(drawZigzag(), std::runtime_error);
   QeltDesktop::setBatchObserver({});
+}
+
+TEST(CallRecorder, LeavesNoCallWithoutItsBatches) {
+  const QeltTests::LogCapture log;
+  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
+  QeltDesktop::OutputFile file("/dev/null");
+  QeltDesktop::CallRecorder recorder(queue, file, QeltDesktop::DrawableKind::Stroke, 8);
+  const auto call = [&](const std::function<void()>& task) {
+    recorder.call({QeltDesktop::DrawableKind::Stroke, 0, "Draw", {}},
+                  [&](Qelt::RectF*) { return QeltDesktop::postCall(queue, task); });
+  };
+  EXPECT_NO_THROW(call([] {}));
+  EXPECT_THROW(call([] { throw std::bad_alloc(); }), std::runtime_error);
 }
 
 }  // namespace

@@ -373,7 +373,11 @@ TEST_F(Program, SaysInOneLineWhatCannotBeDoneAndLeavesAnOlderFileAlone) {
     EXPECT_NE(ran.err.find(why), std::string::npos) << ran.err;
     EXPECT_EQ(ran.out, "");
   };
-  expectRefused("draw '" + ink + "' --zoom 1e6 -o '" + older + "'", ink + ": the picture is too large");
+  expectRefused("draw '" + ink + "' --zoom 1e6 -o '" + older + "'",
+                ink + ": the picture is too large to draw: ");
+  expectRefused("draw '" + ink + "' --page 40000x1 -o '" + older + "'",
+                "--page: the picture is too large to draw: 40000 x 1 pixels, at most 32767 a side and "
+                "67108864 in all\n");
   EXPECT_EQ(contentsOf(older), "older");
   expectRefused("draw '" + ink + "' --predict 3 --rendering-version 7 -o '" + path("no.png").string() + "'",
                 "the pen has no prediction drawable in rendering version 7");

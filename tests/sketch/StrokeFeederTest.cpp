@@ -14,24 +14,33 @@ namespace QeltDesktop {
 namespace {
 
 // Points at x = 0, 1, 2, ..., each different in everything.
-Trace line(int points) {
-  Trace trace;
+std::vector<Sample> samplesOf(int points) {
+  std::vector<Sample> samples;
   for (int i = 0; i < points; ++i) {
     const auto number = static_cast<float>(i);
-    trace.samples.push_back({.x = number,
-                             .y = 10.0f * number,
-                             .pressure = 0.01f * number,
-                             .tilt = 0.002f * number,
-                             .orientation = -0.03f * number,
-                             .time = 4.0 * i});
+    samples.push_back({.x = number,
+                       .y = 10.0f * number,
+                       .pressure = 0.01f * number,
+                       .tilt = 0.002f * number,
+                       .orientation = -0.03f * number,
+                       .time = 4.0 * i});
   }
-  return trace;
+  return samples;
+}
+
+// A page of one trace.
+Page pageOf(const std::vector<Sample>& samples, std::optional<int> tool = {}) {
+  Page page;
+  page.traces.add(samples, {}, tool);
+  return page;
 }
 
 constexpr Pointer kStylus{2, 16386};
 
 // "down 0; move 1 2 3; up 3": what each event holds, by x.
-std::string described(const Trace& trace, int batch, bool penStaysDown = false) {
+std::string described(int points, int batch, bool penStaysDown = false) {
+  const Page page = pageOf(samplesOf(points));
+  const Trace trace = page.traces[0];
   std::string text;
   feedLive(trace, kStylus, batch, penStaysDown, [&](LiveEvent& live) {
     const Qelt::MotionEvent& event = live.event;
@@ -50,23 +59,24 @@ std::string described(const Trace& trace, int batch, bool penStaysDown = false) 
 }
 
 TEST(StrokeFeeder, BatchesLiveSamples) {
-  EXPECT_EQ(described(line(10), 4), "down 0; move 1 2 3 4; move 5 6 7 8; move 9; up 9");
-  EXPECT_EQ(described(line(9), 4), "down 0; move 1 2 3 4; move 5 6 7 8; up 8");
-  EXPECT_EQ(described(line(3), 1), "down 0; move 1; move 2; up 2");
-  EXPECT_EQ(described(line(3), 1000), "down 0; move 1 2; up 2");
-  EXPECT_EQ(described(line(1), 4), "down 0; up 0");
-  EXPECT_EQ(described(line(6), 4, true), "down 0; move 1 2 3 4; move 5");
+  EXPECT_EQ(described(10, 4), "down 0; move 1 2 3 4; move 5 6 7 8; move 9; up 9");
+  EXPECT_EQ(described(9, 4), "down 0; move 1 2 3 4; move 5 6 7 8; up 8");
+  EXPECT_EQ(described(3, 1), "down 0; move 1; move 2; up 2");
+  EXPECT_EQ(described(3, 1000), "down 0; move 1 2; up 2");
+  EXPECT_EQ(described(1, 4), "down 0; up 0");
+  EXPECT_EQ(described(6, 4, true), "down 0; move 1 2 3 4; move 5");
 }
 
 TEST(StrokeFeeder, RecordedEventAndStoredStrokeHoldEveryPoint) {
-  const Trace trace = line(3);
+  const Page page = pageOf(samplesOf(3));
+  const Trace trace = page.traces[0];
   const Qelt::MotionEvent event = recordedEvent(trace, kStylus);
   const auto stroke = storedStroke(trace, kStylus);
   ASSERT_EQ(event.GetHistorySize(), 3);
   ASSERT_EQ(stroke->GetPointCount(), 3);
   EXPECT_EQ(stroke->GetToolType(), 2);
   for (int i = 0; i < 3; ++i) {
-    const Sample& sample = trace.samples[static_cast<std::size_t>(i)];
+    const Sample sample = trace.samples[static_cast<std::size_t>(i)];
     EXPECT_EQ(event.GetHistoricalX(i), sample.x);
     EXPECT_EQ(event.GetHistoricalY(i), sample.y);
     EXPECT_EQ(event.GetHistoricalPressure(i), sample.pressure);
@@ -93,12 +103,12 @@ TEST(StrokeFeeder, RecordedEventAndStoredStrokeHoldEveryPoint) {
       EXPECT_EQ(whole->GetEventTime(), 8);
     }
   });
-  EXPECT_EQ(recordedEvent(line(1), kStylus).GetHistorySize(), 1);
+  EXPECT_EQ(recordedEvent(pageOf(samplesOf(1)).traces[0], kStylus).GetHistorySize(), 1);
 
   // Times that no clock shows.
-  const Trace odd{.samples = {{.time = -1e300}, {.time = 1e300}}, .brush = {}, .tool = {}};
-  EXPECT_LT(recordedEvent(odd, kStylus).GetDownTime(), 0);
-  EXPECT_GT(recordedEvent(odd, kStylus).GetEventTime(), 0);
+  const Page odd = pageOf({{.time = -1e300}, {.time = 1e300}});
+  EXPECT_LT(recordedEvent(odd.traces[0], kStylus).GetDownTime(), 0);
+  EXPECT_GT(recordedEvent(odd.traces[0], kStylus).GetEventTime(), 0);
 }
 
 TEST(StrokeFeeder, PredictionGoesOnInEqualSteps) {
@@ -117,8 +127,8 @@ TEST(StrokeFeeder, PredictionGoesOnInEqualSteps) {
 TEST(StrokeFeeder, ToolsHaveTheirSources) {
   const auto expectPointer = [](std::optional<int> ofTrace, std::optional<int> tool,
                                 std::optional<int> source, const Pointer& wanted) {
-    Trace trace = line(1);
-    trace.tool = ofTrace;
+    const Page page = pageOf(samplesOf(1), ofTrace);
+    const Trace trace = page.traces[0];
     EXPECT_EQ(pointerFor(trace, tool, source).tool, wanted.tool);
     EXPECT_EQ(pointerFor(trace, tool, source).source, wanted.source);
   };
@@ -129,7 +139,8 @@ TEST(StrokeFeeder, ToolsHaveTheirSources) {
 }
 
 TEST(StrokeFeeder, CutsTheLastTraceOnly) {
-  Page page{{line(5), line(5)}};
+  Page page = pageOf(samplesOf(5));
+  page.traces.add(samplesOf(5));
   cutLastTrace(page, 9);
   EXPECT_EQ(page.traces[1].samples.size(), 5u);
   cutLastTrace(page, 2);
