@@ -29,7 +29,7 @@ class BatchGuard {
       : mDrawable(drawable), mCanvas(canvas), mUnclaimed(unclaimed) {
     for (auto*& buffer : mBuffers) {
       buffer = new (std::nothrow) std::vector<float>;
-      if (mBuffers[0] == nullptr) break;
+      if (mBuffers[0] == nullptr) return;
     }
     setBuffers(mBuffers);
   }

@@ -1,5 +1,7 @@
 #pragma once
 
+#include "log/Log.h"
+
 namespace Qelt {
 
 // Calls `leave` at the end of its scope, whichever way the scope is left. An exception out of `leave` is
@@ -12,6 +14,7 @@ class ScopeExit {
     try {
       mLeave();
     } catch (...) {
+      __android_log_print(kLogError, kLogTag, "%s", "the host threw while a tile or a batch was ended");
     }
   }
   ScopeExit(const ScopeExit&) = delete;

@@ -135,7 +135,7 @@ class StampRenderer : public HostBase {
     mTextures.build(queue, width, height, kProfile.className);
   }
 
-  // Returns false when memory ran out.
+  // Returns false when memory ran out or a bitmap is missing.
   bool setTextures(int width, int height) { return mTextures.upload(width, height, kProfile.points); }
 
   void Clear() final {

@@ -28,8 +28,8 @@ class Pencil2OutlineShader {
   __attribute__((visibility("default"))) static const char szFragmentShader[];
 
  private:
-  bool mLinked = false;
   ShaderProgram mProgram;
+  bool mLinked = false;
 };
 
 }  // namespace Qelt

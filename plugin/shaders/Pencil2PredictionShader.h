@@ -26,8 +26,8 @@ class Pencil2PredictionShader : public StampUniforms {
   __attribute__((visibility("default"))) static const char szFragmentShader[];
 
  private:
-  bool mLinked = false;
   ShaderProgram mProgram;
+  bool mLinked = false;
 };
 
 }  // namespace Qelt

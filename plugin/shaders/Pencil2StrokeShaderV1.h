@@ -24,8 +24,8 @@ class Pencil2StrokeShaderV1 : public StampUniforms {
   __attribute__((visibility("default"))) static const char szFragmentShader[];
 
  private:
-  bool mLinked = false;
   ShaderProgram mProgram;
+  bool mLinked = false;
 };
 
 }  // namespace Qelt

@@ -28,7 +28,8 @@ T* ShaderManager::GetShader() try {
     // Memory ran out for it once; nobody holds it.
     found->second.shader = new (std::nothrow) T;
   } else if (T* shader = static_cast<T*>(found->second.shader); !shader->isLinked()) {
-    // It was made while there was no GL context. Others may hold it, so it is mended where it is.
+    // It could not be linked when it was made, most likely for want of a GL context. Others may hold it, so
+    // it is linked where it is.
     shader->link();
   }
   if (found->second.shader != nullptr) ++found->second.references;

@@ -162,7 +162,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
 
   void forgetAlpha() { mAlpha = kNoAlpha; }
 
-  // Ends a stroke at the event's point. A point that is not finite leaves the closing segment out.
+  // Ends a stroke at the event's point. A point that is not usable leaves the closing segment out.
   bool endPen(const MotionEvent& event, RectF* rect, Smoothing smoothing) {
     const PenSample sample = endSample(event, kCleaner, mPath, kMoveGrowth, rect);
     mAttitude.push(sample.tilt, sample.orientation);

@@ -88,7 +88,7 @@ inline int stampCountV3(float length, float size) {
 
 // --- What a stamp is handed over with ---
 
-// When the pen size falls steeply within a stroke, rounding may carry a ramp below 0.
+// When the pen size changes by powers of ten within a stroke, rounding may carry a ramp below 0.
 inline float notNegative(float value) {
   return value > 0.0f ? value : 0.0f;
 }
@@ -103,7 +103,8 @@ inline float stampWidthV4(float width) {
 inline float stampHalfWidthV8(float width) {
   return notNegative(width) * 0.5f;
 }
-// Kept: the preview's ramps may run past their targets, and so below 0, where a stamp shows nothing.
+// Kept: the preview's ramps may run past their targets, and so below 0. An alpha below 0 shows nothing; a
+// stamp of negative width is as large as its amount, mirrored.
 inline float stampWidthPreview(float width) {
   return width + 1.0f;
 }

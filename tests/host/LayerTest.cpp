@@ -314,6 +314,9 @@ TEST_P(Layer, TheHostShapeFillsItsSquare) {
   });
   const std::vector<std::uint8_t> whole = pictureOf(queue, layer, *bitmap);
   for (std::size_t i = 3; i < whole.size(); i += 4) ASSERT_EQ(whole[i], 255);
+  // A canvas draws on in the next context.
+  queue.loseContext();
+  queue.restoreContext();
   // Half a pixel at the rim is half covered; the colour is premultiplied.
   paint.SetColor(0xFFFF0000u);
   queue.run([&] {

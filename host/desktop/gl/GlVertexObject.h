@@ -14,7 +14,8 @@
 namespace QeltDesktop {
 
 // Vertex buffers in GL's memory; this side keeps no copy. A context loss leaves them empty, and whoever draws
-// uploads first. A batch that there is no memory for is logged in one line and not drawn. Render thread.
+// uploads first. A batch of more than 1 MiB that there is no memory for is logged in one line and not drawn.
+// Render thread.
 //
 // A large batch of points, lines or triangles lies in slices, each a store and a draw of its own: drivers
 // that count bytes in 32 bits crash on a store of some gigabytes. Such a batch goes with the render task that

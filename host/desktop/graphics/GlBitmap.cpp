@@ -137,6 +137,11 @@ std::vector<std::uint8_t> GlBitmap::readPixels() {
   std::vector<std::uint8_t> pixels;
   if (!bindFramebuffer()) return pixels;
   pixels.resize(byteCount(mWidth, mHeight));
+  // What another user of the context left would make the pixels run past their end.
+  gl(glBindBuffer)(GL_PIXEL_PACK_BUFFER, 0);
+  for (const GLenum packing : {GL_PACK_ROW_LENGTH, GL_PACK_SKIP_ROWS, GL_PACK_SKIP_PIXELS}) {
+    gl(glPixelStorei)(packing, 0);
+  }
   gl(glReadPixels)(0, 0, mWidth, mHeight, GL_RGBA, GL_UNSIGNED_BYTE, pixels.data());
   gl(glBindFramebuffer)(GL_FRAMEBUFFER, 0);
   return pixels;

@@ -47,8 +47,8 @@ class GlTile final : public Qelt::ISPSubBitmap {
 };
 
 // An RGBA8 texture, its first row texture coordinate 0 and window coordinate 0. It is zeroed when made and
-// when it comes back after a context loss, unless it keeps its pixels. Render thread;
-// one made on a thread without a GL device stays empty for good.
+// when it comes back after a context loss, unless it keeps its pixels. Render thread; one made
+// on a thread without a GL device stays empty for good.
 class QELT_HOST_API GlBitmap final : public Qelt::ISPBitmap, public GlResource {
  public:
   // What happens to the pixels when the context is lost.

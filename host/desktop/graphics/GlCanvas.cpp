@@ -71,8 +71,6 @@ GlCanvas::GlCanvas(GlBitmap& bitmap) : mBitmap(bitmap) {
   layout.addAttribute(Qelt::AttributeType::Float, 2, -1);
   mQuad.reset(
       Qelt::GraphicsFactory::createGraphicsObject(1, Qelt::GraphicsFactory::kTriangles, layout, 0, 0));
-  constexpr std::array<float, 12> kCorners{-1, -1, 1, -1, -1, 1, -1, 1, 1, -1, 1, 1};
-  if (mQuad != nullptr) mQuad->updateBuffer(0, kCorners.data(), 6);
 }
 
 GlCanvas::~GlCanvas() = default;
@@ -104,6 +102,9 @@ void GlCanvas::DrawShape(float x, float y, float size, const Qelt::SPPaint& pain
   mEdges->set(edges);
   mColor->set(premultiplied(paint.GetColor()));
   mAntiAlias->set(paint.IsAntiAlias() ? 1.0f : 0.0f);
+  // Each time: a loss of the context leaves the buffer empty.
+  constexpr std::array<float, 12> kCorners{-1, -1, 1, -1, -1, 1, -1, 1, 1, -1, 1, 1};
+  mQuad->updateBuffer(0, kCorners.data(), 6);
   mQuad->draw(0, -1, true, 0);
   mBitmap.endRender();
 }

@@ -31,7 +31,7 @@ class MoveFilter {
     mSkipToggle = true;
   }
 
-  // Whether the move from `last` to `at` becomes a segment. A point that is not finite never does.
+  // Whether the move from `last` to `at` becomes a segment. A point that is not usable never does.
   bool accepts(PointF last, PointF at) {
     if (!isUsable(at)) return false;
     const float distance = distanceBetween(last, at);

@@ -11,7 +11,7 @@
 // input. Main thread.
 namespace Qelt {
 
-// The index of the first point that a stroke can start from, or -1. Points that are not finite are dropped.
+// The index of the first point that a stroke can start from, or -1. Points that are not usable are dropped.
 template <typename Source>
 int firstUsablePoint(const Source& source) {
   const int count = source.count();

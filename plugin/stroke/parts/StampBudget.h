@@ -1,8 +1,5 @@
 #pragma once
 
-#include <cstddef>
-#include <limits>
-
 #include "log/Log.h"
 
 namespace Qelt {

@@ -25,7 +25,7 @@ struct SegmentRamps {
 
 // The stamps of one segment: hands them to the render drawable and gathers the area they cover. `Version`
 // names the RenderDrawable, and in its profile stampSize, stampAlpha and stampReach, the hand-over. Local
-// state, so that the walk runs in registers. Place of the walks in StampWalk.h.
+// state, so that the walk runs in registers. This is what the walks of StampWalk.h take as `place`.
 template <typename Version>
 class StampRun {
   static constexpr const auto& kProfile = Version::profile;
