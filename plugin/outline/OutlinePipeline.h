@@ -16,7 +16,6 @@
 #include "outline/Pencil2OutlineDrawableRTV1.h"
 #include "render/DrawablePosts.h"
 #include "stroke/StrokeRules.h"
-#include "stroke/parts/CutLog.h"
 #include "stroke/parts/DirtyBox.h"
 #include "stroke/parts/LiveInput.h"
 #include "stroke/parts/MoveFilter.h"
@@ -26,7 +25,7 @@
 #include "stroke/parts/SampleCleaner.h"
 #include "stroke/parts/SampleSources.h"
 #include "stroke/parts/SegmentPath.h"
-#include "stroke/parts/StampBudget.h"
+#include "stroke/parts/StampLimits.h"
 #include "stroke/parts/StampRun.h"
 #include "stroke/parts/StampWalk.h"
 
@@ -67,7 +66,7 @@ class OutlinePipeline : public Pencil2OutlineDrawableGL {
       return false;
     }
     if (mRender == nullptr || mCanvas == nullptr || !settings().exist()) return false;
-    mBudget.restart();
+    mLimits.beginCall();
 
     // Kept: set at once, not posted; an outline that still waits is drawn in this colour too.
     mRender->SetOutlineColor(static_cast<unsigned int>(GetOutlineColor()));
@@ -96,7 +95,7 @@ class OutlinePipeline : public Pencil2OutlineDrawableGL {
     mPath.start(start.at);
     mAttitude.fill(start.tilt, start.orientation);
     mFirstSegment = true;
-    mCutLog.restart();
+    mLimits.beginStroke();
   }
 
   // Takes one sample into the outline; true when it placed a stamp.
@@ -183,13 +182,12 @@ class OutlinePipeline : public Pencil2OutlineDrawableGL {
     const float size = getSize();
     const int count = kProfile.stampCount(length, size);
     const float step = rules::rampStep(mCurrentSize, targetSize(size), count);
-    const int most = mBudget.left();
+    const int most = mLimits.left();
     RenderDrawable::Appender appender(*mRender, std::min({count, kMostStampsPerSegment, most}));
     Run run(appender, mCurrentSize, step, tiltFactor(), stampDirection(mAttitude.meanOrientation()));
     const WalkResult walk = walkEvenly(mPath.path(), count, length, most, run);
     run.finish(rect);
-    mBudget.spend(walk.stamps, Version::name);
-    if (walk.cutShort) mCutLog.note(Version::name, length);
+    mLimits.note(walk, Version::name, length);
     return walk.stamps > 0;
   }
 
@@ -219,8 +217,7 @@ class OutlinePipeline : public Pencil2OutlineDrawableGL {
   SegmentPath mPath;
   MoveFilter mMoves;
   PenAttitude<Version::tiltWindow, Version::orientationWindow> mAttitude;
-  CutLog mCutLog;
-  StampBudget mBudget;
+  StampLimits mLimits;
   bool mFirstSegment = true;  // no segment since the stroke began
   float mCurrentSize = 0.0f;  // reached at the end of the last segment of a move
 };

@@ -66,8 +66,8 @@ bool Pencil2PredictionDrawableGL::startPen() {
   mStamps.restart(std::max<std::int32_t>(live.mStampCount, 0));
   mTiltBlend = live.mTiltBlend;
   mCarried = kProfile.stampSpacing;
-  mCutLog.restart();
-  mBudget.restart();
+  mLimits.beginStroke();
+  mLimits.beginCall();
 
   IGLMsgQueue* queue = queueOf(mDataManager);
   postStartPoint(queue, mRender, {live.mStartX, live.mStartY});
@@ -94,14 +94,13 @@ bool Pencil2PredictionDrawableGL::drawLine(PointF at, bool last, RectF* rect) {
   mPath.setLast(at);
 
   using Run = StampRun<Version>;
-  const int most = mBudget.left();
+  const int most = mLimits.left();
   Run::Appender appender(*mRender, std::min(spacedStamps(mCarried, kProfile.stampSpacing, length), most));
   Run run(appender, {mWidth, mAlpha, 0.0f, 0.0f}, mTiltBlend, stampDirection(mOrientation), mStamps);
   const WalkResult walk = walkSpaced(mPath.path(), mCarried, kProfile.stampSpacing, length, most, run);
   run.finish(mPath.path(), rect);
   mCarried = walk.carry;
-  mBudget.spend(walk.stamps, Version::name);
-  if (walk.cutShort) mCutLog.note(Version::name, length);
+  mLimits.note(walk, Version::name, length);
   const bool placed = run.counter().count() != mStamps.count();
   mStamps = run.counter();
   return placed;

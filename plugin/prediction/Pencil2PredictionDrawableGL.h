@@ -4,11 +4,10 @@
 #include "base/Vector.h"
 #include "pencommon/PenPredictionDrawableGL.h"
 #include "prediction/PredictionVersions.h"
-#include "stroke/parts/CutLog.h"
 #include "stroke/parts/PenSettings.h"
 #include "stroke/parts/SegmentPath.h"
-#include "stroke/parts/StampBudget.h"
 #include "stroke/parts/StampCounter.h"
+#include "stroke/parts/StampLimits.h"
 #include "stroke/parts/ViewScale.h"
 
 namespace Qelt {
@@ -49,8 +48,7 @@ class Pencil2PredictionDrawableGL final : public PenPredictionDrawableGL {
   SegmentPath mPath;
   StampCounter mStamps;
   ViewScale mViewScale;
-  CutLog mCutLog;
-  StampBudget mBudget;
+  StampLimits mLimits;
   float mCarried = 0.0f;  // where the next stamp lies on the next segment
   // The live stroke's last values.
   float mWidth = 0.0f;

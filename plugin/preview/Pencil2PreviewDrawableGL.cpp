@@ -39,7 +39,7 @@ bool Pencil2PreviewDrawableGL::Draw(const MotionEvent* event, RectF* rect) {
     return false;
   }
   if (!canDraw()) return false;
-  mBudget.restart();
+  mLimits.beginCall();
 
   Version::ReturnGuard guard(mRender, mCanvas, mRender->unclaimedBatch());
   const bool result = drawLive(*event, *this, mState, rect, settings().smoothing(), kGrowth);
@@ -55,7 +55,7 @@ bool Pencil2PreviewDrawableGL::RedrawPen(const MotionEvent* event, RectF* rect) 
     return false;
   }
   if (!canDraw()) return false;
-  mBudget.restart();
+  mLimits.beginCall();
   IGLMsgQueue* queue = queueOf(mDataManager);
   postRedrawState(queue, mRender);
   postPenData(queue, mRender, settings().size(), settings().color());
@@ -158,7 +158,7 @@ void Pencil2PreviewDrawableGL::begin(const PenSample& start) {
   mAttitude.fill(start.tilt, start.orientation);
   mStamps.restart();
   mPatternShift.restart();
-  mCutLog.restart();
+  mLimits.beginStroke();
 }
 
 bool Pencil2PreviewDrawableGL::hasSpacing(const char* message) const {
@@ -181,7 +181,7 @@ bool Pencil2PreviewDrawableGL::placeSegment(float length, float pressure, RectF*
   const SegmentRamps ramps{mWidth, mAlpha, rules::rampStep(mWidth, width, count),
                            rules::rampStep(mAlpha, alpha, count)};
   const bool curve = smoothing == Smoothing::Curve;
-  const int most = mBudget.left();
+  const int most = mLimits.left();
   const int expected =
       curve ? spacedStamps(mCarried, mRepeatDistance, length) : std::min(count, kMostStampsPerSegment);
   Run::Appender appender(*mRender, std::min(expected, most));
@@ -190,8 +190,7 @@ bool Pencil2PreviewDrawableGL::placeSegment(float length, float pressure, RectF*
                                 : walkEvenly(mPath.path(), count, length, most, run);
   if (curve) mCarried = walk.carry;
   run.finish(mPath.path(), rect);
-  mBudget.spend(walk.stamps, Version::name);
-  if (walk.cutShort) mCutLog.note(Version::name, length);
+  mLimits.note(walk, Version::name, length);
 
   const bool placed = run.counter().count() != mStamps.count();
   mStamps = run.counter();

@@ -2,7 +2,6 @@
 
 #include "pencommon/PenPreviewDrawableGL.h"
 #include "preview/PreviewVersions.h"
-#include "stroke/parts/CutLog.h"
 #include "stroke/parts/LiveInput.h"
 #include "stroke/parts/MoveFilter.h"
 #include "stroke/parts/PatternShift.h"
@@ -12,8 +11,8 @@
 #include "stroke/parts/Replay.h"
 #include "stroke/parts/SampleCleaner.h"
 #include "stroke/parts/SegmentPath.h"
-#include "stroke/parts/StampBudget.h"
 #include "stroke/parts/StampCounter.h"
+#include "stroke/parts/StampLimits.h"
 #include "stroke/parts/StampRun.h"
 #include "stroke/parts/StrokeState.h"
 
@@ -77,8 +76,7 @@ class Pencil2PreviewDrawableGL final : public PenPreviewDrawableGL {
   StrokeState mState;
   StampCounter mStamps;
   PatternShift mPatternShift;
-  CutLog mCutLog;
-  StampBudget mBudget;
+  StampLimits mLimits;
   bool mFirstSegment = true;     // no segment since the pen went down
   float mRepeatDistance = 1.0f;  // between stamps on curves, stroke units
   float mCarried = 0.0f;         // where the next stamp lies on the next curve

@@ -19,7 +19,6 @@
 #include "stroke/StrokeCache.h"
 #include "stroke/StrokeRules.h"
 #include "stroke/StrokeVersions.h"
-#include "stroke/parts/CutLog.h"
 #include "stroke/parts/LiveInput.h"
 #include "stroke/parts/MoveFilter.h"
 #include "stroke/parts/PatternShift.h"
@@ -29,8 +28,8 @@
 #include "stroke/parts/SampleCleaner.h"
 #include "stroke/parts/SampleSources.h"
 #include "stroke/parts/SegmentPath.h"
-#include "stroke/parts/StampBudget.h"
 #include "stroke/parts/StampCounter.h"
+#include "stroke/parts/StampLimits.h"
 #include "stroke/parts/StampRun.h"
 #include "stroke/parts/StampWalk.h"
 #include "stroke/parts/StrokeState.h"
@@ -71,7 +70,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
       return false;
     }
     if (!canDraw()) return false;
-    mBudget.restart();
+    mLimits.beginCall();
 
     typename Version::ReturnGuard guard(mRender, mCanvas, mRender->unclaimedBatch());
     passInverseScale();
@@ -90,7 +89,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
       return false;
     }
     if (!canDraw()) return false;
-    mBudget.restart();
+    mLimits.beginCall();
     postRedrawBegin();
 
     typename Version::ReturnGuard guard(mRender, mCanvas, mRender->unclaimedBatch());
@@ -104,7 +103,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
       return false;
     }
     if (!canDraw()) return false;
-    mBudget.restart();
+    mLimits.beginCall();
     postRedrawBegin();
 
     StrokeCache cache(*stroke);
@@ -273,7 +272,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     mFirstSegment = true;
     mAttitude.fill(start.tilt, start.orientation);
     mStamps.restart();
-    mCutLog.restart();
+    mLimits.beginStroke();
   }
 
   // Takes one sample into the stroke; true when it placed a stamp.
@@ -325,13 +324,13 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     const float first = mCarried;
     // The ramps' count is worked out apart from the walk, and may differ from it by one.
     const int count = rules::incremented(rules::saturatedCount((length - first) / kProfile.stampSpacing));
-    const int most = mBudget.left();
+    const int most = mLimits.left();
     Appender appender(*mRender, std::min(spacedStamps(first, kProfile.stampSpacing, length), most));
     StampRun<Version> run = runTo(appender, width, alpha, blend, count);
     const WalkResult walk = walkSpaced(mPath.path(), first, kProfile.stampSpacing, length, most, run);
     finish(run, rect);
     mCarried = walk.carry;
-    note(walk, length);
+    mLimits.note(walk, Version::name, length);
   }
 
   // So many stamps a segment; the next one begins with a stamp at its own start.
@@ -343,17 +342,12 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
                             static_cast<double>(length), static_cast<double>(size));
       }
     }
-    const int most = mBudget.left();
+    const int most = mLimits.left();
     Appender appender(*mRender, std::min({count, kMostStampsPerSegment, most}));
     StampRun<Version> run = runTo(appender, width, alpha, blend, count);
     const WalkResult walk = walkEvenly(mPath.path(), count, length, most, run);
     finish(run, rect);
-    note(walk, length);
-  }
-
-  void note(const WalkResult& walk, float length) {
-    mBudget.spend(walk.stamps, Version::name);
-    if (walk.cutShort) mCutLog.note(Version::name, length);
+    mLimits.note(walk, Version::name, length);
   }
 
   using Appender = typename RenderDrawable::Appender;
@@ -446,8 +440,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
   StrokeState mState;
   StampCounter mStamps;
   PatternShift mPatternShift;
-  CutLog mCutLog;
-  StampBudget mBudget;
+  StampLimits mLimits;
   ViewScale mViewScale;
   bool mFirstSegment = true;  // no segment since the pen went down
   float mCarried = 0.0f;      // where the next stamp lies on the next segment

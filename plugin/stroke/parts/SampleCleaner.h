@@ -3,6 +3,7 @@
 #include <cmath>
 
 #include "engine/MotionEvent.h"
+#include "stroke/parts/PenSample.h"
 
 namespace Qelt {
 
@@ -38,7 +39,7 @@ struct SampleCleaner {
   bool exceedsCap(float reported) const { return knownTilt(reported) > tiltCap; }
 
   // What is not finite, or so large that a mean would not be, counts as 0.
-  static float orientation(float reported) { return std::fabs(reported) <= 1e30f ? reported : 0.0f; }
+  static float orientation(float reported) { return std::fabs(reported) <= kFarthest ? reported : 0.0f; }
 };
 
 // A stylus on a touch screen reports no pressure.
