@@ -1,0 +1,37 @@
+#pragma once
+
+#include <array>
+#include <cstdint>
+
+// The one list of versions. The plug-in's version table and factory, the tests, the benchmarks and the
+// program take theirs from it, so a new version begins with a row here; the compiler then names what is
+// missing. This header depends on nothing, so that programs without the plug-in's other headers may read it.
+namespace Qelt {
+
+// What a pen of one rendering version draws with. A released row is frozen, since documents store the number.
+struct RenderingVersion {
+  std::int32_t number;          // as documents store it and Pen::getVersion returns it
+  std::int32_t strokeVersion;   // of the stroke drawable; 6 is drawn by the class of version 4
+  std::int32_t outlineVersion;  // of the outline drawable
+  int floatsPerVertex;          // in the batches of the stroke drawable: 9, or 11 with a smoothed rim
+  bool predicts;                // whether the pen offers a predicted continuation
+};
+
+// Ascending, without gaps, from 1.
+inline constexpr std::array<RenderingVersion, 8> kRenderingVersions{{
+    {.number = 1, .strokeVersion = 1, .outlineVersion = 1, .floatsPerVertex = 9, .predicts = false},
+    {.number = 2, .strokeVersion = 2, .outlineVersion = 2, .floatsPerVertex = 9, .predicts = false},
+    {.number = 3, .strokeVersion = 3, .outlineVersion = 3, .floatsPerVertex = 9, .predicts = false},
+    {.number = 4, .strokeVersion = 4, .outlineVersion = 4, .floatsPerVertex = 9, .predicts = false},
+    {.number = 5, .strokeVersion = 5, .outlineVersion = 5, .floatsPerVertex = 9, .predicts = false},
+    {.number = 6, .strokeVersion = 6, .outlineVersion = 4, .floatsPerVertex = 9, .predicts = false},
+    {.number = 7, .strokeVersion = 7, .outlineVersion = 4, .floatsPerVertex = 9, .predicts = false},
+    {.number = 8, .strokeVersion = 8, .outlineVersion = 4, .floatsPerVertex = 11, .predicts = true},
+}};
+
+// Floats in a vertex of the batches of the other drawables, which are the same in all rendering versions.
+inline constexpr int kOutlineFloatsPerVertex = 7;
+inline constexpr int kPreviewFloatsPerVertex = 9;
+inline constexpr int kPredictionFloatsPerVertex = 11;
+
+}  // namespace Qelt
