@@ -55,9 +55,9 @@ Pencil2OutlineDrawableRTV1::Pencil2OutlineDrawableRTV1(PenGLDataManager* manager
 
 void Pencil2OutlineDrawableRTV1::AddPoint(Vector2<float>, float) {}
 
-void Pencil2OutlineDrawableRTV1::AddPoint(const Vector2<float>* point, float size, float tiltFactor) {
+void Pencil2OutlineDrawableRTV1::AddPoint(const Vector2<float>* point, float size, float tiltBlend) {
   Appender one(*this, 1);
-  one.AddPoint(point, size, tiltFactor);
+  one.AddPoint(point, size, tiltBlend);
   one.flush();
 }
 
@@ -92,8 +92,8 @@ void Pencil2OutlineDrawableRTV1::Release() {
   mReleased = true;
 }
 
-// Kept: a point texture that was drawn is not drawn again; what a bitmap that was drawn into holds after a
-// context loss is the host's affair. Only what could not be made without a context is made now.
+// Kept: a point texture that was drawn once is not drawn again; what its bitmap holds after a context loss is
+// for the host to see to. Only what could not be made without a context is made now.
 void Pencil2OutlineDrawableRTV1::RestoreGLObject() {
   log("virtual void Qelt::Pencil2OutlineDrawableRTV1::RestoreGLObject()");
   if (mReleased) return;
@@ -106,13 +106,13 @@ void Pencil2OutlineDrawableRTV1::CreatePenCanvas(int, int, IGLMsgQueue*) {
   if (!mReleased) buildPointTexture();
 }
 
-// A square full of alpha: the shader only asks where there is any.
+// A square full of alpha: the shader only asks whether there is any.
 void Pencil2OutlineDrawableRTV1::buildPointTexture() {
   if (mPointTextureBitmap != nullptr) return;
   IGLMsgQueue* queue = queueOf(mDataManager);
   ISPBitmap* bitmap = SPGraphicsFactory::CreateBitmap(queue, kPointSide, kPointSide, nullptr, false, 0);
   if (bitmap == nullptr) return;
-  // What could not be drawn whole is not kept, so that it is tried again.
+  // A texture that could not be drawn completely is dropped, so that the next call tries again.
   const ScopeExit dropBitmap([this, bitmap] {
     if (mPointTextureBitmap == nullptr) SPGraphicsFactory::ReleaseBitmap(bitmap);
   });

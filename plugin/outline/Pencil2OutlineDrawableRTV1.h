@@ -5,7 +5,7 @@
 #include <vector>
 
 #include "base/Vector.h"
-#include "outline/Pencil2OutlineDrawableRT.h"
+#include "pencommon/PenOutlineDrawableRT.h"
 #include "render/StampVertices.h"
 #include "render/UnclaimedBatch.h"
 
@@ -15,12 +15,19 @@ class GraphicsObject;
 class ISPBitmap;
 class Pencil2OutlineShader;
 
-// The render-thread half of every outline version. Each stamp becomes two quads in two streams: one as large
+// The base of the outline render drawables; adds nothing to the host's.
+class Pencil2OutlineDrawableRT : public PenOutlineDrawableRT {
+ public:
+  using PenOutlineDrawableRT::PenOutlineDrawableRT;
+};
+
+// The render drawable of every outline version. Each stamp becomes two quads in two streams: one as large
 // as the stamp, one larger by the outline size. The large ones are drawn in the outline's colour, then the
 // small ones erase, so that a rim is left.
 //
-// What could not be made, for want of memory or of a GL context, is tried again at the next CreatePenCanvas
-// and when the context is restored. Once released, a drawable never draws again; a host makes a new one.
+// What could not be made, because memory ran out or there was no GL context, is tried again at the next
+// CreatePenCanvas and when the context is restored. Once released, a drawable never draws again; a host makes
+// a new one.
 //
 // Main thread: AddPoint, Appender, SetInverseScale, unclaimedBatch. Render thread: the rest.
 class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
@@ -31,9 +38,9 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
 
   void AddPoint(Vector2<float> point, float size) override;
 
-  // Appends stamps to both write buffers, each where there is one. Every stamp has a centre and a direction
-  // (-sin a, cos a), two vectors in a row; a width in stroke units; and a tilt factor. Lives while the
-  // buffers and the outline size stay as they are.
+  // Appends stamps to both write buffers, or to the one that there is. Every stamp has a centre and a
+  // direction (-sin a, cos a), two vectors in a row; a width in stroke units; and a tilt blend. To be used
+  // only as long as the buffers and the outline size stay as they are.
   class Appender {
    public:
     // Makes room for so many stamps, so that appending them does not allocate. Throws std::bad_alloc.
@@ -42,8 +49,8 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
           mOuter(renderer.mOuterWriteBuffer, stamps),
           mOutlineSize(renderer.GetOutlineSize()) {}
 
-    void AddPoint(const Vector2<float>* point, float size, float tiltFactor) {
-      const StampLook look{0.0f, tiltFactor, 0.0f, point[1]};
+    void AddPoint(const Vector2<float>* point, float size, float tiltBlend) {
+      const StampLook look{0.0f, tiltBlend, 0.0f, point[1]};
       StampExtent extent = squareExtent(size);
       mInner.add(stampQuad(point[0], extent), look);
       extent.x = std::max(extent.x + mOutlineSize, 0.0f);
@@ -64,7 +71,7 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
   };
 
   // Appends one stamp. Throws std::bad_alloc where a buffer cannot grow.
-  void AddPoint(const Vector2<float>* point, float size, float tiltFactor);
+  void AddPoint(const Vector2<float>* point, float size, float tiltBlend);
 
   UnclaimedBatch* unclaimedBatch() { return &mUnclaimed; }
 
