@@ -17,9 +17,9 @@ class PenDrawableRT;
 // share of their size and by a margin that each kind of drawable fixes. It is not grown here, only mapped to
 // canvas pixels and boxed, and a tile is drawn into if it overlaps that box. In such a tile every stamp of
 // the batch is drawn, cut by the tile's own edges, and since all tiles show one picture, stamps meet at their
-// borders. But the growth does not follow every stamp to its rim: a wide one of version 8 or of a prediction
-// reaches further than its rectangle. Where it reaches into a tile that the rectangle does not meet, that
-// part of its rim is missing. docs/reliability.md says from which widths on.
+// borders. But the growth does not follow every stamp to its rim: wide ones of version 8 and of predictions,
+// and those of curved outlines, can reach further than their rectangle. What reaches into a tile that the
+// rectangle does not meet is missing there. docs/reliability.md says how much of which drawable that is.
 class PenGLRenderMsg final : public ITask {
  public:
   // Takes the canvas's transform as it is now; `rect` is in stroke units. Main thread.
