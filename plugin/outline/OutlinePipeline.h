@@ -7,7 +7,7 @@
 #include "math/FloatRange.h"
 #include "model/ObjectStroke.h"
 #include "outline/Pencil2OutlineDrawableGL.h"
-#include "render/DrawablePosts.h"
+#include "render/Posting.h"
 #include "stroke/StampPen.h"
 #include "stroke/input/SampleSources.h"
 

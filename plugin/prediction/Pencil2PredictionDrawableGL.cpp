@@ -9,12 +9,10 @@
 #include "engine/MotionEvent.h"
 #include "graphics/ISPPenCanvas.h"
 #include "pen/Pencil2Data.h"
-#include "render/DrawablePosts.h"
+#include "render/Posting.h"
 #include "stroke/input/PenSample.h"
 
 namespace Qelt {
-
-template class StampRenderer<PenPredictionDrawableRT, PredictionRender>;
 
 Pencil2PredictionDrawableGL::Pencil2PredictionDrawableGL(Pencil2Data* penData, PenGLDataManager* manager)
     : PenPredictionDrawableGL(manager),

@@ -4,12 +4,10 @@
 
 #include "base/RectF.h"
 #include "engine/MotionEvent.h"
-#include "render/DrawablePosts.h"
+#include "render/Posting.h"
 #include "stroke/input/SampleSources.h"
 
 namespace Qelt {
-
-template class StampRenderer<PenPreviewDrawableRT, PreviewRender>;
 
 Pencil2PreviewDrawableGL::Pencil2PreviewDrawableGL(Pencil2Data* penData, PenGLDataManager* manager)
     : PenPreviewDrawableGL(manager),

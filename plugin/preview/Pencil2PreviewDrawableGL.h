@@ -2,8 +2,8 @@
 
 #include "pencommon/PenPreviewDrawableGL.h"
 #include "pencommon/PenPreviewDrawableRT.h"
-#include "preview/Pencil2PreviewDrawableRT.h"
 #include "render/BatchGuard.h"
+#include "render/RenderDrawables.h"
 #include "stroke/StampPen.h"
 #include "stroke/StrokeRules.h"
 #include "stroke/StrokeVersions.h"

@@ -9,7 +9,7 @@
 #include "engine/MotionEvent.h"
 #include "log/Log.h"
 #include "pen/Pencil2Data.h"
-#include "render/DrawablePosts.h"
+#include "render/Posting.h"
 #include "stroke/StrokeRules.h"
 #include "stroke/StrokeVersions.h"
 #include "stroke/input/LiveInput.h"

@@ -7,7 +7,6 @@
 #include "engine/MotionEvent.h"
 #include "graphics/ISPPenCanvas.h"
 #include "model/ObjectStroke.h"
-#include "render/DrawablePosts.h"
 #include "render/Posting.h"
 #include "stroke/CacheLookup.h"
 #include "stroke/Pencil2StrokeDrawableGL.h"
@@ -130,11 +129,8 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     postStartPoint(queue(), mRenderDrawable, first < 0 ? PointF{} : source.point(first));
     *rect = cache.rect();
     UnclaimedBatch* unclaimed = mRenderDrawable->unclaimedBatch();
-    bool handedOver = false;
-    {
-      const typename Version::CacheGuard guard(mRenderDrawable, mCanvas, *rect, cache.buffer(), unclaimed,
-                                               &handedOver);
-    }
+    const bool handedOver =
+        typename Version::CacheGuard(mRenderDrawable, mCanvas, unclaimed).present(cache.buffer(), *rect);
     // The render thread drops the reference when it is done with the buffer.
     RefCount* points = cache.takePoints();
     if (!post(queue(), points, &RefCount::Unref)) {

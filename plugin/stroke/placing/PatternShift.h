@@ -4,8 +4,8 @@
 
 namespace Qelt {
 
-// Moves the pattern offset every 300 segments, so that the texture does not repeat visibly along long
-// strokes. Kept: nothing reads the offset any more, but the rows with `shiftsPattern` go on counting.
+// Moves an offset of the pattern every 300 segments. Kept: the rows with `shiftsPattern` go on counting,
+// although nothing reads the offset.
 class PatternShift {
  public:
   void restart() {
