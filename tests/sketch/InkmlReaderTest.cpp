@@ -1,4 +1,4 @@
-#include "InkmlReader.h"
+#include "ink/InkmlReader.h"
 
 #include <gmock/gmock.h>
 #include <malloc.h>
@@ -14,9 +14,9 @@
 #include <utility>
 #include <vector>
 
-#include "Ink.h"
-#include "Refusal.h"
-#include "SourceText.h"
+#include "ink/Ink.h"
+#include "ink/SourceText.h"
+#include "text/Refusal.h"
 
 namespace QeltDesktop {
 namespace {
@@ -32,7 +32,7 @@ Page read(const std::string& text) {
 std::vector<Sample> samplesOf(const std::string& channels, const std::string& trace) {
   const Page page =
       read("<ink><traceFormat>" + channels + "</traceFormat><trace>" + trace + "</trace></ink>");
-  const Samples samples = page.traces.at(0).samples;
+  const Samples samples = page.strokes.at(0).samples;
   return {samples.begin(), samples.end()};
 }
 
@@ -56,8 +56,8 @@ std::string refusalOf(const std::string& text) {
 
 TEST(InkmlReader, ReadsXAndYWithoutATraceFormat) {
   const Page page = read("<ink><trace>1 2, 3.5 -4e1</trace></ink>");
-  ASSERT_EQ(page.traces.size(), 1u);
-  const Samples samples = page.traces[0].samples;
+  ASSERT_EQ(page.strokes.size(), 1u);
+  const Samples samples = page.strokes[0].samples;
   ASSERT_EQ(samples.size(), 2u);
   EXPECT_EQ(samples[1].x, 3.5f);
   EXPECT_EQ(samples[1].y, -40.0f);
@@ -65,8 +65,8 @@ TEST(InkmlReader, ReadsXAndYWithoutATraceFormat) {
   EXPECT_EQ(samples[1].tilt, 0.0f);
   EXPECT_EQ(samples[1].orientation, 0.0f);
   EXPECT_DOUBLE_EQ(samples[1].time, 1000.0 / 240.0);
-  EXPECT_FALSE(page.traces[0].tool);
-  EXPECT_FALSE(page.traces[0].brush.width);
+  EXPECT_FALSE(page.strokes[0].tool);
+  EXPECT_FALSE(page.strokes[0].brush.width);
 }
 
 TEST(InkmlReader, RoundsADecimalToTheNearestFloatOnce) {
@@ -166,12 +166,12 @@ TEST(InkmlReader, FindsTheFormatOfATraceThroughItsContext) {
     <i:trace>1 2</i:trace>
     <i:trace type="penUp">1 2</i:trace>
   </i:ink>)");
-  ASSERT_EQ(page.traces.size(), 5u);
+  ASSERT_EQ(page.strokes.size(), 5u);
   const float x[] = {2, 1, 2, 1, 2};
   const float pressure[] = {1, 0.5f, 1, 0.25f, 1};
-  for (std::size_t i = 0; i < page.traces.size(); ++i) {
-    EXPECT_EQ(page.traces[i].samples.at(0).x, x[i]) << i;
-    EXPECT_EQ(page.traces[i].samples.at(0).pressure, pressure[i]) << i;
+  for (std::size_t i = 0; i < page.strokes.size(); ++i) {
+    EXPECT_EQ(page.strokes[i].samples.at(0).x, x[i]) << i;
+    EXPECT_EQ(page.strokes[i].samples.at(0).pressure, pressure[i]) << i;
   }
 }
 
@@ -188,12 +188,12 @@ TEST(InkmlReader, ChoosesTheBrushNearestToTheTrace) {
     <trace>0 0</trace>
     <brush brushRef='#b'><brushProperty name='transparency' value='0'/></brush><trace>0 0</trace>
     <brush xml:id='late'><brushProperty name='color' value='#102030'/></brush><trace>0 0</trace></ink>)");
-  ASSERT_EQ(page.traces.size(), 6u);
-  for (int i = 0; i < 4; ++i) EXPECT_EQ(page.traces[i].brush.width, i + 1.0f) << i;
-  EXPECT_EQ(page.traces[4].brush.width, 4.0f);  // built on another one
-  EXPECT_EQ(page.traces[4].brush.transparency, 0);
-  EXPECT_FALSE(page.traces[5].brush.width);
-  EXPECT_EQ(page.traces[5].brush.rgb, 0x102030u);
+  ASSERT_EQ(page.strokes.size(), 6u);
+  for (int i = 0; i < 4; ++i) EXPECT_EQ(page.strokes[i].brush.width, i + 1.0f) << i;
+  EXPECT_EQ(page.strokes[4].brush.width, 4.0f);  // built on another one
+  EXPECT_EQ(page.strokes[4].brush.transparency, 0);
+  EXPECT_FALSE(page.strokes[5].brush.width);
+  EXPECT_EQ(page.strokes[5].brush.rgb, 0x102030u);
 }
 
 TEST(InkmlReader, NamesTheToolOfATraceOrItsGroup) {
@@ -201,11 +201,11 @@ TEST(InkmlReader, NamesTheToolOfATraceOrItsGroup) {
       <trace>0 0</trace><trace><annotation type="tool">mouse</annotation>0 0</trace></traceGroup>
       <trace>0 0</trace><annotation type="note">pen</annotation></traceGroup>
       <trace><annotation type="tool">pen</annotation>0 0</trace></ink>)");
-  ASSERT_EQ(page.traces.size(), 4u);
-  EXPECT_EQ(page.traces[0].tool, 1);
-  EXPECT_EQ(page.traces[1].tool, 3);
-  EXPECT_FALSE(page.traces[2].tool);
-  EXPECT_EQ(page.traces[3].tool, 2);
+  ASSERT_EQ(page.strokes.size(), 4u);
+  EXPECT_EQ(page.strokes[0].tool, 1);
+  EXPECT_EQ(page.strokes[1].tool, 3);
+  EXPECT_FALSE(page.strokes[2].tool);
+  EXPECT_EQ(page.strokes[3].tool, 2);
 }
 
 TEST(InkmlReader, ReadsTextAroundCommentsCharacterDataAndEntities) {
@@ -218,7 +218,7 @@ TEST(InkmlReader, ReadsFilesOfUtf16AndRefusesWhatIsNoFile) {
   for (const char c : std::string("<ink>\n<trace>1 2</trace></ink>")) bytes += {c, '\0'};
   const std::string path = testing::TempDir() + "qelt-utf16-" + std::to_string(getpid());
   std::ofstream(path, std::ios::binary) << bytes;
-  EXPECT_EQ(readInkmlFile(path).traces.at(0).samples.at(0).y, 2.0f);
+  EXPECT_EQ(readInkmlFile(path).strokes.at(0).samples.at(0).y, 2.0f);
   std::remove(path.c_str());
   EXPECT_THROW(readInkmlFile(testing::TempDir() + "not/there.inkml"), Refusal);
   EXPECT_THROW(readInkmlFile(testing::TempDir()), Refusal);
@@ -339,23 +339,23 @@ TEST(InkmlReader, TakesNoLongerForATraceOfALargePage) {
   const std::string ends = "<brush xml:id='end'><brushProperty name='width' value='7'/></brush>";
   EXPECT_EQ(read("<ink><context xml:id='c'>" + times(kMany, "<annotation/>") + "</context>" +
                  times(kMany, "<trace contextRef='#c'>1 2</trace>") + "</ink>")
-                .traces.size(),
+                .strokes.size(),
             20000u);
   EXPECT_EQ(read("<ink><brush xml:id='b'>" + times(kMany, "<brushProperty name='width' value='7'/>") +
                  "</brush>" + times(kMany, "<trace brushRef='#b'>1 2</trace>") + "</ink>")
-                .traces.back()
+                .strokes.back()
                 .brush.width,
             7.0f);
   const std::string traces = times(kMany, "<trace brushRef='#x0'>1 2</trace>") + "</ink>";
   EXPECT_EQ(
-      read("<ink>" + chain("brush", "brushRef", kMany, "end") + ends + traces).traces.back().brush.width,
+      read("<ink>" + chain("brush", "brushRef", kMany, "end") + ends + traces).strokes.back().brush.width,
       7.0f);
   EXPECT_EQ(refusalOf("<ink>" + chain("brush", "brushRef", kMany, "x0") + traces),
             "page.inkml:1: brushRef leads back to itself");
   const std::string inContext = "<trace contextRef='#x0'>1 2</trace>";
   EXPECT_EQ(read("<ink>" + chain("context", "contextRef", kMany, "c") + "<context xml:id='c'>" + ends +
                  "</context>" + times(kMany, inContext) + "</ink>")
-                .traces.back()
+                .strokes.back()
                 .brush.width,
             7.0f);
   EXPECT_EQ(refusalOf("<ink>" + chain("context", "contextRef", kMany, "x0") + inContext + "</ink>"),
@@ -385,7 +385,7 @@ double growthOf(const std::string& text) {
     const double before = memory("VmRSS:");
     const Page page = readInkmlFile(path);
     const double growth = (memory("VmHWM:") - before) / static_cast<double>(text.size());
-    _exit(page.traces.empty() ? 255 : static_cast<int>(growth * 10.0));
+    _exit(page.strokes.empty() ? 255 : static_cast<int>(growth * 10.0));
   }
   int status = 0;
   waitpid(child, &status, 0);
@@ -431,7 +431,7 @@ TEST(InkmlReader, TakesATextForWhatItIsWhateverItCallsItself) {
                                    std::string("<?xml version='1.0' encoding='ISO-8859-1'?><!--\xE4-->"),
                                    std::string("<?xml version='1.0' encoding='windows-1252'?><!--\x80-->"),
                                    std::string("\xEF\xBB\xBF<!DOCTYPE ink SYSTEM 'ink.dtd'>")}) {
-    EXPECT_EQ(read(start + "<ink><trace>1 2,3<!-- \n --> 4</trace></ink>").traces.at(0).samples.size(), 2u);
+    EXPECT_EQ(read(start + "<ink><trace>1 2,3<!-- \n --> 4</trace></ink>").strokes.at(0).samples.size(), 2u);
     EXPECT_EQ(refusalOf(start + "<ink><trace>1 2,&quot;3<!-- \n --> x</trace></ink>").substr(11),
               std::to_string(start[0] == '\n' ? 3 : 2) + ": not a number: x");
   }
@@ -444,10 +444,10 @@ TEST(Samples, ComeOutBitForBit) {
                                {.tilt = -0.0f, .time = 1e300},
                                {.pressure = 0.5f}};
   // Behind another trace, whose samples hold less.
-  Traces traces;
-  traces.add({{}, {}});
-  traces.add(in);
-  const Samples samples = traces.back().samples;
+  Strokes strokes;
+  strokes.add({{}, {}});
+  strokes.add(in);
+  const Samples samples = strokes.back().samples;
   ASSERT_EQ(samples.size(), in.size());
   const auto values = [](const Sample& s) {
     return std::vector<double>{s.x, s.y, s.pressure, s.tilt, s.orientation, s.time};

@@ -1,11 +1,11 @@
-#include "PageLayout.h"
+#include "play/PageLayout.h"
 
 #include <gtest/gtest.h>
 
 #include <cmath>
 
-#include "Ink.h"
 #include "base/PointF.h"
+#include "ink/Ink.h"
 
 namespace QeltDesktop {
 namespace {
@@ -22,8 +22,8 @@ void expectAt(const Qelt::PointF& point, float x, float y) {
 
 TEST(PageLayout, PutsTheExtentInsideItsMargin) {
   Page page;
-  page.traces.add({{.x = 10.0f, .y = -5.0f}, {.x = 30.0f, .y = 15.0f}});
-  page.traces.add({{.x = 50.0f, .y = 0.0f}});
+  page.strokes.add({{.x = 10.0f, .y = -5.0f}, {.x = 30.0f, .y = 15.0f}});
+  page.strokes.add({{.x = 50.0f, .y = 0.0f}});
   const float margin = pageMargin(6.0f, 2.0f);  // 16 + 2 * 6 + 2
   EXPECT_EQ(margin, 30.0f);
   const PageLayout layout = layOut(pageArea(page, {}, margin), 2.0f, 0.0f);
