@@ -151,7 +151,7 @@ std::string numberText(Number number) {
 }
 std::string backgroundName(const Background& background) {
   if (background.transparent) return "transparent";
-  return background.rgb == Background{}.rgb ? "white" : formatArgb(background.rgb);
+  return background.rgb == 0xFFFFFF ? "white" : "#" + formatArgb(background.rgb).substr(3);
 }
 
 // Option by option, in the order the help shows them.
