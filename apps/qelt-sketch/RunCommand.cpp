@@ -1,12 +1,11 @@
-#include <android/log.h>
-
 #include "Commands.h"
+#include "desktop/platform/Platform.h"
 
 namespace QeltDesktop {
 
 void runCommand(const Options& options) {
   // Standard error is for the one line that says what could not be done.
-  if (!options.log) __android_log_set_minimum_priority(ANDROID_LOG_SILENT);
+  if (!options.log) silenceLog();
   switch (options.command) {
     case Command::Draw:
       return drawCommand(options);

@@ -1,11 +1,16 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <chrono>
 #include <cmath>
+#include <future>
+#include <memory>
 #include <string>
+#include <thread>
 #include <utility>
 #include <vector>
 
+#include "desktop/gl/CallTask.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/graphics/CanvasLayer.h"
 #include "desktop/graphics/PenCanvas.h"
@@ -17,6 +22,7 @@
 #include "pencommon/PenDrawableGL.h"
 #include "pencommon/PenOutlineDrawableRT.h"
 #include "pencommon/PenStrokeDrawableRT.h"
+#include "support/LogCapture.h"
 
 namespace {
 
@@ -114,6 +120,47 @@ TEST(Drawables, PrepareAndReleaseTheirPartnerThroughAQueueThatMayRefuse) {
       }
     }
   }
+}
+
+// The queue still has work for the partner, and takes no more: then the partner goes after that work, or
+// stays where nobody could wait for it.
+TEST(Drawables, APartnerOutlivesItsWorkHoweverItsQueueEnds) {
+  const QeltTests::LogCapture log;
+  Notes notes;
+  {
+    RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::None);
+    PenDataManager manager(&queue);
+    auto drawable = std::make_unique<PlainGL>(&manager, new NotingRT(notes));
+    std::promise<void> closed;
+    // Both from the render thread: neither runs before both are posted.
+    queue.run([&] {
+      QeltDesktop::postCall(queue, [&] {
+        queue.shutDown();
+        closed.set_value();
+        std::this_thread::sleep_for(std::chrono::milliseconds(20));
+      });
+      QeltDesktop::postCall(queue, [&] { notes.push_back("drawn"); });
+    });
+    closed.get_future().wait();
+    drawable.reset();
+    EXPECT_THAT(notes, ElementsAre("drawn", "gone"));
+  }
+  notes.clear();
+  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None),
+      other(RenderQueue::Mode::Caller, RenderQueue::GL::None);
+  PenDataManager manager(&queue);
+  const std::unique_ptr<NotingRT> left(new NotingRT(notes));
+  auto drawable = std::make_unique<PlainGL>(&manager, left.get());
+  PenCanvas canvas(&queue, nullptr), others(&other, nullptr);
+  drawable->SetCanvas(&canvas);
+  QeltDesktop::postCall(queue, [&] { notes.push_back("drawn"); });
+  drawable->SetCanvas(&others);
+  EXPECT_THAT(notes, ElementsAre("drawn")) << "ahead of anything that the other canvas's queue runs";
+  QeltDesktop::postCall(queue, [&] { notes.push_back("drawn on"); });
+  queue.accept = [](const Qelt::ITask&) { return false; };
+  std::thread([&] { drawable.reset(); }).join();  // may post, and not wait
+  queue.finish();
+  EXPECT_THAT(notes, ElementsAre("drawn", "drawn on"));
 }
 
 TEST(Drawables, OutliveTheRenderThread) {

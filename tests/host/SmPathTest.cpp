@@ -236,26 +236,6 @@ TEST(SmPath, APathWithoutLengthHasOnePosition) {
   EXPECT_FALSE(path.getPosTan(1e-6f, &at, nullptr));
 }
 
-TEST(SmPath, MeasuresTheContourThatWasAskedFor) {
-  SmPath path;
-  path.moveTo(0, 0);
-  path.lineTo(1, 0);
-  path.moveTo(10, 10);
-  path.lineTo(10, 15);
-  path.resetPath(1);
-  EXPECT_EQ(path.getLength(), 5.0f);
-  SmPoint at;
-  ASSERT_TRUE(path.getPosTan(2.0f, &at, nullptr));
-  EXPECT_EQ(at.x, 10.0f);
-  EXPECT_EQ(at.y, 12.0f);
-  path.resetPath(0);
-  EXPECT_EQ(path.getLength(), 1.0f);
-  for (const int missing : {2, -1}) {
-    path.resetPath(missing);
-    EXPECT_FALSE(path.getPosTan(0.0f, &at, nullptr));
-  }
-}
-
 TEST(SmPath, CoordinatesThatAreNoNumbersAreNoWay) {
   for (const float bad : {kNaN, kInfinity, -kInfinity}) {
     for (int place = 0; place < 6; ++place) {

@@ -5,6 +5,7 @@
 #include <functional>
 #include <new>
 #include <stdexcept>
+#include <vector>
 
 #include "CallRecorder.h"
 #include "Ink.h"
@@ -24,10 +25,11 @@ namespace {
 using QeltDesktop::Batch;
 using QeltDesktop::RenderQueue;
 
-// Draws a zigzag of 200 far points, 40 MB of vertices in all, in a queue that runs nothing by itself.
-void drawZigzag() {
+// Draws a zigzag of far points, 200 of which make 40 MB of vertices, in a queue that runs nothing by itself.
+std::vector<std::uint8_t> drawZigzag(int points = 200,
+                                     const std::function<void(RenderQueue&)>& prepare = {}) {
   QeltDesktop::Page page;
-  for (int i = 0; i < 200; ++i) {
+  for (int i = 0; i < points; ++i) {
     page.traces.addSample({.x = i % 2 == 0 ? 0.0f : 600.0f, .y = static_cast<float>(i), .time = 4.0 * i});
   }
   page.traces.finishTrace(QeltDesktop::kNoNumber, {});
@@ -35,8 +37,13 @@ void drawZigzag() {
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
   QeltDesktop::Progress progress("drawing stroke", 1);
   QeltDesktop::Options options;
-  QeltDesktop::drawPage(plugin, queue, page, options, QeltDesktop::layOut({0, 0, 32, 32}, 1, 0),
-                        drawablesFor(options), progress);
+  if (prepare) {
+    options.outline = {2.0f, 0xFF0000FFu};
+    prepare(queue);
+  }
+  return QeltDesktop::drawPage(plugin, queue, page, options, QeltDesktop::layOut({0, 0, 32, 32}, 1, 0),
+                               drawablesFor(options), progress)
+      .rgba;
 }
 
 TEST(PageDrawing, IsOnlySoFarAheadOfTheRenderThread) {
@@ -58,6 +65,27 @@ TEST(PageDrawing, OfWhichSomethingWasLostIsNoPicture) {
   QeltDesktop::setBatchObserver([](const Batch&) { throw std::runtime_error("lost"); });
   EXPECT_THROW(drawZigzag(), std::runtime_error);
   QeltDesktop::setBatchObserver({});
+}
+
+TEST(PageDrawing, StartsAgainWhereTheContextIsLost) {
+  int posts = 0;
+  const auto lostAhead = [&posts](int number) {
+    return [&posts, number](RenderQueue& queue) {
+      posts = 0;
+      queue.accept = [&](const Qelt::ITask&) {
+        if (++posts == number) {
+          queue.loseContext();
+          queue.restoreContext();
+        }
+        return true;
+      };
+    };
+  };
+  const std::vector<std::uint8_t> whole = drawZigzag(12, lostAhead(0));
+  const int all = posts;
+  for (const int number : {1, all / 2, all})
+    EXPECT_TRUE(drawZigzag(12, lostAhead(number)) == whole) << number;
+  EXPECT_NE(whole, std::vector<std::uint8_t>(whole.size(), 255));
 }
 
 TEST(CallRecorder, LeavesNoCallWithoutItsBatches) {

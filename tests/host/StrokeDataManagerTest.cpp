@@ -23,7 +23,7 @@ PenStrokePointData* pointsOf(std::vector<float> floats) {
   return points;
 }
 
-class StrokeCache : public testing::Test {
+class StrokeDataManager : public testing::Test {
  protected:
   void SetUp() override { manager.SetInverseScale({1.0f, 1.0f}); }
   void TearDown() override { manager.DropStrokeData(kHandle); }
@@ -32,7 +32,7 @@ class StrokeCache : public testing::Test {
   PenStrokeDataManager& manager = *PenStrokeDataManager::GetInstance();
 };
 
-TEST_F(StrokeCache, OnlyThePageMakesEntriesAndPointsNeedABuffer) {
+TEST_F(StrokeDataManager, OnlyThePageMakesEntriesAndPointsNeedABuffer) {
   EXPECT_EQ(manager.GetStrokeData(kHandle), nullptr);
   manager.ReleaseStrokeData(kHandle);
   manager.CreateStrokeData(kHandle);
@@ -49,7 +49,7 @@ TEST_F(StrokeCache, OnlyThePageMakesEntriesAndPointsNeedABuffer) {
 }
 
 // Under AddressSanitizer this is the test that the last use frees, and no sooner.
-TEST_F(StrokeCache, ADroppedEntryGoesWithItsLastUseAndOneMadeAnewMeanwhileIsEmpty) {
+TEST_F(StrokeDataManager, ADroppedEntryGoesWithItsLastUseAndOneMadeAnewMeanwhileIsEmpty) {
   for (const bool isMadeAnew : {false, true}) {
     manager.CreateStrokeData(kHandle);
     PenStrokeData* const data = manager.GetStrokeData(kHandle);
@@ -73,7 +73,7 @@ TEST_F(StrokeCache, ADroppedEntryGoesWithItsLastUseAndOneMadeAnewMeanwhileIsEmpt
 }
 
 // That is the canvas that a pen asked for its matrix last, not the one that was made or moved last.
-TEST_F(StrokeCache, PointsRecordTheScaleOfTheViewThatTheyWereStoredIn) {
+TEST_F(StrokeDataManager, PointsRecordTheScaleOfTheViewThatTheyWereStoredIn) {
   QeltDesktop::PenCanvas canvas(nullptr, nullptr);
   Qelt::Matrix3<float> zoom;
   zoom.setScale(4.0f, 2.0f);
