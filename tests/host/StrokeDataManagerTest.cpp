@@ -1,14 +1,11 @@
 #include <gtest/gtest.h>
 
 #include <limits>
-#include <memory>
 #include <vector>
 
 #include "base/RefCount.h"
 #include "desktop/graphics/PenCanvas.h"
-#include "desktop/model/StoredStroke.h"
 #include "math/Matrix3.h"
-#include "model/ObjectBase.h"
 #include "pencommon/PenStrokeDataManager.h"
 
 namespace {
@@ -31,22 +28,6 @@ class StrokeDataManager : public testing::Test {
   static constexpr int kHandle = 1 << 30;  // no living object's
   PenStrokeDataManager& manager = *PenStrokeDataManager::GetInstance();
 };
-
-TEST_F(StrokeDataManager, OnlyThePageMakesEntriesAndPointsNeedABuffer) {
-  EXPECT_EQ(manager.GetStrokeData(kHandle), nullptr);
-  manager.ReleaseStrokeData(kHandle);
-  manager.CreateStrokeData(kHandle);
-  PenStrokeData* const data = manager.GetStrokeData(kHandle);
-  ASSERT_NE(data, nullptr);
-  manager.CreateStrokeData(kHandle);
-  EXPECT_EQ(manager.GetStrokeData(kHandle), data);
-  auto* const empty = new PenStrokePointData;
-  EXPECT_FALSE(data->SetPointData(empty));
-  EXPECT_EQ(data->GetPointData(), nullptr);
-  empty->Unref();
-  manager.ReleaseStrokeData(kHandle);
-  manager.ReleaseStrokeData(kHandle);
-}
 
 // Under AddressSanitizer this is the test that the last use frees, and no sooner.
 TEST_F(StrokeDataManager, ADroppedEntryGoesWithItsLastUseAndOneMadeAnewMeanwhileIsEmpty) {
@@ -93,16 +74,6 @@ TEST_F(StrokeDataManager, PointsRecordTheScaleOfTheViewThatTheyWereStoredIn) {
   constexpr float kInfinity = std::numeric_limits<float>::infinity();
   EXPECT_FALSE(points->hasSameInverseScale({kInfinity, kInfinity}));
   points->Unref();
-}
-
-TEST(PageObjects, AreFoundByHandleWhileTheyLive) {
-  auto stroke = std::make_unique<QeltDesktop::StoredStroke>(2);
-  const int handle = stroke->GetRuntimeHandle();
-  const QeltDesktop::StoredStroke other(1);
-  EXPECT_NE(other.GetRuntimeHandle(), handle);
-  EXPECT_EQ(Qelt::ObjectBase::FindObjectBase(handle), stroke.get());
-  stroke.reset();
-  EXPECT_EQ(Qelt::ObjectBase::FindObjectBase(handle), nullptr);
 }
 
 }  // namespace
