@@ -44,8 +44,9 @@ struct Code {
   }
 };
 
-constexpr const char* kHostNames[] = {"libQeltBase.so", "libQeltModel.so",    "libQeltEngine.so",
-                                      "libQeltGL.so",   "libQeltGraphics.so", "libQeltPenCommon.so"};
+constexpr const char* kHostNames[] = {"libQeltPlatform.so", "libQeltBase.so", "libQeltModel.so",
+                                      "libQeltEngine.so",   "libQeltGL.so",   "libQeltGraphics.so",
+                                      "libQeltPenCommon.so"};
 Code plugIn, standardLibrary, hosts[std::size(kHostNames)];
 std::atomic<long> blocks{0}, ownBlocks{0}, hostsBlocks{0}, ownAllocations{0}, watched{0},
     deletionsOfNothing{0}, thrown{0};

@@ -1,6 +1,5 @@
-// The GL context goes and comes back, twice, between any two tasks of the render thread: the picture at the
-// end is the one drawn without it. It goes before any task and comes back before a later one: what is drawn
-// from there on is what is drawn without.
+// The GL context goes and comes back, at once or later, between any two tasks of the render thread. The layer
+// comes back empty, and from there on it is drawn into as into one that was cleared there.
 
 #include <gtest/gtest.h>
 
@@ -51,46 +50,45 @@ class ContextLoss : public testing::TestWithParam<Case> {
     return mLayer.readPixels();
   }
 
+  const Call mClear = [this] { mLayer.clear(); };
   const Call mLose = [this] { mQueue.loseContext(); };
+  const Call mRestore = [this] {
+    const int before = mLayer.timesEmptied();
+    mQueue.restoreContext();
+    EXPECT_EQ(mLayer.timesEmptied(), before + 1);
+    EXPECT_TRUE(mLayer.readPixels() == mEmpty);
+  };
   const Call mLoseTwice = [this] {
     for (int i = 0; i < 2; ++i) {
-      mQueue.loseContext();
-      mQueue.restoreContext();
+      mLose();
+      mRestore();
     }
-  };
-  const Call mRestoreAndWipe = [this] {
-    mQueue.restoreContext();
-    mLayer.clear();
   };
   LogCapture mLog;
   RenderQueue mQueue{RenderQueue::Mode::Caller, RenderQueue::GL::Context};
   QeltDesktop::CanvasLayer mLayer{mQueue, 160, 120, 128};
+  const std::vector<std::uint8_t> mEmpty = mLayer.readPixels();
   long mPosts = 0;
 };
 
-TEST_P(ContextLoss, LeavesThePictureAsItIsWithout) {
-  const std::vector<std::uint8_t> expected = picture({});
+TEST_P(ContextLoss, EmptiesTheLayerAndSparesWhatIsDrawnAfterwards) {
+  const std::vector<std::uint8_t> whole = picture({});
   const long posts = mPosts;
-  ASSERT_NE(expected, std::vector<std::uint8_t>(expected.size())) << "nothing was drawn";
-  for (long number = 1; number <= posts; ++number) {
-    EXPECT_TRUE(picture({{number, mLoseTwice}}) == expected)
-        << "loss before task " << number << " of " << posts;
-  }
-  RecordProperty("losses", static_cast<int>(2 * posts));
-}
-
-TEST_P(ContextLoss, ForAWhileSparesWhatComesAfterwards) {
-  picture({});
-  const long posts = mPosts;
+  ASSERT_NE(whole, mEmpty) << "nothing was drawn";
   int losses = 0;
-  for (long back = 2; back <= posts; ++back) {
-    const std::vector<std::uint8_t> expected = picture({{back, mRestoreAndWipe}});
+  for (long back = 1; back <= posts; ++back) {
+    const std::vector<std::uint8_t> expected = picture({{back, mClear}});
+    EXPECT_TRUE(picture({{back, mLoseTwice}}) == expected) << "lost before task " << back << " of " << posts;
+    losses += 2;
     for (const long lost : std::set<long>{1, std::max(back - 4, 1l)}) {
-      EXPECT_TRUE(picture({{lost, mLose}, {back, mRestoreAndWipe}}) == expected)
+      if (lost == back) continue;
+      EXPECT_TRUE(picture({{lost, mLose}, {back, mRestore}}) == expected)
           << "lost before task " << lost << ", back before task " << back << " of " << posts;
       ++losses;
     }
   }
+  EXPECT_TRUE(picture({{1, mLose}}) == mEmpty) << "lost for good";
+  EXPECT_TRUE(picture({}) == whole) << "drawn again";
   RecordProperty("losses", losses);
 }
 

@@ -65,32 +65,5 @@ TEST(Picture, HasTheStrokeOnItsLineAndNothingElse) {
   }
 }
 
-TEST(Picture, SurvivesTheLossOfTheContextAndThePensDeathInTheMiddleOfAStroke) {
-  LiveStroke stroke({.picture = true});
-  drawWave(stroke, 40.3f, 60.7f);
-  const Pixels before = stroke.pixels();
-  stroke.queue.loseContext();
-  stroke.queue.restoreContext();
-  EXPECT_EQ(stroke.pixels(), before);
-  drawWave(stroke, 40.3f, 160.7f);
-  Pixels after = stroke.pixels();
-  // The second wave, 100 further down, looks like the first: pattern textures are there again.
-  int firstInk = 0, secondInk = 0;
-  for (int y = 40; y < 90; ++y) {
-    for (int x = 0; x < kSide; ++x) {
-      firstInk += alphaAt(after, x, y);
-      secondInk += alphaAt(after, x, y + 100);
-    }
-  }
-  EXPECT_GT(firstInk, 10000);
-  EXPECT_NEAR(secondInk, firstInk, firstInk / 50);
-
-  stroke.layer->clear();
-  stroke.down({40, 40});
-  stroke.move({{60, 60}, {90, 90}});
-  stroke.deletePen();
-  EXPECT_GT(alphaAt(stroke.pixels(), 60, 60), 0);
-}
-
 }  // namespace
 }  // namespace QeltTests

