@@ -19,7 +19,6 @@
 #include "pencommon/PenPreviewDrawableGL.h"
 #include "pencommon/PenStrokeDataManager.h"
 #include "support/BatchCheck.h"
-#include "support/HostFaults.h"
 
 namespace QeltTests {
 
@@ -114,7 +113,7 @@ void PenWorld::step(FuzzInput& input) {
     pen.reset(mLibrary.createPen());
     if (pen == nullptr) breakOff("a pen", "no pen");
     pen->setPenDataManager(&mData);
-    pen->setVersion(8);
+    pen->setVersion(Qelt::kRenderingVersions.back().number);
     mSizes[which] = pen->GetSize();
   }
   // What comes more often stands there more often.
@@ -152,7 +151,7 @@ void PenWorld::change(FuzzInput& input, Qelt::Pen& pen) {
       [&] { pen.SetSize(input.any()); },
       [&] { pen.SetSize(0.5f + std::abs(input.usual())); },
       [&] { pen.SetColor(input.word()); },
-      [&] { pen.setVersion(input.flag() ? 1 + input.pick(8) : input.word()); },
+      [&] { pen.setVersion(input.flag() ? 1 + input.pick(static_cast<int>(Qelt::kRenderingVersions.size())) : input.word()); },
       [&] { morphing.SetCurveEnabled(input.flag()); },
       [&] {
         morphing.SetFixedWidthEnabled(input.flag());

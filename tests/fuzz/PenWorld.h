@@ -18,7 +18,7 @@
 #include "model/ObjectStroke.h"
 #include "pencommon/Pen.h"
 #include "pencommon/PenStrokeDrawableGL.h"
-#include "support/StageCanvas.h"
+#include "support/FaultyCanvas.h"
 
 namespace QeltTests {
 
@@ -68,7 +68,7 @@ class PenWorld {
 
   const QeltDesktop::PluginLibrary& mLibrary;
   QeltDesktop::RenderQueue& mQueue;
-  StageCanvas mCanvas, mOther;
+  FaultyCanvas mCanvas, mOther;
   QeltDesktop::PenCanvas mBlank;  // has no layer at all
   QeltDesktop::PenDataManager mData, mQueueless;
   std::unique_ptr<Qelt::Pen> mPens[2];

@@ -96,12 +96,4 @@ TEST(Exports, TheLibraryCarriesItsPlainNameAndNeedsOnlyTheHostAndTheRuntime) {
       testing::IsEmpty());
 }
 
-TEST(Exports, TheVersionTablePairsStrokesAndOutlines) {
-  const QeltDesktop::PluginLibrary library(QELT_PLUGIN_PATH);
-  const auto* table = static_cast<const std::int32_t*>(library.symbol("versionTable"));
-  ASSERT_NE(table, nullptr);
-  const std::vector<std::int32_t> pairs(table, table + 18);
-  EXPECT_THAT(pairs, testing::ElementsAre(0, 0, 1, 1, 2, 2, 3, 3, 4, 4, 5, 5, 6, 4, 7, 4, 8, 4));
-}
-
 }  // namespace

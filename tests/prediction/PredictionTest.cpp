@@ -71,27 +71,6 @@ TEST(Prediction, GoesOnFromTheLastStampWithItsLooks) {
               ElementsAre("SetStartPoint", "SetPenData", "SetRect", "Batch", "Render", "DeleteBatch"));
 }
 
-TEST(Prediction, EndsAtTheLastSampleAndPassesTheOthersHalfWay) {
-  PredictionBoard board;
-  leaveStroke(board.shared);
-  // 10 to 25 through 20; 25 to 35 through 30; 35 to 50.2 through 40.
-  EXPECT_TRUE(board.move({{30.0f, 0.0f}, {40.0f, 0.0f}, {50.2f, 0.0f}}));
-  std::vector<Stamp> placed = board.takeStamps();
-  ASSERT_THAT(placed, SizeIs(40));
-  EXPECT_THAT(placed.back(), StampNear(50.0f, 0.0f, 0.05f));
-  // A sample that is nowhere is left out.
-  leaveStroke(board.shared);
-  board.move({{30.0f, 0.0f}, {kNaN, 0.0f}, {40.0f, -kInfinity}, {40.0f, 0.0f}, {50.2f, 0.0f}});
-  EXPECT_EQ(board.takeStamps().size(), placed.size());
-  // Left and right of the way the same: the path bends towards each sample.
-  leaveStroke(board.shared);
-  board.move({{30.0f, 10.0f}});
-  for (const Stamp& stamp : board.takeStamps()) {
-    EXPECT_LE(stamp.y, 10.0f);
-    EXPECT_GE(stamp.y, 0.0f);
-  }
-}
-
 TEST(Prediction, EveryStateOfTheLiveStrokeIsPredictedFromOnce) {
   PredictionBoard board;
   EXPECT_FALSE(board.move({{30.0f, 0.0f}}));  // no stroke yet

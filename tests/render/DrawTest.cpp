@@ -1,4 +1,3 @@
-#include <dlfcn.h>
 #include <gmock/gmock.h>
 
 #include <algorithm>
@@ -6,11 +5,9 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstdlib>
-#include <stdexcept>
 #include <string>
 #include <vector>
 
-#include "gl/OpenGLRenderer.h"
 #include "math/Matrix4.h"
 #include "pen/DrawableFactory.h"
 #include "prediction/Pencil2PredictionDrawableRT.h"
@@ -18,7 +15,6 @@
 #include "render/Pencil2StrokeDrawableRTV2.h"
 #include "render/Pencil2StrokeDrawableRTV3.h"
 #include "support/DrawableBoard.h"
-#include "support/FakeLayer.h"
 #include "support/StampPicture.h"
 #include "support/Stamps.h"
 
@@ -29,8 +25,6 @@ namespace {
 
 using namespace Qelt;
 using QeltDesktop::RenderQueue;
-
-int viewportQueries = 0;
 
 constexpr int kSide = 256;
 
@@ -142,69 +136,6 @@ TEST_P(Draw, InksInThePensColour) {
   }
 }
 
-TEST_P(Draw, GoesOnAfterTheContextIsLostAndRestored) {
-  const std::vector<Sample> samples = wave(kLeft, kTop);
-  DrawingBoard board(paper(GetParam()));
-  board.stroke(samples);
-  const Picture undisturbed = board.pixels();
-  board.layer->clear();
-  board.down(samples.front());
-  board.move({samples.begin() + 1, samples.begin() + 12});
-  board.queue.loseContext();
-  board.move({samples.begin() + 12, samples.end()});  // no context: what was posted draws nothing
-  board.queue.finish();
-  board.queue.restoreContext();
-  const int inkedBefore = inked(board.pixels());
-  EXPECT_GT(inkedBefore, 100);
-  EXPECT_LT(inkedBefore, inked(undisturbed));
-
-  // What is drawn from now on looks as ever.
-  board.layer->clear();
-  board.stroke(samples);
-  EXPECT_EQ(differing(undisturbed, board.pixels()), 0);
-}
-
-// Textures, program and buffer are made while there is no context; all of them come with it.
-TEST_P(Draw, WhatWasPreparedWithoutAContextDrawsOnceThereIsOne) {
-  const std::vector<Sample> samples = wave(kLeft, kTop);
-  DrawingBoard board(paper(GetParam()));
-  board.stroke(samples);
-  const Picture undisturbed = board.pixels();
-  for (const bool begins : {false, true}) {
-    board.deleteDrawable();
-    board.layer->clear();
-    board.queue.loseContext();
-    board.drawable.reset(createStrokeDrawable(GetParam(), &board.shared, &board.data));
-    board.drawable->SetCanvas(&board.canvas);
-    if (begins) board.stroke({samples.begin(), samples.begin() + 12});
-    board.queue.finish();
-    board.queue.restoreContext();
-    board.stroke(samples);
-    EXPECT_EQ(differing(undisturbed, board.pixels()), 0) << (begins ? "drawn with meanwhile" : "only made");
-  }
-}
-
-// The start point cannot be found in the window while there is none; it waits for the first tile that is
-// drawn.
-TEST_P(Draw, AStrokeBegunWithoutAContextHasItsOwnGrain) {
-  const std::vector<Sample> samples = wave(kLeft, kTop);
-  const auto secondHalf = [&](bool loses) {
-    DrawingBoard board(paper(GetParam()));
-    board.queue.finish();
-    if (loses) board.queue.loseContext();
-    board.down(samples.front());
-    board.move({samples.begin() + 1, samples.begin() + 12});
-    board.queue.finish();
-    if (loses) board.queue.restoreContext();
-    board.layer->clear();
-    board.move({samples.begin() + 12, samples.end()});
-    return board.pixels();
-  };
-  const Picture expected = secondHalf(false);
-  EXPECT_GT(inked(expected), 300);
-  EXPECT_EQ(differing(secondHalf(true), expected), 0);
-}
-
 // Kept: the grain's size is what the diagonal of a 150-unit square spans in x and in y, which a rotation
 // makes unequal. By 30 degrees: (cos - sin) * 150 / 2 and (sin + cos) * 150 / 2.
 TEST(GrainSize, UnderARotationIsWhatTheDiagonalSpans) {
@@ -219,150 +150,6 @@ TEST(GrainSize, UnderARotationIsWhatTheDiagonalSpans) {
 
 INSTANTIATE_TEST_SUITE_P(RenderVersions, Draw, testing::Values(1, 7, 8),
                          [](const auto& version) { return "Version" + std::to_string(version.param); });
-
-// --- The render drawable by itself ---
-
-class RenderDrawable : public testing::Test {
- protected:
-  RenderDrawable() {
-    queue.run([this] { drawable.Init(); });
-  }
-  ~RenderDrawable() override {
-    queue.run([this] { drawable.Release(); });
-  }
-
-  // A batch of one stamp of half width 20 in the middle of (x, 128).
-  std::vector<float> stampAt(float x) {
-    std::vector<float> batch;
-    const Vector2<float> stamp[2] = {{x, 128.37f}, {0.0f, 1.0f}};
-    drawable.SetInverseScale({1.0f, 1.0f});
-    drawable.SetBuffer(&batch);
-    drawable.AddPoint(stamp, 20.0f, 1.0f, 0.0f, 0);
-    drawable.AddPoint({1.0f, 1.0f}, 5.0f);  // the host's own operation does nothing
-    drawable.SetBuffer(nullptr);
-    EXPECT_THAT(batch, BatchOf(1, 11));
-    return batch;
-  }
-  // What was handed over, or the cached batch.
-  void drawAll(bool useCache = false) {
-    drawable.Update(useCache);
-    ISPBitmap* const bitmap = layer.GetBitmap();
-    for (int i = 0; i < bitmap->GetTileCount(); ++i) drawable.Draw(bitmap->GetSubBitmap(i), identity);
-  }
-  // The picture of one batch alone.
-  Picture pictureOf(std::vector<float>& batch) {
-    layer.clear();
-    queue.run([&] {
-      drawable.SetPenData(9.0f, static_cast<int>(0xFF000000u));
-      drawable.SetStartPoint(60.37f, 128.37f);
-      drawable.SendDataToGPU(&batch);
-      drawAll();
-      drawable.Clear();
-    });
-    return layer.readPixels();
-  }
-
-  RenderQueue queue{RenderQueue::Mode::Caller, RenderQueue::GL::Context};
-  QeltDesktop::CanvasLayer layer{queue, kSide, kSide, 64};
-  QeltDesktop::PenDataManager data{&queue};
-  Pencil2StrokeDrawableRTV3 drawable{&data};
-  Matrix4<float> identity;
-};
-
-TEST_F(RenderDrawable, DrawsTheBufferThatItsUpdateChose) {
-  std::vector<float> live = stampAt(60.37f), cached = stampAt(190.37f);
-  const Picture ofLive = pictureOf(live);
-  EXPECT_GT(inked(ofLive), 500);
-  EXPECT_EQ(alphaAt(ofLive, 190, 120), 0);
-  // Cleared: emptied and its room kept.
-  EXPECT_TRUE(live.empty());
-  EXPECT_GE(live.capacity(), 66u);
-
-  live = stampAt(60.37f);
-  layer.clear();
-  queue.run([&] {
-    drawable.SendDataToGPU(&live);
-    drawable.SetCacheBuffer(&cached);
-    drawAll(true);
-  });
-  const Picture ofCached = layer.readPixels();
-  EXPECT_GT(inked(ofCached), 500);
-  EXPECT_EQ(alphaAt(ofCached, 60, 120), 0);
-
-  layer.clear();
-  queue.run([&] {
-    drawable.Clear();
-    drawAll();  // forgotten
-  });
-  EXPECT_EQ(inked(layer.readPixels()), 0);
-  EXPECT_EQ(cached.size(), 66u);
-}
-
-// The window pixel of the start point: tiles are windows into one framebuffer, so it is the same in every
-// tile, and the first one drawn settles it. A zoom afterwards changes nothing.
-TEST_F(RenderDrawable, SettlesTheGrainOriginWithTheFirstTileDrawn) {
-  std::vector<float> live = stampAt(60.37f);
-  queue.run([&] {
-    const int before = viewportQueries;
-    drawable.SetStartPoint(60.25f, 130.5f);
-    drawable.SendDataToGPU(&live);
-    drawable.Update(false);
-    EXPECT_EQ(drawable.grainOrigin().x, 60.25f);  // still in stroke units
-    Matrix4<float> twice;
-    twice[0] = twice[5] = 2.0f;
-    drawable.Draw(layer.GetBitmap()->GetSubBitmap(6), twice);
-    EXPECT_NEAR(drawable.grainOrigin().x, 120.5f, 1e-3f);
-    EXPECT_NEAR(drawable.grainOrigin().y, 261.0f, 1e-3f);
-    drawable.Draw(layer.GetBitmap()->GetSubBitmap(1), identity);
-    EXPECT_NEAR(drawable.grainOrigin().x, 120.5f, 1e-3f);
-    EXPECT_EQ(viewportQueries - before, 1);  // by the first tile alone
-    drawable.Clear();
-  });
-}
-
-// A tile that the host fails on is ended all the same.
-TEST_F(RenderDrawable, EndsTheTileThatAnExceptionLeaves) {
-  struct Tile : FakeTile {
-    using FakeTile::FakeTile;
-    const Matrix4<float>& GetProjection() const override { throw std::runtime_error("out of the host"); }
-    void BeginRender(int) override { ++begun; }
-    void EndRender(int) override { --begun; }
-    int begun = 0;
-  } tile(0);
-  std::vector<float> live = stampAt(60.37f);
-  queue.run([&] {
-    drawable.SendDataToGPU(&live);
-    drawable.Update(false);
-    EXPECT_THROW(drawable.Draw(&tile, identity), std::runtime_error);
-    drawable.Clear();
-  });
-  EXPECT_EQ(tile.begun, 0);
-}
-
-TEST_F(RenderDrawable, DrawsNothingWithoutATileOrABatchOrOnceReleased) {
-  std::vector<float> live = stampAt(60.37f), empty;
-  queue.run([&] {
-    drawable.SendDataToGPU(&live);
-    drawable.Update(false);
-    drawable.Draw(nullptr, identity);
-    drawable.SendDataToGPU(&empty);
-    drawAll();
-    drawable.Clear();
-    drawAll(true);
-  });
-  EXPECT_EQ(inked(layer.readPixels()), 0);
-
-  queue.run([&] {
-    drawable.CreatePenCanvas(1, 1, nullptr);  // ready already
-    drawable.Release();
-    drawable.Release();
-  });
-  for (int i = 0; i < 2; ++i) {
-    live = stampAt(60.37f);
-    EXPECT_EQ(inked(pictureOf(live)), 0);
-    queue.run([&] { drawable.Init(); });
-  }
-}
 
 // Stamps of 100 x 100 units, each texel on pixels of its own: grain, mask, shade, and where a vertex has them
 // the rim and the dimming of thin stamps. `look` is that at zoom 1; a stroke's grain is paper, not screen: it
@@ -418,12 +205,3 @@ TEST(StampPicturesTest, AreAsWorkedOutFragmentByFragment) {
 
 }  // namespace
 }  // namespace QeltTests
-
-// Stands before the host's own, to count.
-Qelt::Vector4<int> Qelt::OpenGLRenderer::getViewport() {
-  using Query = Qelt::Vector4<int> (*)();
-  static const auto query =
-      reinterpret_cast<Query>(dlsym(RTLD_NEXT, "_ZN4Qelt14OpenGLRenderer11getViewportEv"));
-  ++QeltTests::viewportQueries;
-  return query();
-}

@@ -3,18 +3,14 @@
 #include <string>
 #include <typeinfo>
 
-#include "base/Vector.h"
 #include "desktop/gl/RenderQueue.h"
 #include "gl/OpenGLShaderProgram.h"
 #include "gl/ShaderManager.h"
-#include "math/Matrix4.h"
 #include "shaders/Exceptions.h"
-#include "shaders/ParameterBinding.h"
-#include "shaders/Pencil2StrokeShaderV1.h"
 #include "shaders/ShaderProgram.h"
 #include "shaders/ShaderRegistry.h"
 #include "shaders/StampUniforms.h"
-#include "support/Allocations.h"
+#include "support/AllocationGate.h"
 #include "support/LogCapture.h"
 
 namespace QeltTests {
@@ -100,52 +96,6 @@ TEST(ShaderRegistryTest, ReportsMisuseAndLeavesTheRegisteredOneAlone) {
 
 // --- Uniforms ---
 
-// A program with one uniform whose type the host does not tell.
-class FakeProgram : public OpenGLShaderProgram, public IParameterBinding {
- public:
-  void activate() override {}
-  IParameterBinding* getBindingIntf(const char* name, int) override {
-    return name != missing ? this : nullptr;
-  }
-  BindingType getType() const override { return kBindingAny; }
-  void set(const Matrix4<float>&) override { FAIL(); }
-  void set(const Vector2<float>&) override { FAIL(); }
-  void set(const Vector4<float>&) override { FAIL(); }
-  void set(float value) override { last = value; }
-  void set(int) override { FAIL(); }
-  void release() override { ++releases; }
-
-  float last = 0.0f;
-  int releases = 0;
-  std::string missing;
-};
-
-TEST(ParameterBindingTest, TakesAHostThatTellsNoTypeAtItsWordAndGivesTheInterfaceBack) {
-  FakeProgram program;
-  {
-    ParameterBinding<kBindingFloat> binding;
-    binding.bind(&program, "uniform");
-    binding = 1.5f;
-    EXPECT_EQ(program.last, 1.5f);
-    EXPECT_EQ(program.releases, 0);
-  }
-  EXPECT_EQ(program.releases, 1);
-}
-
-struct FakeStampShader : StampUniforms {
-  bool bindTo(FakeProgram& program) { return bind(&program); }
-};
-
-// Were it drawn with, the unbound one would throw in the middle of a tile.
-TEST(StampUniformsTest, AreOnlyBoundWhenAllOfThemAre) {
-  FakeProgram program;
-  EXPECT_TRUE(FakeStampShader().bindTo(program));
-  for (const char* name : {"ProjectionMatrix", "sampler1", "textureWidth"}) {
-    program.missing = name;
-    EXPECT_FALSE(FakeStampShader().bindTo(program)) << name;
-  }
-}
-
 // A stamp shader whose colour has no alpha.
 constexpr char kVertex[] = R"(#version 300 es
 layout(location = 0) in vec4 position;
@@ -180,18 +130,10 @@ TEST(StampShaderTest, WithAUniformOfAnotherTypeIsNotRegisteredAndLeaksNothing) {
           ThrowsMessage<InvalidArgumentException>("ParameterBinding<>::bind - invalid parameter type!"));
       EXPECT_THAT(log.take(),
                   Contains(Field(&LogLine::text, MatchesRegex("inputColor: Found .* but given 6"))));
-      alive = liveAllocations();
+      alive = AllocationGate::allBlocks();
     }
     EXPECT_EQ(after[1], after[0]);
   });
-}
-
-TEST(StampShaderTest, WithoutGLIsNotLinkedAndRefusesValues) {
-  const LogCapture log;
-  Pencil2StrokeShaderV1 shader;
-  EXPECT_FALSE(shader.isLinked());
-  EXPECT_THAT([&] { shader.sampler0 = 0; }, ThrowsMessage<NotSupportedException>(
-                                                "ParameterBinding: internal interface is not initialized!"));
 }
 
 }  // namespace

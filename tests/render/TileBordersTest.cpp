@@ -88,7 +88,7 @@ class BoundlessTile : public FakeTile {
 // A view of a layer that draws into all its tiles, whatever a call reports.
 class BoundlessCanvas : public QeltDesktop::PenCanvas {
  public:
-  explicit BoundlessCanvas(Board& board) : PenCanvas(&board.queue, board.layer.get()) {
+  explicit BoundlessCanvas(Board& board) : PenCanvas(&board.queue, board.layer) {
     Qelt::ISPBitmap& bitmap = *board.layer->GetBitmap();
     for (int i = 0; i < bitmap.GetTileCount(); ++i) mLayer.tiles.emplace_back(*bitmap.GetSubBitmap(i));
   }

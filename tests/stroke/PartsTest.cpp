@@ -46,14 +46,6 @@ MoveFilter filter(float minimumMove, float skipDistance) {
   return moves;
 }
 
-TEST(MoveFilterTest, DropsWhatIsShorterThanTheMinimum) {
-  MoveFilter moves = filter(2.0f, 2.0f);
-  EXPECT_FALSE(moves.accepts(kOrigin, {1.9f, 0.0f}));
-  EXPECT_FALSE(moves.accepts(kOrigin, kOrigin));
-  EXPECT_TRUE(moves.accepts(kOrigin, {2.0f, 0.0f}));
-  EXPECT_TRUE(moves.accepts(kOrigin, {1.5f, 1.5f}));  // 2.12 away
-}
-
 // Each move from the origin along x, and whether it is taken.
 TEST(MoveFilterTest, TakesShortMovesEveryOtherTimeBeginningWithTheSecond) {
   MoveFilter moves = filter(2.0f, 20.0f);
@@ -64,38 +56,6 @@ TEST(MoveFilterTest, TakesShortMovesEveryOtherTimeBeginningWithTheSecond) {
   for (const auto& [x, taken] : cases) EXPECT_EQ(moves.accepts(kOrigin, {x, 0.0f}), taken) << x;
   moves.restart(20.0f);  // as each stroke does
   EXPECT_FALSE(moves.accepts(kOrigin, {5.0f, 0.0f}));
-}
-
-TEST(MoveFilterTest, MeasuresDistancesWhoseSquaresOverflow) {
-  EXPECT_FLOAT_EQ(distanceBetween({-3e19f, 0.0f}, {0.0f, 4e19f}), 5e19f);
-  EXPECT_EQ(distanceBetween({0.0f, 0.0f}, {3.0f, 4.0f}), 5.0f);
-}
-
-TEST(SampleCleanerTest, SubstitutesAndCaps) {
-  const SampleCleaner cleaner{0.6f, 0.79f};
-  EXPECT_EQ(cleaner.pressure(0.3f, kToolStylus), 0.3f);
-  EXPECT_EQ(cleaner.pressure(1.7f, kToolStylus), 1.0f);
-  EXPECT_EQ(cleaner.pressure(kNaN, kToolStylus), 0.6f);
-  EXPECT_EQ(cleaner.pressure(0.3f, kToolFinger), 0.6f);
-  EXPECT_EQ(cleaner.pressure(0.3f, kToolMouse), 0.6f);
-  EXPECT_EQ(cleaner.tilt(0.5f), 0.5f);
-  EXPECT_EQ(cleaner.tilt(1.2f), 0.79f);
-  EXPECT_FALSE(cleaner.exceedsCap(0.79f));
-  EXPECT_TRUE(cleaner.exceedsCap(0.8f));
-  for (const float bad : {kNaN, kInfinity, -kInfinity}) {
-    EXPECT_EQ(cleaner.tilt(bad), 0.0f);
-    EXPECT_FALSE(cleaner.exceedsCap(bad));
-    EXPECT_EQ(SampleCleaner::orientation(bad), 0.0f);
-  }
-  EXPECT_EQ(SampleCleaner::orientation(-3.1f), -3.1f);
-}
-
-TEST(SampleCleanerTest, TellsCoarseTools) {
-  EXPECT_TRUE(isCoarseTool(kToolFinger, kSourceTouchScreen));
-  EXPECT_TRUE(isCoarseTool(kToolMouse, kSourceMouse));
-  EXPECT_TRUE(isCoarseTool(kToolStylus, kSourceTouchScreen));
-  EXPECT_FALSE(isCoarseTool(kToolStylus, kSourceStylus));
-  EXPECT_FALSE(isCoarseTool(kToolEraser, kSourceTouchScreen));
 }
 
 // --- Attitude ---
@@ -217,30 +177,6 @@ TEST(SpacedWalkTest, EndsWhereItCanNoLongerAdvance) {
   EXPECT_EQ(line.result.carry, 0.4f);
 }
 
-TEST(WalksTest, StopWhereThePathHasNoPositionAndGiveAPointItsOneStamp) {
-  Line line(1.0f);
-  EXPECT_THAT(line.evenly(4, 2.0f), Pointwise(FloatNear(1e-4f), {0.0f, 0.5f, 1.0f}));
-  EXPECT_FALSE(line.result.cutShort);
-  EXPECT_THAT(Line(0.0f).evenly(1, 0.0f), ElementsAre(0.0f));
-  // A segment shorter than what is carried shortens that.
-  EXPECT_THAT(line.spaced(0.75f, 0.5f, 0.25f), IsEmpty());
-  EXPECT_EQ(line.result.carry, 0.5f);  // 0.75 - 0.25
-  // A stamp at the very end is taken.
-  EXPECT_THAT(line.spaced(0.5f, 0.5f, 1.0f), SizeIs(2));
-  EXPECT_EQ(line.result.carry, 0.5f);
-}
-
-TEST(WalksTest, EndAtTheBoundOnStamps) {
-  Line line(1e6f);
-  EXPECT_EQ(line.spaced(0.4f, 0.4f, 1e6f).size(), static_cast<std::size_t>(kMostStampsPerSegment));
-  EXPECT_TRUE(line.result.cutShort);
-  EXPECT_EQ(line.result.carry, 0.4f);
-  EXPECT_EQ(line.evenly(1'000'000, 1e6f).size(), static_cast<std::size_t>(kMostStampsPerSegment));
-  EXPECT_TRUE(line.result.cutShort);
-  EXPECT_EQ(line.evenly(kMostStampsPerSegment, 1e6f).size(), static_cast<std::size_t>(kMostStampsPerSegment));
-  EXPECT_FALSE(line.result.cutShort);
-}
-
 // Past the bound of a call the rest of a segment is only walked: the carry is what it would have been.
 TEST(WalksTest, PassOverWhatIsBeyondTheMostWanted) {
   Line line(10.0f);
@@ -251,17 +187,6 @@ TEST(WalksTest, PassOverWhatIsBeyondTheMostWanted) {
   EXPECT_THAT(line.evenly(4, 10.0f, 1), ElementsAre(0.0f));
   EXPECT_THAT(line.passedOver, ElementsAre(2.5f, 5.0f, 7.5f));
   EXPECT_EQ(line.result.stamps, 4);
-}
-
-TEST(WalksTest, EndOnPathsWithoutAFiniteLength) {
-  for (const float length :
-       {std::numeric_limits<float>::infinity(), std::numeric_limits<float>::quiet_NaN()}) {
-    Line line(length);
-    EXPECT_THAT(line.spaced(0.4f, 0.4f, length), IsEmpty());
-    EXPECT_EQ(line.result.carry, 0.4f);
-    EXPECT_TRUE(line.result.cutShort);
-    EXPECT_THAT(line.evenly(std::numeric_limits<int>::max(), length), IsEmpty());
-  }
 }
 
 TEST(SpacedStampsTest, NeverReservesTooLittle) {
@@ -285,29 +210,6 @@ TEST(SpacedStampsTest, NeverReservesTooLittle) {
   EXPECT_EQ(stampsOfMove(QeltTests::motionEvent(kActionMove, {{4.0f, 0.0f}, {kNaN, 0.0f}, {8.0f, 0.0f}}),
                          path, 0.4f),
             26);
-}
-
-// From (0, 0) over (10, 0) to (10, 10): mid points (5, 0) and (10, 5); the curve between them is controlled
-// by the corner and passes through (5 / 4 + 10 / 2 + 10 / 4, 0 + 0 + 5 / 4) = (8.75, 1.25) half way.
-TEST(SegmentPathTest, RunsFromMidPointToMidPointAroundTheInputPoint) {
-  SegmentPath path;
-  path.start({0.0f, 0.0f});
-  EXPECT_FLOAT_EQ(path.extend({10.0f, 0.0f}, Smoothing::Curve), 5.0f);
-  path.setLast({10.0f, 0.0f});
-  const float length = path.extend({10.0f, 10.0f}, Smoothing::Curve);
-  EXPECT_EQ(path.mid().x, 10.0f);
-  EXPECT_EQ(path.mid().y, 5.0f);
-  SmPoint at;
-  ASSERT_TRUE(path.path().getPosTan(0.0f, &at, nullptr));
-  EXPECT_NEAR(at.x, 5.0f, 0.01f);
-  EXPECT_NEAR(at.y, 0.0f, 0.01f);
-  ASSERT_TRUE(path.path().getPosTan(length * 0.5f, &at, nullptr));
-  EXPECT_NEAR(at.x, 8.75f, 0.01f);
-  EXPECT_NEAR(at.y, 1.25f, 0.01f);
-
-  // The closing one ends at the up point itself.
-  path.setLast({10.0f, 10.0f});
-  EXPECT_FLOAT_EQ(path.close({10.0f, 12.0f}, Smoothing::Curve), 7.0f);
 }
 
 // Whatever is no number about a stamp, first or last: the box is that of the other two.

@@ -1,10 +1,10 @@
-#include "AllocationGate.h"
+#include "support/AllocationGate.h"
 
 #include <link.h>
-#include <pthread.h>
 #include <unwind.h>
 
 #include <atomic>
+#include <cstddef>
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>
@@ -14,8 +14,6 @@
 #include <new>
 #include <stdexcept>
 #include <string_view>
-
-#include "PlugInCall.h"
 
 namespace {
 
@@ -51,6 +49,7 @@ std::atomic<long> blocks{0}, ownBlocks{0}, hostsBlocks{0}, ownAllocations{0}, wa
     deletionsOfNothing{0}, thrown{0};
 std::atomic<long> askedSince{0}, failFrom{0}, failTo{0};  // failing: from <= number <= to
 std::atomic<bool> everyones{false};                       // are numbered, not the plug-in's alone
+thread_local long untilFailure = -1;                      // of this thread's; below 0: none is to fail
 
 // Guards the list of the living blocks of plug-in and host. Not a std::mutex's business to allocate, nor this
 // one's.
@@ -95,6 +94,7 @@ bool isNumbered(Owner owner, std::uintptr_t caller) {
 void* allocate(std::size_t size, std::size_t alignment, const void* callerAddress) {
   const auto caller = reinterpret_cast<std::uintptr_t>(callerAddress);
   const Owner owner = ownerOf(caller);
+  if (untilFailure >= 0 && untilFailure-- == 0) return nullptr;
   const long number = owner != Owner::Other ? watched.fetch_add(1) + 1 : 0;
   if (owner == Owner::PlugIn) ownAllocations.fetch_add(1);
   if (isNumbered(owner, caller)) {
@@ -244,6 +244,18 @@ std::string AllocationGate::livingSince(long after) {
     }
   }
   return std::string(text, static_cast<std::size_t>(length));
+}
+
+FailingAllocation::FailingAllocation(long number) {
+  untilFailure = number;
+}
+
+FailingAllocation::~FailingAllocation() {
+  untilFailure = -1;
+}
+
+bool FailingAllocation::hasFailed() const {
+  return untilFailure < 0;
 }
 
 }  // namespace QeltTests
