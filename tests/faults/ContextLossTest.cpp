@@ -1,5 +1,5 @@
-// The GL context goes before any task of the render thread and comes back before the same one, twice, or before
-// a later one: what is drawn from there on is what is drawn without.
+// The GL context goes before any task of the render thread and comes back before the same one, twice, or
+// before a later one: what is drawn from there on is what is drawn without.
 
 #include <gtest/gtest.h>
 
@@ -82,8 +82,8 @@ TEST_P(ContextLoss, SparesWhatComesAfterwards) {
 
 INSTANTIATE_TEST_SUITE_P(Strokes, ContextLoss,
                          testing::Values(Case{Kind::Live, 1}, Case{Kind::Live, 7}, Case{Kind::Live, 8},
-                                         Case{Kind::Redraw, 8}, Case{Kind::Outline, 8}, Case{Kind::Preview, 8},
-                                         Case{Kind::Prediction, 8}),
+                                         Case{Kind::Redraw, 8}, Case{Kind::Outline, 8},
+                                         Case{Kind::Preview, 8}, Case{Kind::Prediction, 8}),
                          [](const auto& test) {
                            return testing::PrintToString(test.param.kind) + "Version" +
                                   std::to_string(test.param.version);

@@ -45,11 +45,7 @@ class PenWorld {
   void step(FuzzInput& input);
   void change(FuzzInput& input, Qelt::Pen& pen);
   void ask(FuzzInput& input, Qelt::Pen& pen);
-  void draw(FuzzInput& input, Qelt::Pen& pen);
-  void redraw(FuzzInput& input, Qelt::Pen& pen);
-  void outline(FuzzInput& input, Qelt::Pen& pen);
-  void preview(FuzzInput& input, Qelt::Pen& pen);
-  void predict(FuzzInput& input, Qelt::Pen& pen);
+  void draw(FuzzInput& input, Qelt::Pen& pen, int which);
   void changeView(FuzzInput& input);
   void changeQueue(FuzzInput& input);
 

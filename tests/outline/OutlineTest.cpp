@@ -2,27 +2,18 @@
 
 #include <cmath>
 #include <cstddef>
-#include <limits>
 #include <string>
-#include <utility>
 #include <vector>
 
-#include "base/Error.h"
-#include "desktop/model/StoredStroke.h"
 #include "engine/MotionEvent.h"
 #include "outline/Pencil2OutlineDrawableGLV4.h"
 #include "support/DrawableBoard.h"
-#include "support/Versions.h"
 
 namespace QeltTests {
 namespace {
 
-using Qelt::Error;
 using Qelt::MotionEvent;
-using Qelt::RectF;
-using QeltDesktop::StoredStroke;
 using testing::ElementsAre;
-using testing::IsEmpty;
 using testing::SizeIs;
 
 class OutlineVersions : public testing::TestWithParam<int> {

@@ -79,33 +79,36 @@ class Refusals : public testing::TestWithParam<Drawing> {
     };
     Qelt::Pen& pen = *board.pen;
     auto* const live = pen.GetStrokeDrawableGL();
-    if (kind == Kind::Live) return of(live, {[=, &event](bool has, auto* area) {
-                                        return live->Draw(has ? &event : nullptr, area);
-                                      }});
+    if (kind == Kind::Live)
+      return of(live,
+                {[=, &event](bool has, auto* area) { return live->Draw(has ? &event : nullptr, area); }});
     if (kind == Kind::Redraw)
-      return of(live, {[=, &event](bool has, auto* area) { return live->RedrawPen(has ? &event : nullptr, area); },
-                       [=, &object](bool has, auto* area) {
-                         return live->RedrawPen(has ? &object : nullptr, area);
-                       }});
+      return of(
+          live,
+          {[=, &event](bool has, auto* area) { return live->RedrawPen(has ? &event : nullptr, area); },
+           [=, &object](bool has, auto* area) { return live->RedrawPen(has ? &object : nullptr, area); }});
     if (kind == Kind::Outline) {
       auto* const outline = pen.GetOutlineDrawableGL();
-      return of(outline,
-                {[=, &event](bool has, auto* area) { return outline->DrawOutline(has ? &event : nullptr, area); },
-                 [=, &object](bool has, auto* area) {
-                   return outline->DrawOutline(has ? &object : nullptr, area);
-                 }});
+      return of(outline, {[=, &event](bool has, auto* area) {
+                            return outline->DrawOutline(has ? &event : nullptr, area);
+                          },
+                          [=, &object](bool has, auto* area) {
+                            return outline->DrawOutline(has ? &object : nullptr, area);
+                          }});
     }
     if (kind == Kind::Preview) {
       auto* const preview = pen.GetPreviewDrawableGL();
-      return of(preview,
-                {[=, &event](bool has, auto* area) { return preview->RedrawPen(has ? &event : nullptr, area); },
-                 [=, &event](bool has, auto* area) { return preview->Draw(has ? &event : nullptr, area); }});
+      return of(
+          preview,
+          {[=, &event](bool has, auto* area) { return preview->RedrawPen(has ? &event : nullptr, area); },
+           [=, &event](bool has, auto* area) { return preview->Draw(has ? &event : nullptr, area); }});
     }
     // A prediction needs a stroke to go on from.
     board.down(kStroke[0]);
     board.move({kStroke[1], kStroke[2]});
     auto* const ahead = pen.GetPredictionStrokeDrawableGL();
-    return of(ahead, {[=, &event](bool has, auto* area) { return ahead->Draw(has ? &event : nullptr, area); }});
+    return of(ahead,
+              {[=, &event](bool has, auto* area) { return ahead->Draw(has ? &event : nullptr, area); }});
   }
 };
 INSTANTIATE_TEST_SUITE_P(Drawings, Refusals, testing::ValuesIn(drawings()), [](const auto& test) {

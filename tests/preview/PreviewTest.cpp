@@ -5,21 +5,16 @@
 #include <string>
 #include <vector>
 
-#include "base/Error.h"
 #include "engine/MotionEvent.h"
 #include "preview/Pencil2PreviewDrawableGL.h"
 #include "support/DrawableBoard.h"
 #include "support/LogCapture.h"
-#include "support/StampPicture.h"
-#include "support/Stamps.h"
 
 namespace QeltTests {
 namespace {
 
-using Qelt::Error;
 using Qelt::MotionEvent;
 using Qelt::Pencil2PreviewDrawableGL;
-using Qelt::RectF;
 using testing::ElementsAre;
 using testing::IsEmpty;
 using testing::SizeIs;
@@ -159,28 +154,6 @@ TEST(Preview, WithoutASizeCurvesLogAndNothingIsPlaced) {
   board.move({{40.0f, 0.0f}});
   EXPECT_TRUE(board.up({80.0f, 0.0f}));
   EXPECT_THAT(board.takeStamps(), IsEmpty());
-}
-
-// Kept: the grain's x goes by the height of its tile on screen, its y by the width.
-TEST(PreviewPicture, GrainSwapsWidthAndHeight) {
-  BoardOptions options = panel(199.0f);
-  options.width = 420;
-  options.height = 210;
-  Panel board(options);
-  Qelt::Matrix3<float> wide;
-  wide.setScale(2.0f, 1.0f);
-  board.canvas.setMatrix(wide);
-  board.stroke({{103.3f, 104.7f, 0.5f, 0.0f, 0.4f}});
-  const std::vector<Stamp> placed = board.takeStamps();
-  ASSERT_THAT(placed, SizeIs(1));
-  const std::vector<std::uint8_t> pixels = board.pixels();
-
-  StampPicture expected{.stamp = placed[0], .zoomX = 2.0f, .startX = 206.6f, .startY = 104.7f};
-  expected.grainX = 150.0f;  // the height of a 150-unit tile in this view
-  expected.grainY = 300.0f;  // its width
-  EXPECT_LT(expected.shareOff(pixels, options.width, options.height, 0.47f), 0.02);
-  std::swap(expected.grainX, expected.grainY);
-  EXPECT_GT(expected.shareOff(pixels, options.width, options.height, 0.47f), 0.5);
 }
 
 }  // namespace

@@ -11,8 +11,8 @@
 namespace Qelt {
 namespace {
 
-// Documents show this grain and these shapes: they are the bytes they were when the first version was released,
-// and those of the pictures in the repository. What makes them fit for paper, their maker sees to.
+// Documents show this grain and these shapes: they are the bytes they were when the first version was
+// released, and those of the pictures in the repository. What makes them fit for paper, their maker sees to.
 void expectReleased(const std::string& bytes, std::uint64_t checksum, const char* picture) {
   std::uint64_t sum = 14695981039346656037u;
   for (const char byte : bytes) sum = (sum ^ static_cast<unsigned char>(byte)) * 1099511628211u;

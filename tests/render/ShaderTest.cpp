@@ -3,42 +3,28 @@
 #include <string>
 #include <typeinfo>
 
-#include "desktop/gl/RenderQueue.h"
-#include "gl/OpenGLShaderProgram.h"
 #include "gl/ShaderManager.h"
-#include "shaders/Exceptions.h"
-#include "shaders/ShaderProgram.h"
 #include "shaders/ShaderRegistry.h"
-#include "shaders/StampUniforms.h"
-#include "support/AllocationGate.h"
 #include "support/LogCapture.h"
 
 namespace QeltTests {
 namespace {
 
-using namespace Qelt;
-using QeltDesktop::RenderQueue;
-using testing::Contains;
+using Qelt::ShaderManager;
 using testing::ElementsAre;
-using testing::Field;
 using testing::IsEmpty;
-using testing::MatchesRegex;
 using testing::SizeIs;
-using testing::ThrowsMessage;
 
 MATCHER_P2(LogOf, priority, text, "") {
   return arg.priority == priority && arg.tag == "qel_log" && arg.text == text;
 }
 
-// --- The registry ---
-
 struct Alive {
   Alive() { ++count; }
   ~Alive() { --count; }
-  bool isLinked() const { return linked; }
-  void link() { linked = true; }
+  bool isLinked() const { return true; }
+  void link() {}
   static inline int count = 0;
-  bool linked = true;
 };
 struct OneShader : Alive {};
 struct OtherShader : Alive {};
@@ -65,16 +51,6 @@ TEST(ShaderRegistryTest, SharesOneShaderAClassAndDestroysItWithItsLastUser) {
   EXPECT_THAT(log.take(), IsEmpty());
 }
 
-// A shader that was made without a GL context is mended where it is: others hold it already.
-TEST(ShaderRegistryTest, LinksAnUnlinkedShaderForTheNextWhoAsks) {
-  const LogCapture log;
-  OneShader* const shader = registry().GetShader<OneShader>();
-  shader->linked = false;
-  EXPECT_EQ(registry().GetShader<OneShader>(), shader);
-  EXPECT_TRUE(shader->linked);
-  for (int i = 0; i < 2; ++i) registry().ReleaseShader(shader);
-}
-
 TEST(ShaderRegistryTest, ReportsMisuseAndLeavesTheRegisteredOneAlone) {
   LogCapture log;
   OneShader stranger;
@@ -92,48 +68,6 @@ TEST(ShaderRegistryTest, ReportsMisuseAndLeavesTheRegisteredOneAlone) {
   EXPECT_EQ(Alive::count, 2);
   registry().ReleaseShader(registered);
   EXPECT_EQ(Alive::count, 1);
-}
-
-// --- Uniforms ---
-
-// A stamp shader whose colour has no alpha.
-constexpr char kVertex[] = R"(#version 300 es
-layout(location = 0) in vec4 position;
-uniform mat4 ProjectionMatrix;
-void main() { gl_Position = ProjectionMatrix * position; })";
-constexpr char kFragment[] = R"(#version 300 es
-precision highp float;
-uniform sampler2D sampler0;
-uniform sampler2D sampler1;
-uniform vec3 inputColor;
-out vec4 FragColor;
-void main() { FragColor = vec4(inputColor, 1.0) * texture(sampler0, vec2(0.5)) * texture(sampler1, vec2(0.5)); })";
-
-class WrongShader : public StampUniforms {
- public:
-  WrongShader() { link(); }
-  void link() { bind(mProgram.make(kVertex, kFragment)); }
-  bool isLinked() const { return false; }
-
- private:
-  ShaderProgram mProgram;
-};
-
-TEST(StampShaderTest, WithAUniformOfAnotherTypeIsNotRegisteredAndLeaksNothing) {
-  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
-  queue.run([] {
-    LogCapture log;
-    long after[2];
-    for (long& alive : after) {
-      EXPECT_THAT(
-          [] { registry().GetShader<WrongShader>(); },
-          ThrowsMessage<InvalidArgumentException>("ParameterBinding<>::bind - invalid parameter type!"));
-      EXPECT_THAT(log.take(),
-                  Contains(Field(&LogLine::text, MatchesRegex("inputColor: Found .* but given 6"))));
-      alive = AllocationGate::allBlocks();
-    }
-    EXPECT_EQ(after[1], after[0]);
-  });
 }
 
 }  // namespace

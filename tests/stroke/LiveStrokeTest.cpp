@@ -1,6 +1,5 @@
 #include <gmock/gmock.h>
 
-#include <cmath>
 #include <limits>
 #include <string>
 #include <vector>
@@ -8,8 +7,6 @@
 #include "engine/MotionEvent.h"
 #include "support/DrawableBoard.h"
 #include "support/LogCapture.h"
-#include "support/Stamps.h"
-#include "support/Versions.h"
 
 namespace QeltTests {
 namespace {
@@ -17,21 +14,9 @@ namespace {
 using Qelt::MotionEvent;
 using testing::ElementsAre;
 using testing::IsEmpty;
-using testing::Not;
 
 constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
 constexpr float kInfinity = std::numeric_limits<float>::infinity();
-
-// A stroke with a corner, a short move and changing pressure.
-const std::vector<Sample> kStroke = {{10.0f, 10.0f, 0.3f},        {14.0f, 11.0f, 0.5f, 0.3f, 0.2f},
-                                     {22.0f, 11.5f, 0.9f, 0.77f}, {23.0f, 11.5f, 0.9f},
-                                     {24.0f, 19.0f, 0.4f},        {17.0f, 23.0f, 0.6f}};
-
-std::vector<float> drawn(DrawingBoard& board, const std::vector<Sample>& samples) {
-  board.takeBatches();
-  board.stroke(samples);
-  return board.takeFloats();
-}
 
 class LiveStroke : public testing::TestWithParam<int> {
  protected:
@@ -101,18 +86,6 @@ TEST_P(LiveStroke, PostsInOrderWhateverTheActionDid) {
   }
 }
 
-TEST_P(LiveStroke, AddsUpASlowDrag) {
-  DrawingBoard board({.version = version, .curve = false});
-  board.down({10.0f, 10.0f});
-  // Size 10: moves below 2 are dropped, and the last point stays.
-  EXPECT_TRUE(board.move({{11.0f, 10.0f}, {11.5f, 10.0f}, {11.9f, 10.0f}}));
-  EXPECT_THAT(board.takeStamps(), IsEmpty());
-  EXPECT_TRUE(board.move({{12.5f, 10.0f}}));
-  const std::vector<Stamp> stamps = board.takeStamps();
-  ASSERT_FALSE(stamps.empty());
-  EXPECT_THAT(stamps.front(), StampNear(version == 8 ? 10.4f : 10.0f, 10.0f, 1e-3f));
-}
-
 // Nothing but short moves: the stroke ends as a tap where it began, with the tool's pressure and size.
 TEST_P(LiveStroke, EndsAsATapWhenEveryMoveWasDropped) {
   DrawingBoard board({.version = version});
@@ -179,8 +152,6 @@ TEST_P(LiveStroke, WritesItsCorrectionsBackIntoTheEvent) {
   EXPECT_NE(placed[0], placed[1]);
   EXPECT_EQ(placed[1], placed[2]);
 }
-
-// --- Bad input ---
 
 INSTANTIATE_TEST_SUITE_P(Versions, LiveStroke, testing::ValuesIn(allVersions()), versionName);
 

@@ -1,21 +1,16 @@
 #include <gmock/gmock.h>
 
-#include <cmath>
 #include <cstdint>
-#include <limits>
 #include <memory>
 #include <string>
 #include <utility>
 #include <vector>
 
 #include "base/Error.h"
-#include "base/List.h"
 #include "engine/MotionEvent.h"
 #include "model/ObjectStroke.h"
 #include "pencommon/PenStrokeDataManager.h"
 #include "support/DrawableBoard.h"
-#include "support/Stamps.h"
-#include "support/Versions.h"
 
 namespace QeltTests {
 namespace {
@@ -28,8 +23,6 @@ using QeltDesktop::StoredStroke;
 using testing::ElementsAre;
 using testing::IsEmpty;
 using testing::Not;
-
-constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
 
 const std::vector<Sample> kStroke = {{10.0f, 10.0f, 0.3f},
                                      {18.0f, 11.0f, 0.5f, 0.3f, 0.2f},
@@ -205,26 +198,6 @@ TEST_P(Redraw, OfNothingThinsTheMovesOfTheStrokeUnderWay) {
   EXPECT_THAT(board.takeStamps(), Not(IsEmpty()));
 }
 
-// Two canvases with views of their own: each is drawn for its own scale, whichever was made or moved last.
-TEST(RedrawForTwoViews, ComputesAndKeepsEachForItsOwn) {
-  DrawingBoard board;
-  StrokeOnPage stroke(board.stored(kStroke));
-  const Batch plain = redrawn(board, *stroke);
-  board.canvas.setMatrix(viewOf(4.0f));
-  const Batch enlarged = redrawn(board, *stroke);
-  EXPECT_NE(enlarged.buffers, plain.buffers);
-  QeltDesktop::PenCanvas other(&board.queue, nullptr);
-  EXPECT_TRUE(redrawn(board, *stroke).cached);
-  board.drawable->SetCanvas(&other);
-  const Batch anew = redrawn(board, *stroke);
-  EXPECT_FALSE(anew.cached);
-  EXPECT_EQ(anew.buffers, plain.buffers);
-  board.canvas.setMatrix(viewOf(2.0f));
-  EXPECT_TRUE(redrawn(board, *stroke).cached);
-  board.drawable->SetCanvas(&board.canvas);
-  EXPECT_FALSE(redrawn(board, *stroke).cached);
-}
-
 // A stroke that a document has only half of.
 class BareStroke : public Qelt::ObjectStroke {
  public:
@@ -261,8 +234,6 @@ TEST_P(Redraw, TakesWhateverArraysAreMissing) {
   bare.count = -5;
   EXPECT_THAT(floatsOf(board, bare), IsEmpty());
 }
-
-// --- Arguments ---
 
 // --- What goes back into the caller's data ---
 

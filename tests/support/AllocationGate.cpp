@@ -6,7 +6,6 @@
 #include <atomic>
 #include <cstddef>
 #include <cstdint>
-#include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <iterator>
@@ -26,7 +25,6 @@ struct Header {
   std::size_t size;  // of the block itself
   Header* previous;  // of the living blocks of plug-in and host
   Header* next;
-  std::uintptr_t caller;
   long number;  // of their allocations
   Owner owner;
 };
@@ -109,7 +107,7 @@ void* allocate(std::size_t size, std::size_t alignment, const void* callerAddres
   const auto start = reinterpret_cast<std::uintptr_t>(base) + sizeof(Header);
   const std::uintptr_t block = (start + alignment - 1) / alignment * alignment;
   auto* const header = reinterpret_cast<Header*>(block) - 1;
-  *header = {kAlive, base, size, nullptr, nullptr, caller, number, owner};
+  *header = {kAlive, base, size, nullptr, nullptr, number, owner};
   blocks.fetch_add(1, std::memory_order_relaxed);
   auto* const memory = reinterpret_cast<void*>(block);
   if (owner != Owner::Other) {
@@ -204,10 +202,6 @@ long AllocationGate::plugInAllocations() {
   return ownAllocations;
 }
 
-long AllocationGate::watchedAllocations() {
-  return watched;
-}
-
 long AllocationGate::thrownFailures() {
   return thrown;
 }
@@ -222,28 +216,6 @@ long AllocationGate::numberOf(const void* address) {
     if (header + 1 == address && header->owner == Owner::PlugIn) return header->number;
   }
   return 0;
-}
-
-std::string AllocationGate::livingSince(long after) {
-  char text[2048];
-  int length = 0;
-  {
-    const std::lock_guard hold(listLock);
-    for (const Header* header = living; header != nullptr && length < 2000; header = header->next) {
-      if (header->number <= after) continue;
-      const char* name = "plug-in";
-      std::uintptr_t begin = plugIn.begin;
-      for (std::size_t i = 0; i < std::size(hosts); ++i) {
-        if (!hosts[i].holds(header->caller)) continue;
-        name = kHostNames[i];
-        begin = hosts[i].begin;
-      }
-      length +=
-          std::snprintf(text + length, sizeof text - static_cast<std::size_t>(length), " %s 0x%zx(%zu bytes)",
-                        name, static_cast<std::size_t>(header->caller - begin), header->size);
-    }
-  }
-  return std::string(text, static_cast<std::size_t>(length));
 }
 
 FailingAllocation::FailingAllocation(long number) {

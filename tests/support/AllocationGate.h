@@ -43,17 +43,12 @@ class AllocationGate {
   static long allBlocks();
   // The plug-in's allocations so far, failed ones included.
   static long plugInAllocations();
-  // The same of plug-in and host.
-  static long watchedAllocations();
   // How many allocations failed so far that told it by an exception.
   static long thrownFailures();
   // How many deletions were of something that was not alive.
   static long badDeletions();
   // Which of the plug-in's allocations gave the block that begins here; 0 when none did.
   static long numberOf(const void* address);
-  // Where the living blocks of plug-in and host that are younger than `after` watched allocations were asked
-  // for: addresses in their libraries, for addr2line.
-  static std::string livingSince(long after);
 };
 
 // While one lives, the `number`th allocation from 0 that this thread asks of `new`, whoever's code it is,

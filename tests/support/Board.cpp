@@ -29,11 +29,11 @@ Target targetOf(const BoardOptions& wanted) {
 
 Board::Board(const BoardOptions& wanted)
     : options(wanted),
-      mOwnQueue(std::make_unique<RenderQueue>(
-          wanted.thread ? RenderQueue::Mode::Thread : RenderQueue::Mode::Caller,
-          wanted.width > 0 ? RenderQueue::GL::Context : RenderQueue::GL::None)),
+      mOwnQueue(
+          std::make_unique<RenderQueue>(wanted.thread ? RenderQueue::Mode::Thread : RenderQueue::Mode::Caller,
+                                        wanted.width > 0 ? RenderQueue::GL::Context : RenderQueue::GL::None)),
       mOwnLayer(wanted.width > 0 ? std::make_unique<QeltDesktop::CanvasLayer>(*mOwnQueue, wanted.width,
-                                                                             wanted.height, wanted.tile)
+                                                                              wanted.height, wanted.tile)
                                  : nullptr),
       queue(*mOwnQueue),
       layer(mOwnLayer.get()),

@@ -62,8 +62,8 @@ Qelt::Matrix3<float> viewOf(float zoom, float dx = 0.0f, float dy = 0.0f);
 // Whether a call answers false and leaves the error of a wrong argument.
 bool isRefused(const std::function<bool()>& call);
 
-// What a host sets up to draw with: a queue, a layer, a canvas, what it keeps of pens. Whoever derives from this
-// brings what draws. Main thread.
+// What a host sets up to draw with: a queue, a layer, a canvas, what it keeps of pens. Whoever derives from
+// this brings what draws. Main thread.
 class Board {
  public:
   virtual ~Board();

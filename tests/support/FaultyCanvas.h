@@ -75,8 +75,9 @@ class FakeLayer : public Qelt::ISPLayer, public Qelt::ISPBitmap {
   std::vector<FakeTile> tiles;
 };
 
-// What a canvas has to draw into.
-enum class Target { Whole, NoLayer, NoBitmap, NoTiles };
+// What a canvas has to draw into. Boundless tiles say that each is the whole page, so that every rectangle
+// meets them.
+enum class Target { Whole, NoLayer, NoBitmap, NoTiles, BoundlessTiles };
 
 // A canvas any call of which may fail, and any part of which may be missing. Without a layer it has one tile
 // without GL, enough for render messages to run through their batch.
@@ -106,10 +107,10 @@ class FaultyCanvas final : public QeltDesktop::PenCanvas {
 
  private:
   struct Tile final : Qelt::ISPSubBitmap {
-    int GetX() const override { return real->GetX(); }
-    int GetY() const override { return real->GetY(); }
-    int GetWidth() const override { return real->GetWidth(); }
-    int GetHeight() const override { return real->GetHeight(); }
+    int GetX() const override { return boundless ? -4096 : real->GetX(); }
+    int GetY() const override { return boundless ? -4096 : real->GetY(); }
+    int GetWidth() const override { return boundless ? 8192 : real->GetWidth(); }
+    int GetHeight() const override { return boundless ? 8192 : real->GetHeight(); }
     const Qelt::Matrix4<float>& GetProjection() const override {
       HostFaults::mayThrow();
       return real->GetProjection();
@@ -124,6 +125,7 @@ class FaultyCanvas final : public QeltDesktop::PenCanvas {
       real->EndRender(mode);
     }
     Qelt::ISPSubBitmap* real = nullptr;
+    bool boundless = false;
     int open = 0;
   };
   struct Layer final : Qelt::ISPLayer, Qelt::ISPBitmap {
@@ -143,6 +145,7 @@ class FaultyCanvas final : public QeltDesktop::PenCanvas {
     Qelt::ISPSubBitmap* GetSubBitmap(int index) override {
       if (HostFaults::strikes()) return nullptr;
       tile.real = bitmap->GetSubBitmap(index);
+      tile.boundless = target == Target::BoundlessTiles;
       return &tile;
     }
     Qelt::ISPLayer* real = nullptr;

@@ -55,7 +55,8 @@ const QeltDesktop::PluginLibrary& PenBoard::library() {
   return loaded;
 }
 
-PenBoard::PenBoard(const BoardOptions& wanted) : Board(wanted), mMakePen([] { return library().createPen(); }) {
+PenBoard::PenBoard(const BoardOptions& wanted)
+    : Board(wanted), mMakePen([] { return library().createPen(); }) {
   makePen();
   if (pen == nullptr) throw std::runtime_error("no pen");
   watch();
@@ -205,7 +206,7 @@ void PenBoard::draw(Kind kind, const std::vector<Sample>& samples,
       auto* const drawable = onCanvas(&Qelt::Pen::GetPredictionStrokeDrawableGL);
       if (drawable == nullptr) return;
       drawable->SetOpacity(0.75f);
-      const MotionEvent ahead = eventOf(Qelt::kActionMove, {samples[1], samples[0]});
+      const MotionEvent ahead = eventOf(Qelt::kActionMove, {samples.rbegin(), samples.rend()});
       return call(*drawable, around, [&](RectF* area) { return drawable->Draw(&ahead, area); });
     }
   }

@@ -18,8 +18,9 @@
 
 namespace QeltTests {
 
-// What a pen draws. A prediction goes ahead of a live stroke that it leaves open; a redraw is of a recorded
-// event and of a stored stroke: without an entry in the cache, with one that is empty, full, and dirty.
+// What a pen draws. A prediction goes back the way of a live stroke, which it leaves open; a redraw is of a
+// recorded event and of a stored stroke: without an entry in the cache, with one that is empty, full, and
+// dirty.
 enum class Kind { Live, Redraw, Outline, Preview, Prediction };
 inline constexpr std::array kAllKinds = {Kind::Live, Kind::Redraw, Kind::Outline, Kind::Preview,
                                          Kind::Prediction};
@@ -48,8 +49,9 @@ class PenBoard : public Board {
   explicit PenBoard(const BoardOptions& wanted = {});
   // On a host's queue and layer, as the pens of a process are; not watched. The pen is made by the first call
   // that needs it. Without a layer the canvas has a tile without GL.
-  PenBoard(const BoardOptions& wanted, QeltDesktop::RenderQueue& itsQueue, QeltDesktop::CanvasLayer* itsLayer,
-           MakePen makesPen = [] { return library().createPen(); });
+  PenBoard(
+      const BoardOptions& wanted, QeltDesktop::RenderQueue& itsQueue, QeltDesktop::CanvasLayer* itsLayer,
+      MakePen makesPen = [] { return library().createPen(); });
   ~PenBoard() override;
 
   static const QeltDesktop::PluginLibrary& library();
