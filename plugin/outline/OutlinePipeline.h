@@ -14,7 +14,7 @@
 #include "outline/OutlineVersions.h"
 #include "outline/Pencil2OutlineDrawableGL.h"
 #include "outline/Pencil2OutlineDrawableRTV1.h"
-#include "render/DrawablePosts.h"
+#include "render/Posting.h"
 #include "stroke/StrokeRules.h"
 #include "stroke/parts/DirtyBox.h"
 #include "stroke/parts/LiveInput.h"

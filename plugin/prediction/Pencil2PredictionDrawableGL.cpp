@@ -10,7 +10,7 @@
 #include "engine/MotionEvent.h"
 #include "graphics/ISPPenCanvas.h"
 #include "pen/Pencil2Data.h"
-#include "render/DrawablePosts.h"
+#include "render/Posting.h"
 #include "stroke/parts/PenSample.h"
 #include "stroke/parts/StampRun.h"
 #include "stroke/parts/StampWalk.h"

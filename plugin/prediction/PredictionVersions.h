@@ -1,8 +1,8 @@
 #pragma once
 
 #include "pencommon/PenPredictionDrawableRT.h"
-#include "prediction/Pencil2PredictionDrawableRT.h"
 #include "render/BatchGuard.h"
+#include "render/RenderDrawables.h"
 #include "stroke/StrokeRules.h"
 
 // The prediction as a row in the form of the strokes' (StrokeVersions.h). There is one; it continues strokes

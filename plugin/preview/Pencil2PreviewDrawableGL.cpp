@@ -9,7 +9,7 @@
 #include "base/RectF.h"
 #include "engine/MotionEvent.h"
 #include "log/Log.h"
-#include "render/DrawablePosts.h"
+#include "render/Posting.h"
 #include "stroke/StrokeRules.h"
 #include "stroke/parts/SampleSources.h"
 #include "stroke/parts/StampWalk.h"

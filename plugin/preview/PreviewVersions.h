@@ -1,8 +1,8 @@
 #pragma once
 
 #include "pencommon/PenPreviewDrawableRT.h"
-#include "preview/Pencil2PreviewDrawableRT.h"
 #include "render/BatchGuard.h"
+#include "render/RenderDrawables.h"
 #include "stroke/StrokeRules.h"
 
 // The preview as a row in the form of the strokes' (StrokeVersions.h). There is one, whatever version the pen

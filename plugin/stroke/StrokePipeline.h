@@ -13,7 +13,6 @@
 #include "model/ObjectStroke.h"
 #include "pen/Pencil2Data.h"
 #include "pencommon/PenGLDataManager.h"
-#include "render/DrawablePosts.h"
 #include "render/Posting.h"
 #include "stroke/Pencil2StrokeDrawableGL.h"
 #include "stroke/StrokeCache.h"
@@ -225,11 +224,8 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     postStartPoint(queue(), mRender, first < 0 ? PointF{} : source.point(first));
     *rect = cache.rect();
     UnclaimedBatch* unclaimed = mRender->unclaimedBatch();
-    bool handedOver = false;
-    {
-      const typename Version::CacheGuard guard(mRender, mCanvas, *rect, cache.buffer(), unclaimed,
-                                               &handedOver);
-    }
+    const bool handedOver =
+        typename Version::CacheGuard(mRender, mCanvas, unclaimed).present(cache.buffer(), *rect);
     // The render thread drops the reference when it is done with the buffer.
     RefCount* points = cache.takePoints();
     if (!post(queue(), points, &RefCount::Unref)) {

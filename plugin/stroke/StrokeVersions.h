@@ -1,8 +1,6 @@
 #pragma once
 
-#include "render/Pencil2StrokeDrawableRTV1.h"
-#include "render/Pencil2StrokeDrawableRTV2.h"
-#include "render/Pencil2StrokeDrawableRTV3.h"
+#include "render/RenderDrawables.h"
 #include "stroke/StrokeGuards.h"
 #include "stroke/StrokeRules.h"
 

@@ -10,11 +10,7 @@
 #include <vector>
 
 #include "math/Matrix4.h"
-#include "prediction/Pencil2PredictionDrawableRT.h"
-#include "preview/Pencil2PreviewDrawableRT.h"
-#include "render/Pencil2StrokeDrawableRTV1.h"
-#include "render/Pencil2StrokeDrawableRTV2.h"
-#include "render/Pencil2StrokeDrawableRTV3.h"
+#include "render/RenderDrawables.h"
 #include "support/DrawableBoard.h"
 #include "support/StampPicture.h"
 #include "support/Stamps.h"

@@ -1,5 +1,3 @@
-#include "render/Patterns.h"
-
 #include <gtest/gtest.h>
 
 #include <cstddef>
@@ -7,6 +5,8 @@
 #include <fstream>
 #include <iterator>
 #include <string>
+
+#include "render/PatternTextures.h"
 
 namespace Qelt {
 namespace {
