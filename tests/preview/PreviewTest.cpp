@@ -111,24 +111,6 @@ TEST(Preview, PostsTheStartPointLiveAndOnCurvedReplays) {
   }
 }
 
-TEST(Preview, ReplaysDrawWhatTheLiveStrokeDrew) {
-  for (const bool curve : {true, false}) {
-    Panel board(panel(7.0f, curve));
-    board.down(kSampleStroke[0]);
-    board.move({kSampleStroke.begin() + 1, kSampleStroke.end()});
-    const std::vector<float> live = board.takeFloats();
-    EXPECT_TRUE(board.redraw(board.recorded(kSampleStroke)));
-    std::vector<float> replayed = board.takeFloats();
-    ASSERT_GE(replayed.size(), live.size());
-    replayed.resize(live.size());  // then follows the closing segment
-    EXPECT_EQ(replayed, live);
-    for (const Sample& sample : kSampleStroke) {
-      EXPECT_LT(board.rect.left, sample.x);
-      EXPECT_GT(board.rect.bottom, sample.y);
-    }
-  }
-}
-
 TEST(Preview, WithoutASizeCurvesLogAndNothingIsPlaced) {
   Panel board(panel(0.0f));
   LogCapture log;

@@ -169,8 +169,9 @@ void expectStampsAsWorkedOut(float size, const StampPicture& look, Grain grain =
       expected.zoomY = zoomY;
       expected.startX = 60.37f * zoomX;
       expected.startY = 65.61f * zoomY;
-      expected.grainX *= grain == Grain::OfScreen ? 1.0f : grain == Grain::Swapped ? zoomY : zoomX;
-      expected.grainY *= grain == Grain::OfScreen ? 1.0f : grain == Grain::Swapped ? zoomX : zoomY;
+      const bool swaps = grain == Grain::Swapped;
+      expected.grainX = look.grainX * (grain == Grain::OfScreen ? 1.0f : swaps ? zoomY : zoomX);
+      expected.grainY = look.grainX * (grain == Grain::OfScreen ? 1.0f : swaps ? zoomX : zoomY);
       if (look.ramp) {
         for (std::size_t i = 10; i < batch.size(); i += 11) batch[i] = 0.625f;
         expected.stamp.alphaByWidth = 0.625f;

@@ -17,7 +17,8 @@ void expectReleased(const std::string& bytes, std::uint64_t checksum, const char
   std::uint64_t sum = 14695981039346656037u;
   for (const char byte : bytes) sum = (sum ^ static_cast<unsigned char>(byte)) * 1099511628211u;
   EXPECT_EQ(sum, checksum) << picture;
-  std::ifstream file(std::string(QELT_SOURCE_DIR) + "/resources/" + picture, std::ios::binary);
+  std::string path = QELT_SOURCE_DIR "/resources/";
+  std::ifstream file(path += picture, std::ios::binary);
   const std::string all{std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
   ASSERT_GT(all.size(), bytes.size()) << picture;
   EXPECT_TRUE(all.substr(all.size() - bytes.size()) == bytes) << picture;
