@@ -9,24 +9,26 @@
 namespace Qelt {
 
 // What a pen of one rendering version draws with. A released row is frozen, since documents store the number.
+// What the row names is checked where the drawables are made, in DrawableFactory.cpp.
 struct RenderingVersion {
   std::int32_t number;          // as documents store it and Pen::getVersion returns it
-  std::int32_t strokeVersion;   // of the stroke drawable; 6 is drawn by the class of version 4
+  std::int32_t strokeVersion;   // of the stroke drawable
+  std::int32_t drawnBy;         // the stroke version whose class draws it: the same, but for 6, drawn by 4's
   std::int32_t outlineVersion;  // of the outline drawable
   int floatsPerVertex;          // in the batches of the stroke drawable: 9, or 11 with a smoothed rim
   bool predicts;                // whether the pen offers a predicted continuation
 };
 
-// Ascending, without gaps, from 1.
+// Ascending, without gaps, from 1. The columns are the fields above, in their order.
 inline constexpr std::array<RenderingVersion, 8> kRenderingVersions{{
-    {.number = 1, .strokeVersion = 1, .outlineVersion = 1, .floatsPerVertex = 9, .predicts = false},
-    {.number = 2, .strokeVersion = 2, .outlineVersion = 2, .floatsPerVertex = 9, .predicts = false},
-    {.number = 3, .strokeVersion = 3, .outlineVersion = 3, .floatsPerVertex = 9, .predicts = false},
-    {.number = 4, .strokeVersion = 4, .outlineVersion = 4, .floatsPerVertex = 9, .predicts = false},
-    {.number = 5, .strokeVersion = 5, .outlineVersion = 5, .floatsPerVertex = 9, .predicts = false},
-    {.number = 6, .strokeVersion = 6, .outlineVersion = 4, .floatsPerVertex = 9, .predicts = false},
-    {.number = 7, .strokeVersion = 7, .outlineVersion = 4, .floatsPerVertex = 9, .predicts = false},
-    {.number = 8, .strokeVersion = 8, .outlineVersion = 4, .floatsPerVertex = 11, .predicts = true},
+    {1, 1, 1, 1, 9, false},
+    {2, 2, 2, 2, 9, false},
+    {3, 3, 3, 3, 9, false},
+    {4, 4, 4, 4, 9, false},
+    {5, 5, 5, 5, 9, false},
+    {6, 6, 4, 4, 9, false},
+    {7, 7, 7, 4, 9, false},
+    {8, 8, 8, 4, 11, true},
 }};
 
 // Floats in a vertex of the batches of the other drawables, which are the same in all rendering versions.

@@ -14,6 +14,7 @@
 #include "gl/OpenGLRenderer.h"
 #include "graphics/ISPBitmap.h"
 #include "log/Log.h"
+#include "math/FloatRange.h"
 #include "math/Matrix4.h"
 #include "render/BatchGuard.h"
 #include "render/PatternTextures.h"
@@ -139,9 +140,8 @@ class StampRenderer : public HostBase {
   // Sets the stroke units per device pixel in x and y, before the stamps of a call are appended. Anything but
   // two positive numbers that leave stamps finite counts as (1, 1).
   void SetInverseScale(const Vector2<float>& inverseScale) requires kAntialiased {
-    const auto usable = [](float scale) { return scale >= 1e-30f && scale <= 1e30f; };
-    mInverseScale =
-        usable(inverseScale.x) && usable(inverseScale.y) ? inverseScale : Vector2<float>{1.0f, 1.0f};
+    const bool usable = isUsableScale(inverseScale.x) && isUsableScale(inverseScale.y);
+    mInverseScale = usable ? inverseScale : Vector2<float>{1.0f, 1.0f};
   }
 
   // Fixes the grain to the first point of a stroke, stroke units.

@@ -6,7 +6,7 @@
 #include <vector>
 
 #include "engine/MotionEvent.h"
-#include "outline/Pencil2OutlineDrawableGLV4.h"
+#include "outline/OutlineDrawables.h"
 #include "support/DrawableBoard.h"
 
 namespace QeltTests {

@@ -10,10 +10,9 @@
 #include <vector>
 
 #include "base/RectF.h"
-#include "stroke/parts/DirtyBox.h"
-#include "stroke/parts/MoveFilter.h"
-#include "stroke/parts/PenAttitude.h"
-#include "stroke/parts/StampCounter.h"
+#include "stroke/input/MoveFilter.h"
+#include "stroke/input/PenAttitude.h"
+#include "stroke/placing/StampRun.h"
 
 namespace Qelt {
 namespace {
@@ -99,8 +98,7 @@ TEST(DirtyBoxTest, LeavesOutEdgesThatAreNaN) {
 }
 
 TEST(StampCounterTest, LetsTheShapesTakeTurnsEvenPastTheLargestCount) {
-  StampCounter stamps;
-  stamps.restart(std::numeric_limits<std::int32_t>::max() - 1);  // 2147483646 = 3 * 715827882
+  StampCounter stamps(std::numeric_limits<std::int32_t>::max() - 1);  // 2147483646 = 3 * 715827882
   for (const int shape : {0, 1, 2, 0}) EXPECT_EQ(stamps.next(), shape);
   EXPECT_GT(stamps.count(), 0);
 }

@@ -21,17 +21,17 @@ TEST(StampCountTest, SaturatesInsteadOfOverflowing) {
   EXPECT_EQ(saturatedCount(-1.5f), -1);
   EXPECT_EQ(incremented(kLargest), kLargest);
   EXPECT_EQ(incremented(9), 10);
-  EXPECT_EQ(stampCountV1(10.0f, 1e-30f), kLargest);
-  EXPECT_EQ(stampCountV3(1e30f, 1e-30f), kLargest);
+  EXPECT_EQ(getRepeatV1(10.0f, 1e-30f), kLargest);
+  EXPECT_EQ(getRepeatV3(1e30f, 1e-30f), kLargest);
 }
 
 TEST(ScreenScaleTest, GoesByTheShorterSide) {
-  EXPECT_EQ(pixelScale(1440, 2960), 4.0f);
-  EXPECT_EQ(speedScale(1440, 2960, 1.0f), 1.0f);
-  EXPECT_EQ(pixelScale(2960, 720), 2.0f);
-  EXPECT_EQ(speedScale(2960, 720, 1.0f), 2.0f);
-  EXPECT_EQ(pixelScale(0, 2960), 1.0f);
-  EXPECT_EQ(speedScale(1440, 0, 0.5f), 0.5f);
+  EXPECT_EQ(getPixelScale(1440, 2960), 4.0f);
+  EXPECT_EQ(getSpeedScale(1440, 2960, 1.0f), 1.0f);
+  EXPECT_EQ(getPixelScale(2960, 720), 2.0f);
+  EXPECT_EQ(getSpeedScale(2960, 720, 1.0f), 2.0f);
+  EXPECT_EQ(getPixelScale(0, 2960), 1.0f);
+  EXPECT_EQ(getSpeedScale(1440, 0, 0.5f), 0.5f);
 }
 
 }  // namespace
