@@ -10,11 +10,10 @@
 #include <string>
 #include <utility>
 
-#include "Stage.h"
 #include "desktop/gl/CallTask.h"
 #include "gl/ITask.h"
 #include "support/LogCapture.h"
-#include "support/Versions.h"
+#include "support/PenBoard.h"
 
 namespace QeltTests {
 namespace {
@@ -22,9 +21,8 @@ namespace {
 using QeltDesktop::RenderQueue;
 
 struct Case {
-  const char* name;
+  Kind kind;
   int version;
-  void (*draw)(Stage&);
 };
 
 class ContextLoss : public testing::TestWithParam<Case> {
@@ -33,7 +31,7 @@ class ContextLoss : public testing::TestWithParam<Case> {
   using Call = std::function<void()>;
   std::vector<std::uint8_t> picture(std::map<long, Call> calls) {
     mLayer.clear();
-    Stage stage(mQueue, &mLayer, GetParam().version);
+    PenBoard board({.version = GetParam().version, .size = 4.0f}, mQueue, &mLayer);
     mPosts = 0;
     mQueue.accept = [&](const Qelt::ITask&) {
       if (const auto call = calls.find(++mPosts); call != calls.end()) {
@@ -43,7 +41,7 @@ class ContextLoss : public testing::TestWithParam<Case> {
       }
       return true;
     };
-    GetParam().draw(stage);
+    board.draw(GetParam().kind);
     mQueue.finish();
     mQueue.accept = nullptr;
     mQueue.restoreContext();
@@ -84,7 +82,6 @@ TEST_P(ContextLoss, EmptiesTheLayerAndSparesWhatIsDrawnAfterwards) {
       if (lost == back) continue;
       EXPECT_TRUE(picture({{lost, mLose}, {back, mRestore}}) == expected)
           << "lost before task " << lost << ", back before task " << back << " of " << posts;
-      ++losses;
     }
   }
   EXPECT_TRUE(picture({{1, mLose}}) == mEmpty) << "lost for good";
@@ -93,14 +90,13 @@ TEST_P(ContextLoss, EmptiesTheLayerAndSparesWhatIsDrawnAfterwards) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Strokes, ContextLoss,
-                         testing::Values(Case{"LiveVersion1", 1, [](Stage& stage) { stage.live(false); }},
-                                         Case{"LiveVersion7", 7, [](Stage& stage) { stage.live(false); }},
-                                         Case{"LiveVersion8", 8, [](Stage& stage) { stage.live(false); }},
-                                         Case{"Redraws", 8, [](Stage& stage) { stage.redraw(false); }},
-                                         Case{"Outlines", 8, [](Stage& stage) { stage.outline(false); }},
-                                         Case{"Preview", 8, [](Stage& stage) { stage.preview(false); }},
-                                         Case{"Prediction", 8, [](Stage& stage) { stage.predict(false); }}),
-                         [](const auto& test) { return std::string(test.param.name); });
+                         testing::Values(Case{Kind::Live, 1}, Case{Kind::Live, 7}, Case{Kind::Live, 8},
+                                         Case{Kind::Redraw, 8}, Case{Kind::Outline, 8},
+                                         Case{Kind::Preview, 8}, Case{Kind::Prediction, 8}),
+                         [](const auto& test) {
+                           return testing::PrintToString(test.param.kind) + "Version" +
+                                  std::to_string(test.param.version);
+                         });
 
 }  // namespace
 }  // namespace QeltTests
