@@ -1,6 +1,6 @@
 #include "BenchPen.h"
 
-#include "pen/PencilEntry.h"
+#include "pen/Pencil2.h"
 
 namespace QeltBench {
 

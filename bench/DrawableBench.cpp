@@ -7,6 +7,7 @@
 #include "base/RectF.h"
 #include "desktop/pencommon/BatchObserver.h"
 #include "engine/MotionEvent.h"
+#include "pen/RenderingVersions.h"
 #include "pencommon/PenOutlineDrawableGL.h"
 #include "pencommon/PenPredictionDrawableGL.h"
 #include "pencommon/PenPreviewDrawableGL.h"
@@ -36,9 +37,9 @@ Qelt::MotionEvent recorded(int action, int points) {
   return event;
 }
 
-// Calls draw() again and again; the tasks run outside the clock. `floatsPerStamp`: of the first buffer.
+// Calls draw() again and again; the tasks run outside the clock. `floatsPerVertex`: of the first buffer.
 template <typename Draw>
-void measure(benchmark::State& state, BenchPen& bench, int floatsPerStamp, Draw&& draw) {
+void measure(benchmark::State& state, BenchPen& bench, int floatsPerVertex, Draw&& draw) {
   std::uint64_t floats = 0;
   QeltDesktop::setBatchObserver(
       [&floats](const QeltDesktop::Batch& batch) { floats += batch.buffers[0].size(); });
@@ -52,7 +53,7 @@ void measure(benchmark::State& state, BenchPen& bench, int floatsPerStamp, Draw&
     bench.drain();
     state.ResumeTiming();
   }
-  const double stamps = static_cast<double>(state.iterations()) * once / floatsPerStamp;
+  const double stamps = static_cast<double>(state.iterations()) * once / (6 * floatsPerVertex);
   state.counters["ns/stamp"] =
       benchmark::Counter(stamps * 1e-9, benchmark::Counter::kIsRate | benchmark::Counter::kInvert);
 }
@@ -64,12 +65,18 @@ void outline(benchmark::State& state) {
   drawable->SetCanvas(&bench.canvas());
   drawable->SetOutlineSize(3.0f);
   const Qelt::MotionEvent event = recorded(Qelt::kActionUp, kPoints);
-  measure(state, bench, 42, [&] {
+  measure(state, bench, Qelt::kOutlineFloatsPerVertex, [&] {
     Qelt::RectF rect;
     drawable->DrawOutline(&event, &rect);
   });
 }
-BENCHMARK(outline)->Name("outline_V")->Arg(1)->Arg(2)->Arg(3)->Arg(4)->Arg(5);
+// Each class of outline drawable once.
+void eachOutlineClass(benchmark::internal::Benchmark* bench) {
+  for (const Qelt::RenderingVersion& version : Qelt::kRenderingVersions) {
+    if (version.outlineVersion == version.number) bench->Arg(version.number);
+  }
+}
+BENCHMARK(outline)->Name("outline_V")->Apply(eachOutlineClass);
 
 // The sample stroke of the settings panel.
 void preview(benchmark::State& state) {
@@ -77,7 +84,7 @@ void preview(benchmark::State& state) {
   Qelt::PenPreviewDrawableGL* drawable = bench.pen().GetPreviewDrawableGL();
   drawable->SetCanvas(&bench.canvas());
   const Qelt::MotionEvent event = recorded(Qelt::kActionUp, kPoints);
-  measure(state, bench, 54, [&] {
+  measure(state, bench, Qelt::kPreviewFloatsPerVertex, [&] {
     Qelt::RectF rect;
     drawable->RedrawPen(&event, &rect);
   });
@@ -121,7 +128,8 @@ void prediction(benchmark::State& state) {
     bench.drain();
     state.ResumeTiming();
   }
-  const double stamps = static_cast<double>(state.iterations()) * static_cast<double>(floats) / 66.0;
+  const double stamps = static_cast<double>(state.iterations()) * static_cast<double>(floats) /
+                        (6 * Qelt::kPredictionFloatsPerVertex);
   state.counters["ns/stamp"] =
       benchmark::Counter(stamps * 1e-9, benchmark::Counter::kIsRate | benchmark::Counter::kInvert);
 }

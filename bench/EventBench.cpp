@@ -8,12 +8,12 @@
 #include <vector>
 
 #include "BenchPen.h"
-#include "Ink.h"
-#include "InkmlReader.h"
-#include "StrokeFeeder.h"
 #include "base/RectF.h"
 #include "engine/MotionEvent.h"
+#include "ink/Ink.h"
+#include "ink/InkmlReader.h"
 #include "pencommon/PenStrokeDrawableGL.h"
+#include "play/StrokeFeeder.h"
 
 namespace QeltBench {
 namespace {
@@ -39,9 +39,9 @@ void reportEvents(const std::string& inkPath) {
     BenchPen bench(8, 6.0f);
     Qelt::PenStrokeDrawableGL* drawable = bench.pen().GetStrokeDrawableGL();
     drawable->SetCanvas(&bench.canvas());
-    for (const auto& trace : page.traces) {
-      const auto pointer = QeltDesktop::pointerFor(trace, {}, {});
-      QeltDesktop::feedLive(trace, pointer, 1, false, [&](QeltDesktop::LiveEvent& live) {
+    for (const auto& stroke : page.strokes) {
+      const auto pointer = QeltDesktop::pointerFor(stroke, {}, {});
+      QeltDesktop::feedLive(stroke, pointer, 1, false, [&](QeltDesktop::LiveEvent& live) {
         Qelt::RectF rect;
         const auto begin = Clock::now();
         drawable->Draw(&live.event, &rect);

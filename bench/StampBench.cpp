@@ -6,11 +6,7 @@
 #include "Floor.h"
 #include "base/Vector.h"
 #include "outline/Pencil2OutlineDrawableRTV1.h"
-#include "prediction/Pencil2PredictionDrawableRT.h"
-#include "preview/Pencil2PreviewDrawableRT.h"
-#include "render/Pencil2StrokeDrawableRTV1.h"
-#include "render/Pencil2StrokeDrawableRTV2.h"
-#include "render/Pencil2StrokeDrawableRTV3.h"
+#include "render/RenderDrawables.h"
 
 // Nanoseconds a stamp for what surrounds the walk: the bytes alone, and the pen's vertices.
 namespace {
@@ -73,12 +69,12 @@ BENCHMARK(addPoint<Qelt::Pencil2StrokeDrawableRTV3>)->Name("b/AddPoint_RTV3");
 BENCHMARK(addPoint<Qelt::Pencil2PreviewDrawableRT>)->Name("b/AddPoint_preview");
 BENCHMARK(addPoint<Qelt::Pencil2PredictionDrawableRT>)->Name("b/AddPoint_prediction");
 
-// The outline's stamps go into two streams of 42 floats each.
+// The outline's stamps go into two streams.
 void addOutlinePoint(benchmark::State& state) {
   Qelt::Pencil2OutlineDrawableRTV1 renderer(nullptr);
   std::vector<float> inner, outer;
-  inner.reserve(kStampsPerBatch * 42);
-  outer.reserve(kStampsPerBatch * 42);
+  inner.reserve(kStampsPerBatch * 6 * Qelt::kOutlineVertex.floats());
+  outer.reserve(inner.capacity());
   renderer.SetBuffer(&inner, &outer);
   renderer.SetOutlineSize(3.0f);
   Inputs in;

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <chrono>
 #include <cmath>
+#include <cstddef>
 #include <cstdint>
 #include <numeric>
 #include <vector>
@@ -11,6 +12,7 @@
 #include "base/RectF.h"
 #include "desktop/pencommon/BatchObserver.h"
 #include "engine/MotionEvent.h"
+#include "pen/RenderingVersions.h"
 #include "pencommon/PenStrokeDrawableGL.h"
 
 // Nanoseconds a stamp of a live move event, the whole road on the main thread: the pen, the host's path, the
@@ -56,7 +58,8 @@ void liveMove(benchmark::State& state) {
   for (int i = 0; i < kEvents; ++i)
     events.push_back(eventOf(Qelt::kActionMove, 1 + i * kSamplesPerEvent, kSamplesPerEvent));
   const Qelt::MotionEvent down = eventOf(Qelt::kActionDown, 0, 1);
-  const double floatsPerStamp = state.range(0) == 8 ? 66.0 : 54.0;
+  const auto& version = Qelt::kRenderingVersions[static_cast<std::size_t>(state.range(0) - 1)];
+  const double floatsPerStamp = 6.0 * version.floatsPerVertex;
 
   // One round counts the stamps, which the observer's copying would disturb.
   Qelt::RectF rect;
@@ -83,15 +86,12 @@ void liveMove(benchmark::State& state) {
   }
   state.counters["ns/stamp"] = std::accumulate(fastest.begin(), fastest.end(), 0.0) / stampsPerRound * 1e9;
 }
-BENCHMARK(liveMove)
-    ->Name("d/live_move_V")
-    ->Arg(8)
-    ->Arg(1)
-    ->Arg(2)
-    ->Arg(3)
-    ->Arg(4)
-    ->Arg(5)
-    ->Arg(7)
-    ->UseManualTime();
+// Each class of stroke drawable once.
+void eachStrokeClass(benchmark::internal::Benchmark* bench) {
+  for (const Qelt::RenderingVersion& version : Qelt::kRenderingVersions) {
+    if (version.drawnBy == version.strokeVersion) bench->Arg(version.number);
+  }
+}
+BENCHMARK(liveMove)->Name("d/live_move_V")->Apply(eachStrokeClass)->UseManualTime();
 
 }  // namespace

@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "EventBench.h"
+#include "pen/RenderingVersions.h"
 
 // Runs all benchmarks once and prints the ratios that count; machines differ, ratios within one run hardly.
 namespace {
@@ -70,12 +71,13 @@ int main(int argc, char** argv) {
     reporter.printRatio("(b)/(a)", ("b/AddPoint_" + std::string(drawable)).c_str(), "a/append_prepared");
   }
   reporter.printRatio("(d)/(c)", "d/live_move_V/8/manual_time", "c/cheap_walk");
-  for (const char* version : {"1", "2", "3", "4", "5", "7", "8"}) {
-    const std::string name = "d/live_move_V/" + std::string(version) + "/manual_time";
-    reporter.printRatio("(d)/(a)", name.c_str(), "a/append_prepared");
+  // What was not run is not printed.
+  for (const Qelt::RenderingVersion& version : Qelt::kRenderingVersions) {
+    const std::string number = std::to_string(version.number);
+    reporter.printRatio("(d)/(a)", ("d/live_move_V/" + number + "/manual_time").c_str(), "a/append_prepared");
+    reporter.printRatio("whole/(a)", ("outline_V/" + number).c_str(), "a/append_prepared");
   }
-  for (const char* whole :
-       {"outline_V/1", "outline_V/2", "outline_V/3", "outline_V/4", "outline_V/5", "preview", "prediction"}) {
+  for (const char* whole : {"preview", "prediction"}) {
     reporter.printRatio("whole/(a)", whole, "a/append_prepared");
   }
   reporter.printRatio("cache", "redraw/cached/1000", "redraw/computed/1000");

@@ -16,5 +16,7 @@ else()
 endif()
 find_program(QELT_CCACHE ccache)
 if(QELT_CCACHE)
-  set(CMAKE_CXX_COMPILER_LAUNCHER ${QELT_CCACHE})
+  # Else it keeps nothing that uses a precompiled header.
+  set(CMAKE_CXX_COMPILER_LAUNCHER
+    ${CMAKE_COMMAND} -E env CCACHE_SLOPPINESS=pch_defines,time_macros ${QELT_CCACHE})
 endif()

@@ -22,7 +22,7 @@ function(qelt_pgm_as_bytes out picture width height)
   set(${out} "${bytes}" PARENT_SCOPE)
 endfunction()
 
-# Writes the source that defines the symbols of render/Patterns.h; its path comes back in `out`. Changing a picture
+# Writes the source that defines the symbols of render/PatternTextures.h; its path comes back in `out`. Changing a picture
 # configures the build anew.
 function(qelt_embed_patterns out)
   set(grain ${QELT_RESOURCE_DIR}/paper-grain.pgm)
@@ -32,7 +32,7 @@ function(qelt_embed_patterns out)
   qelt_pgm_as_bytes(stampBytes ${stamps} 100 300)
   set(source ${CMAKE_CURRENT_BINARY_DIR}/Patterns.cpp)
   # Written only when it differs, so that configuring does not cause compiling.
-  file(CONFIGURE OUTPUT ${source} CONTENT "#include \"render/Patterns.h\"
+  file(CONFIGURE OUTPUT ${source} CONTENT "#include \"render/PatternTextures.h\"
 
 namespace Qelt {
 

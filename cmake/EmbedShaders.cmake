@@ -1,20 +1,25 @@
-# qelt_embed_shader(<out> <class> <name>): writes the definitions of <class>::szVertexShader and szFragmentShader
-# from plugin/shaders/glsl/<name>.vert and .frag into a source file in the build tree; <out> names it.
-function(qelt_embed_shader out class name)
+# qelt_embed_shaders(<out> [<class> <vertex> <fragment>]...): writes the definitions of each class's szVertexShader and
+# szFragmentShader, the texts of those files in plugin/shaders/glsl, into one source in the build tree; <out> names it.
+function(qelt_embed_shaders out)
   set(glsl ${PROJECT_SOURCE_DIR}/plugin/shaders/glsl)
-  set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS ${glsl}/${name}.vert ${glsl}/${name}.frag)
-  file(READ ${glsl}/${name}.vert vertex)
-  file(READ ${glsl}/${name}.frag fragment)
-  set(cpp ${CMAKE_CURRENT_BINARY_DIR}/${class}Sources.cpp)
+  set(rows ${ARGN})
+  set(definitions "")
+  while(rows)
+    list(POP_FRONT rows class vertex fragment)
+    set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS ${glsl}/${vertex} ${glsl}/${fragment})
+    file(READ ${glsl}/${vertex} vertexText)
+    file(READ ${glsl}/${fragment} fragmentText)
+    string(APPEND definitions "
+const char ${class}::szVertexShader[] = R\"glsl(${vertexText})glsl\";
+const char ${class}::szFragmentShader[] = R\"glsl(${fragmentText})glsl\";
+")
+  endwhile()
+  set(cpp ${CMAKE_CURRENT_BINARY_DIR}/ShaderSources.cpp)
   file(CONFIGURE OUTPUT ${cpp} @ONLY CONTENT [[
-#include "shaders/@class@.h"
+#include "shaders/PencilShaders.h"
 
 namespace Qelt {
-
-const char @class@::szVertexShader[] = R"glsl(@vertex@)glsl";
-
-const char @class@::szFragmentShader[] = R"glsl(@fragment@)glsl";
-
+@definitions@
 }  // namespace Qelt
 ]])
   set(${out} ${cpp} PARENT_SCOPE)

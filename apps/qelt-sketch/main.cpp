@@ -10,15 +10,15 @@
 #include <string>
 #include <variant>
 
-#include "Commands.h"
-#include "Options.h"
-#include "Refusal.h"
-#include "StandardOutput.h"
+#include "commands/CommandLine.h"
+#include "commands/Commands.h"
+#include "output/Terminal.h"
+#include "text/Refusal.h"
 
 namespace {
 
-// A file opened later must not become standard output or error, where others write. Reading the first and
-// writing the second of these fails, as it would on what is closed.
+// Opens the standard descriptors that are closed, so that no file opened later becomes standard output or
+// error, where others write. Reading and writing them fails, as it would on a closed descriptor.
 void fillStandardDescriptors() {
   constexpr int kModes[] = {O_WRONLY, O_RDONLY, O_WRONLY};
   for (int number = STDIN_FILENO; number <= STDERR_FILENO; ++number) {
@@ -51,7 +51,7 @@ int end(const QeltDesktop::UsageEnd& usage) {
 
 int main(int argc, char** argv) {
   fillStandardDescriptors();
-  // A file that grows beyond what is allowed is told like one that finds the disk full.
+  // Writing beyond the allowed file size then fails like writing to a full disk.
   std::signal(SIGXFSZ, SIG_IGN);
   try {
     const std::variant<QeltDesktop::Options, QeltDesktop::UsageEnd> parsed =
@@ -67,7 +67,7 @@ int main(int argc, char** argv) {
   } catch (const std::exception& error) {
     return endNotDone(std::string("qelt-sketch: ") + error.what());
   } catch (...) {
-    // A plug-in throws what it likes.
+    // A plug-in may throw anything.
     return endNotDone("qelt-sketch: stopped by an exception of unknown type");
   }
 }

@@ -49,7 +49,8 @@ void cofactorsOf(const T* m, T* out) {
   out[8] = m[4] * m[0] - m[1] * m[3];
 }
 
-// A conversion that leaves int's range is undefined; a mapped rectangle may be anything, NaN (0) too.
+// A conversion that leaves int's range would be undefined, and a mapped rectangle may have any edges: those
+// beyond the range take its limit, and NaN becomes 0.
 int saturated(float value) {
   if (value != value) return 0;
   if (value >= 2147483648.0f) return std::numeric_limits<int>::max();
@@ -258,7 +259,7 @@ Matrix3<T>& Matrix3<T>::preConcat(const Matrix3& other) {
 template <typename T>
 Matrix3<T>& Matrix3<T>::postTranslate(T tx, T ty) {
   mElements[0] += mElements[2] * tx;
-  // Kept: a true product would add element 2 times ty. Hosts keep documents that were laid out by this.
+  // Kept: a true product would add element 2 times ty.
   mElements[1] += mElements[1] * ty;
   mElements[3] += mElements[5] * tx;
   mElements[4] += mElements[5] * ty;
@@ -300,7 +301,7 @@ void Matrix3<T>::mapRect(RectF* dst, const RectF& src) const {
   const T* m = mElements;
   bool first = true;
   for (const auto& [x, y] : corners) {
-    // A vanishing w is not guarded: the corner is then infinite or no number.
+    // A vanishing w is not guarded: the corner is then infinite or NaN.
     const T w = m[8] + x * m[2] + y * m[5];
     const T mappedX = (m[6] + x * m[0] + y * m[3]) / w;
     const T mappedY = (m[7] + x * m[1] + y * m[4]) / w;

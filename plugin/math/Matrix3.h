@@ -15,8 +15,8 @@ namespace Qelt {
 //   2 persp. 0   5 persp. 1   8 persp. 2 (1 when affine)
 //
 // "pre" makes this = this * X (X acts on points first), "post" makes this = X * this (X acts last).
-// Operations that change the matrix return it. Nothing reports an error; what has no finite answer gives
-// none. Kept: rotations here take degrees, those of Matrix4 take radians.
+// Operations that change the matrix return it. Nothing reports an error; where there is no finite result, the
+// result is infinite or NaN. Kept: rotations here take degrees, those of Matrix4 take radians.
 //
 // A plain value: any thread, no shared state. Only Matrix3<float> exists; the pen's library exports all of
 // it.

@@ -10,8 +10,8 @@ namespace Qelt {
 // A 4 x 4 matrix: transforms of space and the projections GL takes.
 //
 // Column-major: element (row r, column c) is stored at 4c + r, points are column vectors, and the translation
-// is in elements 12, 13 and 14. Operations that change the matrix return it. Nothing reports an error; what
-// has no finite answer gives none.
+// is in elements 12, 13 and 14. Operations that change the matrix return it. Nothing reports an error; where
+// there is no finite result, the result is infinite or NaN.
 // Kept: rotations here take radians, those of Matrix3 take degrees.
 //
 // A plain value: any thread, no shared state. Only Matrix4<float> exists; the pen's library exports all of

@@ -1,6 +1,6 @@
 #include "outline/Pencil2OutlineDrawableGL.h"
 
-#include "stroke/parts/SampleCleaner.h"
+#include "stroke/input/SampleCleaner.h"
 
 namespace Qelt {
 

@@ -1,7 +1,7 @@
 #pragma once
 
 #include "pencommon/PenOutlineDrawableGL.h"
-#include "stroke/parts/PenSettings.h"
+#include "stroke/input/PenSettings.h"
 
 namespace Qelt {
 
@@ -17,7 +17,7 @@ class Pencil2OutlineDrawableGL : public PenOutlineDrawableGL {
   float getSize() const;
   // Shorter side of the screen over 360; 1 without a screen.
   float getPixelScale() const;
-  // 1440 over the shorter side of the screen. Kept: 0 without a screen, where a stroke answers 1.
+  // 1440 over the shorter side of the screen. Kept: 0 without a screen, where a stroke returns 1.
   float getSpeedScale() const;
   // Replaces a NaN.
   static void checkNan(float* value, float fallback);

@@ -4,20 +4,18 @@
 
 #include <utility>
 
-#include "gl/GraphicsFactory.h"
 #include "gl/GraphicsObject.h"
 #include "gl/ManagedObject.h"
 #include "gl/OpenGLRenderer.h"
-#include "gl/VertexDescriptor.h"
 #include "graphics/ISPBitmap.h"
 #include "graphics/ISPCanvas.h"
 #include "graphics/SPGraphicsFactory.h"
 #include "log/Log.h"
 #include "math/Matrix4.h"
 #include "pencommon/PenGLDataManager.h"
-#include "render/DrawablePosts.h"
+#include "render/Posting.h"
 #include "render/ScopeExit.h"
-#include "shaders/Pencil2OutlineShader.h"
+#include "shaders/PencilShaders.h"
 #include "shaders/ShaderRegistry.h"
 
 namespace Qelt {
@@ -31,14 +29,6 @@ void log(const char* signature) {
   __android_log_print(kLogDebug, kLogTag, "%s", signature);
 }
 
-GraphicsObject* createStampObject() {
-  VertexDescriptor descriptor;
-  descriptor.addAttribute(AttributeType::Float, 4, -1);
-  descriptor.addAttribute(AttributeType::Float, 1, -1);
-  descriptor.addAttribute(AttributeType::Float, 2, -1);
-  return GraphicsFactory::createGraphicsObject(1, GraphicsFactory::kTriangles, descriptor, 0, 0);
-}
-
 Vector4<float> colorOf(unsigned int argb) {
   const auto channel = [argb](int shift) { return static_cast<float>((argb >> shift) & 0xFFu) / 255.0f; };
   return {channel(16), channel(8), channel(0), channel(24)};
@@ -49,9 +39,6 @@ bool hasFloats(const std::vector<float>* batch) {
 }
 
 }  // namespace
-
-Pencil2OutlineDrawableRTV1::Pencil2OutlineDrawableRTV1(PenGLDataManager* manager)
-    : Pencil2OutlineDrawableRT(manager) {}
 
 void Pencil2OutlineDrawableRTV1::AddPoint(Vector2<float>, float) {}
 
@@ -72,8 +59,8 @@ void Pencil2OutlineDrawableRTV1::Init() {
 }
 
 void Pencil2OutlineDrawableRTV1::prepare() {
-  if (mInnerObject == nullptr) mInnerObject = createStampObject();
-  if (mOuterObject == nullptr) mOuterObject = createStampObject();
+  if (mInnerObject == nullptr) mInnerObject = createStampObject(kOutlineVertex);
+  if (mOuterObject == nullptr) mOuterObject = createStampObject(kOutlineVertex);
   if (mShader == nullptr) {
     mShader = ShaderManager::GetInstance()->GetShader<Pencil2OutlineShader>();
   } else if (!mShader->isLinked()) {
@@ -92,8 +79,8 @@ void Pencil2OutlineDrawableRTV1::Release() {
   mReleased = true;
 }
 
-// Kept: a point texture that was drawn is not drawn again; what a bitmap that was drawn into holds after a
-// context loss is the host's affair. Only what could not be made without a context is made now.
+// Kept: a point texture that was drawn is not drawn again; the host has to see to what a bitmap that was
+// drawn into holds after a context loss. Only what could not be made without a context is made now.
 void Pencil2OutlineDrawableRTV1::RestoreGLObject() {
   log("virtual void Qelt::Pencil2OutlineDrawableRTV1::RestoreGLObject()");
   if (mReleased) return;
@@ -106,13 +93,13 @@ void Pencil2OutlineDrawableRTV1::CreatePenCanvas(int, int, IGLMsgQueue*) {
   if (!mReleased) buildPointTexture();
 }
 
-// A square full of alpha: the shader only asks where there is any.
+// Fills the texture with alpha: the shader only looks whether there is any.
 void Pencil2OutlineDrawableRTV1::buildPointTexture() {
   if (mPointTextureBitmap != nullptr) return;
   IGLMsgQueue* queue = queueOf(mDataManager);
   ISPBitmap* bitmap = SPGraphicsFactory::CreateBitmap(queue, kPointSide, kPointSide, nullptr, false, 0);
   if (bitmap == nullptr) return;
-  // What could not be drawn whole is not kept, so that it is tried again.
+  // A bitmap that could not be drawn whole is not kept, so that the next call tries again.
   const ScopeExit dropBitmap([this, bitmap] {
     if (mPointTextureBitmap == nullptr) SPGraphicsFactory::ReleaseBitmap(bitmap);
   });
@@ -166,7 +153,7 @@ void Pencil2OutlineDrawableRTV1::Draw(ISPSubBitmap* target, Matrix4<float>& matr
   const Matrix4<float> projection = target->GetProjection() * matrix;
   drawPass(projection, colorOf(GetOutlineColor()), 0.0f, mOuterObject);
 
-  // What is there keeps the share that the stamps leave uncovered.
+  // What was drawn before keeps the share that the stamps leave uncovered.
   OpenGLRenderer::setBlendFuncFactors(GL_ZERO, GL_ONE_MINUS_SRC_ALPHA, GL_ZERO, GL_ONE_MINUS_SRC_ALPHA);
   drawPass(projection, {}, 1.0f, mInnerObject);
 

@@ -5,9 +5,9 @@
 #include <vector>
 
 #include "base/Vector.h"
-#include "outline/Pencil2OutlineDrawableRT.h"
+#include "pencommon/PenOutlineDrawableRT.h"
+#include "render/BatchGuard.h"
 #include "render/StampVertices.h"
-#include "render/UnclaimedBatch.h"
 
 namespace Qelt {
 
@@ -15,32 +15,43 @@ class GraphicsObject;
 class ISPBitmap;
 class Pencil2OutlineShader;
 
-// The render-thread half of every outline version. Each stamp becomes two quads in two streams: one as large
-// as the stamp, one larger by the outline size. The large ones are drawn in the outline's colour, then the
-// small ones erase, so that a rim is left.
+// The base of the outline render drawables; adds nothing to the host's.
+class Pencil2OutlineDrawableRT : public PenOutlineDrawableRT {
+ public:
+  using PenOutlineDrawableRT::PenOutlineDrawableRT;
+};
+
+// The render drawable of every outline version. Each stamp becomes two quads in two streams: one as large as
+// the stamp, one larger by the outline size. The large ones are drawn in the outline's colour, then the small
+// ones erase, so that a rim is left.
+//
+// The host calls CreatePenCanvas before anything is drawn. Per batch, stamps are appended between
+// SetBuffer(inner, outer) and SetBuffer(nullptr, nullptr); then come SendDataToGPU, Update, Draw for each
+// tile, and Clear. Release comes at the end. The drawable borrows the batch from SendDataToGPU to Clear.
 //
 // What could not be made, for want of memory or of a GL context, is tried again at the next CreatePenCanvas
-// and when the context is restored. Once released, a drawable never draws again; a host makes a new one.
+// and when the context is restored; until then nothing is drawn. Once released, a drawable never draws again;
+// a host makes a new one.
 //
 // Main thread: AddPoint, Appender, SetInverseScale, unclaimedBatch. Render thread: the rest.
 class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
  public:
-  static constexpr std::size_t kFloatsPerVertex = 7;
+  static constexpr std::size_t kFloatsPerVertex = kOutlineVertex.floats();
 
-  explicit Pencil2OutlineDrawableRTV1(PenGLDataManager* manager);
+  using Pencil2OutlineDrawableRT::Pencil2OutlineDrawableRT;
 
   void AddPoint(Vector2<float> point, float size) override;
 
-  // Appends stamps to both write buffers, each where there is one. Every stamp has a centre and a direction
-  // (-sin a, cos a), two vectors in a row; a width in stroke units; and a tilt factor. Lives while the
-  // buffers and the outline size stay as they are.
+  // Appends stamps to the write buffers, or to the one that is there. Every stamp has a centre and a
+  // direction (-sin a, cos a), two vectors in a row; a width in stroke units; and a tilt factor. Must not
+  // outlive a change of the buffers or of the outline size.
   class Appender {
    public:
     // Makes room for so many stamps, so that appending them does not allocate. Throws std::bad_alloc.
-    Appender(Pencil2OutlineDrawableRTV1& renderer, int stamps)
-        : mInner(renderer.mInnerWriteBuffer, stamps),
-          mOuter(renderer.mOuterWriteBuffer, stamps),
-          mOutlineSize(renderer.GetOutlineSize()) {}
+    Appender(Pencil2OutlineDrawableRTV1& drawable, int stamps)
+        : mInner(drawable.mInnerWriteBuffer, stamps),
+          mOuter(drawable.mOuterWriteBuffer, stamps),
+          mOutlineSize(drawable.GetOutlineSize()) {}
 
     void AddPoint(const Vector2<float>* point, float size, float tiltFactor) {
       const StampLook look{0.0f, tiltFactor, 0.0f, point[1]};

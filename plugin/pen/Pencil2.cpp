@@ -1,6 +1,5 @@
 #include "pen/Pencil2.h"
 
-#include <atomic>
 #include <new>
 #include <utility>
 
@@ -9,13 +8,11 @@
 #include "outline/Pencil2OutlineDrawableGL.h"
 #include "pen/DrawableFactory.h"
 #include "pen/Pencil2Data.h"
-#include "pen/VersionTable.h"
-#include "pen/WholeDrawable.h"
+#include "pen/ReleasedName.h"
+#include "pen/RenderingVersions.h"
 #include "pencommon/PenGLDataManager.h"
-#include "pencommon/PenManager.h"
 #include "prediction/Pencil2PredictionDrawableGL.h"
 #include "preview/Pencil2PreviewDrawableGL.h"
-#include "render/Posting.h"
 #include "stroke/Pencil2StrokeDrawableGL.h"
 
 namespace Qelt {
@@ -25,37 +22,15 @@ constexpr float kMinSize = 0.477f;  // stroke units
 constexpr float kMaxSize = 6.571f;
 constexpr std::uint32_t kOpaqueBlack = 0xFF000000u;
 constexpr int kAdvancedSettingVersion = 8;
-constexpr std::int32_t kPredictionVersion = 8;  // the stroke version that predictions continue
 
-// The name that a dying pen has its data released by.
-class ReleasedName final : public String {
- public:
-  explicit ReleasedName(IGLMsgQueue* queue) : String(PenManager::QELT_PENCIL2_NAME), mQueue(queue) {}
-
-  // Of names whose release a queue took, and refused their deletion: the release may yet read them. The next
-  // pen that dies by that queue has them deleted, after it.
-  static void keep(ReleasedName* name) {
-    name->mNext = unclaimed.load();
-    while (!unclaimed.compare_exchange_weak(name->mNext, name)) {
-    }
+// The newest stroke version that predictions continue.
+constexpr std::int32_t kPredictionVersion = [] {
+  std::int32_t newest = 0;
+  for (const RenderingVersion& version : kRenderingVersions) {
+    if (version.predicts) newest = version.strokeVersion;
   }
-
-  static void settle(IGLMsgQueue* queue) {
-    ReleasedName* name = unclaimed.exchange(nullptr);
-    while (name != nullptr) {
-      ReleasedName* const next = name->mNext;
-      if (name->mQueue != queue || !postDelete<String>(queue, name)) keep(name);
-      name = next;
-    }
-  }
-
- private:
-  // Of all pens: several may die at once, each on its own host's thread.
-  static inline std::atomic<ReleasedName*> unclaimed{nullptr};
-
-  IGLMsgQueue* mQueue;
-  ReleasedName* mNext = nullptr;
-};
+  return newest;
+}();
 
 }  // namespace
 
@@ -69,8 +44,8 @@ Pencil2::Pencil2() {
   SetColor(static_cast<int>(kOpaqueBlack));
 }
 
-// Drawables go before the data they leave on the render thread, and the record last: their destructors may
-// still read it.
+// The drawables go first, then the data that they leave on the render thread. The record goes last, since the
+// drawables' destructors may still read it.
 Pencil2::~Pencil2() {
   delete std::exchange(mStrokeDrawable, nullptr);
   delete std::exchange(mPredictionDrawable, nullptr);
@@ -83,16 +58,7 @@ Pencil2::~Pencil2() {
 void Pencil2::releasePenData() {
   PenGLDataManager* manager = getPenDataManager();
   if (manager == nullptr) return;
-  IGLMsgQueue* queue = manager->GetMsgQueue();
-  if (queue != nullptr) {
-    ReleasedName::settle(queue);
-    auto* name = new (std::nothrow) ReleasedName(queue);
-    if (name != nullptr && !post(queue, manager, &PenGLDataManager::ReleasePenData, name)) {
-      delete name;
-    } else if (name != nullptr && !postDelete<String>(queue, name)) {
-      ReleasedName::keep(name);
-    }
-  }
+  if (IGLMsgQueue* queue = manager->GetMsgQueue(); queue != nullptr) ReleasedName::release(manager, queue);
   setPenDataManager(nullptr);
 }
 
@@ -127,7 +93,7 @@ bool Pencil2::GetPenAttribute(IPen::PenAttribute attribute) {
 }
 
 PenStrokeDrawableGL* Pencil2::GetStrokeDrawableGL() {
-  const std::int32_t version = versionTable[versionRow(getVersion())][0];
+  const std::int32_t version = renderingVersionOf(getVersion()).strokeVersion;
   if (mStrokeDrawable != nullptr && mStrokeVersion == version) return mStrokeDrawable;
   delete std::exchange(mStrokeDrawable, nullptr);
   mStrokeDrawable = createStrokeDrawable(version, record(), getPenDataManager());
@@ -136,29 +102,29 @@ PenStrokeDrawableGL* Pencil2::GetStrokeDrawableGL() {
 }
 
 IPenPredictionDrawableGL* Pencil2::GetPredictionStrokeDrawableGL() {
-  const std::int32_t version = versionTable[versionRow(getVersion())][0];
+  const RenderingVersion& rendering = renderingVersionOf(getVersion());
   // Kept: stored although no stroke drawable is made here, so that the next getter of strokes may keep one of
   // another version.
-  mStrokeVersion = version;
-  if (version != kPredictionVersion) {
+  mStrokeVersion = rendering.strokeVersion;
+  if (!rendering.predicts) {
     // Kept: the two versions are named the wrong way round.
     __android_log_print(
         kLogError, kLogTag, "%s - Stroke drawble version (%d) does not match prediction drawable(%d).",
         "virtual Qelt::IPenPredictionDrawableGL *Qelt::Pencil2::GetPredictionStrokeDrawableGL()",
-        static_cast<int>(kPredictionVersion), static_cast<int>(version));
+        static_cast<int>(kPredictionVersion), static_cast<int>(rendering.strokeVersion));
     __android_log_print(kLogError, kLogTag, "%s",
                         "Please, update prediction drawable to last stroke drawable and update "
                         "PEN_PREDICTION_CURRENT_VERSION");
     return nullptr;
   }
   if (mPredictionDrawable == nullptr) {
-    mPredictionDrawable = makeWhole<Pencil2PredictionDrawableGL>(record(), getPenDataManager());
+    mPredictionDrawable = createPredictionDrawable(record(), getPenDataManager());
   }
   return mPredictionDrawable;
 }
 
 PenOutlineDrawableGL* Pencil2::GetOutlineDrawableGL() {
-  const std::int32_t version = versionTable[versionRow(getVersion())][1];
+  const std::int32_t version = renderingVersionOf(getVersion()).outlineVersion;
   if (mOutlineDrawable != nullptr && mOutlineVersion == version) return mOutlineDrawable;
   delete std::exchange(mOutlineDrawable, nullptr);
   mOutlineDrawable = createOutlineDrawable(version, record(), getPenDataManager());
@@ -168,7 +134,7 @@ PenOutlineDrawableGL* Pencil2::GetOutlineDrawableGL() {
 
 PenPreviewDrawableGL* Pencil2::GetPreviewDrawableGL() {
   if (mPreviewDrawable == nullptr) {
-    mPreviewDrawable = makeWhole<Pencil2PreviewDrawableGL>(record(), getPenDataManager());
+    mPreviewDrawable = createPreviewDrawable(record(), getPenDataManager());
   }
   return mPreviewDrawable;
 }
@@ -210,3 +176,7 @@ float Pencil2::GetFixedWidth() {
 }
 
 }  // namespace Qelt
+
+Qelt::Pen* createPenInst() {
+  return new (std::nothrow) Qelt::Pencil2;
+}

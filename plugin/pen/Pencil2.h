@@ -13,9 +13,9 @@ class Pencil2PreviewDrawableGL;
 class Pencil2StrokeDrawableGL;
 struct Pencil2Data;
 
-// The pencil: settings, and the drawables that draw by them. Main thread. Drawables are made on first demand
-// and live until the pen dies, but for those that a change of the rendering version replaces, in their
-// getter.
+// The pencil: settings, and the drawables that draw by them. Main thread. A drawable is made on the first
+// demand and lives until the pen dies; stroke and outline drawables are replaced sooner, by their getter,
+// once the rendering version has changed.
 class Pencil2 final : public Pen, public IPenMorphable {
  public:
   Pencil2();
@@ -33,7 +33,7 @@ class Pencil2 final : public Pen, public IPenMorphable {
   // The data manager's queue; without a data manager the last one seen.
   IGLMsgQueue* GetMsgQueue() override;
 
-  // Options take effect with the next event a drawable handles. Setters always answer true.
+  // Options take effect with the next event a drawable handles. Setters always return true.
   bool SetCurveEnabled(bool enabled) override;
   bool IsCurveEnabled() override;
   bool SetFixedWidthEnabled(bool enabled) override;
@@ -43,7 +43,7 @@ class Pencil2 final : public Pen, public IPenMorphable {
 
  private:
   void releasePenData();
-  // The record, made now where memory ran out for it before; null when it still does.
+  // The record. If memory ran out for it before, it is made now; null when memory runs out again.
   Pencil2Data* record();
 
   Pencil2StrokeDrawableGL* mStrokeDrawable = nullptr;
@@ -58,3 +58,7 @@ class Pencil2 final : public Pen, public IPenMorphable {
 };
 
 }  // namespace Qelt
+
+// The entry point of the library: makes one pencil. Returns null when memory ran out. The caller owns the pen
+// and deletes it through its virtual destructor, on the main thread. Exported.
+extern "C" __attribute__((visibility("default"))) Qelt::Pen* createPenInst();

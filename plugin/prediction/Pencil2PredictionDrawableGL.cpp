@@ -5,29 +5,21 @@
 #include <cstdint>
 #include <new>
 
-#include "base/Error.h"
 #include "base/RectF.h"
 #include "engine/MotionEvent.h"
 #include "graphics/ISPPenCanvas.h"
 #include "pen/Pencil2Data.h"
-#include "render/DrawablePosts.h"
-#include "stroke/parts/PenSample.h"
-#include "stroke/parts/StampRun.h"
-#include "stroke/parts/StampWalk.h"
+#include "render/Posting.h"
+#include "stroke/input/PenSample.h"
 
 namespace Qelt {
-namespace {
-
-constexpr const PredictionProfile& kProfile = PredictionVersion::profile;
-constexpr float kGrowth = 1.0f;  // stroke units around what a call changed
-
-}  // namespace
 
 Pencil2PredictionDrawableGL::Pencil2PredictionDrawableGL(Pencil2Data* penData, PenGLDataManager* manager)
     : PenPredictionDrawableGL(manager),
       mPenData(penData),
-      mRender(new (std::nothrow) RenderDrawable(manager)) {
-  setDrawableRT(mRender);
+      mRenderDrawable(new (std::nothrow) RenderDrawable(manager)),
+      mPlacer(mRenderDrawable) {
+  setDrawableRT(mRenderDrawable);
 }
 
 Pencil2PredictionDrawableGL::~Pencil2PredictionDrawableGL() {
@@ -35,22 +27,19 @@ Pencil2PredictionDrawableGL::~Pencil2PredictionDrawableGL() {
 }
 
 void Pencil2PredictionDrawableGL::SetOpacity(float opacity) {
-  if (mRender != nullptr && std::isfinite(opacity)) mRender->SetOpacity(opacity);
+  if (mRenderDrawable != nullptr && std::isfinite(opacity)) mRenderDrawable->SetOpacity(opacity);
 }
 
 bool Pencil2PredictionDrawableGL::Draw(const MotionEvent* event, RectF* rect) {
-  if (event == nullptr || rect == nullptr) {
-    Error::SetError(Error::kInvalidArgument);
-    return false;
-  }
-  if (mRender == nullptr || mCanvas == nullptr) return false;
+  if (!areGiven(event, rect)) return false;
+  if (mRenderDrawable == nullptr || mCanvas == nullptr) return false;
   if (!settings().exist() || !mPenData->mHasLastStroke) return false;
 
-  Version::ReturnGuard guard(mRender, mCanvas, mRender->unclaimedBatch());
-  mRender->SetInverseScale(getInverseScale());
+  Version::ReturnGuard guard(mRenderDrawable, mCanvas, mRenderDrawable->unclaimedBatch());
+  mRenderDrawable->SetInverseScale(getInverseScale());
   const bool result = event->GetAction() == kActionMove && startPen() && movePen(*event, rect);
   guard.setRect(*rect);
-  postRect(queueOf(mDataManager), mRender, *rect);
+  postRect(queueOf(mDataManager), mRenderDrawable, *rect);
   mPenData->mHasLastStroke = false;
   return result;
 }
@@ -58,52 +47,43 @@ bool Pencil2PredictionDrawableGL::Draw(const MotionEvent* event, RectF* rect) {
 // Kept: before the live stroke's first stamp the record still holds the last stamp of the stroke before it.
 bool Pencil2PredictionDrawableGL::startPen() {
   const Pencil2Data& live = *mPenData;
-  mPath.setMid({live.mLastStampX, live.mLastStampY});
-  mPath.setLast({live.mLastX, live.mLastY});
-  mWidth = live.mLastWidth;
-  mAlpha = live.mLastAlpha;
-  mOrientation = live.mLastOrientation;
-  mStamps.restart(std::max<std::int32_t>(live.mStampCount, 0));
-  mTiltBlend = live.mTiltBlend;
-  mCarried = kProfile.stampSpacing;
-  mLimits.beginStroke();
-  mLimits.beginCall();
+  const PointF lastStamp{live.mLastStampX, live.mLastStampY}, last{live.mLastX, live.mLastY};
+  mPlacer.beginCall();
+  mPlacer.begin(std::max<std::int32_t>(live.mStampCount, 0));
+  mPlacer.setCarried(Version::profile.repeatDistance);
+  mPlacer.path().start(lastStamp, last);
+  mLook = {.width = live.mLastWidth,
+           .alpha = live.mLastAlpha,
+           .widthStep = 0.0f,
+           .alphaStep = 0.0f,
+           .tiltBlend = live.mTiltBlend,
+           .direction = stampDirection(live.mLastOrientation)};
 
   IGLMsgQueue* queue = queueOf(mDataManager);
-  postStartPoint(queue, mRender, {live.mStartX, live.mStartY});
-  postPenData(queue, mRender, settings().size(), settings().color());
-  return settings().hasUsableSize() && isUsable(mPath.mid()) && isUsable(mPath.last()) &&
-         std::isfinite(mWidth) && mWidth > 0.0f && std::isfinite(mAlpha) && std::isfinite(mOrientation) &&
-         std::isfinite(mTiltBlend);
+  postStartPoint(queue, mRenderDrawable, {live.mStartX, live.mStartY});
+  postPenData(queue, mRenderDrawable, settings().size(), settings().color());
+  return settings().hasUsableSize() && isUsable(lastStamp) && isUsable(last) &&
+         std::isfinite(live.mLastWidth) && live.mLastWidth > 0.0f && std::isfinite(live.mLastAlpha) &&
+         std::isfinite(live.mLastOrientation) && std::isfinite(live.mTiltBlend);
 }
 
 bool Pencil2PredictionDrawableGL::movePen(const MotionEvent& event, RectF* rect) {
-  mPath.setToJoint(rect);
+  mPlacer.path().setToJoint(rect);
   const int history = event.GetHistorySize();
   for (int i = 0; i < history; ++i) {
     drawLine({event.GetHistoricalX(i), event.GetHistoricalY(i)}, false, rect);
   }
   drawLine({event.GetX(0), event.GetY(0)}, true, rect);
-  rect->IncreaseRect(kGrowth);
+  rect->IncreaseRect(1.0f);
   return true;
 }
 
-bool Pencil2PredictionDrawableGL::drawLine(PointF at, bool last, RectF* rect) {
-  if (!isUsable(at)) return false;
-  const float length = last ? mPath.close(at, Smoothing::Curve) : mPath.extend(at, Smoothing::Curve);
-  mPath.setLast(at);
-
-  using Run = StampRun<Version>;
-  const int most = mLimits.left();
-  Run::Appender appender(*mRender, std::min(spacedStamps(mCarried, kProfile.stampSpacing, length), most));
-  Run run(appender, {mWidth, mAlpha, 0.0f, 0.0f}, mTiltBlend, stampDirection(mOrientation), mStamps);
-  const WalkResult walk = walkSpaced(mPath.path(), mCarried, kProfile.stampSpacing, length, most, run);
-  run.finish(mPath.path(), rect);
-  mCarried = walk.carry;
-  mLimits.note(walk, Version::name, length);
-  const bool placed = run.counter().count() != mStamps.count();
-  mStamps = run.counter();
-  return placed;
+void Pencil2PredictionDrawableGL::drawLine(PointF at, bool last, RectF* rect) {
+  if (!isUsable(at)) return;
+  SegmentPath& path = mPlacer.path();
+  const float length = last ? path.close(at, Smoothing::Curve) : path.extend(at, Smoothing::Curve);
+  path.setLast(at);
+  mPlacer.placeSpaced(length, Version::profile.repeatDistance, mLook, rect);
 }
 
 Vector2<float> Pencil2PredictionDrawableGL::getInverseScale() {

@@ -3,58 +3,80 @@
 #include "base/PointF.h"
 #include "base/Vector.h"
 #include "pencommon/PenPredictionDrawableGL.h"
-#include "prediction/PredictionVersions.h"
-#include "stroke/parts/PenSettings.h"
-#include "stroke/parts/SegmentPath.h"
-#include "stroke/parts/StampCounter.h"
-#include "stroke/parts/StampLimits.h"
-#include "stroke/parts/ViewScale.h"
+#include "pencommon/PenPredictionDrawableRT.h"
+#include "render/BatchGuard.h"
+#include "render/RenderDrawables.h"
+#include "stroke/StrokeRules.h"
+#include "stroke/input/PenSettings.h"
+#include "stroke/placing/SegmentPlacer.h"
+#include "stroke/placing/StampRun.h"
+#include "stroke/placing/ViewScale.h"
 
 namespace Qelt {
 
-struct Pencil2Data;
+class Pencil2PredictionReturnCallback final : public BatchGuard<PenPredictionDrawableRT> {
+ public:
+  using BatchGuard::BatchGuard;
+};
+
+struct PredictionProfile {
+  float repeatDistance;  // from stamp to stamp, stroke units
+  // Hand-over.
+  float (*stampSize)(float width);
+  float (*stampAlpha)(float alpha);
+  float (*stampReach)(float width);
+
+  static constexpr bool isOutline = false;
+};
+
+// The row of the prediction, in the form of StrokeVersions.h. There is one, which continues the strokes of
+// all versions that predict.
+struct PredictionVersion {
+  static constexpr const char* name = "Pencil2PredictionDrawableGL";
+  static constexpr PredictionProfile profile{
+      .repeatDistance = 1.0f,
+      .stampSize = rules::stampHalfWidthV8,
+      .stampAlpha = rules::stampAlphaPrediction,
+      .stampReach = rules::stampReachV8,
+  };
+  using RenderDrawable = Pencil2PredictionDrawableRT;
+  using ReturnGuard = Pencil2PredictionReturnCallback;
+};
 
 // Continues the live stroke through predicted points, under one opacity. Begins where the stroke drawable
-// left off, with the looks of its last stamp, all from the pen's record; of the predicted samples only the
+// left off, with the look of its last stamp, both from the pen's record. Of the predicted samples only the
 // positions count. Main thread.
 class Pencil2PredictionDrawableGL final : public PenPredictionDrawableGL {
  public:
   Pencil2PredictionDrawableGL(Pencil2Data* penData, PenGLDataManager* manager);
   ~Pencil2PredictionDrawableGL() override;
 
-  // False when memory ran out for the render-thread half.
-  bool hasPartner() const { return mRender != nullptr; }
+  // False when memory ran out for the render drawable.
+  bool hasRenderDrawable() const { return mRenderDrawable != nullptr; }
 
-  // 0 to 1; what is no finite number changes nothing.
+  // 0 to 1. A value that is not finite changes nothing.
   void SetOpacity(float opacity) override;
-  // Predicts from a move event, once from each state of the live stroke. Any other event uses that state up
-  // all the same, and answers false.
+  // Predicts from a move event, once from each state of the live stroke. Any other event returns false, but
+  // uses that state up all the same.
   bool Draw(const MotionEvent* event, RectF* rect) override;
 
  private:
   using Version = PredictionVersion;
   using RenderDrawable = Version::RenderDrawable;
 
-  // Takes the live stroke over; false where nothing can be continued from what the record holds.
+  // Takes the live stroke over. Returns false where the record holds nothing that could be continued.
   bool startPen();
   bool movePen(const MotionEvent& event, RectF* rect);
-  // `last`: the path ends at the point itself, not half way to it. True when it placed a stamp.
-  bool drawLine(PointF at, bool last, RectF* rect);
+  // `last`: the path ends at the point itself, not half way to it.
+  void drawLine(PointF at, bool last, RectF* rect);
   Vector2<float> getInverseScale();
   PenSettings settings() const { return PenSettings(mPenData); }
 
-  Pencil2Data* mPenData;    // the pen's; may be null when its allocation failed
-  RenderDrawable* mRender;  // owned by the host's base; null when its allocation failed
-  SegmentPath mPath;
-  StampCounter mStamps;
+  Pencil2Data* mPenData;            // the pen's; may be null when its allocation failed
+  RenderDrawable* mRenderDrawable;  // owned by the host's base; null when its allocation failed
+  SegmentPlacer<Version> mPlacer;
   ViewScale mViewScale;
-  StampLimits mLimits;
-  float mCarried = 0.0f;  // where the next stamp lies on the next segment
-  // The live stroke's last values.
-  float mWidth = 0.0f;
-  float mAlpha = -1.0f;
-  float mOrientation = 0.0f;  // radians
-  float mTiltBlend = 0.0f;
+  SegmentLook mLook{};  // of all stamps; the live stroke's last
 };
 
 }  // namespace Qelt

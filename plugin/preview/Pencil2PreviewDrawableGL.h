@@ -1,87 +1,98 @@
 #pragma once
 
 #include "pencommon/PenPreviewDrawableGL.h"
-#include "preview/PreviewVersions.h"
-#include "stroke/parts/LiveInput.h"
-#include "stroke/parts/MoveFilter.h"
-#include "stroke/parts/PatternShift.h"
-#include "stroke/parts/PenAttitude.h"
-#include "stroke/parts/PenSample.h"
-#include "stroke/parts/PenSettings.h"
-#include "stroke/parts/Replay.h"
-#include "stroke/parts/SampleCleaner.h"
-#include "stroke/parts/SegmentPath.h"
-#include "stroke/parts/StampCounter.h"
-#include "stroke/parts/StampLimits.h"
-#include "stroke/parts/StampRun.h"
-#include "stroke/parts/StrokeState.h"
+#include "pencommon/PenPreviewDrawableRT.h"
+#include "render/BatchGuard.h"
+#include "render/RenderDrawables.h"
+#include "stroke/StampPen.h"
+#include "stroke/StrokeRules.h"
+#include "stroke/StrokeVersions.h"
+#include "stroke/input/PenSettings.h"
 
 namespace Qelt {
 
-struct Pencil2Data;
+class Pencil2PreviewReturnCallback final : public BatchGuard<PenPreviewDrawableRT> {
+ public:
+  using BatchGuard::BatchGuard;
+};
+
+struct PreviewProfile {
+  // As in StrokeProfile.
+  float unknownPressure;
+  float touchSkipDistance;
+  float tiltCap;
+  float (*adjustTilt)(float meanTilt);
+  float (*getPointSize)(float size, float tiltBlend);
+  float (*getPressureAlpha)(float pressure, float colorAlpha, float size);
+  Placement placement;
+  int (*getRepeat)(float length, float size);
+  float (*getRepeatDistance)(float size);
+  float (*stampSize)(float width);
+  float (*stampAlpha)(float alpha);
+  float (*stampReach)(float width);
+
+  // What sets the preview apart from strokes; see StrokeProfile.
+  static constexpr bool isOutline = false, publishes = false;
+  static constexpr float startAlpha = -1.0f;  // no fade-in, and nothing of the stroke before
+  static constexpr bool postsStraightStarts = true;
+  static constexpr bool shiftsPattern = true, restartsPatternShift = true;
+  static constexpr float growth = 1.0f, endGrowth = 1.0f, closeGrowth = 0.0f;
+  static constexpr const char* wrongDistanceInDrawLine =
+      "Pencil2PreviewDrawableGL::drawLine, mRepeatDistance is a wrong value(%f).";
+  // Kept: the message names another class.
+  static constexpr const char* wrongDistanceInEndPen =
+      "Pencil3GL::EndPen, mRepeatDistance is a wrong value(%f).";
+};
+
+// The row of the preview, in the form of StrokeVersions.h. There is one, whatever version the pen draws with.
+struct PreviewVersion {
+  static constexpr const char* name = "Pencil2PreviewDrawableGL";
+  static constexpr PreviewProfile profile{
+      .unknownPressure = 0.5f,
+      .touchSkipDistance = 50.0f,
+      .tiltCap = 1.0f,
+      .adjustTilt = rules::adjustTiltV5,
+      .getPointSize = rules::getPointSizeV5,
+      .getPressureAlpha = rules::getPressureAlphaV2,
+      .placement = Placement::SpacedOnCurves,
+      .getRepeat = rules::getRepeatV3,
+      .getRepeatDistance = rules::getRepeatDistancePreview,
+      .stampSize = rules::stampWidthPreview,
+      .stampAlpha = rules::stampAlphaPreview,
+      .stampReach = rules::stampReachPreview,
+  };
+  static constexpr int tiltWindow = 3;
+  static constexpr int orientationWindow = 3;
+  using RenderDrawable = Pencil2PreviewDrawableRT;
+  using ReturnGuard = Pencil2PreviewReturnCallback;
+};
 
 // Draws the sample stroke of a settings panel: live, while somebody drags in the panel, or a whole stroke
-// that one event carries as its history. Takes the road of the stroke drawables with the numbers of its own
-// row. Main thread.
+// that one event carries as its history. Its pen is a stroke's, by the numbers of its own row. Main thread.
 class Pencil2PreviewDrawableGL final : public PenPreviewDrawableGL {
  public:
   Pencil2PreviewDrawableGL(Pencil2Data* penData, PenGLDataManager* manager);
   ~Pencil2PreviewDrawableGL() override;
 
-  // False when memory ran out for the render-thread half.
-  bool hasPartner() const { return mRender != nullptr; }
+  // False when memory ran out for the render drawable.
+  bool hasRenderDrawable() const { return mRenderDrawable != nullptr; }
 
   bool Draw(const MotionEvent* event, RectF* rect) override;
   bool RedrawPen(const MotionEvent* event, RectF* rect) override;
-  // Does nothing and answers true.
+  // Does nothing and returns true.
   bool RedrawPen(const List* list, RectF* rect) override;
 
  private:
   using Version = PreviewVersion;
   using RenderDrawable = Version::RenderDrawable;
-  using Run = StampRun<Version>;
-
-  template <typename Source, typename Pen>
-  friend bool replay(Source, Pen&, RectF*, Smoothing, float);
-  template <typename Pen>
-  friend bool drawLive(const MotionEvent&, Pen&, StrokeState&, RectF*, Smoothing, float);
-
-  // What live input and replay ask for.
-  SampleCleaner cleaner() const;
-  const SegmentPath& path() const { return mPath; }
-  void beginLive(const PenSample& start, bool coarseTool, Smoothing smoothing);
-  void beginMove(const MotionEvent& event);
-  void restartMoves(bool coarseTool);
-  void beginReplay(const PenSample& start, Smoothing smoothing);
-  void forgetAlpha();
-  bool drawLine(const PenSample& sample, RectF* rect, Smoothing smoothing);
-  bool endPen(const MotionEvent& event, RectF* rect, Smoothing smoothing);
 
   bool canDraw() const;
-  // Takes the numbers that follow the pen size.
-  void takeSize();
-  void begin(const PenSample& start);
-  void beginWidth(float size);
-  // Logs `message` and answers false without a spacing to walk at.
-  bool hasSpacing(const char* message) const;
-  bool placeSegment(float length, float pressure, RectF* rect, Smoothing smoothing);
-  void placeTap(float pressure, RectF* rect);
+  void report(Version::ReturnGuard& guard, const RectF& rect);
   PenSettings settings() const { return PenSettings(mPenData); }
 
-  Pencil2Data* mPenData;    // the pen's; may be null when its allocation failed
-  RenderDrawable* mRender;  // owned by the host's base; null when its allocation failed
-  SegmentPath mPath;
-  MoveFilter mMoves;
-  PenAttitude<Version::tiltWindow, Version::orientationWindow> mAttitude;
-  StrokeState mState;
-  StampCounter mStamps;
-  PatternShift mPatternShift;
-  StampLimits mLimits;
-  bool mFirstSegment = true;     // no segment since the pen went down
-  float mRepeatDistance = 1.0f;  // between stamps on curves, stroke units
-  float mCarried = 0.0f;         // where the next stamp lies on the next curve
-  float mWidth = 0.0f;           // reached at the end of the last segment
-  float mAlpha = -1.0f;          // likewise; below 0: none yet
+  Pencil2Data* mPenData;            // the pen's; may be null when its allocation failed
+  RenderDrawable* mRenderDrawable;  // owned by the host's base; null when its allocation failed
+  StampPen<Version> mPen;
 };
 
 }  // namespace Qelt

@@ -6,25 +6,76 @@
 #include <vector>
 
 #include "base/RectF.h"
+#include "base/RefCount.h"
 #include "graphics/ISPPenCanvas.h"
 #include "pencommon/PenDrawableRT.h"
 #include "render/PenGLRenderMsg.h"
 #include "render/Posting.h"
-#include "render/UnclaimedBatch.h"
 
+// How batches, the vertices of one call, get to the render thread, and what becomes of them if the queue
+// refuses a task on the way.
 namespace Qelt {
 
-// Collects the vertex floats of one call and hands them to the render thread when the call ends, however it
-// ends: the batch, a render message that draws it, and its deletion, in this order. Lives on the stack of the
-// calling operation; main thread. `Drawable` is the host's render drawable class, whose `SetBuffer` and
-// `SendDataToGPU` take `Buffers` vectors.
+// A batch that was handed over, but whose deletion (or release, if it came from the stroke-data cache) the
+// queue refused: the render thread may still read it, so nobody can free it yet. Its render drawable keeps
+// it, at most one: until the queue takes the deletion, no new batch is handed over. What is left when the
+// render drawable dies goes with it, after every task that might refer to it.
 //
-// A first buffer that could not be allocated leaves the guard inert. What the queue refuses neither leaks nor
-// dangles: see UnclaimedBatch.
+// Main thread, but for the destructor.
+class UnclaimedBatch {
+ public:
+  UnclaimedBatch() = default;
+  ~UnclaimedBatch() {
+    for (auto* buffer : mBuffers) delete buffer;
+    if (mReference != nullptr) mReference->Unref();
+  }
+  UnclaimedBatch(const UnclaimedBatch&) = delete;
+  UnclaimedBatch& operator=(const UnclaimedBatch&) = delete;
+
+  // Tries again to have the batch deleted. Returns true if nothing is left.
+  bool settle(IGLMsgQueue* queue, PenDrawableRT* drawable) {
+    if (mUncleared) {
+      if (!post(queue, drawable, &PenDrawableRT::Clear)) return false;
+      mUncleared = false;
+    }
+    for (auto*& buffer : mBuffers) {
+      if (buffer != nullptr && !postDelete(queue, buffer)) return false;
+      buffer = nullptr;
+    }
+    if (mReference != nullptr && !post(queue, mReference, &RefCount::Unref)) return false;
+    mReference = nullptr;
+    return true;
+  }
+
+  // Takes a buffer over. `uncleared`: the render drawable still refers to it.
+  void keep(std::vector<float>* buffer, bool uncleared) {
+    (mBuffers[0] == nullptr ? mBuffers[0] : mBuffers[1]) = buffer;
+    mUncleared = uncleared;
+  }
+
+  // Takes over the reference that keeps a cached batch alive.
+  void keep(RefCount* reference) { mReference = reference; }
+
+ private:
+  std::array<std::vector<float>*, 2> mBuffers{};  // an outline's batch has two
+  RefCount* mReference = nullptr;
+  bool mUncleared = false;
+};
+
+// Collects the batch of one call and hands it over when the call ends, however it ends: the batch, a render
+// message that draws it, and its deletion, in this order. The call makes its guard before it places a stamp
+// and tells it the area to present before it returns; the guard lives on the call's stack. Main thread.
+//
+// `Drawable` is the host's class of the render drawable, whose `SetBuffer` and `SendDataToGPU` take `Buffers`
+// vectors. The render drawable, canvas and `unclaimed`, which belongs to the render drawable, must outlive
+// the guard.
+//
+// If memory runs out for the first vector, nothing is collected or posted. What the queue refuses neither
+// leaks nor dangles: see UnclaimedBatch.
 template <typename Drawable, std::size_t Buffers = 1>
 class BatchGuard {
  public:
-  // From here on every stamp is appended to the guard's buffers. `unclaimed` is the render drawable's.
+  // From here on every stamp is appended to the guard's buffers.
   BatchGuard(Drawable* drawable, ISPPenCanvas* canvas, UnclaimedBatch* unclaimed) noexcept
       : mDrawable(drawable), mCanvas(canvas), mUnclaimed(unclaimed) {
     for (auto*& buffer : mBuffers) {
@@ -39,7 +90,7 @@ class BatchGuard {
 
   // The area to present, stroke units.
   void setRect(const RectF& rect) { mRect = rect; }
-  // Null when it could not be allocated.
+  // Null if it could not be allocated.
   const std::vector<float>* buffer() const { return mBuffers[0]; }
 
  protected:
@@ -79,7 +130,7 @@ class BatchGuard {
     if (!send(queue)) return;
     const bool drawn = postTask(queue, new (std::nothrow) PenGLRenderMsg(mDrawable, mCanvas, mRect, false));
     for (auto*& buffer : mBuffers) {
-      // Without its render message the batch is never cleared, and the drawable still refers to it.
+      // Without its message the batch is never cleared, and the render drawable still refers to it.
       if (buffer != nullptr && (!drawn || !postDelete(queue, buffer))) mUnclaimed->keep(buffer, !drawn);
       buffer = nullptr;
     }
@@ -92,41 +143,30 @@ class BatchGuard {
   UnclaimedBatch* mUnclaimed;
 };
 
-// Presents a batch that the host's stroke-data cache holds. Borrows the buffer; null does nothing.
+// Presents a batch that the stroke-data cache holds. Main thread.
 template <typename Drawable>
 class CacheGuard {
  public:
-  // `handedOver` becomes true when the render thread will read the buffer.
-  CacheGuard(Drawable* drawable, ISPPenCanvas* canvas, const RectF& rect, std::vector<float>* buffer,
-             UnclaimedBatch* unclaimed, bool* handedOver) noexcept
-      : mDrawable(drawable),
-        mCanvas(canvas),
-        mRect(rect),
-        mBuffer(buffer),
-        mUnclaimed(unclaimed),
-        mHandedOver(handedOver) {}
+  CacheGuard(Drawable* drawable, ISPPenCanvas* canvas, UnclaimedBatch* unclaimed)
+      : mDrawable(drawable), mCanvas(canvas), mUnclaimed(unclaimed) {}
 
-  CacheGuard(const CacheGuard&) = delete;
-  CacheGuard& operator=(const CacheGuard&) = delete;
-
- protected:
-  ~CacheGuard() noexcept {
-    if (mBuffer == nullptr) return;
+  // Hands the batch over, with a render message that draws it; `rect` is the area to present, stroke units.
+  // Returns true if the render thread will read the batch, which must live until then. Null does nothing. An
+  // exception out of a post ends the process.
+  bool present(std::vector<float>* batch, const RectF& rect) noexcept {
+    if (batch == nullptr) return false;
     IGLMsgQueue* queue = mCanvas->GetMsgQueue();
-    if (!mUnclaimed->settle(queue, mDrawable)) return;
+    if (!mUnclaimed->settle(queue, mDrawable)) return false;
     // A message without its batch would draw the batch before it.
-    if (!post(queue, mDrawable, &Drawable::SetCacheBuffer, mBuffer)) return;
-    *mHandedOver = true;
-    postTask(queue, new (std::nothrow) PenGLRenderMsg(mDrawable, mCanvas, mRect, true));
+    if (!post(queue, mDrawable, &Drawable::SetCacheBuffer, batch)) return false;
+    postTask(queue, new (std::nothrow) PenGLRenderMsg(mDrawable, mCanvas, rect, true));
+    return true;
   }
 
  private:
   Drawable* mDrawable;
   ISPPenCanvas* mCanvas;
-  RectF mRect;
-  std::vector<float>* mBuffer;
   UnclaimedBatch* mUnclaimed;
-  bool* mHandedOver;
 };
 
 }  // namespace Qelt

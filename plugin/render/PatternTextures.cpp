@@ -2,15 +2,16 @@
 
 #include <GLES3/gl3.h>
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdint>
 #include <cstdio>
+#include <iterator>
 #include <memory>
 #include <new>
 
 #include "graphics/ISPBitmap.h"
 #include "graphics/SPGraphicsFactory.h"
-#include "render/Patterns.h"
 
 namespace Qelt {
 namespace {
@@ -18,7 +19,6 @@ namespace {
 constexpr int kTileSide = 100;
 constexpr int kTiles = 3;
 constexpr int kTilePixels = kTileSide * kTileSide;
-constexpr int kGrainSide = 150;
 
 ISPBitmap* createPattern(IGLMsgQueue* queue, int width, int height, const char* owner, const char* name) {
   ISPBitmap* bitmap = SPGraphicsFactory::CreateBitmap(queue, width, height, nullptr, false, 0);
@@ -39,10 +39,9 @@ Pixels allocatePixels(std::size_t count) {
 
 }  // namespace
 
-void PatternTextures::build(IGLMsgQueue* queue, int width, int height, const char* owner) {
-  if (isReleased()) return;
+void PatternTextures::buildTextures(IGLMsgQueue* queue, const char* owner) {
   if (mPatternsTexture == nullptr) {
-    mPatternsTexture = createPattern(queue, width, height, owner, "mPatternsTexture");
+    mPatternsTexture = createPattern(queue, kGrainSide, kGrainSide, owner, "mPatternsTexture");
     if (mPatternsTexture != nullptr) {
       mPatternsTexture->GetTexture()->SetParameter(GL_TEXTURE_WRAP_S, GL_REPEAT);
       mPatternsTexture->GetTexture()->SetParameter(GL_TEXTURE_WRAP_T, GL_REPEAT);
@@ -53,32 +52,26 @@ void PatternTextures::build(IGLMsgQueue* queue, int width, int height, const cha
   }
 }
 
-bool PatternTextures::upload(int width, int height, PointSource points) {
-  if (isReleased() || width < 0 || height < 0 || width > kGrainSide || height > kGrainSide) return true;
-  const int grainPixels = width * height;
+bool PatternTextures::setTextures(PointSource points) {
   // A pattern byte becomes a word: red in memory, the other channels 0.
-  Pixels grain = allocatePixels(static_cast<std::size_t>(grainPixels));
+  Pixels grain = allocatePixels(sizeof g_backgroundPtn);
   if (grain == nullptr) return false;
-  for (int i = 0; i < grainPixels; ++i) grain[i] = g_backgroundPtn[i];
-  if (mPatternsTexture != nullptr) mPatternsTexture->SetPixels(grain.get(), width, height);
+  std::copy(std::begin(g_backgroundPtn), std::end(g_backgroundPtn), grain.get());
+  if (mPatternsTexture != nullptr) mPatternsTexture->SetPixels(grain.get(), kGrainSide, kGrainSide);
   grain.reset();
 
-  Pixels shapes = allocatePixels(static_cast<std::size_t>(kTiles) * kTilePixels);
+  Pixels shapes = allocatePixels(sizeof g_pointPtn);
   if (shapes == nullptr) return false;
   for (int i = 0; i < kTiles * kTilePixels; ++i) {
     shapes[i] = points == PointSource::StampShapes ? g_pointPtn[i] : g_backgroundPtn[i % kTilePixels];
   }
   if (mPointTexture != nullptr) mPointTexture->SetPixels(shapes.get(), kTileSide, kTiles * kTileSide);
-  if (mPatternsTexture == nullptr || mPointTexture == nullptr) return false;
-  mState = State::Filled;
-  return true;
+  return mPatternsTexture != nullptr && mPointTexture != nullptr;
 }
 
-void PatternTextures::release() {
-  if (isReleased()) return;
+void PatternTextures::releaseTextures() {
   SPGraphicsFactory::ReleaseBitmap(mPatternsTexture);
   SPGraphicsFactory::ReleaseBitmap(mPointTexture);
-  mState = State::Released;
 }
 
 void PatternTextures::bindGrain(int unit) const {

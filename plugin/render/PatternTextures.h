@@ -5,9 +5,26 @@ namespace Qelt {
 class IGLMsgQueue;
 class ISPBitmap;
 
-// The two pattern textures of a render drawable. Render thread.
+// The two patterns of the pencil, one byte a pixel, row by row from the top, no header. Only read; live as
+// long as the library. The host and the shaders see them as the red channel of a texture.
+//
+// The bytes come from the pictures in resources/ when the build is configured (cmake/EmbedPatterns.cmake);
+// how those are made, and the statistics they keep, stands in docs/grain.md.
+
+// The paper grain: one picture of 150 x 150, values 2 to 243. High is a peak of the paper, which takes the
+// graphite; low is a pit, which stays white. Its edges meet without a seam.
+extern const unsigned char g_backgroundPtn[22500] __attribute__((visibility("default")));
+
+// Three round stamp shapes of 100 x 100, one after another: a flat core, a grainy rim, 0 outside the circle.
+// The shaders draw where a byte is not 0.
+extern const unsigned char g_pointPtn[30000] __attribute__((visibility("default")));
+
+// The two patterns as textures, of one render drawable. Call buildTextures and setTextures before the first
+// drawing, both again when the GL context was restored, and releaseTextures once at the end. Render thread.
 class PatternTextures {
  public:
+  static constexpr int kGrainSide = 150;  // pixels
+
   // What masks the stamps.
   enum class PointSource {
     StampShapes,  // the three round shapes
@@ -16,32 +33,23 @@ class PatternTextures {
     PaperGrain,
   };
 
-  // Creates the bitmaps that do not exist yet, the grain of the given size. `owner` names the drawable in the
-  // bitmaps' debug names.
-  void build(IGLMsgQueue* queue, int width, int height, const char* owner);
+  // Creates the bitmaps that do not exist yet. `owner` names the render drawable in their debug names.
+  void buildTextures(IGLMsgQueue* queue, const char* owner);
 
-  // Uploads the pixels; of the grain the first width x height, in rows of `width`. False when a bitmap is
-  // missing or memory ran out: the upload is left where it is, and `ready` as it was.
-  bool upload(int width, int height, PointSource points);
+  // Uploads the pixels. Returns false if a bitmap is missing or memory ran out, with what was uploaded before
+  // that left in place.
+  bool setTextures(PointSource points);
 
-  // Kept: the fields go on holding the released bitmaps, so that a later `build` creates nothing. From then
-  // on they are never used again.
-  void release();
+  // Kept: the fields go on holding the released bitmaps. Nothing else may be called from then on.
+  void releaseTextures();
 
-  // True after an upload, until the release.
-  bool ready() const { return mState == State::Filled; }
-  bool isReleased() const { return mState == State::Released; }
-
-  // Only while `ready`.
+  // Only after a setTextures that returned true.
   void bindGrain(int unit) const;
   void bindPoints(int unit) const;
 
  private:
-  enum class State { Blank, Filled, Released };
-
   ISPBitmap* mPatternsTexture = nullptr;
   ISPBitmap* mPointTexture = nullptr;
-  State mState = State::Blank;
 };
 
 }  // namespace Qelt

@@ -9,7 +9,7 @@
 namespace Qelt {
 namespace {
 
-// A plane transform as a transform of space: z stays as it is.
+// Turns a transform of the plane into one of space that leaves z as it is.
 Matrix4<float> embed(const Matrix3<float>& m) {
   Matrix4<float> embedded;
   embedded[0] = m[0];
@@ -55,8 +55,8 @@ RectF PenGLRenderMsg::getTransformedRect() const {
 
 void PenGLRenderMsg::run() {
   if (mDrawable == nullptr || mCanvas == nullptr) return;
-  // The batch is deleted by the next task but one, drawn or not, so from here on the drawable must not keep
-  // it.
+  // The task after this message deletes the batch, drawn or not: the render drawable must not refer to it
+  // when the message ends.
   const ScopeExit forgetBatch([this] { mDrawable->Clear(); });
   ISPLayer* layer = mCanvas->GetLayer();
   if (layer == nullptr) return;

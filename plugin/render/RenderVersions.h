@@ -1,23 +1,18 @@
 #pragma once
 
 #include "render/PatternTextures.h"
-#include "shaders/Pencil2StrokeShaderV1.h"
-#include "shaders/Pencil2StrokeShaderV2.h"
+#include "render/StampVertices.h"
+#include "shaders/PencilShaders.h"
 
-// The stroke render drawables side by side. A released row is frozen: documents drawn with it must look the
-// same for ever. New behaviour is a new row. (The preview's and the prediction's rows stand beside their
-// drawables, in the same form.)
+// The render drawables of stamps side by side, a row each. A released row is frozen: documents drawn with it
+// must look the same for ever. New behaviour is a new row. (Outlines have a render drawable of their own.)
 namespace Qelt {
-
-// How a stamp's size becomes vertices.
-enum class StampExpansion {
-  Square,       // the size is the stamp's width; 9 floats a vertex
-  Antialiased,  // the size is the half width; 11 floats a vertex, with the rim's ramp
-};
 
 struct RenderProfile {
   const char* className;  // in debug names and log lines
-  StampExpansion expansion;
+  // kSquareVertex: a stamp's size is its width. kAntialiasedVertex: the size is half the width, and the
+  // view's scale decides how the rim is smoothed.
+  VertexLayout vertex;
   float grainScale;       // the grain's size on screen, as a share of its natural one
   bool grainFollowsView;  // natural: 150 stroke units under the view's transform; else 150 window pixels
   PatternTextures::PointSource points;
@@ -29,7 +24,7 @@ struct RenderProfile {
 struct StrokeRenderV1 {
   static constexpr RenderProfile profile{
       .className = "Pencil2StrokeDrawableRTV1",
-      .expansion = StampExpansion::Square,
+      .vertex = kSquareVertex,
       .grainScale = 1.0f,
       .grainFollowsView = true,
       .points = PatternTextures::PointSource::StampShapes,
@@ -43,7 +38,7 @@ struct StrokeRenderV1 {
 struct StrokeRenderV2 {
   static constexpr RenderProfile profile{
       .className = "Pencil2StrokeDrawableRTV2",
-      .expansion = StampExpansion::Square,
+      .vertex = kSquareVertex,
       .grainScale = 0.5f,
       .grainFollowsView = true,
       .points = PatternTextures::PointSource::StampShapes,
@@ -57,7 +52,7 @@ struct StrokeRenderV2 {
 struct StrokeRenderV3 {
   static constexpr RenderProfile profile{
       .className = "Pencil2StrokeDrawableRTV3",
-      .expansion = StampExpansion::Antialiased,
+      .vertex = kAntialiasedVertex,
       .grainScale = 0.5f,
       .grainFollowsView = true,
       .points = PatternTextures::PointSource::StampShapes,
@@ -66,6 +61,34 @@ struct StrokeRenderV3 {
       .logsSetup = false,
   };
   using Shader = Pencil2StrokeShaderV2;
+};
+
+struct PreviewRender {
+  static constexpr RenderProfile profile{
+      .className = "Pencil2PreviewDrawableRT",
+      .vertex = kSquareVertex,
+      .grainScale = 1.0f,
+      .grainFollowsView = true,
+      .points = PatternTextures::PointSource::StampShapes,
+      .hasCacheBuffer = false,
+      .hasOpacity = false,
+      .logsSetup = true,
+  };
+  using Shader = Pencil2PreviewShader;
+};
+
+struct PredictionRender {
+  static constexpr RenderProfile profile{
+      .className = "Pencil2PredictionDrawableRT",
+      .vertex = kAntialiasedVertex,
+      .grainScale = 1.0f,
+      .grainFollowsView = false,  // Kept: the grain of a prediction has one size on screen, whatever the zoom
+      .points = PatternTextures::PointSource::PaperGrain,
+      .hasCacheBuffer = false,
+      .hasOpacity = true,
+      .logsSetup = true,
+  };
+  using Shader = Pencil2PredictionShader;
 };
 
 }  // namespace Qelt

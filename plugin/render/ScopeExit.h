@@ -5,7 +5,7 @@
 namespace Qelt {
 
 // Calls `leave` at the end of its scope, whichever way the scope is left. An exception out of `leave` is
-// dropped: there may be one under way already, and nothing more could be undone.
+// logged and dropped: another one may be under way already, and nothing more could be undone.
 template <typename Leave>
 class ScopeExit {
  public:

@@ -9,53 +9,89 @@
 #include <vector>
 
 #include "base/Vector.h"
-#include "gl/GraphicsFactory.h"
 #include "gl/GraphicsObject.h"
 #include "gl/ManagedObject.h"
 #include "gl/OpenGLRenderer.h"
-#include "gl/OpenGLShaderProgram.h"
-#include "gl/VertexDescriptor.h"
 #include "graphics/ISPBitmap.h"
 #include "log/Log.h"
+#include "math/FloatRange.h"
 #include "math/Matrix4.h"
-#include "pencommon/PenGLDataManager.h"
-#include "render/GrainOrigin.h"
+#include "render/BatchGuard.h"
 #include "render/PatternTextures.h"
+#include "render/Posting.h"
 #include "render/RenderVersions.h"
 #include "render/ScopeExit.h"
 #include "render/StampVertices.h"
-#include "render/UnclaimedBatch.h"
 #include "shaders/ShaderRegistry.h"
 
 namespace Qelt {
 
+// Where the grain of a stroke is fixed: its start point in stroke units, until the first tile drawn turns it
+// into window pixels. Render thread.
+class GrainOrigin {
+ public:
+  void set(float x, float y) {
+    mStartPoint = {x, y};
+    mStartPointPending = true;
+  }
+
+  // True from each `set` until the next `settle` that had a viewport.
+  bool isPending() const { return mStartPointPending; }
+
+  // Converts the start point: maps it to clip space and from there into the viewport (x, y, width, height in
+  // window pixels). Without a viewport, as while the GL context is lost, the point stays pending.
+  void settle(const Matrix4<float>& projection, Vector4<int> viewport) {
+    if (viewport.z == 0 || viewport.w == 0) return;
+    mStartPointPending = false;
+    const float x = mStartPoint.x;
+    const float y = mStartPoint.y;
+    const float clipX = projection[0] * x + projection[4] * y + projection[12];
+    const float clipY = projection[1] * x + projection[5] * y + projection[13];
+    const float clipW = projection[3] * x + projection[7] * y + projection[15];
+    mStartPoint.x =
+        (clipX / clipW + 1.0f) * 0.5f * static_cast<float>(viewport.z) + static_cast<float>(viewport.x);
+    mStartPoint.y =
+        (clipY / clipW + 1.0f) * 0.5f * static_cast<float>(viewport.w) + static_cast<float>(viewport.y);
+  }
+
+  Vector2<float> value() const { return mStartPoint; }
+
+ private:
+  Vector2<float> mStartPoint;
+  bool mStartPointPending = false;
+};
+
 // A render drawable of stamps: appends them as vertices on the main thread, uploads and draws the batch on
-// the render thread. `HostBase` is the host's render drawable of the kind; `Version` a row of
-// RenderVersions.h (or the preview's or the prediction's), which holds all that differs. Adds no slots to the
-// host's.
+// the render thread. `HostBase` is the host's render drawable of the kind; `Version` is a row of
+// RenderVersions.h, which holds all that differs. Adds no slots to the host's.
+//
+// The host calls CreatePenCanvas before anything is drawn. Per stroke, SetStartPoint comes first. Per batch,
+// stamps are appended between SetBuffer(batch) and SetBuffer(nullptr); then come SendDataToGPU, Update, Draw
+// for each tile, and Clear. Release comes at the end. The drawable borrows the batch from SendDataToGPU to
+// Clear.
 //
 // What could not be prepared, for want of memory or of a GL context, is tried again at the next
-// CreatePenCanvas and when the context is restored. Kept: once released, a drawable never draws again,
-// whatever is called on it; a host makes a new one.
+// CreatePenCanvas and when the context is restored; until then nothing is drawn. Kept: once released, a
+// drawable never draws again, whatever is called on it; a host makes a new one.
 //
 // Main thread: AddPoint, Appender, reserve, SetInverseScale, unclaimedBatch. Render thread: the rest.
 template <typename HostBase, typename Version>
 class StampRenderer : public HostBase {
   static constexpr const RenderProfile& kProfile = Version::profile;
-  static constexpr bool kAntialiased = kProfile.expansion == StampExpansion::Antialiased;
 
  public:
-  static constexpr std::size_t kFloatsPerVertex = kAntialiased ? 11 : 9;
+  static constexpr std::size_t kFloatsPerVertex = kProfile.vertex.floats();
   static constexpr std::size_t kFloatsPerStamp = 6 * kFloatsPerVertex;
+  static constexpr bool kAntialiased = kFloatsPerVertex == kAntialiasedVertex.floats();
 
   using HostBase::HostBase;
 
   void AddPoint(Vector2<float>, float) final {}
 
   // Appends stamps to the write buffer. Each has a centre and a direction (-sin a, cos a), two vectors in a
-  // row; a size, the stamp's width (versions 1 and 2, preview) or half width (version 3, prediction) in
-  // stroke units; an opacity factor; a tilt blend; and its shape, tile 0, 1 or 2. Lives while the buffer and
-  // the inverse scale stay as they are.
+  // row; a size in stroke units, the width of square stamps and half that of anti-aliased ones; an opacity
+  // factor; a tilt blend; and its shape, tile 0, 1 or 2. Must not outlive a change of the buffer or of the
+  // inverse scale.
   class Appender {
    public:
     // Makes room for so many stamps, so that appending them does not allocate. Throws std::bad_alloc.
@@ -101,46 +137,47 @@ class StampRenderer : public HostBase {
 
   UnclaimedBatch* unclaimedBatch() { return &mUnclaimed; }
 
+  // Sets the stroke units per device pixel in x and y, before the stamps of a call are appended. Anything but
+  // two positive numbers that leave stamps finite counts as (1, 1).
+  void SetInverseScale(const Vector2<float>& inverseScale) requires kAntialiased {
+    const bool usable = isUsableScale(inverseScale.x) && isUsableScale(inverseScale.y);
+    mInverseScale = usable ? inverseScale : Vector2<float>{1.0f, 1.0f};
+  }
+
+  // Fixes the grain to the first point of a stroke, stroke units.
+  void SetStartPoint(float x, float y) { mGrainOrigin.set(x, y); }
+
   void Init() final {
     if (kProfile.logsSetup) log("Init()");
-    if (mTextures.isReleased()) return;
-    const bool complete = prepare();
+    if (mState == State::Released) return;
+    const State reached = prepare();
     ManagedObject::Register(this);
-    mPrepared = complete;
+    mState = reached;
   }
 
   void Release() final {
     log("Release()");
-    mPrepared = false;
     ManagedObject::Unregister(this);
     ShaderManager::GetInstance()->ReleaseShader(std::exchange(mShader, nullptr));
     if (mGraphicsObject != nullptr) std::exchange(mGraphicsObject, nullptr)->release();
-    mTextures.release();
+    if (std::exchange(mState, State::Released) != State::Released) mTextures.releaseTextures();
   }
 
   void RestoreGLObject() final {
     log("RestoreGLObject()");
-    if (mTextures.isReleased()) return;
-    mPrepared = false;
-    mPrepared = prepare();
+    if (mState == State::Released) return;
+    mState = State::Incomplete;
+    mState = prepare();
   }
 
   void CreatePenCanvas(int, int, IGLMsgQueue*) final {
     if (kProfile.logsSetup) log("CreatePenCanvas(int, int, Qelt::IGLMsgQueue *)");
-    if (!mPrepared) this->Init();
+    if (mState != State::Prepared) this->Init();
   }
-
-  void buildTextures(int width, int height) {
-    IGLMsgQueue* queue = this->mDataManager != nullptr ? this->mDataManager->GetMsgQueue() : nullptr;
-    mTextures.build(queue, width, height, kProfile.className);
-  }
-
-  // Returns false when memory ran out or a bitmap is missing.
-  bool setTextures(int width, int height) { return mTextures.upload(width, height, kProfile.points); }
 
   void Clear() final {
     this->mHasPendingData = false;
-    // A cached batch is the host's, which may drop it from here on.
+    // A cached batch belongs to the host, which may drop it from here on.
     if constexpr (kProfile.hasCacheBuffer) this->mCacheBuffer = nullptr;
     // The vector itself is freed by its own task.
     if (this->mRenderBuffer != nullptr) std::exchange(this->mRenderBuffer, nullptr)->clear();
@@ -156,7 +193,7 @@ class StampRenderer : public HostBase {
   void Draw(ISPSubBitmap* tile, Matrix4<float>& matrix) final {
     const std::vector<float>* batch = currentBatch();
     if (tile == nullptr || batch == nullptr || batch->empty()) return;
-    if (mGraphicsObject == nullptr || !canShade() || !mTextures.ready()) return;
+    if (mState != State::Prepared) return;
 
     tile->BeginRender(0);
     const ScopeExit endRender([tile] { tile->EndRender(0); });
@@ -188,12 +225,13 @@ class StampRenderer : public HostBase {
   // The on-screen extent of the grain's 150 texels. Kept: under a rotation it is what the formula gives, the
   // extent of the diagonal of a 150-unit square in x and in y.
   static Vector2<float> grainSize(const Matrix4<float>& m) {
+    constexpr float kGrainSide = PatternTextures::kGrainSide;
     if constexpr (kProfile.grainFollowsView) {
       const auto map = [&m](float q) {
         const float w = m[3] * q + m[7] * q + m[15];
         return Vector2<float>{(m[0] * q + m[4] * q + m[12]) / w, (m[1] * q + m[5] * q + m[13]) / w};
       };
-      const Vector2<float> far = map(static_cast<float>(kGrainSide));
+      const Vector2<float> far = map(kGrainSide);
       const Vector2<float> near = map(0.0f);
       return {(far.x - near.x) * kProfile.grainScale, (far.y - near.y) * kProfile.grainScale};
     } else {
@@ -202,43 +240,23 @@ class StampRenderer : public HostBase {
     }
   }
 
- protected:
-  // Render thread. The final class declares the public operation, so that posted tasks name it.
-  void setStartPoint(float x, float y) { mGrainOrigin.set(x, y); }
-
-  // Stroke units a device pixel in x and y. Anything but two positive numbers that leave stamps finite counts
-  // as (1, 1).
-  void setInverseScale(const Vector2<float>& inverseScale) {
-    const auto usable = [](float scale) { return scale >= 1e-30f && scale <= 1e30f; };
-    mInverseScale =
-        usable(inverseScale.x) && usable(inverseScale.y) ? inverseScale : Vector2<float>{1.0f, 1.0f};
-  }
-
  private:
-  static constexpr int kGrainSide = 150;
+  // Prepared: all that drawing needs is there, and the host knows the drawable as a managed object.
+  enum class State { Incomplete, Prepared, Released };
 
-  // Makes what is missing and fills the textures; true when all that drawing needs is there.
-  bool prepare() {
-    if (mGraphicsObject == nullptr) {
-      VertexDescriptor descriptor;
-      descriptor.addAttribute(AttributeType::Float, 4, -1);
-      descriptor.addAttribute(AttributeType::Float, 3, -1);
-      descriptor.addAttribute(AttributeType::Float, 2, -1);
-      if (kAntialiased) descriptor.addAttribute(AttributeType::Float, 2, -1);
-      mGraphicsObject =
-          GraphicsFactory::createGraphicsObject(1, GraphicsFactory::kTriangles, descriptor, 0, 0);
-    }
+  // Makes what is missing and fills the textures. Returns what was reached.
+  State prepare() {
+    if (mGraphicsObject == nullptr) mGraphicsObject = createStampObject(kProfile.vertex);
     if (mShader == nullptr) {
       mShader = ShaderManager::GetInstance()->GetShader<typename Version::Shader>();
     } else if (!mShader->isLinked()) {
       mShader->link();
     }
-    buildTextures(kGrainSide, kGrainSide);
-    const bool filled = setTextures(kGrainSide, kGrainSide);
-    return filled && mGraphicsObject != nullptr && canShade();
+    mTextures.buildTextures(queueOf(this->mDataManager), kProfile.className);
+    const bool filled = mTextures.setTextures(kProfile.points);
+    const bool complete = filled && mGraphicsObject != nullptr && mShader != nullptr && mShader->isLinked();
+    return complete ? State::Prepared : State::Incomplete;
   }
-
-  bool canShade() const { return mShader != nullptr && mShader->isLinked(); }
 
   const std::vector<float>* currentBatch() const {
     if constexpr (kProfile.hasCacheBuffer) {
@@ -255,7 +273,7 @@ class StampRenderer : public HostBase {
   GraphicsObject* mGraphicsObject = nullptr;
   typename Version::Shader* mShader = nullptr;
   PatternTextures mTextures;
-  bool mPrepared = false;  // with all that drawing needs, and known to the host as a managed object
+  State mState = State::Incomplete;
   GrainOrigin mGrainOrigin;
   Vector2<float> mInverseScale{1.0f, 1.0f};
   UnclaimedBatch mUnclaimed;

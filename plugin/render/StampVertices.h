@@ -7,6 +7,8 @@
 #include <vector>
 
 #include "base/Vector.h"
+#include "gl/GraphicsFactory.h"
+#include "gl/VertexDescriptor.h"
 
 // How one stamp becomes two triangles: six vertices of a square around its centre, in the order
 //
@@ -16,6 +18,33 @@
 //
 // All lengths in stroke units.
 namespace Qelt {
+
+// What a vertex holds: the floats of each attribute, in the order of the shader's locations.
+struct VertexLayout {
+  std::array<int, 4> attributes;  // 0 where there is none
+
+  constexpr std::size_t floats() const {
+    std::size_t sum = 0;
+    for (const int floats : attributes) sum += static_cast<std::size_t>(floats);
+    return sum;
+  }
+};
+
+// Corner x, y, u, v; opacity factor, narrowing, stamp shape; direction.
+inline constexpr VertexLayout kSquareVertex{{4, 3, 2}};
+// The same; then inner radius and alpha by width.
+inline constexpr VertexLayout kAntialiasedVertex{{4, 3, 2, 2}};
+// Corner x, y, u, v; narrowing; direction.
+inline constexpr VertexLayout kOutlineVertex{{4, 1, 2}};
+
+// A vertex object for triangles; null if the host could not make one. Render thread.
+inline GraphicsObject* createStampObject(const VertexLayout& layout) {
+  VertexDescriptor descriptor;
+  for (const int floats : layout.attributes) {
+    if (floats > 0) descriptor.addAttribute(AttributeType::Float, floats, -1);
+  }
+  return GraphicsFactory::createGraphicsObject(1, GraphicsFactory::kTriangles, descriptor, 0, 0);
+}
 
 // What every vertex of a stamp carries besides its corner.
 struct StampLook {
@@ -28,8 +57,9 @@ struct StampLook {
 // Where a stamp's square lies, and how its rim is smoothed.
 struct StampQuad {
   float left, top, right, bottom;
-  float innerRadius;   // where the rim's ramp begins, 0.5 at the rim; version 3 vertices only
-  float alphaByWidth;  // what a stamp widened to half a pixel is dimmed by; version 3 vertices only
+  // Of anti-aliased vertices alone.
+  float innerRadius;   // where the rim's ramp begins, 0.5 at the rim
+  float alphaByWidth;  // what a stamp widened to half a pixel is dimmed by
 };
 
 // How far a stamp's square reaches from its centre, and how its rim is smoothed: all that its size decides.
@@ -45,8 +75,9 @@ inline StampExtent squareExtent(float width) {
 }
 
 // A square of the given half width, with a margin of half a device pixel for the rim. A stamp thinner than
-// half a pixel is widened to that and dimmed in proportion; what has no width left to widen, or does not fit
-// into a float, is invisible. `inverseScale`: stroke units a device pixel, positive.
+// half a pixel is widened to that and dimmed in proportion. A stamp that has no width left to widen, or whose
+// extent does not fit into a float, is made invisible. `inverseScale`: stroke units per device pixel,
+// positive.
 inline StampExtent antialiasedExtent(float halfWidth, Vector2<float> inverseScale) {
   constexpr float kMostPixels = 1e37f;
   float a = halfWidth / inverseScale.x;
@@ -73,25 +104,26 @@ inline StampQuad stampQuad(Vector2<float> centre, const StampExtent& extent) {
           centre.y + extent.y, extent.innerRadius,  extent.alphaByWidth};
 }
 
-// Makes room for `count` stamps more, at least doubling so that a long redraw stays linear.
+// Makes room for `count` more stamps, at least doubling so that a long redraw stays linear.
 inline void reserveStamps(std::vector<float>* buffer, int count, std::size_t floatsPerStamp) {
   if (buffer == nullptr) return;
   const std::size_t needed = buffer->size() + static_cast<std::size_t>(count) * floatsPerStamp;
   if (needed > buffer->capacity()) buffer->reserve(std::max(needed, 2 * buffer->capacity()));
 }
 
-// Writes the vertices of a stamp, 6 * Stride floats: 9 a vertex (corner x, y, u, v; alpha, blend, tile;
-// direction), 11 (then inner radius and alpha by width), or an outline's 7 (corner x, y, u, v; blend;
-// direction). In 16-byte stores that overlap from vertex to vertex: twice as fast here as float by float, see
+// Writes the vertices of a stamp, 6 * Stride floats, where Stride is that of one of the layouts above. The
+// 16-byte stores overlap from vertex to vertex, which is twice as fast as float by float; see
 // docs/performance.md.
 template <std::size_t Stride>
 void writeStamp(float* out, const StampQuad& q, const StampLook& look) {
-  static_assert(Stride == 7 || Stride == 9 || Stride == 11);
+  constexpr bool kOutline = Stride == kOutlineVertex.floats();
+  constexpr bool kAntialiased = Stride == kAntialiasedVertex.floats();
+  static_assert(kOutline || kAntialiased || Stride == kSquareVertex.floats());
   using Four [[gnu::vector_size(16), gnu::aligned(4), gnu::may_alias]] = float;
   const Four corners[6] = {{q.left, q.top, 0.0f, 1.0f},    {q.left, q.bottom, 0.0f, 0.0f},
                            {q.right, q.top, 1.0f, 1.0f},   {q.right, q.top, 1.0f, 1.0f},
                            {q.left, q.bottom, 0.0f, 0.0f}, {q.right, q.bottom, 1.0f, 0.0f}};
-  if constexpr (Stride == 7) {
+  if constexpr (kOutline) {
     const Four rest = {look.tiltBlend, look.direction.x, look.direction.y, 0.0f};
     for (int i = 0; i < 6; ++i, out += Stride) {
       *reinterpret_cast<Four*>(out) = corners[i];
@@ -110,11 +142,11 @@ void writeStamp(float* out, const StampQuad& q, const StampLook& look) {
   for (int i = 0; i < 6; ++i, out += Stride) {
     *reinterpret_cast<Four*>(out) = corners[i];
     *reinterpret_cast<Four*>(out + 4) = common;
-    if (Stride == 11 && i < 5) {
+    if (kAntialiased && i < 5) {
       *reinterpret_cast<Four*>(out + 8) = rest;  // its last lane is where the next vertex begins
     } else {
       out[8] = rest[0];
-      if constexpr (Stride == 11) {
+      if constexpr (kAntialiased) {
         out[9] = rest[1];
         out[10] = rest[2];
       }
@@ -127,7 +159,7 @@ void writeStamp(float* out, const StampQuad& q, const StampLook& look) {
 template <std::size_t Stride>
 class StampAppender {
  public:
-  // Makes room for `stamps` of them; throws std::bad_alloc before anything is changed. Without a batch all
+  // Makes room for so many stamps. Throws std::bad_alloc before anything is changed. Without a batch all
   // stamps are dropped.
   StampAppender(std::vector<float>* batch, int stamps) : mBatch(batch) {
     reserveStamps(batch, stamps, kFloats);

@@ -1,14 +1,45 @@
 #pragma once
 
-#include <utility>
+#include <exception>
+#include <memory>
+#include <string>
 
 #include "base/Vector.h"
 #include "gl/OpenGLShaderProgram.h"
 #include "log/Log.h"
 #include "math/Matrix4.h"
-#include "shaders/Exceptions.h"
 
 namespace Qelt {
+
+// Thrown by an operation that the object is in no state for.
+class NotSupportedException : public std::exception {
+ public:
+  explicit NotSupportedException(const std::string& message) : mMessage(message) {}
+  const char* what() const noexcept override { return mMessage.c_str(); }
+
+ private:
+  std::string mMessage;
+};
+
+// Thrown where a value is of the wrong kind.
+class InvalidArgumentException : public std::exception {
+ public:
+  explicit InvalidArgumentException(const std::string& message) : mMessage(message) {}
+  const char* what() const noexcept override { return mMessage.c_str(); }
+
+ private:
+  std::string mMessage;
+};
+
+// Owns a host object that is given back with `release`. An exception out of that ends the process.
+struct ReleaseToHost {
+  template <typename T>
+  void operator()(T* object) const noexcept {
+    object->release();
+  }
+};
+template <typename T>
+using HostOwned = std::unique_ptr<T, ReleaseToHost>;
 
 // The C++ type of each uniform type.
 template <BindingType N>
@@ -38,27 +69,21 @@ struct BindingValue<kBindingInt> {
 template <BindingType N>
 class ParameterBinding {
  public:
-  ParameterBinding() = default;
-  // An exception out of the release ends the process.
-  ~ParameterBinding() { release(); }
-  ParameterBinding(const ParameterBinding&) = delete;
-  ParameterBinding& operator=(const ParameterBinding&) = delete;
-
-  // Looks the uniform up; returns false when the host has no interface to it. Throws InvalidArgumentException
-  // when it has another type.
+  // Looks the uniform up, in place of the one that was bound; returns false if the host has no interface to
+  // it. Throws InvalidArgumentException if it has another type.
   bool bind(OpenGLShaderProgram* program, const char* name) {
-    release();
-    mInterface = program->getBindingIntf(name, kBindingAny);
+    mInterface.reset();
+    mInterface.reset(program->getBindingIntf(name, kBindingAny));
     if (mInterface == nullptr) return false;
     const BindingType found = mInterface->getType();
     if (found == N || found == kBindingAny) return true;
     __android_log_print(kLogInfo, kLogTag, "%s: Found %d but given %d", name, static_cast<int>(found),
                         static_cast<int>(N));
-    release();
+    mInterface.reset();
     throw InvalidArgumentException("ParameterBinding<>::bind - invalid parameter type!");
   }
 
-  // Sets the uniform. Throws NotSupportedException when it is not bound.
+  // Sets the uniform. Throws NotSupportedException if it is not bound.
   ParameterBinding& operator=(const typename BindingValue<N>::Type& value) {
     if (mInterface == nullptr) {
       throw NotSupportedException("ParameterBinding: internal interface is not initialized!");
@@ -68,11 +93,7 @@ class ParameterBinding {
   }
 
  private:
-  void release() {
-    if (mInterface != nullptr) std::exchange(mInterface, nullptr)->release();
-  }
-
-  IParameterBinding* mInterface = nullptr;
+  HostOwned<IParameterBinding> mInterface;
 };
 
 }  // namespace Qelt

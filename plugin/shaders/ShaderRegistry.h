@@ -10,8 +10,13 @@
 #include "gl/ShaderManager.h"
 #include "log/Log.h"
 
-// The plug-in's half of the shader registry: one shared shader a class, counted. Any thread; shaders
-// themselves are used on the render thread only.
+// The registry of shared shaders, as far as it is the plug-in's: the host has the map and its lock, and these
+// templates are what fills it. There is one shader per class in the process. Each GetShader adds a reference
+// to it, to be given back with one ReleaseShader; the last one deletes it.
+//
+// A shader that memory ran out for, or that could not be linked, is tried again whenever somebody asks for
+// it. Misuse is logged and changes nothing. Any thread may call; shaders themselves are for the render thread
+// alone.
 namespace Qelt {
 
 template <typename T>
@@ -23,19 +28,19 @@ T* ShaderManager::GetShader() try {
     __android_log_print(kLogDebug, kLogTag, "ShaderManager::GetShader, New %s is added", typeid(T).name());
     std::unique_ptr<T> made(new (std::nothrow) T);
     found = mShaders.emplace(key, Entry{made.get(), 0}).first;
-    static_cast<void>(made.release());  // the entry has it now
+    static_cast<void>(made.release());  // the entry owns it from here on
   } else if (found->second.shader == nullptr) {
-    // Memory ran out for it once; nobody holds it.
+    // Memory ran out when it was first asked for, so that nobody holds one.
     found->second.shader = new (std::nothrow) T;
   } else if (T* shader = static_cast<T*>(found->second.shader); !shader->isLinked()) {
     // It could not be linked when it was made, most likely for want of a GL context. Others may hold it, so
-    // it is linked where it is.
+    // it is not replaced.
     shader->link();
   }
   if (found->second.shader != nullptr) ++found->second.references;
   return static_cast<T*>(found->second.shader);
 } catch (const std::bad_alloc&) {
-  // No memory for the registry's own: as if there were none for the shader.
+  // Memory ran out for the registry's entry. The caller sees the same as if it had for the shader.
   return nullptr;
 }
 
@@ -44,7 +49,7 @@ void ShaderManager::ReleaseShader(T* shader) {
   if (shader == nullptr) return;
   const AutoCriticalSection lock(&mLock);
   const char* const name = typeid(T).name();
-  // Found by its text: a key takes memory, and giving back must not.
+  // The keys' texts are compared, since making a key takes memory, and giving back must not need any.
   const auto found = std::find_if(mShaders.begin(), mShaders.end(), [name](const auto& entry) {
     return std::strcmp(entry.first.GetText(), name) == 0;
   });

@@ -1,6 +1,6 @@
 #include "stroke/Pencil2StrokeDrawableGL.h"
 
-#include "stroke/parts/SampleCleaner.h"
+#include "stroke/input/SampleCleaner.h"
 
 namespace Qelt {
 

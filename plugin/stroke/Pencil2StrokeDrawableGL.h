@@ -1,7 +1,7 @@
 #pragma once
 
 #include "pencommon/PenStrokeDrawableGL.h"
-#include "stroke/parts/PenSettings.h"
+#include "stroke/input/PenSettings.h"
 
 namespace Qelt {
 
@@ -14,7 +14,7 @@ class Pencil2StrokeDrawableGL : public PenStrokeDrawableGL {
   ~Pencil2StrokeDrawableGL() override;
 
   using PenStrokeDrawableGL::RedrawPen;
-  // Lists are drawn stroke by stroke by the host; does nothing and answers true.
+  // Lists are drawn stroke by stroke by the host; does nothing and returns true.
   bool RedrawPen(const List* list, RectF* rect) override;
 
   // The pen size, stroke units, read live.
@@ -31,7 +31,7 @@ class Pencil2StrokeDrawableGL : public PenStrokeDrawableGL {
   Pencil2StrokeDrawableGL(Pencil2Data* penData, PenGLDataManager* manager);
 
   // Smoothed replay of a whole stroke, then straight replay; see RedrawPen. Each unites into `rect` what the
-  // stamps cover, and answers false with error 7 when there is no point to start from.
+  // stamps cover, and returns false with error 7 when there is no point to start from.
   virtual bool redraw(const MotionEvent* event, RectF* rect) = 0;
   virtual bool redraw(const ObjectStroke* stroke, RectF* rect) = 0;
   virtual bool redrawPen_NoCurve(const MotionEvent* event, RectF* rect) = 0;

@@ -1,33 +1,35 @@
 #pragma once
 
-#include "render/Pencil2StrokeDrawableRTV1.h"
-#include "render/Pencil2StrokeDrawableRTV2.h"
-#include "render/Pencil2StrokeDrawableRTV3.h"
+#include "render/RenderDrawables.h"
 #include "stroke/StrokeGuards.h"
 #include "stroke/StrokeRules.h"
 
 // All stroke versions side by side: each row writes every field, in one order, so that rows compare like
 // columns. A rule is named after the version that brought it, which shows who shares whose formula. A
 // released row is frozen, since documents drawn with it must look the same for ever; new behaviour is a new
-// row, and no row derives from another. (There is no version 6: pens of rendering version 6 draw with
-// version 4.)
+// row, and no row derives from another. (There is no row 6: strokes of version 6 are drawn by version 4.)
 namespace Qelt {
+
+// How the stamps of a segment lie.
+enum class Placement {
+  Even,            // getRepeat() stamps, evenly from the segment's start; nothing is carried over
+  Spaced,          // every getRepeatDistance(); the leftover is carried from segment to segment
+  SpacedOnCurves,  // curves as Spaced, straight segments as Even; getRepeat() counts the ramps' steps in both
+};
 
 struct StrokeProfile {
   // Input.
-  float unknownPressure;    // of finger, mouse, a stylus on a touch screen, and for NaN
+  float unknownPressure;    // for finger, mouse and a stylus on a touch screen, and in place of a NaN
   float touchSkipDistance;  // stroke units; shorter moves of those tools are taken every other time
   float tiltCap;            // radians
   // Mappings, see StrokeRules.h.
-  float (*tiltBlend)(float meanTilt);
-  float (*pointSize)(float size, float tiltBlend);
-  float (*pressureAlpha)(float pressure, float colorAlpha, float size);
-  // Placement: so many stamps a segment, evenly from its start; or (count null) at a fixed spacing carried
-  // from segment to segment.
-  int (*stampCount)(float length, float size);
-  float stampSpacing;     // stroke units
-  float shortestSegment;  // stroke units; a shorter one places nothing and does not move the last point
-  bool logsLargeCounts;   // above 10000 stamps a segment
+  float (*adjustTilt)(float meanTilt);
+  float (*getPointSize)(float size, float tiltBlend);
+  float (*getPressureAlpha)(float pressure, float colorAlpha, float size);
+  // Placement. A rule that the placement does not ask for is null.
+  Placement placement;
+  int (*getRepeat)(float length, float size);  // stamps on a segment; 0 drops it, the last point stays
+  float (*getRepeatDistance)(float size);      // stroke units from stamp to stamp; read when a stroke begins
   // Hand-over.
   float (*stampSize)(float width);
   float (*stampAlpha)(float alpha);
@@ -36,21 +38,31 @@ struct StrokeProfile {
   bool shiftsPattern;     // moves the pattern offset every 300 segments
   bool publishes;         // tells Pencil2Data where the stroke stands
   bool followsViewScale;  // smooths stamps by the view's scale, and caches by it
+
+  // What all stroke versions have in common, and other drawables do not.
+  static constexpr bool isOutline = false;
+  static constexpr float startAlpha = 0.0f;            // the first segment fades in
+  static constexpr bool postsStraightStarts = false;   // Kept: the grain stays where the stroke before had it
+  static constexpr bool restartsPatternShift = false;  // Kept: the shift goes on from stroke to stroke
+  // Stroke units around what changed: in a move and in a straight replay; at the end; by the closing segment.
+  static constexpr float growth = 5.0f, endGrowth = 5.0f, closeGrowth = 1.0f;
+  // What is logged where there is no distance to space stamps by; null for nothing.
+  static constexpr const char *wrongDistanceInDrawLine = nullptr, *wrongDistanceInEndPen = nullptr;
 };
 
 struct StrokeV1 {
+  static constexpr int number = 1;
   static constexpr const char* name = "Pencil2StrokeDrawableGLV1";
   static constexpr StrokeProfile profile{
       .unknownPressure = 0.5f,
       .touchSkipDistance = 50.0f,
       .tiltCap = 0.79f,
-      .tiltBlend = rules::tiltBlendV1,
-      .pointSize = rules::pointSizeV1,
-      .pressureAlpha = rules::pressureAlphaV1,
-      .stampCount = rules::stampCountV1,
-      .stampSpacing = 0.0f,
-      .shortestSegment = 1.0f,
-      .logsLargeCounts = false,
+      .adjustTilt = rules::adjustTiltV1,
+      .getPointSize = rules::getPointSizeV1,
+      .getPressureAlpha = rules::getPressureAlphaV1,
+      .placement = Placement::Even,
+      .getRepeat = rules::getRepeatV1,
+      .getRepeatDistance = nullptr,
       .stampSize = rules::stampWidthV1,
       .stampAlpha = rules::stampAlphaV1,
       .stampReach = rules::stampReachV1,
@@ -66,18 +78,18 @@ struct StrokeV1 {
 };
 
 struct StrokeV2 {
+  static constexpr int number = 2;
   static constexpr const char* name = "Pencil2StrokeDrawableGLV2";
   static constexpr StrokeProfile profile{
       .unknownPressure = 0.5f,
       .touchSkipDistance = 50.0f,
       .tiltCap = 0.79f,
-      .tiltBlend = rules::tiltBlendV1,
-      .pointSize = rules::pointSizeV1,
-      .pressureAlpha = rules::pressureAlphaV2,
-      .stampCount = rules::stampCountV1,
-      .stampSpacing = 0.0f,
-      .shortestSegment = 1.0f,
-      .logsLargeCounts = false,
+      .adjustTilt = rules::adjustTiltV1,
+      .getPointSize = rules::getPointSizeV1,
+      .getPressureAlpha = rules::getPressureAlphaV2,
+      .placement = Placement::Even,
+      .getRepeat = rules::getRepeatV1,
+      .getRepeatDistance = nullptr,
       .stampSize = rules::stampWidthV1,
       .stampAlpha = rules::stampAlphaV1,
       .stampReach = rules::stampReachV1,
@@ -93,18 +105,18 @@ struct StrokeV2 {
 };
 
 struct StrokeV3 {
+  static constexpr int number = 3;
   static constexpr const char* name = "Pencil2StrokeDrawableGLV3";
   static constexpr StrokeProfile profile{
       .unknownPressure = 0.5f,
       .touchSkipDistance = 50.0f,
       .tiltCap = 0.79f,
-      .tiltBlend = rules::tiltBlendV1,
-      .pointSize = rules::pointSizeV1,
-      .pressureAlpha = rules::pressureAlphaV2,
-      .stampCount = rules::stampCountV3,
-      .stampSpacing = 0.0f,
-      .shortestSegment = 0.0f,
-      .logsLargeCounts = false,
+      .adjustTilt = rules::adjustTiltV1,
+      .getPointSize = rules::getPointSizeV1,
+      .getPressureAlpha = rules::getPressureAlphaV2,
+      .placement = Placement::Even,
+      .getRepeat = rules::getRepeatV3,
+      .getRepeatDistance = nullptr,
       .stampSize = rules::stampWidthV1,
       .stampAlpha = rules::stampAlphaV1,
       .stampReach = rules::stampReachV1,
@@ -120,18 +132,18 @@ struct StrokeV3 {
 };
 
 struct StrokeV4 {
+  static constexpr int number = 4;
   static constexpr const char* name = "Pencil2StrokeDrawableGLV4";
   static constexpr StrokeProfile profile{
       .unknownPressure = 0.5f,
       .touchSkipDistance = 50.0f,
       .tiltCap = 0.79f,
-      .tiltBlend = rules::tiltBlendV1,
-      .pointSize = rules::pointSizeV1,
-      .pressureAlpha = rules::pressureAlphaV2,
-      .stampCount = rules::stampCountV3,
-      .stampSpacing = 0.0f,
-      .shortestSegment = 0.0f,
-      .logsLargeCounts = true,
+      .adjustTilt = rules::adjustTiltV1,
+      .getPointSize = rules::getPointSizeV1,
+      .getPressureAlpha = rules::getPressureAlphaV2,
+      .placement = Placement::Even,
+      .getRepeat = rules::getRepeatV4,
+      .getRepeatDistance = nullptr,
       .stampSize = rules::stampWidthV4,
       .stampAlpha = rules::stampAlphaV1,
       .stampReach = rules::stampReachV4,
@@ -147,18 +159,18 @@ struct StrokeV4 {
 };
 
 struct StrokeV5 {
+  static constexpr int number = 5;
   static constexpr const char* name = "Pencil2StrokeDrawableGLV5";
   static constexpr StrokeProfile profile{
       .unknownPressure = 0.5f,
       .touchSkipDistance = 50.0f,
       .tiltCap = 1.0f,
-      .tiltBlend = rules::tiltBlendV5,
-      .pointSize = rules::pointSizeV5,
-      .pressureAlpha = rules::pressureAlphaV2,
-      .stampCount = rules::stampCountV3,
-      .stampSpacing = 0.0f,
-      .shortestSegment = 0.0f,
-      .logsLargeCounts = false,
+      .adjustTilt = rules::adjustTiltV5,
+      .getPointSize = rules::getPointSizeV5,
+      .getPressureAlpha = rules::getPressureAlphaV2,
+      .placement = Placement::Even,
+      .getRepeat = rules::getRepeatV3,
+      .getRepeatDistance = nullptr,
       .stampSize = rules::stampWidthV1,
       .stampAlpha = rules::stampAlphaV1,
       .stampReach = rules::stampReachV1,
@@ -174,18 +186,18 @@ struct StrokeV5 {
 };
 
 struct StrokeV7 {
+  static constexpr int number = 7;
   static constexpr const char* name = "Pencil2StrokeDrawableGLV7";
   static constexpr StrokeProfile profile{
       .unknownPressure = 0.5f,
       .touchSkipDistance = 50.0f,
       .tiltCap = 0.79f,
-      .tiltBlend = rules::tiltBlendV1,
-      .pointSize = rules::pointSizeV1,
-      .pressureAlpha = rules::pressureAlphaV2,
-      .stampCount = rules::stampCountV3,
-      .stampSpacing = 0.0f,
-      .shortestSegment = 0.0f,
-      .logsLargeCounts = true,
+      .adjustTilt = rules::adjustTiltV1,
+      .getPointSize = rules::getPointSizeV1,
+      .getPressureAlpha = rules::getPressureAlphaV2,
+      .placement = Placement::Even,
+      .getRepeat = rules::getRepeatV4,
+      .getRepeatDistance = nullptr,
       .stampSize = rules::stampWidthV4,
       .stampAlpha = rules::stampAlphaV1,
       .stampReach = rules::stampReachV4,
@@ -201,18 +213,18 @@ struct StrokeV7 {
 };
 
 struct StrokeV8 {
+  static constexpr int number = 8;
   static constexpr const char* name = "Pencil2StrokeDrawableGLV8";
   static constexpr StrokeProfile profile{
       .unknownPressure = 0.6f,
       .touchSkipDistance = 20.0f,
       .tiltCap = 0.79f,
-      .tiltBlend = rules::tiltBlendV1,
-      .pointSize = rules::pointSizeV1,
-      .pressureAlpha = rules::pressureAlphaV8,
-      .stampCount = nullptr,
-      .stampSpacing = 0.4f,
-      .shortestSegment = 0.0f,
-      .logsLargeCounts = false,
+      .adjustTilt = rules::adjustTiltV1,
+      .getPointSize = rules::getPointSizeV1,
+      .getPressureAlpha = rules::getPressureAlphaV8,
+      .placement = Placement::Spaced,
+      .getRepeat = nullptr,
+      .getRepeatDistance = rules::getRepeatDistanceV8,
       .stampSize = rules::stampHalfWidthV8,
       .stampAlpha = rules::stampAlphaV8,
       .stampReach = rules::stampReachV8,

@@ -10,21 +10,21 @@
 #include <string>
 
 #include "FuzzInput.h"
-#include "InkmlReader.h"
-#include "Refusal.h"
-#include "SourceText.h"
+#include "ink/InkmlReader.h"
+#include "ink/SourceText.h"
+#include "text/Refusal.h"
 
 namespace {
 
 using QeltDesktop::Page;
 
 void check(const Page& page) {
-  if (page.traces.empty()) QeltTests::breakOff("the reader", "a page without traces");
-  for (const QeltDesktop::Trace& trace : page.traces) {
-    if (trace.samples.empty()) QeltTests::breakOff("the reader", "a trace without samples");
-    if (trace.brush.width && !(*trace.brush.width > 0.0f))
+  if (page.strokes.empty()) QeltTests::breakOff("the reader", "a page without traces");
+  for (const QeltDesktop::Stroke& stroke : page.strokes) {
+    if (stroke.samples.empty()) QeltTests::breakOff("the reader", "a trace without samples");
+    if (stroke.brush.width && !(*stroke.brush.width > 0.0f))
       QeltTests::breakOff("the reader", "a brush of no width");
-    for (const QeltDesktop::Sample& sample : trace.samples) {
+    for (const QeltDesktop::Sample& sample : stroke.samples) {
       if (!std::isfinite(sample.x) || !std::isfinite(sample.y))
         QeltTests::breakOff("the reader", "a point that is not finite");
     }

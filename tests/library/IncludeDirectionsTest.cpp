@@ -81,4 +81,19 @@ TEST(IncludeDirections, OfTheHostTakeOnlyMatricesFromThePlugin) {
               testing::IsEmpty());
 }
 
+// Of the program's folders each includes itself and those before it. From the plug-in, which is loaded and
+// may be another one, it takes the matrices and the list of versions.
+TEST(IncludeDirections, OfTheProgramRunFromTheCommandsDownToText) {
+  const std::map<std::string, int> floors = {
+      {"text", 0}, {"ink", 1}, {"output", 1}, {"play", 2}, {"commands", 3}};
+  const auto runsDown = [&](const std::string& from, const std::string& what) {
+    const auto own = floors.find(folderOf(from)), other = floors.find(folderOf(what));
+    if (other == floors.end())
+      return folderOf(what) == "math" || what == "pen/RenderingVersions.h" ||
+             !fs::exists(kSource / "plugin" / what);
+    return own == floors.end() || own == other || own->second > other->second;
+  };
+  EXPECT_THAT(offenders(kSource / "apps/qelt-sketch", runsDown), testing::IsEmpty());
+}
+
 }  // namespace

@@ -10,7 +10,7 @@
 #include "base/Error.h"
 #include "desktop/model/StoredStroke.h"
 #include "engine/MotionEvent.h"
-#include "outline/Pencil2OutlineDrawableGLV4.h"
+#include "outline/OutlineDrawables.h"
 #include "support/DrawableBoard.h"
 #include "support/Versions.h"
 

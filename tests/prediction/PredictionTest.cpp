@@ -13,7 +13,7 @@
 #include "pen/Pencil2.h"
 #include "pencommon/PenPredictionDrawableGL.h"
 #include "prediction/Pencil2PredictionDrawableGL.h"
-#include "stroke/Pencil2StrokeDrawableGLV1.h"
+#include "stroke/StrokeDrawables.h"
 #include "support/DrawableBoard.h"
 #include "support/LogCapture.h"
 #include "support/StampPicture.h"

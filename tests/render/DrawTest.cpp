@@ -13,10 +13,7 @@
 #include "gl/OpenGLRenderer.h"
 #include "math/Matrix4.h"
 #include "pen/DrawableFactory.h"
-#include "prediction/Pencil2PredictionDrawableRT.h"
-#include "render/Pencil2StrokeDrawableRTV1.h"
-#include "render/Pencil2StrokeDrawableRTV2.h"
-#include "render/Pencil2StrokeDrawableRTV3.h"
+#include "render/RenderDrawables.h"
 #include "support/DrawableBoard.h"
 #include "support/FakeLayer.h"
 #include "support/StampPicture.h"
@@ -409,6 +406,7 @@ void expectStampsAsWorkedOut(float size, const StampPicture& look, bool grainZoo
 TEST(StampPicturesTest, AreAsWorkedOutFragmentByFragment) {
   // The sizes of anti-aliased ones leave room for half a pixel of margin.
   expectStampsAsWorkedOut<Pencil2StrokeDrawableRTV1>(100.0f, {.stamp = {}});
+  expectStampsAsWorkedOut<Pencil2PreviewDrawableRT>(100.0f, {.stamp = {}});
   expectStampsAsWorkedOut<Pencil2StrokeDrawableRTV2>(100.0f, {.stamp = {}, .grainX = 75.0f});
   expectStampsAsWorkedOut<Pencil2StrokeDrawableRTV3>(49.5f, {.stamp = {}, .grainX = 75.0f, .ramp = true});
   // Kept: a prediction's stamps are masked by squares of grain, and its grain has one size on screen.

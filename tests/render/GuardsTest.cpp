@@ -9,7 +9,6 @@
 #include "gl/ITask.h"
 #include "render/Fakes.h"
 #include "render/PenGLRenderMsg.h"
-#include "render/UnclaimedBatch.h"
 #include "stroke/StrokeGuards.h"
 #include "support/Allocations.h"
 #include "support/DrawableBoard.h"
@@ -120,11 +119,8 @@ TEST_F(Guards, StayInertWithoutMemoryForTheBatch) {
 
 TEST_F(Guards, OfACachedBatchBorrowIt) {
   std::vector<float> cached(54, 1.0f);
-  // Whether it was handed over.
   const auto redraw = [&](std::vector<float>* batch) {
-    bool handedOver = false;
-    { const Pencil2V7CacheRedrawCallback guard(&drawable, &canvas, {}, batch, &unclaimed, &handedOver); }
-    return handedOver;
+    return Pencil2V7CacheRedrawCallback(&drawable, &canvas, &unclaimed).present(batch, {});
   };
   EXPECT_TRUE(redraw(&cached));
   EXPECT_THAT(posted(), ElementsAre("Batch", "Render"));

@@ -1,5 +1,3 @@
-#include "render/Patterns.h"
-
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -13,6 +11,8 @@
 #include <set>
 #include <string>
 #include <vector>
+
+#include "render/PatternTextures.h"
 
 namespace Qelt {
 namespace {

@@ -8,12 +8,9 @@
 #include "gl/OpenGLShaderProgram.h"
 #include "gl/ShaderManager.h"
 #include "math/Matrix4.h"
-#include "shaders/Exceptions.h"
 #include "shaders/ParameterBinding.h"
-#include "shaders/Pencil2StrokeShaderV1.h"
-#include "shaders/ShaderProgram.h"
+#include "shaders/PencilShaders.h"
 #include "shaders/ShaderRegistry.h"
-#include "shaders/StampUniforms.h"
 #include "support/Allocations.h"
 #include "support/LogCapture.h"
 
@@ -132,41 +129,29 @@ TEST(ParameterBindingTest, TakesAHostThatTellsNoTypeAtItsWordAndGivesTheInterfac
   EXPECT_EQ(program.releases, 1);
 }
 
-struct FakeStampShader : StampUniforms {
-  bool bindTo(FakeProgram& program) { return bind(&program); }
-};
-
 // Were it drawn with, the unbound one would throw in the middle of a tile.
 TEST(StampUniformsTest, AreOnlyBoundWhenAllOfThemAre) {
   FakeProgram program;
-  EXPECT_TRUE(FakeStampShader().bindTo(program));
+  EXPECT_TRUE(StampUniforms().bind(&program));
   for (const char* name : {"ProjectionMatrix", "sampler1", "textureWidth"}) {
     program.missing = name;
-    EXPECT_FALSE(FakeStampShader().bindTo(program)) << name;
+    EXPECT_FALSE(StampUniforms().bind(&program)) << name;
   }
 }
 
 // A stamp shader whose colour has no alpha.
-constexpr char kVertex[] = R"(#version 300 es
+struct WrongShader : PencilShader<WrongShader, StampUniforms> {
+  static constexpr char szVertexShader[] = R"(#version 300 es
 layout(location = 0) in vec4 position;
 uniform mat4 ProjectionMatrix;
 void main() { gl_Position = ProjectionMatrix * position; })";
-constexpr char kFragment[] = R"(#version 300 es
+  static constexpr char szFragmentShader[] = R"(#version 300 es
 precision highp float;
 uniform sampler2D sampler0;
 uniform sampler2D sampler1;
 uniform vec3 inputColor;
 out vec4 FragColor;
 void main() { FragColor = vec4(inputColor, 1.0) * texture(sampler0, vec2(0.5)) * texture(sampler1, vec2(0.5)); })";
-
-class WrongShader : public StampUniforms {
- public:
-  WrongShader() { link(); }
-  void link() { bind(mProgram.make(kVertex, kFragment)); }
-  bool isLinked() const { return false; }
-
- private:
-  ShaderProgram mProgram;
 };
 
 TEST(StampShaderTest, WithAUniformOfAnotherTypeIsNotRegisteredAndLeaksNothing) {

@@ -2,12 +2,12 @@
 #include <gtest/gtest.h>
 
 #include "desktop/gl/RenderQueue.h"
-#include "render/PatternTextures.h"
+#include "desktop/pencommon/PenDataManager.h"
+#include "render/RenderDrawables.h"
 
 namespace QeltTests {
 namespace {
 
-using Qelt::PatternTextures;
 using QeltDesktop::RenderQueue;
 
 // Texture names alive in the current context.
@@ -20,24 +20,19 @@ int textureCount() {
 // What the textures hold and how they are looked up is seen in pictures of single stamps.
 TEST(Textures, AreMadeOnceAndGoneAfterTheRelease) {
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
-  queue.run([&queue] {
+  QeltDesktop::PenDataManager data(&queue);
+  queue.run([&data] {
     const int before = textureCount();
-    PatternTextures textures;
+    Qelt::Pencil2StrokeDrawableRTV1 drawable(&data);
     for (int i = 0; i < 2; ++i) {
-      textures.build(&queue, 150, 150, "Test");
+      drawable.Init();
       EXPECT_EQ(textureCount(), before + 2);
     }
-    EXPECT_FALSE(textures.ready());
-    textures.upload(0, 150, PatternTextures::PointSource::StampShapes);  // of an empty grain
-    EXPECT_TRUE(textures.ready());
     // Kept: what is released stays released, whoever asks again.
     for (int i = 0; i < 2; ++i) {
-      textures.release();
-      EXPECT_FALSE(textures.ready());
-      EXPECT_EQ(textureCount(), before);
-      textures.build(&queue, 150, 150, "Test");
-      textures.upload(150, 150, PatternTextures::PointSource::StampShapes);
-      EXPECT_FALSE(textures.ready());
+      drawable.Release();
+      drawable.Init();
+      drawable.RestoreGLObject();
       EXPECT_EQ(textureCount(), before);
     }
   });

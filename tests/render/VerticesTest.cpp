@@ -47,7 +47,7 @@ TEST(AntialiasedQuadTest, AddsHalfADevicePixelAndWidensThinStampsAndDimsThem) {
 TEST(StampAppenderTest, AppendsEveryStampInOrderWhateverTheCount) {
   for (const std::size_t count : {0u, 1u, 15u, 16u, 17u, 32u, 100u}) {
     std::vector<float> batch{42.0f};  // what is there stays
-    StampAppender<9> stamps(&batch, count);
+    StampAppender<kSquareVertex.floats()> stamps(&batch, count);
     for (std::size_t i = 0; i < count; ++i) {
       const auto x = static_cast<float>(i);
       stamps.add(stampQuad({x, 0.0f}, squareExtent(2.0f)), {x, 0.0f, 1.0f, {0.0f, 1.0f}});
@@ -57,7 +57,7 @@ TEST(StampAppenderTest, AppendsEveryStampInOrderWhateverTheCount) {
     EXPECT_EQ(batch[0], 42.0f);
     for (std::size_t i = 0; i < count; ++i) EXPECT_EQ(batch[1 + i * 54 + 4], static_cast<float>(i));
   }
-  StampAppender<9> nowhere(nullptr, 40);
+  StampAppender<kSquareVertex.floats()> nowhere(nullptr, 40);
   for (int i = 0; i < 40; ++i) nowhere.add({}, {});
   nowhere.flush();
 }

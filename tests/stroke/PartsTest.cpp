@@ -13,15 +13,14 @@
 #include "base/PointF.h"
 #include "base/RectF.h"
 #include "graphics/SmPath.h"
-#include "stroke/parts/DirtyBox.h"
-#include "stroke/parts/LiveInput.h"
-#include "stroke/parts/MoveFilter.h"
-#include "stroke/parts/PatternShift.h"
-#include "stroke/parts/PenAttitude.h"
-#include "stroke/parts/SampleCleaner.h"
-#include "stroke/parts/SegmentPath.h"
-#include "stroke/parts/StampCounter.h"
-#include "stroke/parts/StampWalk.h"
+#include "stroke/input/LiveInput.h"
+#include "stroke/input/MoveFilter.h"
+#include "stroke/input/PenAttitude.h"
+#include "stroke/input/SampleCleaner.h"
+#include "stroke/placing/PatternShift.h"
+#include "stroke/placing/SegmentPath.h"
+#include "stroke/placing/StampRun.h"
+#include "stroke/placing/StampWalk.h"
 #include "support/Board.h"
 
 namespace Qelt {
@@ -280,10 +279,8 @@ TEST(SpacedStampsTest, NeverReservesTooLittle) {
   EXPECT_EQ(spacedStamps(0.4f, 0.4f, std::numeric_limits<float>::quiet_NaN()), 0);
 
   // A point that is dropped asks for no room: from (0, 0) over (4, 0) to (8, 0), 20 stamps and two a point.
-  SegmentPath path;
-  path.start({0.0f, 0.0f});
   EXPECT_EQ(stampsOfMove(QeltTests::motionEvent(kActionMove, {{4.0f, 0.0f}, {kNaN, 0.0f}, {8.0f, 0.0f}}),
-                         path, 0.4f),
+                         {0.0f, 0.0f}, {0.0f, 0.0f}, 0.4f),
             26);
 }
 
@@ -329,8 +326,7 @@ TEST(DirtyBoxTest, LeavesOutEdgesThatAreNoNumbers) {
 }
 
 TEST(StampCounterTest, LetsTheShapesTakeTurnsEvenPastTheLargestCount) {
-  StampCounter stamps;
-  stamps.restart(std::numeric_limits<std::int32_t>::max() - 1);  // 2147483646 = 3 * 715827882
+  StampCounter stamps(std::numeric_limits<std::int32_t>::max() - 1);  // 2147483646 = 3 * 715827882
   for (const int shape : {0, 1, 2, 0}) EXPECT_EQ(stamps.next(), shape);
   EXPECT_GT(stamps.count(), 0);
 }

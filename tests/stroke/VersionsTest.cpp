@@ -8,9 +8,7 @@
 
 #include "engine/MotionEvent.h"
 #include "pencommon/PenDrawableRT.h"
-#include "render/Pencil2StrokeDrawableRTV1.h"
-#include "render/Pencil2StrokeDrawableRTV2.h"
-#include "render/Pencil2StrokeDrawableRTV3.h"
+#include "render/RenderDrawables.h"
 #include "stroke/StrokeGuards.h"
 #include "stroke/StrokeVersions.h"
 #include "support/DrawableBoard.h"

@@ -8,7 +8,6 @@
 #include "outline/Pencil2OutlineDrawableGL.h"
 #include "pen/DrawableFactory.h"
 #include "pen/Pencil2Data.h"
-#include "pen/VersionTable.h"
 #include "pencommon/PenPreviewDrawableGL.h"
 #include "pencommon/PenSettingData.h"
 #include "stroke/Pencil2StrokeDrawableGL.h"

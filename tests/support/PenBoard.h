@@ -7,7 +7,7 @@
 #include <utility>
 #include <vector>
 
-#include "pen/PencilEntry.h"
+#include "pen/Pencil2.h"
 #include "pencommon/IPenMorphable.h"
 #include "pencommon/Pen.h"
 #include "pencommon/PenOutlineDrawableGL.h"

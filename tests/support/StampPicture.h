@@ -6,7 +6,7 @@
 #include <cstdint>
 #include <vector>
 
-#include "render/Patterns.h"
+#include "render/PatternTextures.h"
 #include "support/Stamps.h"
 
 namespace QeltTests {

@@ -1,0 +1,297 @@
+#include "commands/CommandLine.h"
+
+#include <array>
+#include <cmath>
+#include <functional>
+#include <sstream>
+#include <string_view>
+#include <utility>
+
+#include <CLI/CLI.hpp>
+
+#include "engine/MotionEvent.h"
+#include "ink/Definitions.h"
+#include "play/PageDrawing.h"
+#include "text/NumberText.h"
+#include "text/Refusal.h"
+
+namespace QeltDesktop {
+namespace {
+
+// What an option takes: how the help shows it, how a refusal names it, and the parser of its value. Every
+// number goes through our own parsers, which do not depend on the locale.
+template <typename Value>
+struct Form {
+  std::string shape;
+  std::string wanted;
+  std::function<std::optional<Value>(const std::string&)> parse;
+};
+
+template <typename Value, typename Target>
+void addValue(CLI::App& app, const char* name, Target& target, const Form<Value>& form,
+              const std::string& help) {
+  app.add_option_function<std::string>(
+         name,
+         [&target, form, name](const std::string& text) {
+           const std::optional<Value> value = form.parse(text);
+           if (!value) throw CLI::ValidationError(name, "expects " + form.wanted + ", not '" + text + "'");
+           target = *value;
+         },
+         help)
+      ->type_name(form.shape);
+}
+
+std::optional<int> countFrom(int least, const std::string& text) {
+  const std::optional<int> count = parseInt(text);
+  return count && *count >= least ? count : std::nullopt;
+}
+std::optional<int> count(const std::string& text) {
+  return countFrom(1, text);
+}
+// More than this is a slip of the finger, and would fill the memory.
+constexpr int kMostPredicted = 10000;
+std::optional<int> predictionCount(const std::string& text) {
+  const std::optional<int> samples = countFrom(0, text);
+  return samples && *samples <= kMostPredicted ? samples : std::nullopt;
+}
+std::optional<int> integer(const std::string& text) {
+  return parseInt(text);
+}
+
+std::optional<float> anyFloat(const std::string& text) {
+  return parseFloat(text);
+}
+
+std::optional<float> finiteFloat(const std::string& text) {
+  const std::optional<float> value = parseFloat(text);
+  return value && std::isfinite(*value) ? value : std::nullopt;
+}
+
+std::optional<float> positiveFloat(const std::string& text) {
+  const std::optional<float> value = finiteFloat(text);
+  return value && *value > 0.0f ? value : std::nullopt;
+}
+
+std::optional<float> share(const std::string& text) {
+  const std::optional<float> value = parseFloat(text);
+  return value && *value >= 0.0f && *value <= 1.0f ? value : std::nullopt;
+}
+
+std::optional<std::uint32_t> argbColor(const std::string& text) {
+  return parseArgb(text);
+}
+
+std::optional<PageSize> pageSize(const std::string& text) {
+  const std::size_t cross = text.find('x');
+  if (cross == std::string::npos) return std::nullopt;
+  const std::optional<float> width = positiveFloat(text.substr(0, cross));
+  const std::optional<float> height = positiveFloat(text.substr(cross + 1));
+  if (!width || !height) return std::nullopt;
+  return PageSize{*width, *height};
+}
+
+std::optional<OutlineOptions> outline(const std::string& text) {
+  const std::size_t comma = text.find(',');
+  if (comma == std::string::npos) return std::nullopt;
+  const std::optional<float> size = parseFloat(text.substr(0, comma));
+  const std::optional<unsigned int> argb = parseArgb(text.substr(comma + 1));
+  if (!size || !argb) return std::nullopt;
+  return OutlineOptions{*size, *argb};
+}
+
+std::optional<Background> background(const std::string& text) {
+  if (text == "white") return Background{};
+  if (text == "transparent") return Background{.transparent = true};
+  const std::optional<unsigned int> rgb = parseRgb(text);
+  if (!rgb) return std::nullopt;
+  return Background{.rgb = *rgb};
+}
+
+constexpr std::array<std::pair<const char*, int>, 3> kToolNames{
+    {{"stylus", Qelt::kToolStylus}, {"finger", Qelt::kToolFinger}, {"mouse", Qelt::kToolMouse}}};
+
+// One of the words, which stay where they are.
+template <typename Value, std::size_t count>
+Form<Value> oneOf(const std::array<std::pair<const char*, Value>, count>& names) {
+  std::string shape;
+  for (const auto& [name, value] : names) shape += (shape.empty() ? "" : "|") + std::string(name);
+  return {shape, shape, [&names](const std::string& text) -> std::optional<Value> {
+            for (const auto& [name, value] : names) {
+              if (text == name) return value;
+            }
+            return std::nullopt;
+          }};
+}
+
+const Form<int> kCount{"N", "a whole number from 1", count};
+const Form<int> kInteger{"N", "a whole number", integer};
+const Form<int> kPredictionCount{"K", "a whole number from 0 to " + std::to_string(kMostPredicted),
+                                 predictionCount};
+const Form<float> kSize{"S", "a number", anyFloat};
+const Form<float> kZoom{"Z", "a number above 0", positiveFloat};
+const Form<float> kDegrees{"DEG", "a number of degrees", finiteFloat};
+const Form<float> kShare{"O", "a number from 0 to 1", share};
+const Form<std::uint32_t> kColor{"'#AARRGGBB'", "a colour as #AARRGGBB", argbColor};
+const Form<PageSize> kPage{"WxH", "WxH, two numbers above 0", pageSize};
+const Form<Background> kBackground{"white|transparent|'#RRGGBB'", "white, transparent or #RRGGBB",
+                                   background};
+const Form<OutlineOptions> kOutline{"SIZE,'#AARRGGBB'", "SIZE,#AARRGGBB", outline};
+
+// What the help tells as defaults.
+const Options kDefaults;
+
+std::string withDefault(const std::string& help, const std::string& value) {
+  return help + " (default " + value + ")";
+}
+template <typename Number>
+std::string numberText(Number number) {
+  std::ostringstream text;
+  text << number;
+  return text.str();
+}
+std::string backgroundName(const Background& background) {
+  if (background.transparent) return "transparent";
+  return background.rgb == 0xFFFFFF ? "white" : "#" + formatArgb(background.rgb).substr(3);
+}
+
+// Option by option, in the order the help shows them.
+
+void addInput(CLI::App& app, Options& options) {
+  app.add_option("INPUT", options.input, "page of W3C InkML (default: the sample page)")->type_name("");
+}
+
+std::string limits() {
+  return "Limits: a page's elements nest at most " + std::to_string(kDeepestNesting) +
+         " deep; a picture has at most " + std::to_string(kLongestSide) + " pixels a side and " +
+         std::to_string(kMostPixels) + " in all.";
+}
+
+void addOutput(CLI::App& app, Options& options, const char* help) {
+  app.add_option("-o,--output", options.output, help)->required()->type_name("FILE");
+}
+
+void addPlugin(CLI::App& app, Options& options) {
+  app.add_option("--plugin", options.plugin, "pen plug-in to load")->type_name("FILE")->group("");
+  app.add_flag("--log", options.log, "show what plug-in and host log, on standard error");
+}
+
+void addPen(CLI::App& app, Options& options) {
+  addValue<float>(app, "--size", options.size, kSize, "pen size (default: the file's, else the pen's)");
+  addValue<std::uint32_t>(app, "--color", options.argb, kColor,
+                          "pen colour (default: the file's, else the pen's)");
+}
+
+void addFeeding(CLI::App& app, Options& options) {
+  app.add_flag_callback(
+      "--no-curve", [&options] { options.curve = false; }, "straight segments");
+  addValue<Mode>(app, "--mode", options.mode, oneOf(kModeNames),
+                 withDefault("how strokes reach the plug-in", nameOf(kDefaults.mode)));
+  addValue<int>(app, "--batch", options.samplesPerMove, kCount,
+                withDefault("live: samples a move event", numberText(kDefaults.samplesPerMove)));
+  addValue<int>(app, "--tool", options.tool, oneOf(kToolNames), "tool (default: the file's, else stylus)");
+  addValue<int>(app, "--source", options.source, kInteger,
+                withDefault("event source", std::to_string(Qelt::kSourceStylus) + " stylus, " +
+                                                std::to_string(Qelt::kSourceTouchScreen) + " finger, " +
+                                                std::to_string(Qelt::kSourceMouse) + " mouse"));
+}
+
+void addDrawing(CLI::App& app, Options& options) {
+  addValue<int>(app, "--rendering-version", options.renderingVersion, kInteger,
+                withDefault("of the pen", numberText(kDefaults.renderingVersion)));
+  addPen(app, options);
+  addFeeding(app, options);
+  addValue<int>(app, "--repeat", options.repeat, kCount,
+                "draw the page N times, each onto a cleared layer; in stroke mode from the cache");
+  addValue<float>(app, "--zoom", options.zoom, kZoom,
+                  withDefault("canvas pixels a stroke unit", numberText(kDefaults.zoom)));
+  addValue<float>(app, "--rotate", options.rotate, kDegrees,
+                  withDefault("turn clockwise about the page's centre", numberText(kDefaults.rotate)));
+  addValue<PageSize>(app, "--page", options.page, kPage,
+                     "page in stroke units, from (0, 0) (default: the file's extent plus a margin)");
+  addValue<Background>(app, "--background", options.background, kBackground,
+                       "default " + backgroundName(kDefaults.background));
+  addValue<OutlineOptions>(app, "--outline", options.outline, kOutline,
+                           "draw every stroke's outline under the strokes");
+  addValue<int>(
+      app, "--predict", options.predict, kPredictionCount,
+      "live: K predicted samples, at most " + std::to_string(kMostPredicted) + ", after every move event");
+  addValue<float>(app, "--opacity", options.opacity, kShare,
+                  withDefault("of the prediction, 0 to 1", numberText(kDefaults.opacity)));
+  addValue<int>(app, "--points", options.points, kCount,
+                "stop after the first N points of the last trace, the pen still down");
+}
+
+// Refuses combinations of options that contradict each other.
+void checkTogether(const Options& options) {
+  if (options.command != Command::Trace) return;
+  if (options.drawable == DrawableKind::Prediction && (options.mode != Mode::Live || options.predict == 0)) {
+    throw CLI::ValidationError("--drawable prediction", "needs --mode live and --predict K");
+  }
+  if (options.drawable == DrawableKind::Preview && options.mode == Mode::Stroke) {
+    throw CLI::ValidationError("--drawable preview", "takes --mode live or event");
+  }
+}
+
+UsageEnd usageEnd(const CLI::App& app, const CLI::ParseError& error) {
+  std::ostringstream text;
+  const bool asked = app.exit(error, text, text) == 0;
+  return {text.str(), asked ? 0 : 2};
+}
+
+}  // namespace
+
+std::variant<Options, UsageEnd> parseOptions(int argc, const char* const* argv) {
+  Options options;
+  CLI::App app("Draws recorded ink with the pencil plug-in.", "qelt-sketch");
+  app.require_subcommand(1);
+
+  CLI::App* const draw = app.add_subcommand("draw", "draw the page as a PNG picture");
+  addInput(*draw, options);
+  addOutput(*draw, options, "picture to write");
+  addDrawing(*draw, options);
+
+  CLI::App* const trace =
+      app.add_subcommand("trace", "write what the plug-in did, call by call, as JSON Lines");
+  addInput(*trace, options);
+  addOutput(*trace, options, "file to write; - is standard output");
+  addDrawing(*trace, options);
+  addValue<DrawableKind>(*trace, "--drawable", options.drawable, oneOf(kDrawableNames),
+                         withDefault("whose calls to write", nameOf(kDefaults.drawable)));
+
+  CLI::App* const preview = app.add_subcommand("preview", "draw the settings panel's sample stroke");
+  addOutput(*preview, options, "picture to write");
+  addPen(*preview, options);
+
+  CLI::App* const sheet = app.add_subcommand("sheet", "draw the page once in every rendering version");
+  addInput(*sheet, options);
+  addOutput(*sheet, options, "picture to write");
+  addPen(*sheet, options);
+  addFeeding(*sheet, options);
+
+  CLI::App* const info =
+      app.add_subcommand("info", "show plug-in path, GL renderer, version table and pen limits");
+
+  const std::pair<CLI::App*, Command> commands[] = {{draw, Command::Draw},
+                                                    {trace, Command::Trace},
+                                                    {preview, Command::Preview},
+                                                    {sheet, Command::Sheet},
+                                                    {info, Command::Info}};
+  for (const auto& [command, value] : commands) addPlugin(*command, options);
+  for (CLI::App* const command : {draw, trace, sheet}) command->footer(limits());
+
+  try {
+    app.parse(argc, argv);
+    for (const auto& [command, value] : commands) {
+      if (command->parsed()) options.command = value;
+    }
+    checkTogether(options);
+  } catch (const CLI::RequiredError& error) {
+    if (!app.get_subcommands().empty() || argc < 2) return usageEnd(app, error);
+    return UsageEnd{"no command '" + oneLine(argv[1]) + "'; see qelt-sketch --help\n", 2};
+  } catch (const CLI::ParseError& error) {
+    return usageEnd(app, error);
+  }
+  return options;
+}
+
+}  // namespace QeltDesktop

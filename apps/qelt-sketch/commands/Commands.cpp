@@ -1,0 +1,313 @@
+#include "commands/Commands.h"
+
+#include <android/log.h>
+#include <dlfcn.h>
+#include <link.h>
+
+#include <algorithm>
+#include <cmath>
+#include <cstddef>
+#include <cstdint>
+#include <cstdio>
+#include <filesystem>
+#include <numbers>
+#include <optional>
+#include <span>
+#include <string>
+#include <system_error>
+
+#include "desktop/engine/PluginLibrary.h"
+#include "desktop/gl/RenderQueue.h"
+#include "desktop/graphics/PenCanvas.h"
+#include "ink/InkmlReader.h"
+#include "output/LabelFont.h"
+#include "output/OutputFile.h"
+#include "output/Picture.h"
+#include "output/Terminal.h"
+#include "pen/RenderingVersions.h"
+#include "pencommon/IPenMorphable.h"
+#include "play/CallRecorder.h"
+#include "play/PageDrawing.h"
+#include "play/PageLayout.h"
+#include "play/PagePlayer.h"
+#include "play/PenSession.h"
+#include "play/StrokeFeeder.h"
+#include "text/NumberText.h"
+#include "text/Refusal.h"
+
+namespace QeltDesktop {
+namespace {
+
+namespace fs = std::filesystem;
+
+// A file that comes with the program. It is looked for beside the program and where the build tree has it,
+// seen from the program, so that both may be moved.
+std::string besideProgram(const char* pathFromProgram) {
+  std::error_code error;
+  const fs::path folder = fs::read_symlink("/proc/self/exe", error).parent_path();
+  const fs::path builtIn = (folder / pathFromProgram).lexically_normal();
+  for (const fs::path& path : {folder / builtIn.filename(), builtIn}) {
+    if (fs::exists(path, error)) return path.string();
+  }
+  throw Refusal(builtIn.string() + ": not there; it comes with the program");
+}
+
+// The plug-in that was asked for, else the one built with the program.
+std::string pluginPath(const Options& options) {
+  if (!options.plugin) return besideProgram(QELT_PLUGIN_FROM_PROGRAM);
+  // The loader looks for a name without a folder among the system's libraries only; here it may also stand
+  // in the current folder.
+  std::error_code error;
+  const fs::path asked = *options.plugin;
+  return !asked.has_parent_path() && fs::exists(asked, error) ? (fs::path(".") / asked).string()
+                                                              : asked.string();
+}
+
+// The page that was asked for, else the sample page.
+std::string inputPath(const Options& options) {
+  return options.input ? *options.input : besideProgram(QELT_SAMPLE_FROM_PROGRAM);
+}
+
+// The margin of a page that is drawn or traced with all its options.
+float marginFor(const PluginLibrary& plugin, RenderQueue& queue, const Page& page, const Options& options) {
+  return pageMargin(largestPenSize(plugin, queue, page, options),
+                    options.outline ? options.outline->size : 0.0f);
+}
+
+std::size_t strokesToPlay(const Page& page, const Options& options) {
+  return page.strokes.size() * static_cast<std::size_t>(options.repeat);
+}
+
+void draw(const Options& options) {
+  Page page = readInkmlFile(inputPath(options));
+  OutputFile file(options.output, page.name);
+  const PluginLibrary plugin(pluginPath(options));
+  RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
+
+  // The extent of the whole page: what --points leaves out keeps its place.
+  const PageArea area = pageArea(page, options.page, marginFor(plugin, queue, page, options));
+  if (options.points) cutLastStroke(page, *options.points);
+
+  Progress progress("drawing stroke", strokesToPlay(page, options));
+  const Picture picture = drawPage(plugin, queue, page, options, layOut(area, options.zoom, options.rotate),
+                                   drawablesFor(options), progress);
+  file.write(encodePng(picture));
+  file.commit();
+}
+
+std::string traceHeader(PenSession& session, const Page& page, const Options& options) {
+  const PenStyle style = styleFor(page.strokes.front().brush, session.ownStyle(), options);
+  const bool curve = session.pen().GetMorphable()->IsCurveEnabled();
+  std::string line = R"({"kind":"header","renderingVersion":)" + std::to_string(options.renderingVersion);
+  line += R"(,"size":)";
+  appendJson(line, style.size);
+  line += R"(,"color":")" + formatArgb(style.argb);
+  line += R"(","curve":)";
+  line += curve ? "true" : "false";
+  line += R"(,"mode":")";
+  line += nameOf(options.mode);
+  line += R"(","drawable":")";
+  line += nameOf(options.drawable);
+  line += "\"}\n";
+  return line;
+}
+
+// The drawable whose calls are wanted, and the one it depends on: predictions go on from live strokes.
+Canvases canvasesFor(DrawableKind wanted, PenCanvas& canvas) {
+  Canvases canvases;
+  if (wanted == DrawableKind::Stroke || wanted == DrawableKind::Prediction) canvases.stroke = &canvas;
+  if (wanted == DrawableKind::Outline) canvases.outline = &canvas;
+  if (wanted == DrawableKind::Preview) canvases.preview = &canvas;
+  if (wanted == DrawableKind::Prediction) canvases.prediction = &canvas;
+  return canvases;
+}
+
+void trace(const Options& options) {
+  Page page = readInkmlFile(inputPath(options));
+  OutputFile file(options.output, page.name);
+  const PluginLibrary plugin(pluginPath(options));
+  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
+  Progress progress("tracing stroke", strokesToPlay(page, options));
+  CallRecorder recorder(queue, file, progress, options.drawable, options.renderingVersion);
+
+  PenCanvas canvas(&queue, nullptr);
+  const PageArea area = pageArea(page, options.page, marginFor(plugin, queue, page, options));
+  canvas.setMatrix(layOut(area, options.zoom, options.rotate).matrix);
+  if (options.points) cutLastStroke(page, *options.points);
+
+  {
+    PenSession session(plugin, queue, options);
+    PagePlayer player(session, page, options, canvasesFor(options.drawable, canvas));
+    file.write(traceHeader(session, page, options));
+    player.play(recorder);
+  }
+  file.commit();
+}
+
+// The panel of `preview`, in stroke units, each of which is one pixel.
+constexpr float kPanelWidth = 480.0f;
+constexpr float kPanelHeight = 160.0f;
+
+// A lying S that swells: pressed harder and leant further towards its middle.
+Page samplePanel() {
+  constexpr int kSamples = 160;
+  constexpr double kInset = 50.0, kSwing = 42.0;        // stroke units
+  constexpr double kLightest = 0.15, kHeaviest = 0.75;  // pressure
+  constexpr double kMostTilt = 0.55;                    // radians
+  Page page{.name = "the sample stroke", .strokes = {}};
+  for (int i = 0; i < kSamples; ++i) {
+    const double along = static_cast<double>(i) / (kSamples - 1);
+    const double swell = std::pow(std::sin(along * std::numbers::pi), 2.0);
+    Sample sample;
+    sample.x = static_cast<float>(kInset + along * (kPanelWidth - 2.0 * kInset));
+    sample.y = static_cast<float>(kPanelHeight / 2.0 - kSwing * std::sin(along * 2.0 * std::numbers::pi));
+    sample.pressure = static_cast<float>(kLightest + (kHeaviest - kLightest) * swell);
+    sample.tilt = static_cast<float>(kMostTilt * swell);
+    sample.time = i * 1000.0 / 240.0;
+    page.strokes.addSample(sample);
+  }
+  page.strokes.finishStroke(kNoNumber, std::nullopt);
+  return page;
+}
+
+void preview(const Options& asked) {
+  Options options = asked;
+  options.mode = Mode::Event;
+  OutputFile file(options.output);
+  const PluginLibrary plugin(pluginPath(options));
+  RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
+  Progress progress("drawing stroke", 1);
+  const PageLayout layout = layOut({0.0f, 0.0f, kPanelWidth, kPanelHeight}, 1.0f, 0.0f);
+  const Picture picture =
+      drawPage(plugin, queue, samplePanel(), options, layout, {.preview = true}, progress);
+  file.write(encodePng(picture));
+  file.commit();
+}
+
+// Every rendering version in a cell of its own, under a label, row by row.
+void sheet(const Options& asked) {
+  constexpr int kColumns = 2;
+  constexpr int kRows = (static_cast<int>(Qelt::kRenderingVersions.size()) + kColumns - 1) / kColumns;
+  // Pixels.
+  constexpr double kWidestCell = 800.0, kHighestCell = 600.0;
+  constexpr int kGap = 16;
+  constexpr int kLabelScale = 2;
+  constexpr int kLabelHeight = kGlyphHeight * kLabelScale;
+  constexpr std::uint32_t kPaper = 0xE8E8E8, kInk = 0x404040;
+
+  Options options = asked;
+  const Page page = readInkmlFile(inputPath(options));
+  OutputFile file(options.output, page.name);
+  const PluginLibrary plugin(pluginPath(options));
+  RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
+
+  const PageArea area = pageArea(page, std::nullopt, marginFor(plugin, queue, page, options));
+  const double fit = std::min({1.0, kWidestCell / area.width, kHighestCell / area.height});
+  const PageLayout layout = layOut(area, static_cast<float>(fit), 0.0f);
+
+  Progress progress("drawing stroke", page.strokes.size() * Qelt::kRenderingVersions.size());
+  std::optional<Picture> sheet;
+  int column = 0, row = 0;
+  for (const Qelt::RenderingVersion& version : Qelt::kRenderingVersions) {
+    options.renderingVersion = version.number;
+    const Picture cell = drawPage(plugin, queue, page, options, layout, {.stroke = true}, progress);
+    const int stepX = cell.width + kGap;
+    const int stepY = cell.height + kLabelHeight + kGap;
+    if (!sheet) sheet = plainPicture(kColumns * stepX + kGap, kRows * stepY + kGap, kPaper);
+    const int x = kGap + column * stepX;
+    const int y = kGap + row * stepY;
+    writeLabel(*sheet, x, y, kLabelScale, kInk, "RENDERING VERSION " + std::to_string(version.number));
+    paste(*sheet, cell, x, y + kLabelHeight + kGap / 2);
+    if (++column == kColumns) column = 0, ++row;
+  }
+  file.write(encodePng(*sheet));
+  file.commit();
+}
+
+// A row of the plug-in's version table.
+struct TableRow {
+  std::int32_t strokeVersion, outlineVersion;
+};
+
+// The table as the loaded plug-in exports it, which may be of another age than this program. The index is
+// the rendering version.
+std::span<const TableRow> versionTable(const PluginLibrary& plugin) {
+  const void* const table = plugin.symbol("versionTable");
+  Dl_info where{};
+  const ElfW(Sym)* symbol = nullptr;
+  if (table == nullptr ||
+      dladdr1(table, &where, reinterpret_cast<void**>(const_cast<ElfW(Sym)**>(&symbol)), RTLD_DL_SYMENT) ==
+          0 ||
+      symbol == nullptr) {
+    throw Refusal(plugin.path() + ": the plug-in has no versionTable");
+  }
+  return {static_cast<const TableRow*>(table), symbol->st_size / sizeof(TableRow)};
+}
+
+// Where the plug-in's table and this program's list of versions disagree, one line for each version.
+std::string disagreements(std::span<const TableRow> table) {
+  std::string lines;
+  const auto tell = [&](std::size_t number, const char* what) {
+    lines += "rendering version " + std::to_string(number) + what + '\n';
+  };
+  const std::size_t known = Qelt::kRenderingVersions.size();
+  for (const Qelt::RenderingVersion& version : Qelt::kRenderingVersions) {
+    const auto number = static_cast<std::size_t>(version.number);
+    if (number >= table.size()) {
+      tell(number, " is known to this program, not to the plug-in");
+    } else if (table[number].strokeVersion != version.strokeVersion ||
+               table[number].outlineVersion != version.outlineVersion) {
+      tell(number, (" has stroke version " + std::to_string(version.strokeVersion) + " and outline version " +
+                    std::to_string(version.outlineVersion) + " in this program's list")
+                       .c_str());
+    }
+  }
+  for (std::size_t number = known + 1; number < table.size(); ++number) {
+    tell(number, " is known to the plug-in, not to this program");
+  }
+  return lines;
+}
+
+void info(const Options& options) {
+  const PluginLibrary plugin(pluginPath(options));
+  std::printf("plug-in      %s\n", printable(plugin.path()).c_str());
+  const std::span<const TableRow> table = versionTable(plugin);
+
+  RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
+  std::printf("GL renderer  %s\n", queue.rendererName().c_str());
+
+  PenSession session(plugin, queue, options);
+  const PenStyle& style = session.ownStyle();
+  std::printf("pen size     %g to %g, a new pen has %g\n", static_cast<double>(session.pen().GetMinSize()),
+              static_cast<double>(session.pen().GetMaxSize()), static_cast<double>(style.size));
+  std::printf("pen colour   #%08X\n", static_cast<unsigned int>(style.argb));
+  std::printf("\nrendering version  stroke version  outline version\n");
+  for (std::size_t version = 0; version < table.size(); ++version) {
+    std::printf("%17zu  %14d  %15d\n", version, table[version].strokeVersion, table[version].outlineVersion);
+  }
+  if (const std::string lines = disagreements(table); !lines.empty()) {
+    std::printf("\nThe plug-in is of another age than this program:\n%s", lines.c_str());
+  }
+  finishStandardOutput();
+}
+
+}  // namespace
+
+void runCommand(const Options& options) {
+  // Without --log, standard error holds only the line that says what could not be done.
+  if (!options.log) __android_log_set_minimum_priority(ANDROID_LOG_SILENT);
+  switch (options.command) {
+    case Command::Draw:
+      return draw(options);
+    case Command::Trace:
+      return trace(options);
+    case Command::Preview:
+      return preview(options);
+    case Command::Sheet:
+      return sheet(options);
+    case Command::Info:
+      return info(options);
+  }
+}
+
+}  // namespace QeltDesktop

@@ -1,0 +1,16 @@
+#pragma once
+
+#include <string>
+
+#include "ink/Ink.h"
+#include "ink/SourceText.h"
+
+namespace QeltDesktop {
+
+// Reads a page of W3C InkML. Every trace that leaves ink becomes one stroke, in document order; a trace
+// within a <definitions> element is not drawn. Throws Refusal, "file:line: what: value", at the first thing
+// that is malformed.
+Page readInkml(const SourceText& source);
+Page readInkmlFile(const std::string& path);
+
+}  // namespace QeltDesktop

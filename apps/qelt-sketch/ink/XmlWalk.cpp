@@ -1,0 +1,179 @@
+#include "ink/XmlWalk.h"
+
+#include <expat.h>
+
+#include <algorithm>
+#include <exception>
+#include <memory>
+#include <new>
+#include <type_traits>
+
+#include "text/Utf8.h"
+
+namespace QeltDesktop {
+namespace {
+
+std::string_view withoutPrefix(std::string_view name) {
+  const std::size_t colon = name.rfind(':');
+  return colon == std::string_view::npos ? name : name.substr(colon + 1);
+}
+
+struct FreeParser {
+  void operator()(XML_Parser parser) const { XML_ParserFree(parser); }
+};
+
+// For a text in an encoding that the parser does not know. Only its ASCII characters matter here, and those
+// are the same in most encodings.
+int asSingleBytes(void*, const XML_Char*, XML_Encoding* encoding) {
+  for (int i = 0; i < 256; ++i) encoding->map[i] = i;
+  encoding->data = nullptr;
+  encoding->convert = nullptr;
+  encoding->release = nullptr;
+  return XML_STATUS_OK;
+}
+
+class Walk {
+ public:
+  Walk(const SourceText& source, XmlVisitor& visitor) : mSource(source), mVisitor(visitor) {
+    // Some programs put an empty line before the XML declaration.
+    mStart = std::min(source.text().find_first_not_of(kXmlSpace), source.text().size());
+    // A text that is valid UTF-8 is read as UTF-8, whatever its declaration says.
+    mParser.reset(XML_ParserCreate(isUtf8(source.text()) ? "UTF-8" : nullptr));
+    if (!mParser) throw std::bad_alloc();
+    XML_Parser parser = mParser.get();
+    XML_SetUserData(parser, this);
+    XML_SetElementHandler(parser, begins, ends);
+    XML_SetCharacterDataHandler(parser, comes);
+    // With these two, references to unknown entities come as they are written.
+    XML_SetDefaultHandler(parser, comesAsWritten);
+    XML_UseForeignDTD(parser, XML_TRUE);
+    XML_SetUnknownEncodingHandler(parser, asSingleBytes, nullptr);
+  }
+
+  void run() {
+    constexpr std::size_t kBlock = 65536, kLargestBlock = std::size_t{1} << 30;
+    const std::string_view text = std::string_view(mSource.text()).substr(mStart);
+    XML_Index before = -1;
+    std::size_t block = kBlock;
+    for (std::size_t at = 0; at < text.size() || at == 0;) {
+      const std::size_t size = std::min(block, text.size() - at);
+      const bool last = at + size == text.size();
+      if (XML_Parse(mParser.get(), text.data() + at, static_cast<int>(size), last) != XML_STATUS_OK)
+        throw refusal();
+      if (last) break;
+      at += size;
+      // The parser scans a token from its start again for each block that does not end it. Blocks that grow
+      // keep this from taking a time that grows with the square of the token.
+      const XML_Index now = XML_GetCurrentByteIndex(mParser.get());
+      block = now == before ? std::min(block * 2, kLargestBlock) : kBlock;
+      before = now;
+    }
+    if (mThrown) std::rethrow_exception(mThrown);
+  }
+
+ private:
+  // Nothing may be thrown through the parser, which is written in C. It goes on, because a text that is not
+  // XML is refused for that before anything else.
+  template <typename Visit>
+  void visit(const Visit& call) noexcept {
+    if (mThrown) return;
+    try {
+      call();
+    } catch (...) {
+      mThrown = std::current_exception();
+    }
+  }
+
+  static Walk& of(void* user) { return *static_cast<Walk*>(user); }
+
+  static void begins(void* user, const XML_Char* name, const XML_Char** attributes) {
+    Walk& walk = of(user);
+    ++walk.mDepth;
+    const int given = XML_GetSpecifiedAttributeCount(walk.mParser.get());
+    walk.visit([&] {
+      walk.mVisitor.elementBegins({name, attributes, static_cast<std::size_t>(given) / 2, walk.offset()});
+    });
+  }
+
+  static void ends(void* user, const XML_Char*) {
+    Walk& walk = of(user);
+    --walk.mDepth;
+    walk.visit([&] { walk.mVisitor.elementEnds(); });
+  }
+
+  static void comes(void* user, const XML_Char* characters, int count) {
+    Walk& walk = of(user);
+    const auto size = static_cast<std::size_t>(count);
+    const auto written = static_cast<std::size_t>(XML_GetCurrentByteCount(walk.mParser.get()));
+    // A reference is longer than the character it stands for; an "&" in a CDATA section stands for itself.
+    const bool replaced = walk.mSource.text()[walk.offset()] == '&' && written > size;
+    walk.visit([&] {
+      walk.mVisitor.textComes({walk.offset(), written, std::string_view(characters, size), replaced});
+    });
+  }
+
+  // Gets everything else: comments and the like, which are skipped, and references to unknown entities.
+  static void comesAsWritten(void* user, const XML_Char* characters, int count) {
+    if (count > 0 && characters[0] == '&' && of(user).mDepth > 0) comes(user, characters, count);
+  }
+
+  std::size_t offset() const {
+    const XML_Index index = XML_GetCurrentByteIndex(mParser.get());
+    return mStart + static_cast<std::size_t>(std::max<XML_Index>(index, 0));
+  }
+
+  Refusal refusal() const {
+    const XML_Error error = XML_GetErrorCode(mParser.get());
+    const std::string_view rest = std::string_view(mSource.text()).substr(offset());
+    std::string what = XML_ErrorString(error);
+    if (error == XML_ERROR_NO_MEMORY) throw std::bad_alloc();
+    if (error == XML_ERROR_NO_ELEMENTS) {
+      what = mDepth == 0 ? "No document element found" : "Start-end tags mismatch";
+    } else if (error == XML_ERROR_TAG_MISMATCH) {
+      what = "Start-end tags mismatch";
+    } else if (error == XML_ERROR_JUNK_AFTER_DOC_ELEMENT && rest.starts_with('<')) {
+      what = rest.starts_with("</") ? "Start-end tags mismatch" : "a second root element";
+    } else if (error == XML_ERROR_BAD_CHAR_REF) {
+      what += ": " + std::string(rest.substr(0, rest.find(';') + 1));
+    }
+    return mSource.refusalAt(offset(), "not XML", what);
+  }
+
+  const SourceText& mSource;
+  XmlVisitor& mVisitor;
+  std::size_t mStart = 0;
+  std::unique_ptr<std::remove_pointer_t<XML_Parser>, FreeParser> mParser;
+  int mDepth = 0;
+  std::exception_ptr mThrown;
+};
+
+}  // namespace
+
+std::string trimmed(std::string_view text) {
+  const std::size_t first = text.find_first_not_of(kXmlSpace);
+  if (first == std::string_view::npos) return {};
+  return std::string(text.substr(first, text.find_last_not_of(kXmlSpace) - first + 1));
+}
+
+std::string_view XmlElement::name() const {
+  return withoutPrefix(mName);
+}
+
+std::optional<std::string> XmlElement::attribute(std::string_view name) const {
+  for (std::size_t i = 0; i < mCount; ++i) {
+    if (withoutPrefix(mAttributes[2 * i]) == name) return trimmed(mAttributes[2 * i + 1]);
+  }
+  return std::nullopt;
+}
+
+std::string XmlElement::text(std::string_view attributeName) const {
+  return attribute(attributeName).value_or(std::string());
+}
+
+void walkXml(const SourceText& source, XmlVisitor& visitor) {
+  if (const std::size_t nul = source.text().find('\0'); nul != std::string::npos)
+    throw source.refusalAt(nul, "not XML", "a NUL byte");
+  Walk(source, visitor).run();
+}
+
+}  // namespace QeltDesktop

@@ -1,0 +1,41 @@
+#include "output/Terminal.h"
+
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <utility>
+
+#include "text/Refusal.h"
+
+namespace QeltDesktop {
+
+void finishStandardOutput() {
+  errno = 0;
+  const bool flushed = std::fflush(stdout) == 0 && std::ferror(stdout) == 0;
+  if (flushed) return;
+  const std::string why = errno != 0 ? std::string(": ") + std::strerror(errno) : std::string();
+  throw Refusal("standard output cannot be written" + why);
+}
+
+Progress::Progress(std::string what, std::size_t total)
+    : mWhat(std::move(what)),
+      mTotal(total),
+      mOnTerminal(isatty(STDERR_FILENO) != 0),
+      mNextShow(Clock::now() + std::chrono::milliseconds(300)) {}
+
+Progress::~Progress() {
+  if (mShown) std::fputs("\r\033[K", stderr);
+}
+
+void Progress::step() {
+  ++mDone;
+  if (!mOnTerminal || Clock::now() < mNextShow) return;
+  mNextShow = Clock::now() + std::chrono::milliseconds(100);
+  mShown = true;
+  std::fprintf(stderr, "\r%s %zu of %zu\033[K", mWhat.c_str(), mDone, mTotal);
+  std::fflush(stderr);
+}
+
+}  // namespace QeltDesktop

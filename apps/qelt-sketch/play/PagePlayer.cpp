@@ -1,0 +1,193 @@
+#include "play/PagePlayer.h"
+
+#include <new>
+#include <stdexcept>
+#include <string>
+
+#include "engine/MotionEvent.h"
+#include "pencommon/Pen.h"
+#include "pencommon/PenOutlineDrawableGL.h"
+#include "pencommon/PenPredictionDrawableGL.h"
+#include "pencommon/PenPreviewDrawableGL.h"
+#include "pencommon/PenStrokeDataManager.h"
+#include "pencommon/PenStrokeDrawableGL.h"
+#include "text/Refusal.h"
+
+namespace QeltDesktop {
+namespace {
+
+// What the cached drawings of a page may take together.
+constexpr std::size_t kMostCachedBytes = std::size_t{256} << 20;
+
+// The pen's drawable of one kind, set to draw into the canvas; null when there is no canvas.
+template <typename Drawable>
+Drawable* drawableOn(Qelt::ISPPenCanvas* canvas, Qelt::Pen& pen, Drawable* (Qelt::Pen::*getter)(),
+                     DrawableKind kind) {
+  if (canvas == nullptr) return nullptr;
+  Drawable* const drawable = (pen.*getter)();
+  if (drawable == nullptr) {
+    throw Refusal("the pen has no " + std::string(nameOf(kind)) + " drawable in rendering version " +
+                  std::to_string(pen.getVersion()));
+  }
+  drawable->SetCanvas(canvas);
+  return drawable;
+}
+
+}  // namespace
+
+void QueueWatch::finish() {
+  mQueue.finish();
+  if (GlVertexObject::undrawnBatches() != mUndrawnBefore) throw std::bad_alloc();
+  if (mQueue.droppedTasks() != mDroppedBefore) throw std::runtime_error("a render task failed (see --log)");
+}
+
+PagePlayer::PagePlayer(PenSession& session, const Page& page, const Options& options,
+                       const Canvases& canvases)
+    : mSession(session), mPage(page), mOptions(options) {
+  using Qelt::Pen;
+  Pen& pen = session.pen();
+  mStroke = drawableOn(canvases.stroke, pen, &Pen::GetStrokeDrawableGL, DrawableKind::Stroke);
+  mOutline = drawableOn(canvases.outline, pen, &Pen::GetOutlineDrawableGL, DrawableKind::Outline);
+  mPreview = drawableOn(canvases.preview, pen, &Pen::GetPreviewDrawableGL, DrawableKind::Preview);
+  mPrediction =
+      drawableOn(canvases.prediction, pen, &Pen::GetPredictionStrokeDrawableGL, DrawableKind::Prediction);
+  if (mOutline != nullptr && options.outline) {
+    mOutline->SetOutlineSize(options.outline->size);
+    mOutline->SetOutlineColor(static_cast<int>(options.outline->argb));
+  }
+  if (mPrediction != nullptr) mPrediction->SetOpacity(options.opacity);
+  if (options.mode == Mode::Stroke) {
+    for (std::size_t i = 0; i < page.strokes.size(); ++i) {
+      mStoredStrokes.push_back(storedStroke(page.strokes[i], pointerOf(i)));
+      mCachedBytesOf.push_back(0);
+      Qelt::PenStrokeDataManager::GetInstance()->CreateStrokeData(mStoredStrokes.back()->GetRuntimeHandle());
+    }
+  }
+}
+
+PagePlayer::~PagePlayer() {
+  for (const auto& stroke : mStoredStrokes) {
+    Qelt::PenStrokeDataManager::GetInstance()->DropStrokeData(stroke->GetRuntimeHandle());
+  }
+}
+
+void PagePlayer::play(PlayObserver& observer) {
+  for (int pass = 0; pass < mOptions.repeat; ++pass) {
+    observer.passBegins();
+    for (std::size_t i = 0; i < mPage.strokes.size(); ++i) {
+      try {
+        playStroke(i, observer);
+        observer.strokeEnds();
+      } catch (const std::bad_alloc&) {
+        throw Refusal(mPage.name + ": trace " + std::to_string(i + 1) + ": out of memory while drawing it");
+      }
+    }
+  }
+}
+
+void PagePlayer::playStroke(std::size_t index, PlayObserver& observer) {
+  mSession.setStyle(styleFor(mPage.strokes[index].brush, mSession.ownStyle(), mOptions));
+  if (mOptions.mode == Mode::Stroke) {
+    playStored(index, observer);
+    return;
+  }
+  if (mOptions.mode == Mode::Live) playLive(index, observer);
+  playRecorded(index, observer);
+}
+
+void PagePlayer::playLive(std::size_t index, PlayObserver& observer) {
+  const bool penStaysDown = mOptions.points.has_value() && index + 1 == mPage.strokes.size();
+  feedLive(mPage.strokes[index], pointerOf(index), mOptions.samplesPerMove, penStaysDown,
+           [&](LiveEvent& live) {
+             const Qelt::MotionEvent& event = live.event;
+             const int action = event.GetAction();
+             if (mPrediction != nullptr) observer.predictionEnds();
+             if (mStroke != nullptr) {
+               observer.call({DrawableKind::Stroke, index, "Draw", action},
+                             [&](Qelt::RectF* rect) { return mStroke->Draw(&event, rect); });
+             }
+             if (mPreview != nullptr) {
+               observer.call({DrawableKind::Preview, index, "Draw", action},
+                             [&](Qelt::RectF* rect) { return mPreview->Draw(&event, rect); });
+             }
+             if (mPrediction != nullptr && action == Qelt::kActionMove) predict(index, live.sample, observer);
+           });
+}
+
+void PagePlayer::predict(std::size_t index, std::size_t sample, PlayObserver& observer) {
+  const Samples samples = mPage.strokes[index].samples;
+  const Qelt::MotionEvent event =
+      predictedEvent(samples[sample - 1], samples[sample], pointerOf(index), mOptions.predict);
+  observer.call({DrawableKind::Prediction, index, "Draw", event.GetAction()},
+                [&](Qelt::RectF* rect) { return mPrediction->Draw(&event, rect); });
+}
+
+// The stroke as one recorded event. In live mode that is the outline's alone, as it has no live input.
+void PagePlayer::playRecorded(std::size_t index, PlayObserver& observer) {
+  const bool live = mOptions.mode == Mode::Live;
+  if (live && mOutline == nullptr) return;
+  const Stroke stroke = mPage.strokes[index];
+  const auto play = [&](DrawableKind drawable, const char* operation, const auto& draw) {
+    // The pen corrects the event that it is given, so every drawable gets its own copy.
+    Qelt::MotionEvent event = recordedEvent(stroke, pointerOf(index));
+    observer.call({drawable, index, operation, event.GetAction()},
+                  [&](Qelt::RectF* rect) { return draw(&event, rect); });
+  };
+  using Event = const Qelt::MotionEvent*;
+  if (mOutline != nullptr) {
+    play(DrawableKind::Outline, "DrawOutline",
+         [&](Event event, Qelt::RectF* rect) { return mOutline->DrawOutline(event, rect); });
+  }
+  if (live) return;
+  if (mStroke != nullptr) {
+    play(DrawableKind::Stroke, "RedrawPen",
+         [&](Event event, Qelt::RectF* rect) { return mStroke->RedrawPen(event, rect); });
+  }
+  if (mPreview != nullptr) {
+    play(DrawableKind::Preview, "RedrawPen",
+         [&](Event event, Qelt::RectF* rect) { return mPreview->RedrawPen(event, rect); });
+  }
+}
+
+void PagePlayer::playStored(std::size_t index, PlayObserver& observer) {
+  const Qelt::ObjectStroke* const stroke = mStoredStrokes[index].get();
+  if (mOutline != nullptr) {
+    observer.call({DrawableKind::Outline, index, "DrawOutline", std::nullopt},
+                  [&](Qelt::RectF* rect) { return mOutline->DrawOutline(stroke, rect); });
+  }
+  if (mStroke != nullptr) {
+    observer.call({DrawableKind::Stroke, index, "RedrawPen", std::nullopt}, [&](Qelt::RectF* rect) {
+      const bool drawn = mStroke->RedrawPen(stroke, rect);
+      // Before the observer waits for the render thread, which takes as much memory again.
+      boundCache(index);
+      return drawn;
+    });
+  }
+}
+
+// Drops the stroke's cached drawing when those of the page take too much; each pass then computes it anew.
+void PagePlayer::boundCache(std::size_t index) {
+  const int handle = mStoredStrokes[index]->GetRuntimeHandle();
+  auto* const manager = Qelt::PenStrokeDataManager::GetInstance();
+  Qelt::PenStrokeData* const data = manager->GetStrokeData(handle);
+  if (data == nullptr) return;
+  std::size_t bytes = 0;
+  if (Qelt::PenStrokePointData* const points = data->GetPointData(); points != nullptr) {
+    bytes = points->mBuffer->size() * sizeof(float);
+    points->Unref();
+  }
+  mCachedBytes += bytes - mCachedBytesOf[index];
+  mCachedBytesOf[index] = bytes;
+  if (mCachedBytes > kMostCachedBytes) {
+    data->SetPointData(nullptr);
+    mCachedBytes -= bytes;
+    mCachedBytesOf[index] = 0;
+  }
+  manager->ReleaseStrokeData(handle);
+}
+
+Pointer PagePlayer::pointerOf(std::size_t index) const {
+  return pointerFor(mPage.strokes[index], mOptions.tool, mOptions.source);
+}
+
+}  // namespace QeltDesktop

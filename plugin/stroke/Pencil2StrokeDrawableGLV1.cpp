@@ -1,7 +1,0 @@
-#include "stroke/Pencil2StrokeDrawableGLV1.h"
-
-namespace Qelt {
-
-template class StrokePipeline<StrokeV1>;
-
-}  // namespace Qelt

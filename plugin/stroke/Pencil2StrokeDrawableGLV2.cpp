@@ -1,7 +1,0 @@
-#include "stroke/Pencil2StrokeDrawableGLV2.h"
-
-namespace Qelt {
-
-template class StrokePipeline<StrokeV2>;
-
-}  // namespace Qelt

@@ -1,7 +1,0 @@
-#include "stroke/Pencil2StrokeDrawableGLV3.h"
-
-namespace Qelt {
-
-template class StrokePipeline<StrokeV3>;
-
-}  // namespace Qelt

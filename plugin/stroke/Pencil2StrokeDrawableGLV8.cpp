@@ -1,7 +1,0 @@
-#include "stroke/Pencil2StrokeDrawableGLV8.h"
-
-namespace Qelt {
-
-template class StrokePipeline<StrokeV8>;
-
-}  // namespace Qelt

@@ -1,0 +1,125 @@
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cmath>
+#include <cstdint>
+#include <functional>
+#include <new>
+#include <stdexcept>
+
+#include "desktop/engine/PluginLibrary.h"
+#include "desktop/gl/CallTask.h"
+#include "desktop/gl/RenderQueue.h"
+#include "desktop/pencommon/BatchObserver.h"
+#include "ink/Ink.h"
+#include "output/OutputFile.h"
+#include "output/Terminal.h"
+#include "play/CallRecorder.h"
+#include "play/Options.h"
+#include "play/PageDrawing.h"
+#include "play/PageLayout.h"
+#include "play/StrokeFeeder.h"
+#include "support/LogCapture.h"
+
+namespace QeltDesktop {
+namespace {
+
+// The size of the picture, and where it has a point of the page.
+void expectLayout(const PageLayout& layout, double width, double height, float x, float y, float toX,
+                  float toY) {
+  const Qelt::Matrix3<float>& m = layout.matrix;
+  EXPECT_NEAR(layout.width, width, 1e-3);
+  EXPECT_NEAR(layout.height, height, 1e-3);
+  EXPECT_NEAR(m[0] * x + m[3] * y + m[6], toX, 1e-3f);
+  EXPECT_NEAR(m[1] * x + m[4] * y + m[7], toY, 1e-3f);
+}
+
+TEST(PageLayout, PutsTheExtentInsideItsMargin) {
+  Page page;
+  page.strokes.add({{.x = 10.0f, .y = -5.0f}, {.x = 30.0f, .y = 15.0f}});
+  page.strokes.add({{.x = 50.0f, .y = 0.0f}});
+  const float margin = pageMargin(6.0f, 2.0f);
+  EXPECT_EQ(margin, 30.0f);  // 16 + 2 * 6 + 2
+  EXPECT_EQ(pageMargin(NAN, -1.0f), 16.0f);
+  EXPECT_EQ(pageMargin(1e30f, 0.0f), 512.0f);
+  // (40 + 60) * 2 and (20 + 60) * 2
+  expectLayout(layOut(pageArea(page, {}, margin), 2.0f, 0.0f), 200, 160, 10, -5, 60, 60);
+  expectLayout(layOut(pageArea(page, PageSize{300, 200}, margin), 1.0f, 0.0f), 300, 200, 0, 0, 0, 0);
+}
+
+TEST(PageLayout, TurnsClockwiseAboutTheCentreAndGrows) {
+  const PageArea area{100.0f, 200.0f, 40.0f, 20.0f};
+  const PageLayout quarter = layOut(area, 1.0f, 90.0f), eighth = layOut(area, 2.0f, 45.0f);
+  expectLayout(quarter, 20, 40, 100, 200, 20, 0);  // the top left corner goes to the top right
+  expectLayout(quarter, 20, 40, 140, 220, 0, 40);
+  const double side = 84.853;  // (40 + 20) * 2 / sqrt(2)
+  expectLayout(eighth, side, side, 120, 210, 42.426f, 42.426f);
+  expectLayout(eighth, side, side, 100, 200, 28.284f, 0.0f);  // 20 * sqrt(2), at the very top
+}
+
+// Draws a zigzag of 200 far points, 40 MB of vertices in all, in a queue that runs nothing by itself.
+void drawZigzag() {
+  Page page;
+  for (int i = 0; i < 200; ++i) {
+    page.strokes.addSample({.x = i % 2 == 0 ? 0.0f : 600.0f, .y = static_cast<float>(i), .time = 4.0 * i});
+  }
+  page.strokes.finishStroke(kNoNumber, {});
+  const PluginLibrary plugin(QELT_PLUGIN_PATH);
+  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
+  Progress progress("drawing stroke", 1);
+  drawPage(plugin, queue, page, Options(), layOut({0, 0, 32, 32}, 1, 0), {.stroke = true}, progress);
+}
+
+TEST(PageDrawing, IsOnlySoFarAheadOfTheRenderThread) {
+  const std::uint64_t before = writtenBytes();
+  std::uint64_t drawn = 0, mostWaiting = 0;
+  setBatchObserver([&](const Batch& batch) {
+    mostWaiting = std::max(mostWaiting, writtenBytes() - before - drawn);
+    drawn += batch.buffers[0].size() * sizeof(float);
+  });
+  drawZigzag();
+  setBatchObserver({});
+  EXPECT_EQ(writtenBytes() - before, drawn);
+  EXPECT_GT(drawn, 32'000'000u);
+  EXPECT_LT(mostWaiting, 20'000'000u);
+}
+
+TEST(PageDrawing, OfWhichSomethingWasLostIsNoPicture) {
+  const QeltTests::LogCapture log;
+  setBatchObserver([](const Batch&) { throw std::runtime_error("lost"); });
+  EXPECT_THROW(drawZigzag(), std::runtime_error);
+  setBatchObserver({});
+}
+
+TEST(CallRecorder, LeavesNoCallWithoutItsBatches) {
+  const QeltTests::LogCapture log;
+  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
+  OutputFile file("/dev/null");
+  Progress progress("tracing stroke", 1);
+  CallRecorder recorder(queue, file, progress, DrawableKind::Stroke, 8);
+  const auto call = [&](const std::function<void()>& task) {
+    recorder.call({DrawableKind::Stroke, 0, "Draw", {}}, [&](Qelt::RectF*) { return postCall(queue, task); });
+  };
+  EXPECT_NO_THROW(call([] {}));
+  EXPECT_THROW(call([] { throw std::bad_alloc(); }), std::runtime_error);
+}
+
+// No stamp depends on these.
+TEST(StrokeFeeder, NamesToolsSourcesAndTimes) {
+  Page page;
+  page.strokes.add({{.time = -1e300}, {.time = 4.6}, {.time = 1e300}}, {}, 1);
+  const Stroke stroke = page.strokes[0];
+  EXPECT_EQ(pointerFor(stroke, {}, {}).tool, 1);
+  EXPECT_EQ(pointerFor(stroke, {}, {}).source, 4098);
+  EXPECT_EQ(pointerFor(stroke, 2, {}).source, 16386);
+  EXPECT_EQ(pointerFor(stroke, 3, {}).source, 8194);
+  EXPECT_EQ(pointerFor(stroke, 3, 99).source, 99);
+  const Qelt::MotionEvent event = recordedEvent(stroke, {1, 77});
+  // Times that no clock shows stay as far away as they can.
+  EXPECT_LT(event.GetDownTime(), -1'000'000'000);
+  EXPECT_EQ(storedStroke(stroke, {1, 77})->GetTimeStamp()[1], 5);
+  EXPECT_GT(event.GetEventTime(), 1'000'000'000);
+}
+
+}  // namespace
+}  // namespace QeltDesktop
