@@ -14,8 +14,8 @@ namespace QeltTests {
 
 namespace {
 
-bool recordsGolden() {
-  return std::getenv("QELT_RECORD_GOLDEN") != nullptr;
+bool isSet(const char* variable) {
+  return std::getenv(variable) != nullptr;
 }
 
 std::string goldenPath(const std::string& file) {
@@ -73,6 +73,27 @@ void writePgm(const std::string& path, const GreyPicture& picture) {
              static_cast<std::streamsize>(picture.pixels.size()));
 }
 
+// A line of renderers.txt up to the renderer's name: which picture, and a checksum of its pixels (FNV-1a).
+std::string approvalOf(const GreyPicture& picture, const std::string& file) {
+  std::uint64_t sum = 0xcbf29ce484222325u;
+  for (const std::uint8_t pixel : picture.pixels) sum = (sum ^ pixel) * 0x100000001b3u;
+  return (std::ostringstream() << file << " " << std::hex << sum << " ").str();
+}
+
+void approve(const GreyPicture& picture, const std::string& file) {
+  std::ofstream(goldenPath("renderers.txt"), std::ios::app)
+      << approvalOf(picture, file) << picture.renderer << "\n";
+}
+
+// On a renderer whose picture was approved, that picture and no other.
+void expectApproved(const GreyPicture& picture, const std::string& file) {
+  std::ifstream in(goldenPath("renderers.txt"));
+  for (std::string name, sum, renderer; in >> name >> sum >> std::ws && std::getline(in, renderer);) {
+    if (name == file && renderer == picture.renderer)
+      EXPECT_EQ(approvalOf(picture, file), name + " " + sum + " ") << "on " << renderer;
+  }
+}
+
 // How far two pictures of one size are apart.
 struct Difference {
   double mean = 0.0;    // mean absolute difference over the pixels with ink in either, of 255
@@ -108,7 +129,7 @@ std::string traceLine(const char* word, const std::vector<float>& numbers) {
 }
 
 void expectGoldenTrace(const Trace& trace, const std::string& file) {
-  if (recordsGolden()) {
+  if (isSet("QELT_RECORD_GOLDEN")) {
     std::ofstream out(goldenPath(file));
     for (const std::string& line : trace) out << line << "\n";
     return;
@@ -127,10 +148,12 @@ void expectGoldenTrace(const Trace& trace, const std::string& file) {
 }
 
 void expectGoldenPicture(const GreyPicture& picture, const std::string& file) {
-  if (recordsGolden()) {
+  if (isSet("QELT_RECORD_GOLDEN")) {
     writePgm(goldenPath(file), picture);
+    approve(picture, file);
     return;
   }
+  if (isSet("QELT_APPROVE_RENDERER")) approve(picture, file);
   const GreyPicture golden = readPgm(goldenPath(file));
   ASSERT_EQ(picture.width, golden.width) << file;
   ASSERT_EQ(picture.height, golden.height) << file;
@@ -142,6 +165,7 @@ void expectGoldenPicture(const GreyPicture& picture, const std::string& file) {
   EXPECT_LE(difference.mean, 4.0) << file;
   EXPECT_LE(difference.ink, 0.02) << file;
   EXPECT_LE(difference.farOff, 0.01) << file;
+  expectApproved(picture, file);
   if (testing::Test::HasFailure()) {
     const std::string drawn = testing::TempDir() + file;
     writePgm(drawn, picture);

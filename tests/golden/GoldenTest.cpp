@@ -12,6 +12,7 @@
 #include <locale>
 #include <map>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "golden/Golden.h"
@@ -35,7 +36,7 @@ std::string areaLine(const Qelt::RectF& rect) {
 // Ink on paper: what a board's layer holds.
 GreyPicture pictureOf(Board& board) {
   board.queue.finish();
-  GreyPicture picture{board.options.width, board.options.height, {}};
+  GreyPicture picture{board.options.width, board.options.height, {}, board.queue.rendererName()};
   const std::vector<std::uint8_t> pixels = board.pixels();
   for (std::size_t i = 3; i < pixels.size(); i += 4)
     picture.pixels.push_back(static_cast<std::uint8_t>(255 - pixels[i]));
@@ -260,6 +261,39 @@ TEST(PredictionGolden, PictureIsThatOfTheRelease) {
   leaveStroke(board.shared);
   board.move(kAhead);
   expectGoldenPicture(pictureOf(board), "prediction-picture.pgm");
+}
+
+// The grain is fixed to where a stroke begins: here below the first row of tiles, and to the right of the
+// first column, under a view that is zoomed and moved. One picture under the other, of each kind of grain.
+TEST(GrainGolden, PictureBelowTheFirstTilesIsThatOfTheRelease) {
+  std::vector<Sample> shading;
+  for (int i = 0; i <= 11; ++i) {
+    const auto t = static_cast<float>(i);
+    shading.push_back({46.37f + 2.9f * t, i % 2 == 0 ? 51.13f : 72.59f, 0.5f, 0.9f, -0.6f});
+  }
+  GreyPicture all;
+  const auto draw = [&](auto&& board, const auto& stroke) {
+    board.canvas.setMatrix(viewOf(1.5f, 32.0f, 22.0f));
+    stroke(board);
+    const GreyPicture picture = pictureOf(board);
+    all.pixels.insert(all.pixels.end(), picture.pixels.begin() + 80 * picture.width, picture.pixels.end());
+    all = {picture.width, all.height + picture.height - 80, std::move(all.pixels), picture.renderer};
+  };
+  const BoardOptions options{.size = 7.0f, .color = 0x50203040u, .width = 160, .height = 144, .tile = 64};
+  const auto draws = [&](auto& board) { board.stroke(shading); };
+  for (const int version : {1, 7, 8}) {
+    BoardOptions ofVersion = options;
+    ofVersion.version = version;
+    draw(DrawingBoard(ofVersion), draws);
+  }
+  draw(PreviewBoard(options), draws);
+  draw(PredictionBoard(options), [&](auto& board) {
+    leaveStroke(board.shared);
+    board.shared.mStartX = board.shared.mLastStampX = board.shared.mLastX = shading[0].x;
+    board.shared.mStartY = board.shared.mLastStampY = board.shared.mLastY = shading[0].y;
+    board.move(shading);
+  });
+  expectGoldenPicture(all, "grain-picture.pgm");
 }
 
 // --- All stamps, on threads that a host has set up in its own way ---
