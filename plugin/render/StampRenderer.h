@@ -152,7 +152,7 @@ class StampRenderer : public HostBase {
     if (mState == State::Released) return;
     const State reached = prepare();
     ManagedObject::Register(this);
-    mState = reached;
+    if (reached == State::Prepared) mState = reached;
   }
 
   void Release() final {
@@ -193,7 +193,7 @@ class StampRenderer : public HostBase {
   void Draw(ISPSubBitmap* tile, Matrix4<float>& matrix) final {
     const std::vector<float>* batch = currentBatch();
     if (tile == nullptr || batch == nullptr || batch->empty()) return;
-    if (mState != State::Prepared) return;
+    if (mGraphicsObject == nullptr || !canShade() || !mHasTextures) return;
 
     tile->BeginRender(0);
     const ScopeExit endRender([tile] { tile->EndRender(0); });
@@ -254,9 +254,12 @@ class StampRenderer : public HostBase {
     }
     mTextures.buildTextures(queueOf(this->mDataManager), kProfile.className);
     const bool filled = mTextures.setTextures(kProfile.points);
-    const bool complete = filled && mGraphicsObject != nullptr && mShader != nullptr && mShader->isLinked();
-    return complete ? State::Prepared : State::Incomplete;
+    mHasTextures = mHasTextures || filled;
+    return filled && mGraphicsObject != nullptr && canShade() ? State::Prepared : State::Incomplete;
   }
+
+  // Another drawable may have linked the shader that all share.
+  bool canShade() const { return mShader != nullptr && mShader->isLinked(); }
 
   const std::vector<float>* currentBatch() const {
     if constexpr (kProfile.hasCacheBuffer) {
@@ -273,6 +276,7 @@ class StampRenderer : public HostBase {
   GraphicsObject* mGraphicsObject = nullptr;
   typename Version::Shader* mShader = nullptr;
   PatternTextures mTextures;
+  bool mHasTextures = false;  // they were filled once
   State mState = State::Incomplete;
   GrainOrigin mGrainOrigin;
   Vector2<float> mInverseScale{1.0f, 1.0f};

@@ -58,7 +58,7 @@ class PencilShader : public Uniforms {
   // Makes the program and binds its uniforms, in place of those there were. Throws as the constructor does.
   void link() {
     mLinked = false;
-    mProgram.reset();
+    giveBack(mProgram);
     mProgram.reset(GraphicsFactory::createOpenGLShaderProgram(Shader::szVertexShader,
                                                               Shader::szFragmentShader, nullptr));
     mLinked = mProgram != nullptr && Uniforms::bind(mProgram.get());

@@ -74,6 +74,8 @@ class QELT_HOST_API GlDevice {
   // Makes a program the current one, without asking GL when it is so already.
   void useProgram(GLuint program);
   void forgetProgram(GLuint program);
+  // Whether a program is current; without one GL draws nothing of use.
+  bool hasProgram() const { return mProgram != 0; }
   // The longest sides that a texture may have, and that can be drawn into at once.
   int maxTextureSize() const { return mMaxTextureSize; }
   int maxViewportSize() const { return mMaxViewportSize; }

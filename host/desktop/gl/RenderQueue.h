@@ -42,6 +42,10 @@ class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
   RenderQueue(const RenderQueue&) = delete;
   RenderQueue& operator=(const RenderQueue&) = delete;
 
+  // The queue itself where it is a render queue that has not been destroyed; else null. `queue` is compared
+  // and never looked into.
+  static RenderQueue* ifAlive(const Qelt::IGLMsgQueue* queue);
+
   bool Post(Qelt::ITask* task) override;
 
   // Waits until everything posted so far has run, and for nothing that is posted later. It cannot wait inside
@@ -116,6 +120,19 @@ class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
   std::unique_ptr<GlDevice> mDevice;  // used by the runner alone
   std::string mRendererName;
   std::thread mThread;
+
+  // Has the queue among those that `ifAlive` knows.
+  class Registration {
+   public:
+    explicit Registration(RenderQueue* queue);
+    ~Registration();
+    Registration(const Registration&) = delete;
+    Registration& operator=(const Registration&) = delete;
+
+   private:
+    RenderQueue* mQueue;
+  };
+  const Registration mRegistration{this};
 };
 
 }  // namespace QeltDesktop

@@ -58,6 +58,8 @@ class QELT_HOST_API Presenter {
   using Binding = std::unique_ptr<Qelt::IParameterBinding, Release>;
 
   void make();
+  void bindAll();
+  void release();
   void draw(std::span<const ShownLayer> layers, const std::optional<std::array<std::uint8_t, 3>>& paper,
             int width, int height);
 
