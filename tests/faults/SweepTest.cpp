@@ -4,6 +4,7 @@
 
 #include <gtest/gtest.h>
 
+#include <cmath>
 #include <functional>
 #include <limits>
 #include <map>
@@ -374,11 +375,10 @@ using Change = std::function<void(PenBoard&, Qelt::PenDrawableGL&)>;
 
 std::vector<std::pair<const char*, Change>> changes() {
   using Limits = std::numeric_limits<float>;
-  constexpr float kNaN = Limits::quiet_NaN();
   std::vector<std::pair<const char*, Change>> all;
-  for (const float size : {0.0f, -3.0f, kNaN, Limits::infinity(), -Limits::infinity(), 1e30f, 40.0f})
+  for (const float size : {0.0f, -3.0f, NAN, Limits::infinity(), -Limits::infinity(), 1e30f, 40.0f})
     all.emplace_back("size", [size](PenBoard& board, auto&) { board.pen->SetSize(size); });
-  for (const float size : {-3.0f, kNaN, Limits::infinity()}) {
+  for (const float size : {-3.0f, NAN, Limits::infinity()}) {
     all.emplace_back("outline size or opacity", [size](PenBoard&, Qelt::PenDrawableGL& drawable) {
       if (auto* const outline = dynamic_cast<Qelt::PenOutlineDrawableGL*>(&drawable))
         outline->SetOutlineSize(size);
@@ -386,7 +386,7 @@ std::vector<std::pair<const char*, Change>> changes() {
         ahead->SetOpacity(size);
     });
   }
-  for (const float size : {0.0f, kNaN}) {
+  for (const float size : {0.0f, NAN}) {
     all.emplace_back("fixed width", [size](PenBoard& board, auto&) {
       board.pen->GetMorphable()->SetFixedWidthEnabled(true);
       board.pen->GetMorphable()->SetFixedWidth(size);

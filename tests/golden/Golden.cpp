@@ -89,8 +89,9 @@ void approve(const GreyPicture& picture, const std::string& file) {
 void expectApproved(const GreyPicture& picture, const std::string& file) {
   std::ifstream in(goldenPath("renderers.txt"));
   for (std::string name, sum, renderer; in >> name >> sum >> std::ws && std::getline(in, renderer);) {
-    if (name == file && renderer == picture.renderer)
+    if (name == file && renderer == picture.renderer) {
       EXPECT_EQ(approvalOf(picture, file), name + " " + sum + " ") << "on " << renderer;
+    }
   }
 }
 

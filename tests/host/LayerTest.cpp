@@ -136,23 +136,23 @@ INSTANTIATE_TEST_SUITE_P(Modes, Layer, testing::Values(RenderQueue::Mode::Thread
                          });
 
 TEST_P(Layer, WindowCoordinatesRunOnAcrossTilesAndTheFirstRowIsTheTop) {
-  constexpr int kWidth = 150, kHeight = 90;
-  CanvasLayer layer(queue, kWidth, kHeight, 64);
+  constexpr int kColumns = 150, kRows = 90;
+  CanvasLayer layer(queue, kColumns, kRows, 64);
   queue.run([&] {
     Painter painter(kWindowShader);
     // Over every border between tiles, one pixel short of the page's edges.
-    painter.setQuad(1, 1, kWidth - 1, kHeight - 1);
+    painter.setQuad(1, 1, kColumns - 1, kRows - 1);
     painter.draw(*layer.GetBitmap());
   });
   EXPECT_EQ(layer.GetBitmap()->GetTileCount(), 6);
   EXPECT_EQ(layer.GetBitmap()->GetSubBitmap(6), nullptr);
   EXPECT_EQ(layer.GetBitmap()->GetSubBitmap(-1), nullptr);
   const std::vector<std::uint8_t> pixels = layer.readPixels();
-  ASSERT_EQ(pixels.size(), static_cast<std::size_t>(kWidth * kHeight * 4));
-  for (int y = 0; y < kHeight; ++y) {
-    for (int x = 0; x < kWidth; ++x) {
-      const std::uint8_t* const pixel = pixelAt(pixels, kWidth, x, y);
-      const bool inside = x > 0 && y > 0 && x < kWidth - 1 && y < kHeight - 1;
+  ASSERT_EQ(pixels.size(), static_cast<std::size_t>(kColumns * kRows * 4));
+  for (int y = 0; y < kRows; ++y) {
+    for (int x = 0; x < kColumns; ++x) {
+      const std::uint8_t* const pixel = pixelAt(pixels, kColumns, x, y);
+      const bool inside = x > 0 && y > 0 && x < kColumns - 1 && y < kRows - 1;
       ASSERT_EQ(pixel[3], inside ? 255 : 0) << x << ", " << y;
       ASSERT_EQ(pixel[0], inside ? x : 0) << x << ", " << y;
       ASSERT_EQ(pixel[1], inside ? y : 0) << x << ", " << y;

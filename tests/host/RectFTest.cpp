@@ -2,14 +2,11 @@
 
 #include <gtest/gtest.h>
 
-#include <limits>
+#include <cmath>
 
 namespace {
 
 using Qelt::RectF;
-
-constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
-constexpr float kInfinity = std::numeric_limits<float>::infinity();
 
 void expectEdges(const RectF& rect, float left, float top, float right, float bottom) {
   EXPECT_EQ(rect.left, left);
@@ -28,14 +25,14 @@ TEST(RectF, GrowsByRectanglesWithoutAreaToo) {
 
 TEST(RectF, IgnoresWhatIsNotANumberEdgeByEdge) {
   RectF rect{1, 2, 3, 4};
-  rect.MakeRect(kNaN, 9);
+  rect.MakeRect(NAN, 9);
   expectEdges(rect, 1, 2, 3, 9);
-  rect.Union(RectF{kNaN, -1, kNaN, kNaN});
+  rect.Union(RectF{NAN, -1, NAN, NAN});
   expectEdges(rect, 1, -1, 3, 9);
   rect.MakeRect(nullptr);
   expectEdges(rect, 1, -1, 3, 9);
 
-  RectF broken{kNaN, kNaN, kNaN, kNaN};
+  RectF broken{NAN, NAN, NAN, NAN};
   broken.MakeRect(5, 6);
   expectEdges(broken, 5, 6, 5, 6);
 }
@@ -44,9 +41,9 @@ TEST(RectF, RoundsOutwardsAndSurvivesInfinity) {
   RectF rect{-0.25f, 1.0f, 1.25f, -1.5f};
   rect.ExtendRect();
   expectEdges(rect, -1, 1, 2, -1);
-  rect = RectF{-kInfinity, kNaN, kInfinity, 1e30f};
+  rect = RectF{-INFINITY, NAN, INFINITY, 1e30f};
   rect.ExtendRect();
-  EXPECT_EQ(rect.left, -kInfinity);
+  EXPECT_EQ(rect.left, -INFINITY);
   EXPECT_NE(rect.top, rect.top);
   EXPECT_EQ(rect.bottom, 1e30f);
 }
@@ -56,7 +53,7 @@ TEST(RectF, TouchingRectanglesIntersect) {
   EXPECT_TRUE((RectF{500, 500, 512, 512}.IsIntersect(tile)));
   EXPECT_FALSE((RectF{500, 500, 511.99f, 512}.IsIntersect(tile)));
   EXPECT_TRUE((RectF{600, 100, 600, 100}.IsIntersect(tile)));
-  EXPECT_FALSE((RectF{kNaN, 0, 1000, 100}.IsIntersect(tile)));
+  EXPECT_FALSE((RectF{NAN, 0, 1000, 100}.IsIntersect(tile)));
 }
 
 }  // namespace

@@ -16,9 +16,6 @@ namespace {
 using Qelt::SmPath;
 using Qelt::SmPoint;
 
-constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
-constexpr float kInfinity = std::numeric_limits<float>::infinity();
-
 struct Quad {
   float x0, y0, cx, cy, x1, y1;
 };
@@ -197,9 +194,9 @@ TEST(SmPath, DistancesOutsideAreRefusedAndRoundingIsForgiven) {
   EXPECT_FALSE(path.getPosTan(0.0f, &at, nullptr));  // nothing measured yet
   build(path, {0, 0, 3, 1, 7, 0});
   const float length = path.getLength();
-  EXPECT_TRUE(path.getPosTan(std::nextafter(std::nextafter(length, kInfinity), kInfinity), &at, nullptr));
+  EXPECT_TRUE(path.getPosTan(std::nextafter(std::nextafter(length, INFINITY), INFINITY), &at, nullptr));
   EXPECT_NEAR(at.x, 7.0f, 1e-5f);
-  for (const float outside : {length * 1.0001f, -1e-3f, kNaN, kInfinity, -kInfinity}) {
+  for (const float outside : {length * 1.0001f, -1e-3f, NAN, INFINITY, -INFINITY}) {
     EXPECT_FALSE(path.getPosTan(outside, &at, nullptr)) << outside;
   }
   path.rewind();
@@ -227,7 +224,7 @@ TEST(SmPath, APathWithoutLengthHasOnePosition) {
 }
 
 TEST(SmPath, CoordinatesThatAreNoNumbersAreNoWay) {
-  for (const float bad : {kNaN, kInfinity, -kInfinity}) {
+  for (const float bad : {NAN, INFINITY, -INFINITY}) {
     for (int place = 0; place < 6; ++place) {
       float values[6] = {0, 0, 5, 5, 10, 0};
       values[place] = bad;

@@ -1,6 +1,6 @@
 #include <gtest/gtest.h>
 
-#include <limits>
+#include <cmath>
 #include <vector>
 
 #include "base/RefCount.h"
@@ -71,8 +71,7 @@ TEST_F(StrokeDataManager, PointsRecordTheScaleOfTheViewThatTheyWereStoredIn) {
   canvas.setMatrix(Qelt::Matrix3<float>());
   EXPECT_TRUE(points->hasSameInverseScale({0.25f, 0.5f}));
   // Of a view that squeezes everything into a point.
-  constexpr float kInfinity = std::numeric_limits<float>::infinity();
-  EXPECT_FALSE(points->hasSameInverseScale({kInfinity, kInfinity}));
+  EXPECT_FALSE(points->hasSameInverseScale({INFINITY, INFINITY}));
   points->Unref();
 }
 

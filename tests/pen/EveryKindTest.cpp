@@ -35,11 +35,6 @@ std::vector<Sample> wave() {
   return samples;
 }
 
-struct Drawing {
-  Kind kind;
-  int version;
-};
-
 class EveryKind : public testing::TestWithParam<Drawing> {
  protected:
   const Kind kind = GetParam().kind;

@@ -3,8 +3,8 @@
 
 #include <gmock/gmock.h>
 
+#include <cmath>
 #include <functional>
-#include <limits>
 #include <string>
 #include <utility>
 #include <vector>
@@ -23,9 +23,7 @@ using QeltDesktop::StoredStroke;
 using testing::Each;
 using testing::IsEmpty;
 
-constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
-constexpr float kInfinity = std::numeric_limits<float>::infinity();
-constexpr float kNoSizes[] = {0.0f, -3.0f, kNaN, kInfinity, -kInfinity};
+constexpr float kNoSizes[] = {0.0f, -3.0f, NAN, INFINITY, -INFINITY};
 
 // Moves that no size drops.
 const std::vector<Sample> kStroke = {{10.0f, 10.0f, 0.3f},
@@ -33,11 +31,6 @@ const std::vector<Sample> kStroke = {{10.0f, 10.0f, 0.3f},
                                      {26.0f, 11.5f, 0.9f, 0.77f, 0.4f},
                                      {30.0f, 19.0f, 0.4f, 0.2f, 0.1f},
                                      {41.0f, 24.0f, 0.6f}};
-
-struct Drawing {
-  Kind kind;
-  int version;
-};
 
 std::vector<Drawing> drawings() {
   std::vector<Drawing> all{{Kind::Preview, newestVersion()}};
@@ -149,7 +142,7 @@ TEST_P(Refusals, OfStrokesWithoutPointsHandEmptyBatchesOver) {
   for (const bool curve : {true, false}) {
     SCOPED_TRACE(curve ? "curve" : "straight");
     PenBoard board(page(curve));
-    const std::vector<Sample> nowhere = {{kNaN, 1.0f}, {1.0f, kNaN}};
+    const std::vector<Sample> nowhere = {{NAN, 1.0f}, {1.0f, NAN}};
     const MotionEvent events[] = {motionEvent(Qelt::kActionUp, {{1.0f, 1.0f}}), board.recorded(nowhere)};
     const StoredStroke none(Qelt::kToolStylus);
     const auto unplaced = board.stored(nowhere);
@@ -176,16 +169,16 @@ TEST_P(Refusals, OfStrokesWithoutPointsHandEmptyBatchesOver) {
 
 TEST_P(Refusals, OfPointsThatAreNotFiniteAreAsIfTheyHadNotBeen) {
   std::vector<Sample> broken = kStroke;
-  broken.insert(broken.begin() + 2, {kNaN, 3.0f, 0.9f, 0.5f, 1.0f});
-  broken.insert(broken.end() - 1, {3.0f, -kInfinity, 0.9f, 0.5f, 1.0f});
-  broken.insert(broken.end() - 1, {-kInfinity, kNaN});
+  broken.insert(broken.begin() + 2, {NAN, 3.0f, 0.9f, 0.5f, 1.0f});
+  broken.insert(broken.end() - 1, {3.0f, -INFINITY, 0.9f, 0.5f, 1.0f});
+  broken.insert(broken.end() - 1, {-INFINITY, NAN});
   for (const bool curve : {true, false}) {
     EXPECT_EQ(drawn(broken, curve), drawn(kStroke, curve)) << (curve ? "curve" : "straight");
   }
   PenBoard board(page());
   const auto whole = [&](std::vector<Sample> samples, bool brokenFirst, bool brokenLast) {
-    if (brokenFirst) samples.insert(samples.begin(), {kNaN, 1.0f, 0.9f, 0.5f, 1.0f});
-    if (brokenLast) samples.push_back({kNaN, kNaN});
+    if (brokenFirst) samples.insert(samples.begin(), {NAN, 1.0f, 0.9f, 0.5f, 1.0f});
+    if (brokenLast) samples.push_back({NAN, NAN});
     const MotionEvent event = board.recorded(samples);
     const auto stroke = board.stored(samples);
     const auto [drawable, all] = ways(board, event, *stroke);
@@ -205,12 +198,12 @@ TEST_P(Refusals, OfPointsThatAreNotFiniteAreAsIfTheyHadNotBeen) {
     EXPECT_LT(whole(kStroke, false, true).size(), clean.size());
   }
   if (kind == Kind::Live) {
-    EXPECT_FALSE(board.down({kNaN, 10.0f}));
+    EXPECT_FALSE(board.down({NAN, 10.0f}));
     EXPECT_FALSE(board.move({kStroke[1]}));  // nothing has begun
     board.down(kStroke[0]);
     board.move({kStroke[2]});
     board.takeFloats();
-    EXPECT_TRUE(board.up({kNaN, kNaN}));
+    EXPECT_TRUE(board.up({NAN, NAN}));
     EXPECT_THAT(board.takeFloats(), IsEmpty());
     EXPECT_TRUE(board.rect.left <= board.rect.right);
   }
@@ -220,8 +213,8 @@ TEST_P(Refusals, OfPressureAndAnglesThatAreNotFiniteTakeTheVersionsOwn) {
   std::vector<Sample> broken = kStroke, plain = kStroke;
   for (std::size_t i = 0; i < kStroke.size(); ++i) {
     plain[i] = {kStroke[i].x, kStroke[i].y, kind != Kind::Preview && version == 8 ? 0.6f : 0.5f};
-    broken[i] = {kStroke[i].x, kStroke[i].y, kNaN, i % 2 == 0 ? kInfinity : kNaN,
-                 i % 2 == 0 ? kNaN : -kInfinity};
+    broken[i] = {kStroke[i].x, kStroke[i].y, NAN, i % 2 == 0 ? INFINITY : NAN,
+                 i % 2 == 0 ? NAN : -INFINITY};
   }
   EXPECT_EQ(drawn(broken), drawn(plain));
 }
@@ -257,7 +250,7 @@ TEST_P(Refusals, BegunAtNoSizeTakesTheFirstThatIsOne) {
   for (const float size : kNoSizes) {
     EXPECT_EQ(begunAt(size, 0), begunAt(6.0f, 0)) << size;
     // A fifth of infinity is a minimum move that nothing reaches.
-    if (size != kInfinity) {
+    if (size != INFINITY) {
       EXPECT_EQ(begunAt(size, 4), begunAt(6.0f, 4)) << size;
     }
   }

@@ -1,7 +1,7 @@
 #include <gmock/gmock.h>
 
+#include <cmath>
 #include <cstddef>
-#include <limits>
 #include <memory>
 #include <string>
 #include <utility>
@@ -28,11 +28,8 @@ using testing::SizeIs;
 
 using PredictionBoard = DrawableBoard<Pencil2PredictionDrawableGL>;
 
-constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
-constexpr float kInfinity = std::numeric_limits<float>::infinity();
-
-// What a live stroke along the x axis might have left.
-void leaveStroke(Qelt::Pencil2Data& shared) {
+// What a live stroke might have left.
+void leaveStrokeAlongX(Qelt::Pencil2Data& shared) {
   shared.mStartX = 3.3f;
   shared.mStartY = 2.7f;
   shared.mLastStampX = 10.0f;
@@ -49,7 +46,7 @@ void leaveStroke(Qelt::Pencil2Data& shared) {
 
 TEST(Prediction, GoesOnFromTheLastStampWithItsLooks) {
   PredictionBoard board;
-  leaveStroke(board.shared);
+  leaveStrokeAlongX(board.shared);
   EXPECT_TRUE(board.move({{30.5f, 0.0f, 0.1f, 0.7f, 2.0f}}));  // only the position counts
   const std::vector<Stamp> placed = board.takeStamps();
   ASSERT_THAT(placed, SizeIs(20));  // from 10 to 30.5, one a unit
@@ -73,24 +70,24 @@ TEST(Prediction, EveryStateOfTheLiveStrokeIsPredictedFromOnce) {
   PredictionBoard board;
   EXPECT_FALSE(board.move({{30.0f, 0.0f}}));  // no stroke yet
   EXPECT_THAT(board.takePosts(), IsEmpty());
-  leaveStroke(board.shared);
+  leaveStrokeAlongX(board.shared);
   EXPECT_TRUE(board.move({{30.0f, 0.0f}}));
   const std::vector<float> once = board.takeFloats();
   EXPECT_FALSE(board.shared.mHasLastStroke);
   EXPECT_FALSE(board.move({{30.0f, 0.0f}}));
   EXPECT_THAT(board.takeBatches(), IsEmpty());
   // Any other event uses the state up and draws nothing.
-  leaveStroke(board.shared);
+  leaveStrokeAlongX(board.shared);
   board.takePosts();
   EXPECT_FALSE(board.up({30.0f, 0.0f}));
   EXPECT_THAT(board.takePosts(), ElementsAre("SetRect", "Batch", "Render", "DeleteBatch"));
   EXPECT_THAT(board.takeStamps(), IsEmpty());
   EXPECT_FALSE(board.shared.mHasLastStroke);
   // Nothing is carried from one to the next.
-  leaveStroke(board.shared);
+  leaveStrokeAlongX(board.shared);
   board.move({{77.7f, 12.0f}});
   board.takeBatches();
-  leaveStroke(board.shared);
+  leaveStrokeAlongX(board.shared);
   board.move({{30.0f, 0.0f}});
   EXPECT_EQ(board.takeFloats(), once);
 }
@@ -98,7 +95,7 @@ TEST(Prediction, EveryStateOfTheLiveStrokeIsPredictedFromOnce) {
 // Kept: before a stroke's first stamp the prediction goes on from wherever the stroke before it ended.
 TEST(Prediction, BeforeTheFirstStampStartsFromTheStrokeBefore) {
   PredictionBoard board;
-  leaveStroke(board.shared);
+  leaveStrokeAlongX(board.shared);
   // A new stroke far away has begun, and has not placed a stamp yet.
   board.shared.mStartX = board.shared.mLastX = 500.0f;
   board.shared.mStartY = board.shared.mLastY = 500.0f;
@@ -110,7 +107,7 @@ TEST(Prediction, BeforeTheFirstStampStartsFromTheStrokeBefore) {
 TEST(Prediction, TheRimFollowsTheView) {
   PredictionBoard board;
   board.canvas.setMatrix(viewOf(2.0f));
-  leaveStroke(board.shared);
+  leaveStrokeAlongX(board.shared);
   board.move({{30.0f, 0.0f}});
   EXPECT_NEAR(board.takeStamps().at(0).halfWidth, 2.25f, 1e-5f);  // half a pixel is a quarter of a unit
 }
@@ -152,11 +149,11 @@ TEST(Prediction, ContinuesTheLiveStrokeAndLeavesItAlone) {
 
 TEST(Prediction, LeavesOutSamplesThatAreNowhereAndStartsNowhereFromARecordOutOfBounds) {
   PredictionBoard board;
-  leaveStroke(board.shared);
+  leaveStrokeAlongX(board.shared);
   board.move({{30.0f, 0.0f}, {40.0f, 0.0f}, {50.2f, 0.0f}});
   const std::vector<float> clean = board.takeFloats();
-  leaveStroke(board.shared);
-  board.move({{30.0f, 0.0f}, {kNaN, 0.0f}, {40.0f, -kInfinity}, {40.0f, 0.0f}, {50.2f, 0.0f}});
+  leaveStrokeAlongX(board.shared);
+  board.move({{30.0f, 0.0f}, {NAN, 0.0f}, {40.0f, -INFINITY}, {40.0f, 0.0f}, {50.2f, 0.0f}});
   EXPECT_EQ(board.takeFloats(), clean);
 
   const MotionEvent event = motionEvent(Qelt::kActionMove, {{30.0f, 0.0f}});
@@ -165,15 +162,15 @@ TEST(Prediction, LeavesOutSamplesThatAreNowhereAndStartsNowhereFromARecordOutOfB
       &Qelt::Pencil2Data::mLastY,      &Qelt::Pencil2Data::mLastWidth,  &Qelt::Pencil2Data::mLastOrientation,
       &Qelt::Pencil2Data::mLastAlpha,  &Qelt::Pencil2Data::mTiltBlend};
   for (const auto field : fields) {
-    for (const float value : {kNaN, kInfinity, -kInfinity}) {
-      leaveStroke(board.shared);
+    for (const float value : {NAN, INFINITY, -INFINITY}) {
+      leaveStrokeAlongX(board.shared);
       board.shared.*field = value;
       EXPECT_FALSE(board.send(event));
       EXPECT_THAT(board.takeFloats(), IsEmpty());
     }
   }
   // A count below 0 does no harm, nor does a drawable without a record, as when memory ran out.
-  leaveStroke(board.shared);
+  leaveStrokeAlongX(board.shared);
   board.shared.mStampCount = -5;
   EXPECT_TRUE(board.send(event));
   EXPECT_EQ(board.takeStamps().at(0).tile, 0);

@@ -1,7 +1,7 @@
 #include <gmock/gmock.h>
 
+#include <cmath>
 #include <cstddef>
-#include <limits>
 #include <string>
 #include <vector>
 
@@ -20,8 +20,6 @@ using testing::IsEmpty;
 using testing::SizeIs;
 
 using Panel = DrawableBoard<Pencil2PreviewDrawableGL>;
-
-constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
 
 // Alpha 160: colour factor 2.
 BoardOptions panel(float size, bool curve = true, int source = Qelt::kSourceStylus) {
@@ -88,7 +86,7 @@ TEST(Preview, FingersTakeShortMovesEveryOtherTime) {
 TEST(Preview, AStylusOnATouchScreenHasItsPressureReplacedInTheEvent) {
   Panel board(panel(10.0f, true, Qelt::kSourceTouchScreen));
   board.down({0.0f, 0.0f, 0.9f});
-  const MotionEvent move = motionEvent(Qelt::kActionMove, {{60.0f, 0.0f, 0.9f}, {120.0f, 0.0f, kNaN, 1.3f}},
+  const MotionEvent move = motionEvent(Qelt::kActionMove, {{60.0f, 0.0f, 0.9f}, {120.0f, 0.0f, NAN, 1.3f}},
                                        Qelt::kToolStylus, Qelt::kSourceTouchScreen);
   EXPECT_TRUE(board.send(move));
   EXPECT_EQ(move.GetHistoricalPressure(0), 0.5f);

@@ -23,13 +23,13 @@ namespace {
 using namespace Qelt;
 using QeltDesktop::RenderQueue;
 
-constexpr int kSide = 256;
+constexpr int kPictureSide = 256;
 
-// A picture of kSide x kSide pixels.
+// A picture of kPictureSide x kPictureSide pixels.
 using Picture = std::vector<std::uint8_t>;
 
-int alphaAt(const Picture& picture, int x, int y) {
-  return picture[(static_cast<std::size_t>(y) * kSide + static_cast<std::size_t>(x)) * 4 + 3];
+int alphaOf(const Picture& picture, int x, int y) {
+  return picture[(static_cast<std::size_t>(y) * kPictureSide + static_cast<std::size_t>(x)) * 4 + 3];
 }
 
 int inked(const Picture& picture) {
@@ -41,9 +41,9 @@ int inked(const Picture& picture) {
 // How many pixels of `a` differ from those of `b` that lie (dx, dy) further, by more than 8 of 255.
 int differing(const Picture& a, const Picture& b, int dx = 0, int dy = 0) {
   int count = 0;
-  for (int y = std::max(0, -dy); y < std::min(kSide, kSide - dy); ++y) {
-    for (int x = std::max(0, -dx); x < std::min(kSide, kSide - dx); ++x)
-      count += std::abs(alphaAt(a, x, y) - alphaAt(b, x + dx, y + dy)) > 8 ? 1 : 0;
+  for (int y = std::max(0, -dy); y < std::min(kPictureSide, kPictureSide - dy); ++y) {
+    for (int x = std::max(0, -dx); x < std::min(kPictureSide, kPictureSide - dx); ++x)
+      count += std::abs(alphaOf(a, x, y) - alphaOf(b, x + dx, y + dy)) > 8 ? 1 : 0;
   }
   return count;
 }
@@ -52,7 +52,7 @@ BoardOptions paper(int version) {
   BoardOptions options;
   options.version = version;
   options.size = 9.0f;
-  options.width = options.height = kSide;
+  options.width = options.height = kPictureSide;
   return options;
 }
 
@@ -149,7 +149,7 @@ enum class Grain { OfPaper, OfScreen, Swapped };
 template <typename RenderDrawableType>
 void expectStampsAsWorkedOut(float size, const StampPicture& look, Grain grain = Grain::OfPaper) {
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
-  QeltDesktop::CanvasLayer layer(queue, kSide, kSide);
+  QeltDesktop::CanvasLayer layer(queue, kPictureSide, kPictureSide);
   QeltDesktop::PenDataManager data(&queue);
   RenderDrawableType drawable(&data);
   for (const auto& [zoomX, zoomY] : {std::pair{1.0f, 1.0f}, {2.0f, 1.0f}, {2.0f, 2.0f}}) {
@@ -177,14 +177,14 @@ void expectStampsAsWorkedOut(float size, const StampPicture& look, Grain grain =
         expected.stamp.alphaByWidth = 0.625f;
       }
       queue.run([&] {
-        drawable.CreatePenCanvas(kSide, kSide, &queue);
+        drawable.CreatePenCanvas(kPictureSide, kPictureSide, &queue);
         drawable.SetPenData(9.0f, static_cast<int>(0xFF000000u));
         drawable.SetStartPoint(60.37f, 65.61f);
         drawable.SendDataToGPU(&batch);
         drawable.Update(false);
         drawable.Draw(layer.GetBitmap()->GetSubBitmap(0), view);
       });
-      EXPECT_LT(expected.shareOff(layer.readPixels(), kSide, kSide, 0.5f), 0.02);
+      EXPECT_LT(expected.shareOff(layer.readPixels(), kPictureSide, kPictureSide, 0.5f), 0.02);
     }
   }
   queue.run([&] { drawable.Release(); });

@@ -1,6 +1,6 @@
 #include <gmock/gmock.h>
 
-#include <limits>
+#include <cmath>
 #include <string>
 #include <vector>
 
@@ -14,9 +14,6 @@ namespace {
 using Qelt::MotionEvent;
 using testing::ElementsAre;
 using testing::IsEmpty;
-
-constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
-constexpr float kInfinity = std::numeric_limits<float>::infinity();
 
 class LiveStroke : public testing::TestWithParam<int> {
  protected:
@@ -177,7 +174,7 @@ TEST(ViewScaleTest, MarginsOfVersion8AreDevicePixels) {
   };
   const Case cases[] = {{4.0f, 4.0f, 5.125f, 5.125f}, {4.0f, 0.5f, 5.125f, 6.0f},
                         {0.5f, 0.5f, 6.0f, 6.0f},     {0.0f, 0.0f, 5.5f, 5.5f},
-                        {kNaN, kNaN, 5.5f, 5.5f},     {kInfinity, 1.0f, 5.5f, 5.5f}};
+                        {NAN, NAN, 5.5f, 5.5f},     {INFINITY, 1.0f, 5.5f, 5.5f}};
   const std::vector<Sample> tap = {{10.0f, 10.0f}, {10.0f, 10.0f}};
   void (*const ways[])(DrawingBoard&, const std::vector<Sample>&) = {
       [](DrawingBoard& board, const auto& samples) { board.stroke(samples); },

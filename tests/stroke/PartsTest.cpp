@@ -2,6 +2,7 @@
 
 #include <array>
 #include <bit>
+#include <cmath>
 #include <cstddef>
 #include <cstdint>
 #include <limits>
@@ -21,7 +22,6 @@ using testing::ElementsAre;
 
 // --- Input ---
 
-constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
 constexpr PointF kOrigin{0.0f, 0.0f};
 
 MoveFilter filter(float minimumMove, float skipDistance) {
@@ -81,7 +81,7 @@ TEST(MeanRingTest, EqualsAPlainSumBitForBitOverAllWraps) {
 
 // Whatever is NaN about a stamp, first or last: the box is that of the other two.
 TEST(DirtyBoxTest, LeavesOutEdgesThatAreNaN) {
-  for (const auto& [x, y, reach] : {std::array{kNaN, 5.0f, 1.0f}, {5.0f, kNaN, 1.0f}, {5.0f, 5.0f, kNaN}}) {
+  for (const auto& [x, y, reach] : {std::array{NAN, 5.0f, 1.0f}, {5.0f, NAN, 1.0f}, {5.0f, 5.0f, NAN}}) {
     for (const int bad : {0, 1, 2}) {
       DirtyBox box;
       if (bad == 0) box.add(x, y, reach);
