@@ -1,6 +1,5 @@
-// The GL context goes and comes back, twice, between any two tasks of the render thread: the picture at the
-// end is the one drawn without it. It goes before any task and comes back before a later one: what is drawn
-// from there on is what is drawn without.
+// The GL context goes and comes back, at once or later, between any two tasks of the render thread. The layer
+// comes back empty, and from there on it is drawn into as into one that was cleared there.
 
 #include <gtest/gtest.h>
 
@@ -11,11 +10,10 @@
 #include <string>
 #include <utility>
 
-#include "Stage.h"
 #include "desktop/gl/CallTask.h"
 #include "gl/ITask.h"
 #include "support/LogCapture.h"
-#include "support/Versions.h"
+#include "support/PenBoard.h"
 
 namespace QeltTests {
 namespace {
@@ -23,9 +21,8 @@ namespace {
 using QeltDesktop::RenderQueue;
 
 struct Case {
-  const char* name;
+  Kind kind;
   int version;
-  void (*draw)(Stage&);
 };
 
 class ContextLoss : public testing::TestWithParam<Case> {
@@ -34,7 +31,7 @@ class ContextLoss : public testing::TestWithParam<Case> {
   using Call = std::function<void()>;
   std::vector<std::uint8_t> picture(std::map<long, Call> calls) {
     mLayer.clear();
-    Stage stage(mQueue, &mLayer, GetParam().version);
+    PenBoard board({.version = GetParam().version, .size = 4.0f}, mQueue, &mLayer);
     mPosts = 0;
     mQueue.accept = [&](const Qelt::ITask&) {
       if (const auto call = calls.find(++mPosts); call != calls.end()) {
@@ -44,65 +41,62 @@ class ContextLoss : public testing::TestWithParam<Case> {
       }
       return true;
     };
-    GetParam().draw(stage);
+    board.draw(GetParam().kind);
     mQueue.finish();
     mQueue.accept = nullptr;
     mQueue.restoreContext();
     return mLayer.readPixels();
   }
 
+  const Call mClear = [this] { mLayer.clear(); };
   const Call mLose = [this] { mQueue.loseContext(); };
+  const Call mRestore = [this] {
+    const int before = mLayer.timesEmptied();
+    mQueue.restoreContext();
+    EXPECT_EQ(mLayer.timesEmptied(), before + 1);
+    EXPECT_TRUE(mLayer.readPixels() == mEmpty);
+  };
   const Call mLoseTwice = [this] {
     for (int i = 0; i < 2; ++i) {
-      mQueue.loseContext();
-      mQueue.restoreContext();
+      mLose();
+      mRestore();
     }
-  };
-  const Call mRestoreAndWipe = [this] {
-    mQueue.restoreContext();
-    mLayer.clear();
   };
   LogCapture mLog;
   RenderQueue mQueue{RenderQueue::Mode::Caller, RenderQueue::GL::Context};
   QeltDesktop::CanvasLayer mLayer{mQueue, 160, 120, 128};
+  const std::vector<std::uint8_t> mEmpty = mLayer.readPixels();
   long mPosts = 0;
 };
 
-TEST_P(ContextLoss, LeavesThePictureAsItIsWithout) {
-  const std::vector<std::uint8_t> expected = picture({});
+TEST_P(ContextLoss, EmptiesTheLayerAndSparesWhatIsDrawnAfterwards) {
+  const std::vector<std::uint8_t> whole = picture({});
   const long posts = mPosts;
-  ASSERT_NE(expected, std::vector<std::uint8_t>(expected.size())) << "nothing was drawn";
-  for (long number = 1; number <= posts; ++number) {
-    EXPECT_TRUE(picture({{number, mLoseTwice}}) == expected)
-        << "loss before task " << number << " of " << posts;
-  }
-  RecordProperty("losses", static_cast<int>(2 * posts));
-}
-
-TEST_P(ContextLoss, ForAWhileSparesWhatComesAfterwards) {
-  picture({});
-  const long posts = mPosts;
+  ASSERT_NE(whole, mEmpty) << "nothing was drawn";
   int losses = 0;
-  for (long back = 2; back <= posts; ++back) {
-    const std::vector<std::uint8_t> expected = picture({{back, mRestoreAndWipe}});
+  for (long back = 1; back <= posts; ++back) {
+    const std::vector<std::uint8_t> expected = picture({{back, mClear}});
+    EXPECT_TRUE(picture({{back, mLoseTwice}}) == expected) << "lost before task " << back << " of " << posts;
+    losses += 2;
     for (const long lost : std::set<long>{1, std::max(back - 4, 1l)}) {
-      EXPECT_TRUE(picture({{lost, mLose}, {back, mRestoreAndWipe}}) == expected)
+      if (lost == back) continue;
+      EXPECT_TRUE(picture({{lost, mLose}, {back, mRestore}}) == expected)
           << "lost before task " << lost << ", back before task " << back << " of " << posts;
-      ++losses;
     }
   }
+  EXPECT_TRUE(picture({{1, mLose}}) == mEmpty) << "lost for good";
+  EXPECT_TRUE(picture({}) == whole) << "drawn again";
   RecordProperty("losses", losses);
 }
 
 INSTANTIATE_TEST_SUITE_P(Strokes, ContextLoss,
-                         testing::Values(Case{"LiveVersion1", 1, [](Stage& stage) { stage.live(false); }},
-                                         Case{"LiveVersion7", 7, [](Stage& stage) { stage.live(false); }},
-                                         Case{"LiveVersion8", 8, [](Stage& stage) { stage.live(false); }},
-                                         Case{"Redraws", 8, [](Stage& stage) { stage.redraw(false); }},
-                                         Case{"Outlines", 8, [](Stage& stage) { stage.outline(false); }},
-                                         Case{"Preview", 8, [](Stage& stage) { stage.preview(false); }},
-                                         Case{"Prediction", 8, [](Stage& stage) { stage.predict(false); }}),
-                         [](const auto& test) { return std::string(test.param.name); });
+                         testing::Values(Case{Kind::Live, 1}, Case{Kind::Live, 7}, Case{Kind::Live, 8},
+                                         Case{Kind::Redraw, 8}, Case{Kind::Outline, 8},
+                                         Case{Kind::Preview, 8}, Case{Kind::Prediction, 8}),
+                         [](const auto& test) {
+                           return testing::PrintToString(test.param.kind) + "Version" +
+                                  std::to_string(test.param.version);
+                         });
 
 }  // namespace
 }  // namespace QeltTests

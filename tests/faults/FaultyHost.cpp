@@ -10,7 +10,7 @@
 #include "gl/GraphicsObject.h"
 #include "gl/OpenGLShaderProgram.h"
 #include "graphics/SPGraphicsFactory.h"
-#include "support/HostFaults.h"
+#include "support/FaultyCanvas.h"
 
 namespace {
 

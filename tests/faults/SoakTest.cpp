@@ -6,17 +6,15 @@
 #include <chrono>
 #include <cstdint>
 #include <cstdlib>
-#include <functional>
-#include <iterator>
 #include <memory>
 #include <random>
 #include <string>
 #include <thread>
 #include <vector>
 
-#include "Stage.h"
-#include "gl/ITask.h"
+#include "desktop/gl/CallTask.h"
 #include "support/LogCapture.h"
+#include "support/PenBoard.h"
 
 namespace QeltTests {
 namespace {
@@ -29,64 +27,47 @@ double seconds() {
   return asked != nullptr ? std::strtod(asked, nullptr) : 1.5;
 }
 
-class SleepTask final : public Qelt::ITask {
- public:
-  explicit SleepTask(std::chrono::microseconds time) : mTime(time) {}
-  void run() override { std::this_thread::sleep_for(mTime); }
-
- private:
-  std::chrono::microseconds mTime;
-};
-
 struct Pace {
   int mostSleep;  // of the render thread after each action, microseconds
   int mostAhead;  // actions the main thread is ahead, at the most
 };
 
-// Draws, redraws, predicts, and takes pens away with their work queued, without a pattern. Answers the number
-// of actions.
-long drawFor(double time, Stage& stage, RenderQueue& queue, Pace pace, bool losesContext,
-             std::uint32_t seed) {
+// Draws, redraws, predicts, and takes pens away with their work queued, without a pattern.
+void drawFor(double time, PenBoard& board, Pace pace, std::uint32_t seed) {
   std::mt19937 random(seed);
   const auto below = [&random](int bound) {
     return static_cast<int>(random() % static_cast<unsigned>(bound));
   };
-  const auto live = [&] { stage.live(false); };
-  const auto redraw = [&] { stage.redraw(false); };
-  const std::function<void()> all[] = {
-      live,
-      live,
-      redraw,
-      redraw,
-      [&] { stage.beginLive(); },
-      [&] { stage.outline(false); },
-      [&] { stage.preview(false); },
-      [&] { stage.predict(false); },
-      [&] { stage.deletePen(); },
-      [&] { stage.zoom(1.0f + 0.5f * static_cast<float>(below(4))); },
-      [&] {
-        if (stage.pen() != nullptr) stage.pen()->setVersion(1 + below(8));
-      },
-      [&] {
-        stage.turnPage();
-        if (losesContext && below(4) == 0) stage.loseAndRestoreContext();
-      },
-  };
   const Clock::time_point end =
       Clock::now() + std::chrono::duration_cast<Clock::duration>(std::chrono::duration<double>(time));
-  long actions = 0;
-  for (int ahead = 0; Clock::now() < end; ++actions) {
-    all[below(static_cast<int>(std::size(all)))]();
+  for (int ahead = 0; Clock::now() < end;) {
+    switch (const int action = below(12)) {
+      case 5:
+        board.deletePen();
+        break;
+      case 6:
+        board.zoom(1.0f + 0.5f * static_cast<float>(below(4)));
+        break;
+      case 7:
+        if (board.pen != nullptr) board.pen->setVersion(1 + below(newestVersion()));
+        break;
+      case 8:
+        board.turnPage();
+        if (board.layer != nullptr && below(4) == 0) board.loseAndRestoreContext();
+        break;
+      default:
+        board.draw(kAllKinds[static_cast<std::size_t>(action % 5)]);
+        break;
+    }
     if (pace.mostSleep > 0) {
-      auto* const sleep = new SleepTask(std::chrono::microseconds(below(pace.mostSleep)));
-      if (!queue.Post(sleep)) delete sleep;
+      const std::chrono::microseconds sleep(below(pace.mostSleep));
+      QeltDesktop::postCall(board.queue, [sleep] { std::this_thread::sleep_for(sleep); });
     }
     if (++ahead >= 1 + below(pace.mostAhead)) {
-      queue.finish();
+      board.finish();
       ahead = 0;
     }
   }
-  return actions;
 }
 
 void soak(RenderQueue::GL gl, Pace pace, int hosts, double time) {
@@ -98,10 +79,8 @@ void soak(RenderQueue::GL gl, Pace pace, int hosts, double time) {
       std::unique_ptr<QeltDesktop::CanvasLayer> layer;
       const bool draws = gl == RenderQueue::GL::Context;
       if (draws) layer = std::make_unique<QeltDesktop::CanvasLayer>(queue, 96, 64, 64);
-      Stage stage(queue, layer.get(), 8);
-      const long actions = drawFor(time, stage, queue, pace, draws, 7u + static_cast<std::uint32_t>(host));
-      EXPECT_GT(actions, 0);
-      std::printf("host %d: %ld actions\n", host, actions);
+      PenBoard board({.size = 4.0f}, queue, layer.get());
+      drawFor(time, board, pace, 7u + static_cast<std::uint32_t>(host));
     });
   }
   for (std::thread& thread : threads) thread.join();

@@ -19,7 +19,6 @@
 #include "pencommon/PenPreviewDrawableGL.h"
 #include "pencommon/PenStrokeDataManager.h"
 #include "support/BatchCheck.h"
-#include "support/HostFaults.h"
 
 namespace QeltTests {
 
@@ -114,14 +113,9 @@ void PenWorld::step(FuzzInput& input) {
     pen.reset(mLibrary.createPen());
     if (pen == nullptr) breakOff("a pen", "no pen");
     pen->setPenDataManager(&mData);
-    pen->setVersion(8);
+    pen->setVersion(Qelt::kRenderingVersions.back().number);
     mSizes[which] = pen->GetSize();
   }
-  // What comes more often stands there more often.
-  using Move = void (PenWorld::*)(FuzzInput&, Qelt::Pen&);
-  constexpr Move kDraws[] = {&PenWorld::draw,    &PenWorld::draw,    &PenWorld::draw,
-                             &PenWorld::draw,    &PenWorld::redraw,  &PenWorld::redraw,
-                             &PenWorld::outline, &PenWorld::preview, &PenWorld::predict};
   const int move = input.pick(16);
   if (move == 0) {
     pen.reset();
@@ -131,7 +125,7 @@ void PenWorld::step(FuzzInput& input) {
   } else if (move == 3) {
     ask(input, *pen);
   } else if (move <= 12) {
-    if (mayDraw(*pen)) (this->*kDraws[move - 4])(input, *pen);
+    if (mayDraw(*pen)) draw(input, *pen, move - 4);
   } else if (move == 13) {
     changeView(input);
   } else if (move == 14) {
@@ -152,7 +146,10 @@ void PenWorld::change(FuzzInput& input, Qelt::Pen& pen) {
       [&] { pen.SetSize(input.any()); },
       [&] { pen.SetSize(0.5f + std::abs(input.usual())); },
       [&] { pen.SetColor(input.word()); },
-      [&] { pen.setVersion(input.flag() ? 1 + input.pick(8) : input.word()); },
+      [&] {
+        pen.setVersion(input.flag() ? 1 + input.pick(static_cast<int>(Qelt::kRenderingVersions.size()))
+                                    : input.word());
+      },
       [&] { morphing.SetCurveEnabled(input.flag()); },
       [&] {
         morphing.SetFixedWidthEnabled(input.flag());
@@ -279,15 +276,6 @@ Drawable* PenWorld::onCanvas(FuzzInput& input, Drawable* drawable) {
   return drawable;
 }
 
-void PenWorld::draw(FuzzInput& input, Qelt::Pen& pen) {
-  Qelt::PenStrokeDrawableGL* const drawable = onCanvas(input, pen.GetStrokeDrawableGL());
-  const MotionEvent made = event(input, 4);
-  const int nulls = input.byte();
-  RectF rect;
-  const bool answer = drawable->Draw(nulls == 255 ? nullptr : &made, nulls == 254 ? nullptr : &rect);
-  note(answer, rect);
-}
-
 // A page whose stroke gets another version does not offer the drawing of the version before.
 void PenWorld::keepCacheFitting(const Stroke& stroke, const Qelt::PenStrokeDrawableGL& drawable) {
   const int original = stroke.GetOriginalRuntimeHandle();
@@ -302,63 +290,60 @@ void PenWorld::keepCacheFitting(const Stroke& stroke, const Qelt::PenStrokeDrawa
   }
 }
 
-void PenWorld::redraw(FuzzInput& input, Qelt::Pen& pen) {
-  Qelt::PenStrokeDrawableGL* const drawable = onCanvas(input, pen.GetStrokeDrawableGL());
-  const int kind = input.byte();
+// One call of a drawable, with an event, a stored stroke or a list, any of which may be null.
+void PenWorld::draw(FuzzInput& input, Qelt::Pen& pen, int which) {
   RectF rect;
-  RectF* const into = kind >= 252 ? nullptr : &rect;
   bool answer = false;
-  if (kind % 3 == 0) {
-    const MotionEvent made = event(input, 5);
-    answer = drawable->RedrawPen(kind == 249 ? nullptr : &made, into);
-  } else if (kind % 16 == 1) {
-    const Qelt::List list;
-    answer = drawable->RedrawPen(kind == 241 ? nullptr : &list, into);
+  int nulls = 0;
+  const auto area = [&] { return nulls >= 252 ? nullptr : &rect; };
+  const auto orNull = [&](const auto& object) { return nulls % 84 == 81 ? nullptr : &object; };
+  if (which < 4) {
+    Qelt::PenStrokeDrawableGL* const drawable = onCanvas(input, pen.GetStrokeDrawableGL());
+    const MotionEvent made = event(input, 4);
+    nulls = input.byte();
+    answer = drawable->Draw(orNull(made), area());
+  } else if (which < 6) {
+    Qelt::PenStrokeDrawableGL* const drawable = onCanvas(input, pen.GetStrokeDrawableGL());
+    nulls = input.byte();
+    if (nulls % 3 == 0) {
+      const MotionEvent made = event(input, 5);
+      answer = drawable->RedrawPen(orNull(made), area());
+    } else if (nulls % 16 == 1) {
+      const Qelt::List list;
+      answer = drawable->RedrawPen(orNull(list), area());
+    } else {
+      const Stroke& made = stroke(input);
+      keepCacheFitting(made, *drawable);
+      answer = drawable->RedrawPen(static_cast<const Qelt::ObjectStroke*>(orNull(made)), area());
+    }
+  } else if (which == 6) {
+    Qelt::PenOutlineDrawableGL* const drawable = onCanvas(input, pen.GetOutlineDrawableGL());
+    nulls = input.byte();
+    if (nulls % 4 == 0) drawable->SetOutlineSize(input.any());
+    if (nulls % 4 == 1) drawable->SetOutlineColor(input.word());
+    if (nulls % 3 == 0) {
+      const MotionEvent made = event(input, 5);
+      answer = drawable->DrawOutline(orNull(made), area());
+    } else {
+      const Stroke& made = stroke(input);
+      answer = drawable->DrawOutline(static_cast<const Qelt::ObjectStroke*>(orNull(made)), area());
+    }
+  } else if (which == 7) {
+    Qelt::PenPreviewDrawableGL* const drawable = onCanvas(input, pen.GetPreviewDrawableGL());
+    nulls = input.byte();
+    const MotionEvent made = event(input, 4);
+    answer =
+        nulls % 2 == 0 ? drawable->Draw(orNull(made), area()) : drawable->RedrawPen(orNull(made), area());
   } else {
-    const Stroke& made = stroke(input);
-    keepCacheFitting(made, *drawable);
-    answer = drawable->RedrawPen(kind == 250 ? nullptr : &made, into);
+    Qelt::IPenPredictionDrawableGL* const drawable = pen.GetPredictionStrokeDrawableGL();
+    if (drawable == nullptr) return;
+    onCanvas(input, drawable);
+    nulls = input.byte();
+    if (nulls % 4 == 0) drawable->SetOpacity(input.any());
+    const MotionEvent made = event(input, 3);
+    answer = drawable->Draw(orNull(made), area());
   }
   note(answer, rect);
-}
-
-void PenWorld::outline(FuzzInput& input, Qelt::Pen& pen) {
-  Qelt::PenOutlineDrawableGL* const drawable = onCanvas(input, pen.GetOutlineDrawableGL());
-  const int kind = input.byte();
-  if (kind % 4 == 0) drawable->SetOutlineSize(input.any());
-  if (kind % 4 == 1) drawable->SetOutlineColor(input.word());
-  RectF rect;
-  RectF* const into = kind >= 252 ? nullptr : &rect;
-  bool answer = false;
-  if (kind % 3 == 0) {
-    const MotionEvent made = event(input, 5);
-    answer = drawable->DrawOutline(kind == 249 ? nullptr : &made, into);
-  } else {
-    const Stroke& made = stroke(input);
-    answer = drawable->DrawOutline(kind == 250 ? nullptr : &made, into);
-  }
-  note(answer, rect);
-}
-
-void PenWorld::preview(FuzzInput& input, Qelt::Pen& pen) {
-  Qelt::PenPreviewDrawableGL* const drawable = onCanvas(input, pen.GetPreviewDrawableGL());
-  const int kind = input.byte();
-  const MotionEvent made = event(input, 4);
-  const MotionEvent* const given = kind == 254 ? nullptr : &made;
-  RectF rect;
-  RectF* const into = kind == 255 ? nullptr : &rect;
-  note(kind % 2 == 0 ? drawable->Draw(given, into) : drawable->RedrawPen(given, into), rect);
-}
-
-void PenWorld::predict(FuzzInput& input, Qelt::Pen& pen) {
-  Qelt::IPenPredictionDrawableGL* const drawable = pen.GetPredictionStrokeDrawableGL();
-  if (drawable == nullptr) return;
-  onCanvas(input, drawable);
-  const int kind = input.byte();
-  if (kind % 4 == 0) drawable->SetOpacity(input.any());
-  const MotionEvent made = event(input, 3);
-  RectF rect;
-  note(drawable->Draw(kind == 254 ? nullptr : &made, kind == 255 ? nullptr : &rect), rect);
 }
 
 void PenWorld::changeView(FuzzInput& input) {

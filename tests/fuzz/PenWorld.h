@@ -18,7 +18,7 @@
 #include "model/ObjectStroke.h"
 #include "pencommon/Pen.h"
 #include "pencommon/PenStrokeDrawableGL.h"
-#include "support/StageCanvas.h"
+#include "support/FaultyCanvas.h"
 
 namespace QeltTests {
 
@@ -45,11 +45,7 @@ class PenWorld {
   void step(FuzzInput& input);
   void change(FuzzInput& input, Qelt::Pen& pen);
   void ask(FuzzInput& input, Qelt::Pen& pen);
-  void draw(FuzzInput& input, Qelt::Pen& pen);
-  void redraw(FuzzInput& input, Qelt::Pen& pen);
-  void outline(FuzzInput& input, Qelt::Pen& pen);
-  void preview(FuzzInput& input, Qelt::Pen& pen);
-  void predict(FuzzInput& input, Qelt::Pen& pen);
+  void draw(FuzzInput& input, Qelt::Pen& pen, int which);
   void changeView(FuzzInput& input);
   void changeQueue(FuzzInput& input);
 
@@ -68,7 +64,7 @@ class PenWorld {
 
   const QeltDesktop::PluginLibrary& mLibrary;
   QeltDesktop::RenderQueue& mQueue;
-  StageCanvas mCanvas, mOther;
+  FaultyCanvas mCanvas, mOther;
   QeltDesktop::PenCanvas mBlank;  // has no layer at all
   QeltDesktop::PenDataManager mData, mQueueless;
   std::unique_ptr<Qelt::Pen> mPens[2];

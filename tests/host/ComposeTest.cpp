@@ -1,19 +1,40 @@
 #include "desktop/graphics/Compose.h"
 
-#include <gtest/gtest.h>
+#include <GLES3/gl3.h>
+#include <gmock/gmock.h>
 
 #include <array>
+#include <cmath>
 #include <cstdint>
 #include <optional>
 #include <stdexcept>
 #include <vector>
 
+#include "desktop/gl/RenderQueue.h"
+#include "desktop/graphics/CanvasLayer.h"
+#include "desktop/graphics/Presenter.h"
+#include "graphics/ISPBitmap.h"
+
 namespace {
 
 using Pixels = std::vector<std::uint8_t>;
+using QeltDesktop::CanvasLayer;
 using QeltDesktop::composeLayers;
+using QeltDesktop::Presenter;
+using QeltDesktop::RenderQueue;
+using QeltDesktop::ShownLayer;
 
 constexpr std::array<std::uint8_t, 3> kWhite{255, 255, 255};
+constexpr int kWidth = 40, kHeight = 30;
+
+Pixels at(const Pixels& pixels, int x, int y) {
+  const auto pixel = pixels.begin() + (y * kWidth + x) * 4;
+  return Pixels(pixel, pixel + 4);
+}
+
+void expectNear(const Pixels& some, const Pixels& others) {
+  EXPECT_THAT(some, testing::Pointwise(testing::FloatNear(1.0f), others));
+}
 
 TEST(Compose, LayersMeetPremultiplied) {
   // Half black over white: 0 + (1 - 128/255) * 255 = 127.
@@ -33,6 +54,68 @@ TEST(Compose, WithoutABackgroundColoursComeOutStraight) {
   EXPECT_EQ(straight[2], 0);
   EXPECT_EQ(straight[3], 128);
   EXPECT_EQ(composeLayers({{0, 0, 0, 0}}, std::nullopt), (Pixels{0, 0, 0, 0}));
+}
+
+// What is shown is what is written to files; here on a surface off screen.
+TEST(Presenter, ShowsWhatComposingGives) {
+  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context, {"", kWidth, kHeight});
+  CanvasLayer lowest(queue, kWidth, kHeight), middle(queue, kWidth, kHeight), highest(queue, kWidth, kHeight);
+  // Bands of all strengths, in each layer another colour, along or across.
+  const auto fill = [&] {
+    int number = 0;
+    for (CanvasLayer* const layer : {&lowest, &middle, &highest}) {
+      queue.run([&] {
+        auto& tile = *layer->GetBitmap()->GetSubBitmap(0);
+        tile.BeginRender(0);
+        for (int band = 0; band < kWidth / 2; ++band) {
+          const auto alpha = static_cast<float>(band * (number + 1) % 16) / 15.0f;
+          layer == &middle ? glScissor(0, 2 * band, kWidth, 2) : glScissor(2 * band, 0, 2, kHeight);
+          glClearColor(alpha * 0.3f, alpha * static_cast<float>(number) * 0.5f, alpha, alpha);
+          glClear(GL_COLOR_BUFFER_BIT);
+        }
+        tile.EndRender(0);
+      });
+      ++number;
+    }
+  };
+  fill();
+  Presenter presenter(queue);
+  const auto screen = [&](const std::vector<ShownLayer>& layers, const auto& paper) {
+    Pixels rows(kWidth * kHeight * 4), pixels;
+    presenter.present(layers, paper, kWidth, kHeight);
+    queue.run([&] { glReadPixels(0, 0, kWidth, kHeight, GL_RGBA, GL_UNSIGNED_BYTE, rows.data()); });
+    // A surface's rows are counted from its lowest.
+    for (auto row = rows.end(); row != rows.begin(); row -= kWidth * 4)
+      pixels.insert(pixels.end(), row - kWidth * 4, row);
+    return pixels;
+  };
+  constexpr std::array<std::uint8_t, 3> kPaper{250, 240, 200};
+  const std::vector<ShownLayer> all{{&lowest}, {&middle}, {&highest}};
+  const Pixels shown = screen(all, kPaper), layer = highest.readPixels();
+  expectNear(shown, composeLayers({lowest.readPixels(), middle.readPixels(), layer}, kPaper));
+  EXPECT_EQ(screen({{&middle}}, std::nullopt), middle.readPixels()) << "premultiplied, without paper";
+
+  const Pixels moved = screen({{&highest, 1.0f, 4.0f, -6.0f}}, std::nullopt);
+  const Pixels twice = screen({{&highest, 2.0f}}, std::nullopt);
+  for (int y = 0; y < kHeight; ++y) {
+    for (int x = 0; x < kWidth; ++x) {
+      const bool isInside = x >= 4 && y + 6 < kHeight;
+      EXPECT_EQ(at(moved, x, y), isInside ? at(layer, x - 4, y + 6) : Pixels(4)) << x << ", " << y;
+      // A band is four pixels wide now; its middle two are free of its neighbours.
+      if (x % 4 == 1 || x % 4 == 2) expectNear(at(twice, x, y), at(layer, x / 2, y / 2));
+    }
+  }
+  for (const float scale : {0.0f, -1.0f, NAN, INFINITY})
+    EXPECT_EQ(screen({{&highest, scale}, {nullptr}}, std::nullopt), Pixels(layer.size()));
+  EXPECT_THROW(presenter.present(std::vector<ShownLayer>(5), kPaper, 1, 1), std::invalid_argument);
+
+  queue.loseContext();
+  presenter.present(all, kPaper, kWidth, kHeight);
+  queue.restoreContext();
+  fill();
+  EXPECT_EQ(screen(all, kPaper), shown);
+  RenderQueue unseen(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
+  EXPECT_THROW(const Presenter none(unseen), std::runtime_error) << "no surface";
 }
 
 }  // namespace

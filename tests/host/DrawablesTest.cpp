@@ -1,22 +1,25 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <chrono>
 #include <cmath>
+#include <future>
+#include <memory>
 #include <string>
-#include <utility>
+#include <thread>
 #include <vector>
 
+#include "desktop/gl/CallTask.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/graphics/CanvasLayer.h"
 #include "desktop/graphics/PenCanvas.h"
-#include "desktop/pencommon/BatchObserver.h"
 #include "desktop/pencommon/PenDataManager.h"
 #include "gl/IGLMsgQueue.h"
 #include "gl/ITask.h"
 #include "pencommon/Pen.h"
 #include "pencommon/PenDrawableGL.h"
-#include "pencommon/PenOutlineDrawableRT.h"
 #include "pencommon/PenStrokeDrawableRT.h"
+#include "support/LogCapture.h"
 
 namespace {
 
@@ -37,9 +40,6 @@ class NotingRT : public Qelt::PenStrokeDrawableRT {
     mNotes.push_back("create " + std::to_string(width) + " x " + std::to_string(height));
   }
   void Release() override { mNotes.push_back("release"); }
-
-  bool hasPendingData() const { return mHasPendingData; }
-  const Qelt::Vector4<float>& color() const { return mPenColor; }
 
  private:
   Notes& mNotes;
@@ -116,6 +116,47 @@ TEST(Drawables, PrepareAndReleaseTheirPartnerThroughAQueueThatMayRefuse) {
   }
 }
 
+// The queue still has work for the partner, and takes no more: then the partner goes after that work, or
+// stays where nobody could wait for it.
+TEST(Drawables, APartnerOutlivesItsWorkHoweverItsQueueEnds) {
+  const QeltTests::LogCapture log;
+  Notes notes;
+  {
+    RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::None);
+    PenDataManager manager(&queue);
+    auto drawable = std::make_unique<PlainGL>(&manager, new NotingRT(notes));
+    std::promise<void> closed;
+    // Both from the render thread: neither runs before both are posted.
+    queue.run([&] {
+      QeltDesktop::postCall(queue, [&] {
+        queue.shutDown();
+        closed.set_value();
+        std::this_thread::sleep_for(std::chrono::milliseconds(20));
+      });
+      QeltDesktop::postCall(queue, [&] { notes.push_back("drawn"); });
+    });
+    closed.get_future().wait();
+    drawable.reset();
+    EXPECT_THAT(notes, ElementsAre("drawn", "gone"));
+  }
+  notes.clear();
+  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None),
+      other(RenderQueue::Mode::Caller, RenderQueue::GL::None);
+  PenDataManager manager(&queue);
+  const std::unique_ptr<NotingRT> left(new NotingRT(notes));
+  auto drawable = std::make_unique<PlainGL>(&manager, left.get());
+  PenCanvas canvas(&queue, nullptr), others(&other, nullptr);
+  drawable->SetCanvas(&canvas);
+  QeltDesktop::postCall(queue, [&] { notes.push_back("drawn"); });
+  drawable->SetCanvas(&others);
+  EXPECT_THAT(notes, ElementsAre("drawn")) << "ahead of anything that the other canvas's queue runs";
+  QeltDesktop::postCall(queue, [&] { notes.push_back("drawn on"); });
+  queue.accept = [](const Qelt::ITask&) { return false; };
+  std::thread([&] { drawable.reset(); }).join();  // may post, and not wait
+  queue.finish();
+  EXPECT_THAT(notes, ElementsAre("drawn", "drawn on"));
+}
+
 TEST(Drawables, OutliveTheRenderThread) {
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
   PenDataManager manager(&queue);
@@ -128,39 +169,6 @@ TEST(Drawables, OutliveTheRenderThread) {
     queue.shutDown();
   }
   EXPECT_THAT(notes, ElementsAre("create 8 x 8", "release", "gone"));
-}
-
-TEST(Drawables, SplitTheColourIntoSharesAndShowHandOversToTheObserver) {
-  Notes notes;
-  NotingRT stroke(notes);
-  stroke.SetPenData(3.0f, static_cast<int>(0x80FF3300u));
-  EXPECT_EQ(stroke.color().x, 1.0f);
-  EXPECT_EQ(stroke.color().y, 0.2f);  // 51 / 255
-  EXPECT_EQ(stroke.color().z, 0.0f);
-  EXPECT_EQ(stroke.color().w, 128.0f / 255.0f);
-
-  Qelt::PenOutlineDrawableRT outline(nullptr);
-  std::vector<QeltDesktop::Batch> seen;
-  QeltDesktop::setBatchObserver([&](QeltDesktop::Batch batch) { seen.push_back(std::move(batch)); });
-  std::vector<float> first{1, 2}, second{3}, empty;
-  stroke.SendDataToGPU(&first);
-  EXPECT_TRUE(stroke.hasPendingData());
-  stroke.Clear();
-  EXPECT_FALSE(stroke.hasPendingData());
-  stroke.SetCacheBuffer(&empty);
-  stroke.SendDataToGPU(nullptr);
-  outline.SendDataToGPU(&second, &first);
-  QeltDesktop::setBatchObserver(nullptr);
-  stroke.SendDataToGPU(&first);
-
-  ASSERT_EQ(seen.size(), 3u);
-  EXPECT_EQ(seen[0].drawable, &stroke);
-  EXPECT_FALSE(seen[0].cached);
-  EXPECT_THAT(seen[0].buffers, ElementsAre(first));
-  EXPECT_TRUE(seen[1].cached);
-  EXPECT_THAT(seen[1].buffers, ElementsAre(empty));
-  EXPECT_EQ(seen[2].drawable, &outline);
-  EXPECT_THAT(seen[2].buffers, ElementsAre(second, first));
 }
 
 TEST(PenBase, AStrokesRectIsItsPointsGrownByTheSize) {

@@ -15,7 +15,7 @@
 #include "desktop/gl/CallTask.h"
 #include "desktop/gl/RenderQueue.h"
 #include "gl/ITask.h"
-#include "support/Allocations.h"
+#include "support/AllocationGate.h"
 #include "support/LogCapture.h"
 
 namespace {
@@ -85,7 +85,6 @@ TEST_P(Queue, RefusesWithoutTakingOwnershipAndIgnoresNull) {
 
 // So a layer, too, can go while there is none; and a task that runs out of it takes nothing else along.
 TEST_P(Queue, AsksForNoMemory) {
-  if (!QeltTests::countsAllocations()) GTEST_SKIP();
   std::atomic<int> alive{0}, ran{0};
   RenderQueue queue(GetParam(), RenderQueue::GL::None);
   auto* const task = new CountedTask(alive, ran);

@@ -11,8 +11,6 @@
 #include <string>
 #include <vector>
 
-#include "support/Allocations.h"
-
 namespace {
 
 using Qelt::SmPath;
@@ -159,14 +157,6 @@ TEST(SmPath, TangentsPointAlongTheWayThereAndBack) {
     EXPECT_EQ(at.y, 0.0f);
     EXPECT_FLOAT_EQ(along.x, direction);
   }
-  build(path, {0, 0, 30, 0, 30, 40});
-  SmPoint at, along;
-  ASSERT_TRUE(path.getPosTan(0.0f, &at, &along));
-  EXPECT_NEAR(along.x, 1.0f, 1e-6f);
-  EXPECT_NEAR(along.y, 0.0f, 1e-6f);
-  ASSERT_TRUE(path.getPosTan(path.getLength(), nullptr, &along));
-  EXPECT_NEAR(along.x, 0.0f, 1e-5f);
-  EXPECT_NEAR(along.y, 1.0f, 1e-5f);
 }
 
 TEST(SmPath, QueriesInAnyOrderAnswerTheSame) {
@@ -236,26 +226,6 @@ TEST(SmPath, APathWithoutLengthHasOnePosition) {
   EXPECT_FALSE(path.getPosTan(1e-6f, &at, nullptr));
 }
 
-TEST(SmPath, MeasuresTheContourThatWasAskedFor) {
-  SmPath path;
-  path.moveTo(0, 0);
-  path.lineTo(1, 0);
-  path.moveTo(10, 10);
-  path.lineTo(10, 15);
-  path.resetPath(1);
-  EXPECT_EQ(path.getLength(), 5.0f);
-  SmPoint at;
-  ASSERT_TRUE(path.getPosTan(2.0f, &at, nullptr));
-  EXPECT_EQ(at.x, 10.0f);
-  EXPECT_EQ(at.y, 12.0f);
-  path.resetPath(0);
-  EXPECT_EQ(path.getLength(), 1.0f);
-  for (const int missing : {2, -1}) {
-    path.resetPath(missing);
-    EXPECT_FALSE(path.getPosTan(0.0f, &at, nullptr));
-  }
-}
-
 TEST(SmPath, CoordinatesThatAreNoNumbersAreNoWay) {
   for (const float bad : {kNaN, kInfinity, -kInfinity}) {
     for (int place = 0; place < 6; ++place) {
@@ -275,28 +245,6 @@ TEST(SmPath, CoordinatesThatAreNoNumbersAreNoWay) {
   SmPoint at;
   path.getPosTan(1e38f, &at, nullptr);
   EXPECT_GT(path.getLength(), 0.0f);
-}
-
-TEST(SmPath, RoomMayBeAskedForAndFreedAndWhatItCannotHoldIsLeftOut) {
-  SmPath path;
-  for (const int room : {std::numeric_limits<int>::max(), -1, 3}) path.incReserve(room);
-  build(path, {0, 0, 1, 1, 2, 0});
-  path.freeMemory();
-  EXPECT_EQ(path.getLength(), 0.0f);
-  path.resetPath(0);
-  build(path, {0, 0, 1, 0, 2, 0});
-  EXPECT_EQ(path.getLength(), 2.0f);
-
-  // The path itself, and the room for segments and contours.
-  for (long number = 0; number < 3 && QeltTests::countsAllocations(); ++number) {
-    const QeltTests::FailingAllocation failing(number);
-    SmPath poor;
-    poor.incReserve(3);
-    build(poor, {0, 0, 1, 0, 2, 0});
-    poor.getPosTan(0.0f, nullptr, nullptr);
-    EXPECT_LE(poor.getLength(), 2.0f);
-    EXPECT_TRUE(failing.hasFailed());
-  }
 }
 
 }  // namespace

@@ -15,19 +15,13 @@
 #include <utility>
 #include <vector>
 
-#include "AllocationGate.h"
-#include "base/PointF.h"
-#include "base/RectF.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/graphics/CanvasLayer.h"
-#include "desktop/graphics/PenCanvas.h"
 #include "desktop/pencommon/BatchObserver.h"
-#include "desktop/pencommon/PenDataManager.h"
-#include "engine/MotionEvent.h"
 #include "pencommon/Pen.h"
-#include "pencommon/PenOutlineDrawableGL.h"
-#include "pencommon/PenStrokeDrawableGL.h"
+#include "support/AllocationGate.h"
 #include "support/LogCapture.h"
+#include "support/PenBoard.h"
 
 namespace QeltTests {
 namespace {
@@ -51,10 +45,10 @@ class Loaded {
   }
   void* handle() const { return mHandle; }
   const void* symbol(const char* name) const { return dlsym(mHandle, name); }
-  std::unique_ptr<Qelt::Pen> makePen() const {
+  Qelt::Pen* makePen() const {
     const auto create = reinterpret_cast<Qelt::Pen* (*)()>(dlsym(mHandle, "createPenInst"));
     if (create == nullptr) throw std::runtime_error(dlerror());
-    return std::unique_ptr<Qelt::Pen>(create());
+    return create();
   }
 
  private:
@@ -62,44 +56,17 @@ class Loaded {
 };
 
 // A host with one pen of a library.
-class Desk {
+class Desk : public PenBoard {
  public:
-  Desk(const Loaded& library, RenderQueue& queue, QeltDesktop::CanvasLayer* layer)
-      : mQueue(queue), mCanvas(&queue, layer), mData(&queue), mPen(library.makePen()) {
-    mPen->setPenDataManager(&mData);
-    mPen->setVersion(8);
-    mPen->SetSize(5.0f);
-    mPen->GetStrokeDrawableGL()->SetCanvas(&mCanvas);
-    mPen->GetOutlineDrawableGL()->SetCanvas(&mCanvas);
-  }
-  ~Desk() {
-    mPen.reset();
-    mQueue.finish();
+  Desk(const Loaded& library, RenderQueue& itsQueue, QeltDesktop::CanvasLayer* itsLayer)
+      : PenBoard({.size = 5.0f}, itsQueue, itsLayer, [&library] { return library.makePen(); }) {
+    keepsUp = true;
   }
 
-  static constexpr int kEvents = 4;
-  // One of the events of a stroke.
-  void event(int number) {
-    constexpr int kActions[kEvents] = {Qelt::kActionDown, Qelt::kActionMove, Qelt::kActionMove,
-                                       Qelt::kActionUp};
-    constexpr Qelt::PointF kPoints[kEvents] = {
-        {10.3f, 10.4f}, {40.3f, 14.4f}, {60.3f, 44.4f}, {90.3f, 50.4f}};
-    const Qelt::PointerProperties pointer{0, Qelt::kToolStylus};
-    const Qelt::PointerCoords coords{kPoints[number].x, kPoints[number].y, 0.6f, 0.3f, 0.4f};
-    const Qelt::MotionEvent made(0, 1, kActions[number], 1, &pointer, &coords, 0, Qelt::kSourceStylus, 0);
-    Qelt::RectF rect;
-    mPen->GetStrokeDrawableGL()->Draw(&made, &rect);
-    mQueue.finish();
+  static std::vector<Sample> samples() {
+    return {{10.3f, 10.4f, 0.6f, 0.3f, 0.4f}, {40.3f, 14.4f}, {60.3f, 44.4f}, {90.3f, 50.4f}};
   }
-  void stroke() {
-    for (int number = 0; number < kEvents; ++number) event(number);
-  }
-
- private:
-  RenderQueue& mQueue;
-  QeltDesktop::PenCanvas mCanvas;
-  QeltDesktop::PenDataManager mData;
-  std::unique_ptr<Qelt::Pen> mPen;
+  void stroke() { draw(Kind::Live, samples()); }
 };
 
 // Whether the library really went after it was loaded and drew a stroke.
@@ -167,12 +134,11 @@ TEST(Loading, WithAPictureLeavesNoShaderOfTheLibraryBehind) {
   QeltDesktop::CanvasLayer layer(queue, 128, 64);
   std::vector<std::uint8_t> first;
   for (int i = 0; i < 10; ++i) {
-    layer.clear();
     ASSERT_TRUE(drawsAndGoes(queue, &layer));
+    const std::vector<std::uint8_t> pixels = layer.readPixels();
     // Nothing that is restored may be the library's.
     queue.loseContext();
     queue.restoreContext();
-    const std::vector<std::uint8_t> pixels = layer.readPixels();
     if (first.empty()) first = pixels;
     EXPECT_TRUE(pixels == first) << "load " << i + 1;
   }
@@ -186,20 +152,21 @@ TEST(Loading, TwoCopiesDrawInTurnsAsOneDoesAlone) {
   const Loaded one(QELT_PLUGIN_PATH), other(copy.path);
   ASSERT_NE(one.symbol("versionTable"), other.symbol("versionTable")) << "the same library twice";
   Batches batches;
+  Desk left(one, queue, nullptr), right(other, queue, nullptr);
   QeltDesktop::setBatchObserver([&](const QeltDesktop::Batch& batch) {
     batches.insert(batches.end(), batch.buffers.begin(), batch.buffers.end());
   });
-  Desk left(one, queue, nullptr), right(other, queue, nullptr);
   left.stroke();
   const Batches alone = std::exchange(batches, {});
-  ASSERT_EQ(alone.size(), static_cast<std::size_t>(Desk::kEvents));
-  for (int i = 0; i < Desk::kEvents; ++i) {
-    for (Desk* desk : {&left, &right}) {
-      desk->event(i);
-      EXPECT_EQ(batches, (Batches{alone[static_cast<std::size_t>(i)]})) << "event " << i;
-      batches.clear();
-    }
-  }
+  ASSERT_EQ(alone.size(), 4u);
+  // Before each call of the one the other draws its stroke.
+  left.beforeCall = [&](auto&) {
+    const Batches ofLeft = std::exchange(batches, {});
+    right.stroke();
+    EXPECT_EQ(std::exchange(batches, ofLeft), alone);
+  };
+  left.stroke();
+  EXPECT_EQ(batches, alone);
   QeltDesktop::setBatchObserver(nullptr);
 }
 
@@ -214,6 +181,8 @@ TEST(Loading, ACopyDrawsOnWithTheShadersThatAnotherBrought) {
   auto left = std::make_unique<Desk>(*one, queue, &layer);
   // The registry knows shaders by their class: this desk's are the left one's.
   Desk right(other, queue, &layer);
+  left->prepareAll();
+  right.prepareAll();
   left->stroke();
   before = layer.readPixels();
   layer.clear();

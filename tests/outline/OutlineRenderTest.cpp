@@ -5,16 +5,9 @@
 #include <cstdint>
 #include <fstream>
 #include <iterator>
-#include <memory>
 #include <string>
 #include <vector>
 
-#include "desktop/gl/RenderQueue.h"
-#include "desktop/graphics/CanvasLayer.h"
-#include "desktop/pencommon/PenDataManager.h"
-#include "graphics/ISPBitmap.h"
-#include "math/Matrix4.h"
-#include "outline/Pencil2OutlineDrawableRTV1.h"
 #include "support/DrawableBoard.h"
 #include "support/LogCapture.h"
 
@@ -22,7 +15,6 @@ namespace QeltTests {
 namespace {
 
 using testing::ElementsAre;
-using testing::IsEmpty;
 
 constexpr int kSide = 120;
 
@@ -101,108 +93,25 @@ TEST(OutlinePicture, WithoutASizeTheInsideIsErasedToNothing) {
   }
 }
 
-TEST(OutlinePicture, ATiltedPenLeavesASlabThatIsErasedThinner) {
-  // Factor 0.5: half a quarter of the stamp's width to each side in colour, 1 / 6.5 erased.
-  const Sample tilted{60.3f, 60.0f, 0.5f, 0.79f, 0.0f};
-  const auto pixels = outlinePicture(0.0f, {tilted});
-  // Along the y axis, the stamp is (30 * 1.75 + 1) across: 1 / 4 of it to each side is coloured, 2 / 13
-  // erased.
-  EXPECT_EQ(alphaAt(pixels, 60 + 10, 60), 255);
-  EXPECT_EQ(alphaAt(pixels, 60 + 4, 60), 0);
-  EXPECT_EQ(alphaAt(pixels, 60 + 18, 60), 0);
-  EXPECT_EQ(alphaAt(pixels, 60, 60 + 20), 0);
-}
-
-// The drawable alone, on a queue of its own.
-class OutlineRenderer : public testing::Test {
- protected:
-  OutlineRenderer() {
-    const Qelt::Vector2<float> stamp[2] = {{60.0f, 60.0f}, {0.0f, 1.0f}};
-    drawable->SetOutlineSize(5.0f);
-    drawable->SetOutlineColor(0xFF00FF00u);
-    drawable->SetBuffer(&inner, &outer);
-    drawable->AddPoint(stamp, 40.0f, 0.0f);
-    drawable->SetBuffer(nullptr, nullptr);
-    drawable->AddPoint(stamp, 40.0f, 0.0f);  // goes nowhere
-  }
-  ~OutlineRenderer() override {
-    queue.run([this] { drawable.reset(); });
-  }
-
-  void draw() {
-    queue.run([this] {
-      Qelt::Matrix4<float> identity;
-      drawable->Draw(layer.GetBitmap()->GetSubBitmap(0), identity);
-    });
-  }
-  int rim() { return alphaAt(layer.readPixels(), 60 + 22, 60); }
-
-  std::vector<float> inner, outer;
-  QeltDesktop::RenderQueue queue{QeltDesktop::RenderQueue::Mode::Caller,
-                                 QeltDesktop::RenderQueue::GL::Context};
-  QeltDesktop::CanvasLayer layer{queue, kSide, kSide};
-  QeltDesktop::PenDataManager data{&queue};
-  std::unique_ptr<Qelt::Pencil2OutlineDrawableRTV1> drawable =
-      std::make_unique<Qelt::Pencil2OutlineDrawableRTV1>(&data);
-};
-
-TEST_F(OutlineRenderer, DrawsOnlyWhenThereIsSomethingToDrawWith) {
-  EXPECT_EQ(inner.size(), 42u);
-  EXPECT_EQ(outer[0], inner[0] - 5.0f);
-  queue.run([this] { drawable->SendDataToGPU(&inner, &outer); });
-  draw();  // before Init
-  EXPECT_EQ(rim(), 0);
-  queue.run([this] {
-    for (int twice = 0; twice < 2; ++twice) drawable->CreatePenCanvas(0, 0, nullptr);
-    drawable->Update(true);
-    Qelt::Matrix4<float> identity;
-    drawable->Draw(nullptr, identity);
-  });
-  EXPECT_EQ(rim(), 0);
-  draw();
-  EXPECT_EQ(rim(), 255);
-
-  layer.clear();
-  std::vector<float> none;
-  queue.run([&] { drawable->SendDataToGPU(&inner, &none); });
-  draw();
-  queue.run([&] { drawable->SendDataToGPU(nullptr, &outer); });
-  draw();
-  EXPECT_EQ(rim(), 0);  // one stream alone draws nothing
-
-  queue.run([&] {
-    drawable->SendDataToGPU(&inner, &outer);
-    drawable->Clear();
-    drawable->Update(false);
-  });
-  EXPECT_THAT(inner, IsEmpty());
-  EXPECT_THAT(outer, IsEmpty());
-  draw();
-  EXPECT_EQ(rim(), 0);
-  queue.run([this] { drawable->Release(); });
-  draw();
-  queue.run([this] { drawable->Release(); });
-}
-
-TEST_F(OutlineRenderer, NotesWhatItDoes) {
+// Kept: of both streams it says 1.
+TEST(Outline, NotesWhatItDoes) {
   LogCapture log;
-  queue.run([this] {
-    drawable->CreatePenCanvas(0, 0, nullptr);
-    drawable->SendDataToGPU(&inner, &outer);
-    drawable->Update(false);
-    drawable->RestoreGLObject();
-    drawable->Release();
-  });
-  std::vector<std::string> lines;
-  for (const LogLine& line : log.take()) {
-    EXPECT_EQ(line.priority, 3);
-    if (line.text.find("Pencil2OutlineDrawableRTV1::") != std::string::npos) lines.push_back(line.text);
+  {
+    OutlineBoard board({.version = 4, .size = 30.0f, .width = kSide, .height = kSide});
+    board.outline({{60.0f, 60.0f}});
+    board.queue.finish();
+    board.queue.loseContext();
+    board.queue.restoreContext();
   }
+  std::vector<std::string> lines;
   const std::string name = "virtual void Qelt::Pencil2OutlineDrawableRTV1::";
-  // Kept: both streams say 1.
-  EXPECT_THAT(lines,
-              ElementsAre(name + "Update(bool)", name + "Update(bool) 1 size 42",
-                          name + "Update(bool) 1 size 42", name + "RestoreGLObject()", name + "Release()"));
+  for (const LogLine& line : log.take()) {
+    if (line.text.rfind(name, 0) != 0) continue;
+    EXPECT_EQ(line.priority, 3);
+    lines.push_back(line.text.substr(name.size()));
+  }
+  EXPECT_THAT(lines, ElementsAre("Update(bool)", "Update(bool) 1 size 42", "Update(bool) 1 size 42",
+                                 "RestoreGLObject()", "Release()"));
 }
 
 // Kept: tools that show bitmaps by name find the outline's texture under another drawable's.

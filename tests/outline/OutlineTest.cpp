@@ -2,27 +2,18 @@
 
 #include <cmath>
 #include <cstddef>
-#include <limits>
 #include <string>
-#include <utility>
 #include <vector>
 
-#include "base/Error.h"
-#include "desktop/model/StoredStroke.h"
 #include "engine/MotionEvent.h"
 #include "outline/OutlineDrawables.h"
 #include "support/DrawableBoard.h"
-#include "support/Versions.h"
 
 namespace QeltTests {
 namespace {
 
-using Qelt::Error;
 using Qelt::MotionEvent;
-using Qelt::RectF;
-using QeltDesktop::StoredStroke;
 using testing::ElementsAre;
-using testing::IsEmpty;
 using testing::SizeIs;
 
 class OutlineVersions : public testing::TestWithParam<int> {
@@ -97,58 +88,9 @@ TEST_P(OutlineVersions, EventsAndStoredStrokesGiveTheSameOutlineInTwoStreams) {
   }
 }
 
-TEST_P(OutlineVersions, RefusesWhatIsMissing) {
-  OutlineBoard board({.version = version, .size = 6.0f});
-  const MotionEvent event = board.recorded(kStroke);
-  const StoredStroke empty(Qelt::kToolStylus);
-  const MotionEvent* const noEvent = nullptr;
-  const StoredStroke* const noStroke = nullptr;
-  RectF rect;
-  EXPECT_TRUE(isRefused([&] { return board.drawable->DrawOutline(noEvent, &rect); }));
-  EXPECT_TRUE(isRefused([&] { return board.drawable->DrawOutline(noStroke, &rect); }));
-  EXPECT_TRUE(isRefused([&] { return board.drawable->DrawOutline(&event, nullptr); }));
-  EXPECT_TRUE(isRefused([&] { return board.drawable->DrawOutline(&empty, nullptr); }));
-  Error::SetError(0);
-  EXPECT_TRUE(board.outline(empty));  // Kept: on curves true all the same
-  EXPECT_EQ(Error::GetError(), Error::kInvalidArgument);
-  board.shared.mCurveEnabled = false;
-  EXPECT_TRUE(isRefused([&] { return board.outline(empty); }));
-  EXPECT_THAT(board.takeStamps(), IsEmpty());
-  // Nor does a size that is none place anything.
-  for (const float size : {0.0f, -3.0f, NAN, INFINITY}) {
-    board.settings.size = size;
-    board.outline({{1.0f, 2.0f}, {50.0f, 2.0f}});
-    EXPECT_THAT(board.takeStamps(), IsEmpty());
-  }
-  board.takePosts();
-  board.drawable->SetCanvas(nullptr);
-  EXPECT_FALSE(board.outline(event));
-  EXPECT_THAT(board.takePosts(), IsEmpty());
-}
-
 INSTANTIATE_TEST_SUITE_P(Versions, OutlineVersions, testing::ValuesIn(outlineVersions()), versionName);
 
 // --- What tells the versions apart ---
-
-TEST(Outline, VersionFourDividesEachSegmentAndRampsToItsTarget) {
-  OutlineBoard board({.version = 4, .size = 4.0f, .curve = false});
-  board.outline({{0.5f, 0.5f}, {10.5f, 0.5f}});  // 10 long: 20 stamps, then the closing segment of none
-  const std::vector<Stamp> stamps = board.takeStamps();
-  ASSERT_THAT(stamps, SizeIs(21));
-  for (int i = 0; i < 20; ++i) {
-    EXPECT_FLOAT_EQ(stamps[i].x, std::trunc(0.5f + 0.5f * static_cast<float>(i))) << i;
-    EXPECT_NEAR(stamps[i].halfWidth, (0.2f * static_cast<float>(i) + 1.0f) / 2.0f, 1e-4f) << i;  // 0 to 4
-  }
-  // The end repeats the last point: a path without length holds its one stamp.
-  EXPECT_FLOAT_EQ(stamps[20].x, 10.0f);
-  EXPECT_NEAR(stamps[20].halfWidth, 2.5f, 1e-4f);
-}
-
-TEST(Outline, VersionOneCountsBySizeAndAQuarterOfTheLength) {
-  OutlineBoard board({.version = 1, .size = 8.0f, .curve = false});
-  board.outline({{0.0f, 0.0f}, {40.0f, 0.0f}});
-  EXPECT_THAT(board.takeStamps(), SizeIs(15));  // trunc(40 / 8) + 40 / 4; the end is too short for one
-}
 
 // Kept: a segment below 1 moves the mid point and enters the histories, but neither the last point nor the
 // mean orientation that the next sample is unwrapped against.
@@ -164,26 +106,6 @@ TEST(Outline, VersionOneDropsShortSegmentsAndKeepsTheMeanOrientation) {
   const float mean = (48.0f * 3.0f + 3.283185f - 0.139f) / 50.0f;
   EXPECT_NEAR(stamps[0].directionX, -std::sin(mean), 1e-5f);
   EXPECT_NEAR(stamps[0].directionY, std::cos(mean), 1e-5f);
-}
-
-TEST(Outline, VersionFiveCapsTiltHigherAndAveragesThreeSamples) {
-  std::vector<Sample> samples;
-  for (int i = 0; i < 5; ++i) samples.push_back({20.0f * static_cast<float>(i), 0.0f, 0.5f, 1.3f});
-  // (0.79 - 0.75) / 0.08 and (1 - 0.05) / 1.9 are a half both.
-  for (const auto& [version, cap] : {std::pair(4, 0.79f), std::pair(5, 1.0f)}) {
-    OutlineBoard board({.version = version, .size = 4.0f, .curve = false});
-    const MotionEvent event = board.recorded(samples);
-    board.outline(event);
-    EXPECT_EQ(event.GetHistoricalTilt(2), cap);
-    EXPECT_EQ(event.GetTilt(0), cap);
-    EXPECT_NEAR(board.takeStamps().back().narrowing, 0.5f, 1e-4f);
-  }
-  samples[0].tilt = 0.0f;  // upright, then three of the samples at 1
-  OutlineBoard five({.version = 5, .size = 4.0f, .curve = false});
-  five.outline(samples);
-  const std::vector<Stamp> stamps = five.takeStamps();
-  EXPECT_NEAR(stamps.front().narrowing, (1.0f / 3.0f - 0.05f) / 1.9f, 1e-5f);
-  EXPECT_NEAR(stamps.back().halfWidth, 7.5f, 0.1f);  // 4 + 4 * 5 * 0.5, and 1
 }
 
 TEST(Outline, FingersTakeShortMovesEveryOtherTime) {

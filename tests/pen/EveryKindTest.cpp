@@ -16,7 +16,6 @@
 #include "support/LogCapture.h"
 #include "support/PenBoard.h"
 #include "support/Stamps.h"
-#include "support/Versions.h"
 
 namespace QeltTests {
 namespace {
@@ -302,7 +301,7 @@ TEST(CutSegments, AreSaidOnceAStroke) {
   const Case cases[] = {
       {{Kind::Live, 7}, {"Pencil2StrokeDrawableGLV7"}},
       // What is cached is not walked.
-      {{Kind::Redraw, 1}, std::vector<std::string>(3, "Pencil2StrokeDrawableGLV1")},
+      {{Kind::Redraw, 1}, std::vector<std::string>(4, "Pencil2StrokeDrawableGLV1")},
       {{Kind::Outline, 8}, std::vector<std::string>(2, "Pencil2OutlineDrawableGLV4")},
       {{Kind::Preview, 8}, std::vector<std::string>(2, "Pencil2PreviewDrawableGL")},
       {{Kind::Prediction, 8}, {"Pencil2StrokeDrawableGLV8", "Pencil2PredictionDrawableGL"}}};
@@ -383,23 +382,22 @@ TEST(LongSession, KeepsNoGlNames) {
   const std::vector<Sample> samples = {{20.3f, 20.6f}, {50.1f, 31.4f}, {30.2f, 50.3f}, {70.7f, 40.1f}};
   const auto drawAll = [&](int version) {
     board.pen->setVersion(version);
-    for (const Kind kind : {Kind::Live, Kind::Redraw, Kind::Outline, Kind::Preview, Kind::Prediction}) {
-      if (kind != Kind::Prediction || version == 8) board.draw(kind, samples);
-    }
+    for (const Kind kind : kAllKinds) board.draw(kind, samples);
     board.takeBatches();
+    board.turnPage();
   };
   const auto countNames = [&] {
-    drawAll(8);
+    drawAll(newestVersion());
     int names = 0;
     board.queue.run([&] { names = liveNames(); });
     return names;
   };
   const int early = countNames();
   EXPECT_GT(early, 5);
-  constexpr int kRounds = QELT_SANITIZED ? 40 : 240;  // 9 strokes each
+  constexpr int kRounds = QELT_SANITIZED ? 40 : 240;  // ten strokes each
   for (int round = 1; round <= kRounds; ++round) {
     board.canvas.setMatrix(viewOf(0.5f + 0.25f * static_cast<float>(round % 5)));
-    drawAll(1 + round % 8);
+    drawAll(1 + round % newestVersion());
     if (round % 10 == 0) {
       board.deletePen();
       board.makePen();

@@ -1,8 +1,5 @@
 #include <gmock/gmock.h>
 
-#include <cstddef>
-#include <vector>
-
 #include "render/StampVertices.h"
 
 namespace Qelt {
@@ -41,35 +38,6 @@ TEST(AntialiasedQuadTest, AddsHalfADevicePixelAndWidensThinStampsAndDimsThem) {
     EXPECT_FLOAT_EQ(quad.innerRadius, innerRadius);
     EXPECT_FLOAT_EQ(quad.alphaByWidth, alphaByWidth);
   }
-}
-
-// The appender writes blocks of 16; whatever the count, the batch holds every stamp once and in order.
-TEST(StampAppenderTest, AppendsEveryStampInOrderWhateverTheCount) {
-  for (const std::size_t count : {0u, 1u, 15u, 16u, 17u, 32u, 100u}) {
-    std::vector<float> batch{42.0f};  // what is there stays
-    StampAppender<kSquareVertex.floats()> stamps(&batch, count);
-    for (std::size_t i = 0; i < count; ++i) {
-      const auto x = static_cast<float>(i);
-      stamps.add(stampQuad({x, 0.0f}, squareExtent(2.0f)), {x, 0.0f, 1.0f, {0.0f, 1.0f}});
-    }
-    stamps.flush();
-    ASSERT_EQ(batch.size(), 1 + count * 54) << count;
-    EXPECT_EQ(batch[0], 42.0f);
-    for (std::size_t i = 0; i < count; ++i) EXPECT_EQ(batch[1 + i * 54 + 4], static_cast<float>(i));
-  }
-  StampAppender<kSquareVertex.floats()> nowhere(nullptr, 40);
-  for (int i = 0; i < 40; ++i) nowhere.add({}, {});
-  nowhere.flush();
-}
-
-TEST(ReserveStampsTest, MakesRoomAndAtLeastDoubles) {
-  std::vector<float> batch;
-  reserveStamps(&batch, 3, 66);
-  EXPECT_GE(batch.capacity(), 198u);
-  batch.resize(198);
-  reserveStamps(&batch, 1, 66);
-  EXPECT_GE(batch.capacity(), 396u);
-  reserveStamps(nullptr, 1, 66);  // nowhere to make room
 }
 
 }  // namespace

@@ -6,6 +6,7 @@
 #include <functional>
 #include <new>
 #include <stdexcept>
+#include <vector>
 
 #include "desktop/engine/PluginLibrary.h"
 #include "desktop/gl/CallTask.h"
@@ -57,17 +58,23 @@ TEST(PageLayout, TurnsClockwiseAboutTheCentreAndGrows) {
   expectLayout(eighth, side, side, 100, 200, 28.284f, 0.0f);  // 20 * sqrt(2), at the very top
 }
 
-// Draws a zigzag of 200 far points, 40 MB of vertices in all, in a queue that runs nothing by itself.
-void drawZigzag() {
+// Draws a zigzag of far points, 200 of which make 40 MB of vertices, in a queue that runs nothing by itself.
+std::vector<std::uint8_t> drawZigzag(int points = 200,
+                                     const std::function<void(RenderQueue&)>& prepare = {}) {
   Page page;
-  for (int i = 0; i < 200; ++i) {
+  for (int i = 0; i < points; ++i) {
     page.strokes.addSample({.x = i % 2 == 0 ? 0.0f : 600.0f, .y = static_cast<float>(i), .time = 4.0 * i});
   }
   page.strokes.finishStroke(kNoNumber, {});
   const PluginLibrary plugin(QELT_PLUGIN_PATH);
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
+  if (prepare) prepare(queue);
   Progress progress("drawing stroke", 1);
-  drawPage(plugin, queue, page, Options(), layOut({0, 0, 32, 32}, 1, 0), {.stroke = true}, progress);
+  Options options;
+  options.outline = {2.0f, 0xFF0000FFu};
+  return drawPage(plugin, queue, page, options, layOut({0, 0, 32, 32}, 1, 0),
+                  {.stroke = true, .outline = points < 200}, progress)
+      .rgba;
 }
 
 TEST(PageDrawing, IsOnlySoFarAheadOfTheRenderThread) {
@@ -89,6 +96,29 @@ TEST(PageDrawing, OfWhichSomethingWasLostIsNoPicture) {
   setBatchObserver([](const Batch&) { throw std::runtime_error("lost"); });
   EXPECT_THROW(drawZigzag(), std::runtime_error);
   setBatchObserver({});
+}
+
+TEST(PageDrawing, StartsAgainWhereTheContextIsLost) {
+  int posts = 0, lost = 0;  // how often; from that post on, each time
+  const auto losing = [&](int number, int times) {
+    return [&, number, times](RenderQueue& queue) {
+      posts = lost = 0;
+      queue.accept = [&, number, times](const Qelt::ITask&) {
+        if (++posts % number == 0 && lost < times) {
+          ++lost;
+          queue.loseContext();
+          queue.restoreContext();
+        }
+        return true;
+      };
+    };
+  };
+  const std::vector<std::uint8_t> whole = drawZigzag(12, losing(1, 0));
+  const int all = posts;
+  for (const int number : {1, all / 2, all})
+    EXPECT_TRUE(drawZigzag(12, losing(number, 1)) == whole) << number;
+  EXPECT_NE(whole, std::vector<std::uint8_t>(whole.size(), 255));
+  EXPECT_THROW(drawZigzag(12, losing(all / 2, 1000)), std::runtime_error) << "no end";
 }
 
 TEST(CallRecorder, LeavesNoCallWithoutItsBatches) {

@@ -1,6 +1,5 @@
 #include <gmock/gmock.h>
 
-#include <cmath>
 #include <limits>
 #include <string>
 #include <vector>
@@ -8,8 +7,6 @@
 #include "engine/MotionEvent.h"
 #include "support/DrawableBoard.h"
 #include "support/LogCapture.h"
-#include "support/Stamps.h"
-#include "support/Versions.h"
 
 namespace QeltTests {
 namespace {
@@ -17,21 +14,9 @@ namespace {
 using Qelt::MotionEvent;
 using testing::ElementsAre;
 using testing::IsEmpty;
-using testing::Not;
 
 constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
 constexpr float kInfinity = std::numeric_limits<float>::infinity();
-
-// A stroke with a corner, a short move and changing pressure.
-const std::vector<Sample> kStroke = {{10.0f, 10.0f, 0.3f},        {14.0f, 11.0f, 0.5f, 0.3f, 0.2f},
-                                     {22.0f, 11.5f, 0.9f, 0.77f}, {23.0f, 11.5f, 0.9f},
-                                     {24.0f, 19.0f, 0.4f},        {17.0f, 23.0f, 0.6f}};
-
-std::vector<float> drawn(DrawingBoard& board, const std::vector<Sample>& samples) {
-  board.takeBatches();
-  board.stroke(samples);
-  return board.takeFloats();
-}
 
 class LiveStroke : public testing::TestWithParam<int> {
  protected:
@@ -101,18 +86,6 @@ TEST_P(LiveStroke, PostsInOrderWhateverTheActionDid) {
   }
 }
 
-TEST_P(LiveStroke, AddsUpASlowDrag) {
-  DrawingBoard board({.version = version, .curve = false});
-  board.down({10.0f, 10.0f});
-  // Size 10: moves below 2 are dropped, and the last point stays.
-  EXPECT_TRUE(board.move({{11.0f, 10.0f}, {11.5f, 10.0f}, {11.9f, 10.0f}}));
-  EXPECT_THAT(board.takeStamps(), IsEmpty());
-  EXPECT_TRUE(board.move({{12.5f, 10.0f}}));
-  const std::vector<Stamp> stamps = board.takeStamps();
-  ASSERT_FALSE(stamps.empty());
-  EXPECT_THAT(stamps.front(), StampNear(version == 8 ? 10.4f : 10.0f, 10.0f, 1e-3f));
-}
-
 // Nothing but short moves: the stroke ends as a tap where it began, with the tool's pressure and size.
 TEST_P(LiveStroke, EndsAsATapWhenEveryMoveWasDropped) {
   DrawingBoard board({.version = version});
@@ -178,114 +151,6 @@ TEST_P(LiveStroke, WritesItsCorrectionsBackIntoTheEvent) {
   }
   EXPECT_NE(placed[0], placed[1]);
   EXPECT_EQ(placed[1], placed[2]);
-}
-
-// --- Bad input ---
-
-TEST_P(LiveStroke, DropsPointsThatAreNotFiniteAsIfTheyHadNotBeen) {
-  DrawingBoard board({.version = version});
-  EXPECT_FALSE(board.down({kNaN, 10.0f}));
-  EXPECT_FALSE(board.move({kStroke[1]}));  // nothing has begun
-  std::vector<Sample> broken = kStroke;
-  broken.insert(broken.begin() + 1, {kNaN, 3.0f});
-  broken.insert(broken.begin() + 3, {3.0f, kInfinity});
-  broken.insert(broken.end() - 1, {-kInfinity, kNaN});
-  const std::vector<float> clean = drawn(board, kStroke);
-  EXPECT_EQ(drawn(board, broken), clean);
-
-  // An end that is not finite leaves the closing segment out.
-  board.down(kStroke[0]);
-  board.move({kStroke[2]});
-  board.takeStamps();
-  EXPECT_TRUE(board.up({kNaN, kNaN}));
-  EXPECT_THAT(board.takeStamps(), IsEmpty());
-  EXPECT_TRUE(board.rect.left <= board.rect.right);
-}
-
-TEST_P(LiveStroke, ReplacesPressureAndAnglesThatAreNoNumbers) {
-  DrawingBoard board({.version = version});
-  const float substitute = version == 8 ? 0.6f : 0.5f;
-  const std::vector<float> plain =
-      drawn(board, {{10.0f, 10.0f, substitute}, {30.0f, 10.0f, substitute}, {50.0f, 10.0f, substitute}});
-  EXPECT_EQ(drawn(board, {{10.0f, 10.0f, kNaN, kNaN, kNaN},
-                          {30.0f, 10.0f, kNaN, kInfinity, -kInfinity},
-                          {50.0f, 10.0f, kNaN, -kInfinity, kInfinity}}),
-            plain);
-}
-
-TEST_P(LiveStroke, PlacesNothingAtASizeThatIsNoneAndBeginsAtTheFirstThatIsOne) {
-  for (const float size : {0.0f, -3.0f, kNaN, kInfinity, -kInfinity}) {
-    SCOPED_TRACE(size);
-    for (const bool curve : {true, false}) {
-      DrawingBoard board({.version = version, .size = size, .curve = curve});
-      board.stroke(kStroke);
-      board.stroke({kStroke[0], kStroke[0]});
-      board.redraw(board.recorded(kStroke));
-      board.redraw(*board.stored(kStroke));
-      EXPECT_THAT(board.takeStamps(), IsEmpty());
-    }
-  }
-  // Moves that no size drops.
-  const std::vector<Sample> tap = {kStroke[0], kStroke[0]},
-                            line = {kStroke[0], kStroke[1], kStroke[2], kStroke[5]};
-  DrawingBoard usual({.version = version, .size = 6.0f});
-  const std::vector<float> stroke = drawn(usual, line), dot = drawn(usual, tap);
-  for (const float size : {0.0f, -3.0f, kNaN, kInfinity}) {
-    const auto begunAtIt = [&](const std::vector<Sample>& samples) {
-      DrawingBoard board({.version = version, .size = size});
-      board.down(samples.front());
-      board.settings.size = 6.0f;
-      if (samples.size() > 2) board.move({samples.begin() + 1, samples.end()});
-      board.up(samples.back());
-      return board.takeFloats();
-    };
-    EXPECT_EQ(begunAtIt(tap), dot) << "begun at size " << size;
-    // A fifth of infinity is a minimum move that nothing reaches.
-    if (size != kInfinity) {
-      EXPECT_EQ(begunAtIt(line), stroke) << "begun at size " << size;
-    }
-  }
-}
-
-// From any size to any other, from event to event: vertices are finite, and no stamp has less than no width
-// or alpha, although the ramps fall by powers of ten and rounding goes with them.
-TEST_P(LiveStroke, StaysFiniteHoweverSizeColourAndViewChange) {
-  const LogCapture log;
-  DrawingBoard board({.version = version});
-  const float sizes[] = {1e30f, 1e-30f, 6.0f, 1e-6f, 1e8f, 0.0f, 3e38f, 1e-38f, -6.0f, kNaN, 1e5f, 2.0f};
-  const float zooms[] = {1.0f, 1e-30f, 1e30f, 1e-38f, 3e38f, 0.0f, kNaN};
-  std::size_t stamps = 0;
-  for (std::size_t i = 0; i < 84; ++i) {
-    board.settings.size = sizes[i % 12];
-    board.settings.color = i % 3 == 0 ? 0xFF000000u : 0u;
-    board.canvas.setMatrix(viewOf(zooms[i % 7]));
-    board.shared.mCurveEnabled = i % 5 != 0;
-    const auto x = static_cast<float>(i % 4 == 3 ? 1e29f : static_cast<float>(i) * 15.0f);
-    if (i % 20 == 0) board.down({0.0f, 0.0f, 0.5f, 0.79f, 1e38f});
-    board.move({{x, x, 0.1f, 0.0f, -1e38f}, {x + 15.0f, x, 1.0f, 0.79f, 3.0f}});
-    if (i % 20 == 19) board.up({x, x, 0.5f});
-    const auto stride = static_cast<std::size_t>(board.stride());
-    for (const std::vector<float>& floats : board.takeBuffers()) {
-      for (const float value : floats) ASSERT_TRUE(std::isfinite(value)) << "event " << i;
-      for (std::size_t at = 0; at < floats.size(); at += 6 * stride) {
-        ++stamps;
-        ASSERT_LE(floats[at], floats[at + 2 * stride]) << "event " << i;
-        ASSERT_GE(floats[at + 4], 0.0f) << "event " << i;
-      }
-    }
-  }
-  EXPECT_GT(stamps, 1000u);
-}
-
-TEST_P(LiveStroke, EndsOnHugeCoordinates) {
-  const LogCapture log;
-  DrawingBoard board({.version = version});
-  const std::vector<float> before = drawn(board, kStroke);
-  for (const float far : {1e6f, std::numeric_limits<float>::max()}) {
-    board.stroke({{0.0f, 0.0f}, {far, far}, {-far, far}, {0.0f, -far}}, 1);
-    for (const auto& floats : board.takeBuffers()) EXPECT_LE(floats.size(), 262144u * 66u) << far;
-  }
-  EXPECT_EQ(drawn(board, kStroke), before);
 }
 
 INSTANTIATE_TEST_SUITE_P(Versions, LiveStroke, testing::ValuesIn(allVersions()), versionName);

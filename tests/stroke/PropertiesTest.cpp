@@ -173,21 +173,6 @@ TEST_P(StrokesByLot, AreDrawnAndRedrawnTheSameWhateverWasDrawnBefore) {
   }
 }
 
-TEST_P(StrokesByLot, StayInsideTheAreasTheyReport) {
-  DrawingBoard board(options());
-  // Of version 8 the reported area takes in half of each stamp; the growth by 5 covers the rest of thin ones.
-  for (unsigned seed = 1; seed <= kStrokes; ++seed) {
-    const std::vector<Sample> samples = strokeByLot(seed);
-    board.redraw(*board.stored(samples));
-    for (const Stamp& stamp : board.takeStamps()) {
-      EXPECT_LE(board.rect.left, stamp.x - stamp.halfWidth);
-      EXPECT_GE(board.rect.right, stamp.x + stamp.halfWidth);
-      EXPECT_LE(board.rect.top, stamp.y - stamp.halfHeight);
-      EXPECT_GE(board.rect.bottom, stamp.y + stamp.halfHeight);
-    }
-  }
-}
-
 std::string nameOf(const testing::TestParamInfo<std::tuple<int, bool, Hand>>& stroke) {
   const auto& [version, curve, hand] = stroke.param;
   return "Version" + std::to_string(version) + (curve ? "Curve" : "Straight") + hand.name;

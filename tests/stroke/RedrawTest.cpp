@@ -1,21 +1,16 @@
 #include <gmock/gmock.h>
 
-#include <cmath>
 #include <cstdint>
-#include <limits>
 #include <memory>
 #include <string>
 #include <utility>
 #include <vector>
 
 #include "base/Error.h"
-#include "base/List.h"
 #include "engine/MotionEvent.h"
 #include "model/ObjectStroke.h"
 #include "pencommon/PenStrokeDataManager.h"
 #include "support/DrawableBoard.h"
-#include "support/Stamps.h"
-#include "support/Versions.h"
 
 namespace QeltTests {
 namespace {
@@ -28,8 +23,6 @@ using QeltDesktop::StoredStroke;
 using testing::ElementsAre;
 using testing::IsEmpty;
 using testing::Not;
-
-constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
 
 const std::vector<Sample> kStroke = {{10.0f, 10.0f, 0.3f},
                                      {18.0f, 11.0f, 0.5f, 0.3f, 0.2f},
@@ -192,24 +185,6 @@ TEST_P(Redraw, OfOnePointPlacesOneStamp) {
   }
 }
 
-// Curved, the call answers true all the same; straight, the replay's answer counts.
-TEST_P(Redraw, OfNothingReportsTheErrorAndHandsAnEmptyBatchOver) {
-  for (const bool curve : {true, false}) {
-    SCOPED_TRACE(curve ? "curve" : "straight");
-    DrawingBoard board({.version = version, .curve = curve});
-    const auto isNothing = [&](const auto& input) {
-      Error::SetError(0);
-      EXPECT_EQ(board.redraw(input), curve);
-      EXPECT_EQ(Error::GetError(), 7u);
-      EXPECT_THAT(board.takeBuffers(), ElementsAre(IsEmpty()));
-    };
-    isNothing(motionEvent(Qelt::kActionUp, {{1.0f, 1.0f}}));  // no history
-    isNothing(StoredStroke(Qelt::kToolStylus));
-    // No point that a stroke could start from is no point at all.
-    isNothing(*board.stored({{kNaN, 1.0f}, {1.0f, kNaN}}));
-  }
-}
-
 // Kept: even the redraw of nothing sets how moves are thinned out: a finger's, of which the first of two
 // short ones is dropped, in the middle of a stylus's stroke.
 TEST_P(Redraw, OfNothingThinsTheMovesOfTheStrokeUnderWay) {
@@ -221,49 +196,6 @@ TEST_P(Redraw, OfNothingThinsTheMovesOfTheStrokeUnderWay) {
   EXPECT_THAT(board.takeStamps(), IsEmpty());
   board.move({{29.0f, 10.0f}});
   EXPECT_THAT(board.takeStamps(), Not(IsEmpty()));
-}
-
-// Two canvases with views of their own: each is drawn for its own scale, whichever was made or moved last.
-TEST(RedrawForTwoViews, ComputesAndKeepsEachForItsOwn) {
-  DrawingBoard board;
-  StrokeOnPage stroke(board.stored(kStroke));
-  const Batch plain = redrawn(board, *stroke);
-  board.canvas.setMatrix(viewOf(4.0f));
-  const Batch enlarged = redrawn(board, *stroke);
-  EXPECT_NE(enlarged.buffers, plain.buffers);
-  QeltDesktop::PenCanvas other(&board.queue, nullptr);
-  EXPECT_TRUE(redrawn(board, *stroke).cached);
-  board.drawable->SetCanvas(&other);
-  const Batch anew = redrawn(board, *stroke);
-  EXPECT_FALSE(anew.cached);
-  EXPECT_EQ(anew.buffers, plain.buffers);
-  board.canvas.setMatrix(viewOf(2.0f));
-  EXPECT_TRUE(redrawn(board, *stroke).cached);
-  board.drawable->SetCanvas(&board.canvas);
-  EXPECT_FALSE(redrawn(board, *stroke).cached);
-}
-
-// Wherever they stand, points that are not finite are as if they had not been; the stroke begins at the first
-// that is.
-TEST_P(Redraw, DropsPointsThatAreNotFinite) {
-  std::vector<Sample> broken = kStroke;
-  broken.insert(broken.begin() + 2, {kNaN, 3.0f, 0.9f, 0.5f, 1.0f});
-  broken.insert(broken.begin(), {3.0f, -std::numeric_limits<float>::infinity(), 0.9f, 0.5f, 1.0f});
-  for (const bool curve : {true, false}) {
-    SCOPED_TRACE(curve ? "curve" : "straight");
-    DrawingBoard board({.version = version, .curve = curve});
-    const std::vector<float> clean = floatsOf(board, *board.stored(kStroke));
-    EXPECT_EQ(floatsOf(board, *board.stored(broken)), clean);
-    EXPECT_EQ(floatsOf(board, board.recorded(broken)), clean);
-
-    // At the very end, there is no point to close to.
-    std::vector<Sample> open = kStroke;
-    open.push_back({kNaN, kNaN});
-    const std::vector<float> unclosed = floatsOf(board, *board.stored(open));
-    ASSERT_FALSE(unclosed.empty());
-    EXPECT_LE(unclosed.size(), clean.size());
-    EXPECT_TRUE(std::isfinite(board.rect.left) && std::isfinite(board.rect.bottom));
-  }
 }
 
 // A stroke that a document has only half of.
@@ -301,46 +233,6 @@ TEST_P(Redraw, TakesWhateverArraysAreMissing) {
 
   bare.count = -5;
   EXPECT_THAT(floatsOf(board, bare), IsEmpty());
-}
-
-// --- Arguments ---
-
-TEST_P(Redraw, AndDrawRefuseNullAndStaySilentWithoutACanvas) {
-  DrawingBoard board({.version = version});
-  Qelt::Pencil2StrokeDrawableGL& drawable = *board.drawable;
-  const MotionEvent event = board.recorded(kStroke);
-  const auto stroke = board.stored(kStroke);
-  const MotionEvent* const noEvent = nullptr;
-  const Qelt::ObjectStroke* const noStroke = nullptr;
-  Qelt::RectF rect;
-  EXPECT_TRUE(isRefused([&] { return drawable.Draw(nullptr, &rect); }));
-  EXPECT_TRUE(isRefused([&] { return drawable.Draw(&event, nullptr); }));
-  EXPECT_TRUE(isRefused([&] { return drawable.RedrawPen(noEvent, &rect); }));
-  EXPECT_TRUE(isRefused([&] { return drawable.RedrawPen(&event, nullptr); }));
-  EXPECT_TRUE(isRefused([&] { return drawable.RedrawPen(noStroke, &rect); }));
-  EXPECT_TRUE(isRefused([&] { return drawable.RedrawPen(stroke.get(), nullptr); }));
-
-  Error::SetError(0);
-  drawable.SetCanvas(nullptr);
-  EXPECT_FALSE(drawable.Draw(&event, &rect));
-  EXPECT_FALSE(drawable.RedrawPen(&event, &rect));
-  EXPECT_FALSE(drawable.RedrawPen(stroke.get(), &rect));
-  EXPECT_EQ(Error::GetError(), 0u);
-  EXPECT_THAT(board.takePosts(), IsEmpty());
-}
-
-TEST_P(Redraw, OfAListDoesNothingAndAnswersTrue) {
-  DrawingBoard board({.version = version});
-  Qelt::List list;
-  const auto stroke = board.stored(kStroke);
-  list.Add(stroke.get());
-  Qelt::RectF rect;
-  EXPECT_TRUE(board.drawable->RedrawPen(&list, &rect));
-  EXPECT_TRUE(board.drawable->RedrawPen(static_cast<const Qelt::List*>(nullptr), nullptr));
-  Qelt::IPenListRedrawable& other = *board.drawable;  // the class's second interface
-  EXPECT_TRUE(other.RedrawPen(&list, &rect));
-  EXPECT_THAT(board.takePosts(), IsEmpty());
-  EXPECT_EQ(rect.right, 0.0f);
 }
 
 // --- What goes back into the caller's data ---
@@ -385,16 +277,6 @@ TEST_P(Redraw, TakesATouchStylussHistoryAsRecorded) {
     }
   }
   EXPECT_NEAR(stamps.back().alpha, end, 0.01f);
-}
-
-TEST_P(Redraw, OfAHundredThousandPointsEnds) {
-  DrawingBoard board({.version = version});
-  StoredStroke stroke(Qelt::kToolStylus);
-  for (int i = 0; i < 100'000; ++i) {
-    const auto x = static_cast<float>(i % 1000) * 2.1f;
-    stroke.addPoint({i % 2000 < 1000 ? x : 2100.0f - x, static_cast<float>(i / 1000) * 5.0f}, i, 0.5f);
-  }
-  EXPECT_FALSE(floatsOf(board, stroke).empty());
 }
 
 INSTANTIATE_TEST_SUITE_P(Versions, Redraw, testing::ValuesIn(allVersions()), versionName);

@@ -7,36 +7,51 @@
 #include <vector>
 
 #include "desktop/pencommon/BatchObserver.h"
+#include "pen/RenderingVersions.h"
 #include "pencommon/PenDrawableRT.h"
 
 namespace QeltTests {
 
-// Floats in one vertex of a render drawable's batches, told by its class.
-inline std::size_t floatsPerVertex(const Qelt::PenDrawableRT& drawable) {
-  const std::string_view name = typeid(drawable).name();
-  const auto is = [name](std::string_view part) { return name.find(part) != std::string_view::npos; };
-  if (is("OutlineDrawableRT")) return 7;
-  if (is("StrokeDrawableRTV3") || is("PredictionDrawableRT")) return 11;
-  return 9;
+// Whether a buffer is of whole stamps with so many floats a vertex: two triangles each, told by the texture
+// coordinates of their corners.
+inline bool isOfStamps(const std::vector<float>& buffer, std::size_t stride) {
+  static constexpr float kCorners[6][2] = {{0, 1}, {0, 0}, {1, 1}, {1, 1}, {0, 0}, {1, 0}};
+  if (buffer.size() % (6 * stride) != 0) return false;
+  for (std::size_t vertex = 0; vertex * stride < buffer.size(); ++vertex) {
+    const float* const at = &buffer[vertex * stride];
+    if (at[2] != kCorners[vertex % 6][0] || at[3] != kCorners[vertex % 6][1]) return false;
+  }
+  return true;
+}
+
+// Floats in a vertex of a buffer: of the layouts that the versions have, the one that fits it; 0 where none
+// does.
+inline std::size_t strideOf(const std::vector<float>& buffer) {
+  std::vector<int> layouts = {Qelt::kOutlineFloatsPerVertex, Qelt::kPreviewFloatsPerVertex,
+                              Qelt::kPredictionFloatsPerVertex};
+  for (const Qelt::RenderingVersion& row : Qelt::kRenderingVersions) layouts.push_back(row.floatsPerVertex);
+  for (const int layout : layouts) {
+    if (isOfStamps(buffer, static_cast<std::size_t>(layout))) return static_cast<std::size_t>(layout);
+  }
+  return 0;
 }
 
 // What no pen may hand over, whatever it was told to draw; null where the batch is in order.
 inline const char* faultOf(const QeltDesktop::Batch& batch) {
-  const std::size_t stride = floatsPerVertex(*batch.drawable);
   const std::string_view name = typeid(*batch.drawable).name();
   // Kept: a preview's ramps may run past their targets; a prediction ahead of any stroke takes over the
   // record's -1 for "no stamp yet", a third of which it hands over.
   const bool overshoots = name.find("PreviewDrawableRT") != std::string_view::npos;
   const float lowestAlpha = name.find("PredictionDrawableRT") != std::string_view::npos ? -1.0f / 3.0f : 0.0f;
   for (const std::vector<float>& buffer : batch.buffers) {
-    if (buffer.size() % (6 * stride) != 0) return "a batch that is not of whole stamps";
-    for (std::size_t at = 0; at < buffer.size(); at += 6 * stride) {
+    for (const float value : buffer) {
+      if (!std::isfinite(value)) return "a vertex that is not finite";
+    }
+    const std::size_t stride = strideOf(buffer);
+    if (stride == 0) return "a batch that is not of whole stamps";
+    for (std::size_t at = 0; at < buffer.size() && !overshoots; at += 6 * stride) {
       const float* const first = buffer.data() + at;
-      for (std::size_t i = 0; i < 6 * stride; ++i) {
-        if (!std::isfinite(first[i])) return "a vertex that is not finite";
-      }
       const float* const last = first + 5 * stride;
-      if (overshoots) continue;
       if (first[0] > last[0] || first[1] > last[1]) return "a stamp with its edges crossed";
       // An outline's vertices have no alpha.
       if (stride > 7 && first[4] < lowestAlpha) return "a negative alpha";

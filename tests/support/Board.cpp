@@ -9,6 +9,7 @@
 #include <utility>
 
 #include "base/Error.h"
+#include "support/BatchCheck.h"
 
 namespace QeltTests {
 
@@ -17,39 +18,62 @@ using QeltDesktop::Batch;
 using QeltDesktop::RenderQueue;
 using QeltDesktop::StoredStroke;
 
+namespace {
+
+// A board that draws nothing has no layer, which spares the tests of batches the render messages' walk.
+Target targetOf(const BoardOptions& wanted) {
+  return wanted.width > 0 ? Target::Whole : Target::NoLayer;
+}
+
+}  // namespace
+
 Board::Board(const BoardOptions& wanted)
     : options(wanted),
-      queue(wanted.thread ? RenderQueue::Mode::Thread : RenderQueue::Mode::Caller,
-            wanted.width > 0 ? RenderQueue::GL::Context : RenderQueue::GL::None),
-      layer(wanted.width > 0
-                ? std::make_unique<QeltDesktop::CanvasLayer>(queue, wanted.width, wanted.height, wanted.tile)
-                : nullptr),
-      canvas(&queue, layer.get()),
+      mOwnQueue(
+          std::make_unique<RenderQueue>(wanted.thread ? RenderQueue::Mode::Thread : RenderQueue::Mode::Caller,
+                                        wanted.width > 0 ? RenderQueue::GL::Context : RenderQueue::GL::None)),
+      mOwnLayer(wanted.width > 0 ? std::make_unique<QeltDesktop::CanvasLayer>(*mOwnQueue, wanted.width,
+                                                                              wanted.height, wanted.tile)
+                                 : nullptr),
+      queue(*mOwnQueue),
+      layer(mOwnLayer.get()),
+      canvas(&queue, layer, targetOf(wanted)),
       data(&queue) {}
+
+Board::Board(const BoardOptions& wanted, RenderQueue& itsQueue, QeltDesktop::CanvasLayer* itsLayer)
+    : options(wanted), queue(itsQueue), layer(itsLayer), canvas(&queue, layer), data(&queue) {}
 
 Board::~Board() {
   queue.finish();
-  QeltDesktop::setBatchObserver(nullptr);
+  if (mWatches) QeltDesktop::setBatchObserver(nullptr);
 }
 
 void Board::watch() {
   queue.finish();
+  mWatches = true;
   queue.onAccepted = [this](const Qelt::ITask& task) { mPosts.push_back(taskName(task)); };
-  QeltDesktop::setBatchObserver([this](Batch batch) { mBatches.push_back(std::move(batch)); });
+  QeltDesktop::setBatchObserver([this](Batch batch) {
+    if (const char* const fault = faultOf(batch); fault != nullptr) ADD_FAILURE() << fault;
+    mBatches.push_back(std::move(batch));
+  });
 }
 
 void Board::unwatch() {
   queue.onAccepted = nullptr;
   queue.accept = nullptr;
-}
-
-bool Board::send(int action, const std::vector<Sample>& samples) {
-  return send(motionEvent(action, samples, options.tool, options.source, options.clock));
+  if (std::exchange(mWatches, false)) {
+    queue.finish();
+    QeltDesktop::setBatchObserver(nullptr);
+  }
 }
 
 bool Board::send(const MotionEvent& event) {
   rect = {};
   return draw(event);
+}
+
+MotionEvent Board::eventOf(int action, const std::vector<Sample>& samples) const {
+  return motionEvent(action, samples, options.tool, options.source, options.clock);
 }
 
 void Board::stroke(const std::vector<Sample>& samples, int batch) {
@@ -64,7 +88,7 @@ void Board::stroke(const std::vector<Sample>& samples, int batch) {
 
 MotionEvent Board::recorded(std::vector<Sample> samples) const {
   samples.push_back(samples.back());
-  return motionEvent(Qelt::kActionUp, samples, options.tool, options.source, options.clock);
+  return eventOf(Qelt::kActionUp, samples);
 }
 
 std::unique_ptr<StoredStroke> Board::stored(const std::vector<Sample>& samples, bool hasAngles) const {

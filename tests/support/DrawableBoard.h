@@ -13,7 +13,6 @@
 #include "stroke/Pencil2StrokeDrawableGL.h"
 #include "support/Board.h"
 #include "support/Stamps.h"
-#include "support/Versions.h"
 
 namespace QeltTests {
 
@@ -29,8 +28,7 @@ class DrawableBoard : public Board {
     shared.mCurveEnabled = options.curve;
     shared.mLastAlpha = -1.0f;
     if constexpr (std::is_same_v<Drawable, Qelt::Pencil2StrokeDrawableGL>) {
-      const int version = versionTable[Qelt::versionRow(options.version)][0];
-      drawable.reset(Qelt::createStrokeDrawable(version, &shared, &data));
+      drawable.reset(Qelt::createStrokeDrawable(rowOf(options.version).strokeVersion, &shared, &data));
     } else if constexpr (kOutlines) {
       drawable.reset(Qelt::createOutlineDrawable(options.version, &shared, &data));
     } else {
@@ -76,8 +74,9 @@ class DrawableBoard : public Board {
 
   // Floats in one vertex.
   int stride() const {
-    if constexpr (kOutlines) return 7;
-    if constexpr (std::is_base_of_v<Qelt::PenPreviewDrawableGL, Drawable>) return 9;
+    if constexpr (kOutlines) return Qelt::kOutlineFloatsPerVertex;
+    if constexpr (std::is_base_of_v<Qelt::PenPreviewDrawableGL, Drawable>)
+      return Qelt::kPreviewFloatsPerVertex;
     return strideOf(options.version);
   }
 

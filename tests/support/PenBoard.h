@@ -4,134 +4,116 @@
 #include <functional>
 #include <memory>
 #include <ostream>
-#include <utility>
+#include <string>
 #include <vector>
 
-#include "pen/Pencil2.h"
+#include "desktop/engine/PluginLibrary.h"
 #include "pencommon/IPenMorphable.h"
 #include "pencommon/Pen.h"
 #include "pencommon/PenOutlineDrawableGL.h"
 #include "pencommon/PenPredictionDrawableGL.h"
 #include "pencommon/PenPreviewDrawableGL.h"
-#include "pencommon/PenStrokeDataManager.h"
 #include "pencommon/PenStrokeDrawableGL.h"
 #include "support/Board.h"
 
 namespace QeltTests {
 
-// What a pen draws; a redraw is of a recorded event, of a stored stroke, and of one that is cached.
+// What a pen draws. A prediction goes back the way of a live stroke, which it leaves open; a redraw is of a
+// recorded event and of a stored stroke: without an entry in the cache, with one that is empty, full, and
+// dirty.
 enum class Kind { Live, Redraw, Outline, Preview, Prediction };
+inline constexpr std::array kAllKinds = {Kind::Live, Kind::Redraw, Kind::Outline, Kind::Preview,
+                                         Kind::Prediction};
+std::ostream& operator<<(std::ostream& out, Kind kind);
 
-inline constexpr std::array<const char*, 5> kKindNames = {"Live", "Redraw", "Outline", "Preview",
-                                                          "Prediction"};
-inline std::ostream& operator<<(std::ostream& out, Kind kind) {
-  return out << kKindNames[static_cast<std::size_t>(kind)];
-}
+// What a pen made of the same input: compared between a pen that went through a fault and a fresh one.
+struct Drawn {
+  std::vector<std::vector<float>> steps;    // each call's answer and the edges of its rectangle
+  std::vector<std::vector<float>> batches;  // as they reached the render drawables
+  std::vector<bool> cached;                 // of each, whether it came from the cache
+  std::vector<std::uint8_t> pixels;         // only where there is a layer
+};
 
-// A whole pen and everything it draws, call by call as a host makes them. Events of the board itself go to
-// the pen's stroke drawable.
+// The first difference, for people; empty where there is none.
+std::string difference(const Drawn& drawn, const Drawn& expected);
+
+// A whole pen of the built library and everything it draws, call by call as a host makes them. None of it
+// minds that the pen or a drawable could not be made. Events of the board itself go to the pen's stroke
+// drawable.
 class PenBoard : public Board {
  public:
+  using MakePen = std::function<Qelt::Pen*()>;
   using Call = std::function<bool(Qelt::RectF*)>;
 
-  explicit PenBoard(const BoardOptions& wanted = {}) : Board(wanted) {
-    makePen();
-    watch();
-  }
-  ~PenBoard() override {
-    unwatch();
-    deletePen();
-  }
+  // With a pen, watched.
+  explicit PenBoard(const BoardOptions& wanted = {});
+  // On a host's queue and layer, as the pens of a process are; not watched. The pen is made by the first call
+  // that needs it. Without a layer the canvas has a tile without GL.
+  PenBoard(
+      const BoardOptions& wanted, QeltDesktop::RenderQueue& itsQueue, QeltDesktop::CanvasLayer* itsLayer,
+      MakePen makesPen = [] { return library().createPen(); });
+  ~PenBoard() override;
 
-  void makePen() {
-    pen.reset(createPenInst());
-    pen->setPenDataManager(&data);
-    pen->setVersion(options.version);
-    pen->SetSize(options.size);
-    pen->SetColor(static_cast<int>(options.color));
-    pen->GetMorphable()->SetCurveEnabled(options.curve);
-  }
-  void deletePen() {
-    pen.reset();
-    queue.finish();
-  }
+  static const QeltDesktop::PluginLibrary& library();
 
-  // Makes the calls of a kind, some 80 x 40 units wide, leaving it to `around` to make each of them.
-  void draw(Kind kind, const std::vector<Sample>& samples, const std::function<void(const Call&)>& around) {
-    const Qelt::MotionEvent whole = recorded(samples);
-    switch (kind) {
-      case Kind::Live:
-        return drawLive(onCanvas(pen->GetStrokeDrawableGL()), samples, true, around);
-      case Kind::Redraw: {
-        auto* const drawable = onCanvas(pen->GetStrokeDrawableGL());
-        const auto stroke = stored(samples);
-        auto& cache = *Qelt::PenStrokeDataManager::GetInstance();
-        around([&](Qelt::RectF* area) { return drawable->RedrawPen(&whole, area); });
-        for (const bool hasEntry : {false, true, true}) {
-          if (hasEntry) cache.CreateStrokeData(stroke->GetRuntimeHandle());
-          around([&](Qelt::RectF* area) { return drawable->RedrawPen(stroke.get(), area); });
-        }
-        return cache.DropStrokeData(stroke->GetRuntimeHandle());
-      }
-      case Kind::Outline: {
-        auto* const drawable = onCanvas(pen->GetOutlineDrawableGL());
-        drawable->SetOutlineSize(3.0f);
-        drawable->SetOutlineColor(static_cast<int>(options.color));
-        const auto stroke = stored(samples);
-        around([&](Qelt::RectF* area) { return drawable->DrawOutline(&whole, area); });
-        return around([&](Qelt::RectF* area) { return drawable->DrawOutline(stroke.get(), area); });
-      }
-      case Kind::Preview: {
-        auto* const drawable = onCanvas(pen->GetPreviewDrawableGL());
-        drawLive(drawable, samples, true, around);
-        return around([&](Qelt::RectF* area) { return drawable->RedrawPen(&whole, area); });
-      }
-      case Kind::Prediction: {
-        drawLive(onCanvas(pen->GetStrokeDrawableGL()), samples, false, around);
-        auto* const drawable = onCanvas(pen->GetPredictionStrokeDrawableGL());
-        drawable->SetOpacity(0.75f);
-        const Qelt::MotionEvent ahead = eventOf(Qelt::kActionMove, {samples[1], samples[0]});
-        return around([&](Qelt::RectF* area) { return drawable->Draw(&ahead, area); });
-      }
-    }
+  void makePen();
+  // As a host that closes its document: what the pen has queued still runs.
+  void deletePen();
+  // Puts pen, drawable and view back to what a board begins with.
+  void setUsual(Qelt::PenDrawableGL& drawable);
+  void setCurve(bool curve);
+  void zoom(float factor) { canvas.setMatrix(viewOf(factor)); }
+
+  // A stroke of nine samples, some 60 x 24 units.
+  static std::vector<Sample> usualStroke();
+  // Makes the calls of a kind that the pen's version has; leaves it to `around` to make each of them.
+  void draw(Kind kind, const std::vector<Sample>& samples, const std::function<void(const Call&)>& around);
+  void draw(Kind kind, const std::vector<Sample>& samples = usualStroke());
+  void drawAll() {
+    for (const Kind kind : kAllKinds) draw(kind);
   }
-  void draw(Kind kind, const std::vector<Sample>& samples) {
-    draw(kind, samples, [this](const Call& call) { call(&(rect = {})); });
-  }
+  // One batch of each render drawable, and one from the cache.
+  void drawOneOfEach();
+  // Every drawable there is, on the canvas, nothing drawn.
+  void prepareAll();
+  // Draws all kinds, or with a layer one of each, beginning as every stroke does, and tells what came of it.
+  Drawn drawEverything(float zoomFactor = 1.0f);
+  // Draws the last stroke of another's page in this view, as the other pen would: as it comes, and without
+  // the cache. Returns whether these are alike.
+  bool redrawsLastOf(PenBoard& other);
+  // Takes all stored strokes away, whatever the render thread still does with their drawings.
+  void turnPage();
+  void loseAndRestoreContext();
+  void finish();
+  // How many calls let a std::bad_alloc out: calls that hand over a batch, which may not grow.
+  int refusedBatches() const { return mRefusedBatches; }
 
   std::unique_ptr<Qelt::Pen> pen;
+  // Whether the render thread is waited for after each call.
+  bool keepsUp = false;
+  // Called before every call that hands over a batch.
+  std::function<void(Qelt::PenDrawableGL&)> beforeCall;
 
  protected:
-  bool draw(const Qelt::MotionEvent& event) override {
-    return onCanvas(pen->GetStrokeDrawableGL())->Draw(&event, &rect);
-  }
+  bool draw(const Qelt::MotionEvent& event) override;
 
  private:
+  void setUsualPen();
+  // A drawable of the pen's on the canvas; null where there is no pen or it could not make one.
   template <typename Drawable>
-  Drawable* onCanvas(Drawable* drawable) {
-    drawable->SetCanvas(&canvas);
-    return drawable;
-  }
-
-  Qelt::MotionEvent eventOf(int action, const std::vector<Sample>& samples) const {
-    return motionEvent(action, samples, options.tool, options.source, options.clock);
-  }
-
-  // Down, two moves with half of the samples each, up; or all but the up.
+  Drawable* onCanvas(Drawable* (Qelt::Pen::*getter)());
   template <typename Drawable>
   void drawLive(Drawable* drawable, const std::vector<Sample>& samples, bool ends,
-                const std::function<void(const Call&)>& around) {
-    const auto middle = samples.begin() + static_cast<std::ptrdiff_t>(samples.size() / 2);
-    const std::pair<int, std::vector<Sample>> events[] = {{Qelt::kActionDown, {samples.front()}},
-                                                          {Qelt::kActionMove, {samples.begin() + 1, middle}},
-                                                          {Qelt::kActionMove, {middle, samples.end()}},
-                                                          {Qelt::kActionUp, {samples.back()}}};
-    for (const auto& [action, some] : events) {
-      if (action == Qelt::kActionUp && !ends) return;
-      const Qelt::MotionEvent event = eventOf(action, some);
-      around([&](Qelt::RectF* area) { return drawable->Draw(&event, area); });
-    }
-  }
+                const std::function<void(const Call&)>& around);
+  QeltDesktop::StoredStroke& newStroke(const std::vector<Sample>& samples);
+  // Has `around` make a call, which may fail.
+  template <typename Made>
+  void call(Qelt::PenDrawableGL& drawable, const std::function<void(const Call&)>& around, Made&& made);
+
+  const MakePen mMakePen;
+  std::vector<std::unique_ptr<QeltDesktop::StoredStroke>> mPage;
+  int mRefusedBatches = 0;
+  std::vector<std::vector<float>>* mSteps = nullptr;  // where steps are noted, if anywhere
 };
 
 }  // namespace QeltTests

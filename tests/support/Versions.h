@@ -2,24 +2,39 @@
 
 #include <gtest/gtest.h>
 
-#include <array>
+#include <set>
 #include <string>
+#include <vector>
+
+#include "pen/RenderingVersions.h"
 
 namespace QeltTests {
 
+// The row of a rendering version that the list has.
+inline const Qelt::RenderingVersion& rowOf(int version) {
+  return Qelt::kRenderingVersions.at(static_cast<std::size_t>(version - 1));
+}
+
 // Every rendering version a pen can have.
-inline constexpr std::array<int, 8> allVersions() {
-  return {1, 2, 3, 4, 5, 6, 7, 8};
+inline std::vector<int> allVersions() {
+  std::vector<int> all;
+  for (const Qelt::RenderingVersion& row : Qelt::kRenderingVersions) all.push_back(row.number);
+  return all;
+}
+inline int newestVersion() {
+  return Qelt::kRenderingVersions.back().number;
 }
 
 // Every version of an outline.
-inline constexpr std::array<int, 5> outlineVersions() {
-  return {1, 2, 3, 4, 5};
+inline std::vector<int> outlineVersions() {
+  std::set<int> all;
+  for (const Qelt::RenderingVersion& row : Qelt::kRenderingVersions) all.insert(row.outlineVersion);
+  return {all.begin(), all.end()};
 }
 
 // Floats in one vertex of a stroke's batch.
-inline constexpr int strideOf(int renderingVersion) {
-  return renderingVersion == 8 ? 11 : 9;
+inline int strideOf(int version) {
+  return rowOf(version).floatsPerVertex;
 }
 
 // The name of a test of one version.

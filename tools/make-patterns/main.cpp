@@ -19,6 +19,8 @@
 #include <utility>
 #include <vector>
 
+#include "Facts.h"
+
 namespace {
 
 // SplitMix64: small, and its output is fixed by arithmetic modulo 2^64 alone.
@@ -333,10 +335,14 @@ int main(int argc, char** argv) {
   }
   try {
     const std::string directory = argv[1];
-    writePicture(directory + "/paper-grain.pgm", kGrainSide, makeGrain());
+    const auto grain = makeGrain();
+    facts::checkGrain(grain, kGrainSide);
+    writePicture(directory + "/paper-grain.pgm", kGrainSide, grain);
     std::vector<std::uint8_t> stamps;
     for (const auto& stamp : kStamps) {
       const auto tile = makeStamp(stamp);
+      facts::checkStamp(tile, kStampSide, stamp.core - stamp.coreGrain, stamp.core, stamp.emptyPixels,
+                        stamp.ruggedness < 100 ? 1.5 : 5.0);
       stamps.insert(stamps.end(), tile.begin(), tile.end());
     }
     writePicture(directory + "/stamp-shapes.pgm", kStampSide, stamps);

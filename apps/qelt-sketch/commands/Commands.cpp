@@ -1,6 +1,5 @@
 #include "commands/Commands.h"
 
-#include <android/log.h>
 #include <dlfcn.h>
 #include <link.h>
 
@@ -19,6 +18,7 @@
 #include "desktop/engine/PluginLibrary.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/graphics/PenCanvas.h"
+#include "desktop/platform/Platform.h"
 #include "ink/InkmlReader.h"
 #include "output/LabelFont.h"
 #include "output/OutputFile.h"
@@ -295,7 +295,7 @@ void info(const Options& options) {
 
 void runCommand(const Options& options) {
   // Without --log, standard error holds only the line that says what could not be done.
-  if (!options.log) __android_log_set_minimum_priority(ANDROID_LOG_SILENT);
+  if (!options.log) silenceLog();
   switch (options.command) {
     case Command::Draw:
       return draw(options);

@@ -105,6 +105,15 @@ class Drawing : public PlayObserver {
     mProgress.step();
   }
 
+  // Goes up with every context loss that emptied the layers.
+  int timesEmptied() {
+    int times = 0;
+    for (std::optional<Layer>* layer : {&mOutline, &mStroke, &mPrediction}) {
+      if (*layer) times += (*layer)->pixels().timesEmptied();
+    }
+    return times;
+  }
+
   // The pixels of each, from the lowest layer to the highest.
   std::vector<std::vector<std::uint8_t>> readLayers() {
     std::vector<std::vector<std::uint8_t>> layers;
@@ -150,10 +159,15 @@ Picture drawPage(const PluginLibrary& plugin, RenderQueue& queue, const Page& pa
                  const PageLayout& layout, const DrawableSet& drawables, Progress& progress) {
   const PixelSize size = pixelSizeOf(layout, page, options);
   Drawing drawing(queue, size, layout, drawables, progress);
-  {
+  // What was drawn before the context was lost is gone: then the page is drawn anew, by a new pen.
+  constexpr int kMostTries = 8;
+  int timesBefore = 0, tries = 0;
+  do {
+    if (++tries > kMostTries) throw std::runtime_error("the GL context is lost again and again");
+    timesBefore = drawing.timesEmptied();
     PenSession session(plugin, queue, options);
     PagePlayer(session, page, options, drawing.canvases()).play(drawing);
-  }
+  } while (drawing.timesEmptied() != timesBefore);
   std::optional<std::array<std::uint8_t, 3>> background;
   if (!options.background.transparent) {
     const std::uint32_t rgb = options.background.rgb;

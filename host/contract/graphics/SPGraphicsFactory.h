@@ -17,7 +17,8 @@ class QELT_HOST_API SPGraphicsFactory {
                                  int flags);
   static void ReleaseBitmap(ISPBitmap* bitmap);
 
-  // A canvas drawing into a bitmap that outlives it. The pen passes flags 0.
+  // A canvas that draws into a bitmap, which outlives it; not into a layer's. What it draws comes back after
+  // a loss of the context; what was uploaded to the bitmap does not. The pen passes flags 0.
   static ISPCanvas* CreateCanvas(IGLMsgQueue* queue, ISPBitmap* bitmap, int flags);
   static void ReleaseCanvas(ISPCanvas* canvas);
 };

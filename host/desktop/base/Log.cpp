@@ -1,14 +1,14 @@
 #include "desktop/base/Log.h"
 
-#include <android/log.h>
-
 #include <array>
 #include <cstdio>
+
+#include "desktop/platform/Platform.h"
 
 namespace QeltDesktop {
 
 void logError(const char* text) noexcept {
-  __android_log_write(ANDROID_LOG_ERROR, "qel_log", text);
+  writeError(text);
 }
 
 void logError(const char* what, const char* detail) noexcept {

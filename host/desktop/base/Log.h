@@ -6,9 +6,9 @@
 
 namespace QeltDesktop {
 
-// Writes one line to the Android log under the tag the pens use, priority error. Any thread. Takes no memory.
+// Writes one line of priority error to where the pens' own lines go. Any thread. Takes no memory.
 QELT_HOST_API void logError(const char* text) noexcept;
-// The same of "what: detail"; a long detail is cut.
+// Writes "what: detail"; a long detail is cut.
 QELT_HOST_API void logError(const char* what, const char* detail) noexcept;
 inline void logError(const std::string& text) noexcept {
   logError(text.c_str());

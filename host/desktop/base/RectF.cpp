@@ -6,7 +6,7 @@ namespace Qelt {
 
 namespace {
 
-// Each is one instruction, and keeps the edge when `other` is not a number. Pens grow rectangles once a
+// Each is one instruction, and keeps the edge when `other` is not a number. Pens grow rectangles once per
 // stamp.
 float smaller(float edge, float other) {
   return other < edge ? other : edge;

@@ -3,6 +3,7 @@
 #include <string>
 
 #include "base/HostApi.h"
+#include "desktop/platform/Platform.h"
 
 namespace Qelt {
 class Pen;
@@ -27,8 +28,7 @@ class QELT_HOST_API PluginLibrary {
  private:
   using CreatePen = Qelt::Pen* (*)();
 
-  std::string mPath;
-  void* mHandle;
+  LoadedPlugin mPlugin;
   CreatePen mCreatePen;
 };
 

@@ -9,7 +9,7 @@ namespace QeltDesktop {
 // Logs every error GL has noted since the last call. Render thread.
 QELT_HOST_API void reportGlErrors(const char* file, int line);
 
-// Takes every error GL has noted since the last call, unlogged; true when there was none. Render thread.
+// Clears every error GL has noted since the last call; returns true when there was none. Render thread.
 QELT_HOST_API bool takeGlErrors();
 
 #ifdef NDEBUG
@@ -22,7 +22,7 @@ constexpr auto gl(Result(GL_APIENTRY* function)(Parameters...)) {
 
 #else
 
-// The same in debug builds: each call is followed by a look for errors, reported with its place.
+// The same in debug builds: after each call GL is asked for errors, which are logged with the place.
 template <typename Result, typename... Parameters>
 class CheckedGlCall {
  public:

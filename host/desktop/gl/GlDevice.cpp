@@ -2,9 +2,7 @@
 
 #include <algorithm>
 
-#include "desktop/gl/EglContext.h"
 #include "desktop/gl/GlCall.h"
-#include "desktop/gl/ManagedObjects.h"
 
 namespace QeltDesktop {
 
@@ -38,19 +36,18 @@ bool GlResource::isLive() const {
   return mDevice != nullptr && GlDevice::live() == mDevice;
 }
 
-void GlResource::save() {}
-
-void GlResource::dropSaved() noexcept {}
-
-GlDevice::GlDevice() : mContext(std::make_unique<EglContext>()) {
+GlDevice::GlDevice(const Surface& surface) : mSurface(surface), mContext(GlContext::make(surface)) {
   makeCurrent();
   readLimits();
 }
 
 GlDevice::~GlDevice() {
-  for (GlResource* resource : resources()) {
-    resource->forget();
-    resource->mDevice = nullptr;
+  {
+    const std::lock_guard guard(mLock);
+    for (GlResource* resource : mResources) {
+      resource->forget();
+      resource->mDevice = nullptr;
+    }
   }
   ManagedObjects::forget(this);
   clearCurrent();
@@ -74,31 +71,28 @@ void GlDevice::clearCurrent() {
   tCurrent = nullptr;
 }
 
-void GlDevice::lose() {
+void GlDevice::lose() noexcept {
   if (isLost()) return;
-  ManagedObjects::release(this);
-  const std::vector<GlResource*> all = resources();
-  try {
-    for (GlResource* resource : all) resource->save();
-  } catch (...) {
-    for (GlResource* resource : all) resource->dropSaved();
-    throw;
-  }
-  for (GlResource* resource : all) resource->forget();
-  mContext->clearCurrent();
   mContext.reset();
   mProgram = 0;
+  {
+    const std::lock_guard guard(mLock);
+    for (GlResource* resource : mResources) resource->forget();
+  }
+  ManagedObjects::release(this);
 }
 
 void GlDevice::restore() {
   if (!isLost()) return;
-  // All that may throw stands ahead of the change.
-  const std::vector<GlResource*> all = resources();
-  auto context = std::make_unique<EglContext>();
+  // All that may throw comes ahead of the change.
+  std::unique_ptr<GlContext> context = GlContext::make(mSurface);
   context->makeCurrent();
   readLimits();
   mContext = std::move(context);
-  for (GlResource* resource : all) resource->remake();
+  {
+    const std::lock_guard guard(mLock);
+    for (GlResource* resource : mResources) resource->remake();
+  }
   ManagedObjects::restore(this);
 }
 
@@ -118,11 +112,6 @@ void GlDevice::readLimits() {
   gl(glGetIntegerv)(GL_MAX_VIEWPORT_DIMS, viewport);
   mMaxViewportSize = std::min(viewport[0], viewport[1]);
   mDescription = glText(GL_RENDERER) + ", " + glText(GL_VERSION);
-}
-
-std::vector<GlResource*> GlDevice::resources() {
-  const std::lock_guard guard(mLock);
-  return mResources;
 }
 
 }  // namespace QeltDesktop

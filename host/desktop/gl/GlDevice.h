@@ -8,16 +8,17 @@
 #include <vector>
 
 #include "base/HostApi.h"
+#include "desktop/platform/Platform.h"
 
 namespace QeltDesktop {
 
-class EglContext;
 class GlDevice;
 
-// Something made of GL names. It registers with the device whose context is current where it is made, loses
-// its names with the context and makes them again in the next one. Where there is no context it is inert.
-// Made, used and destroyed on the render thread; made or destroyed elsewhere it only forgets or never had
-// its names, which then go with the context.
+// An object that owns GL names: textures, buffers, programs. It belongs to the device that is current on the
+// thread that makes it. When the device's context is lost its names are gone, and it gets new ones in the
+// next context. Without a context it does nothing. It is made, used and destroyed on the render thread. One
+// made on another thread never has any names; one destroyed there leaves its names to the context, which
+// takes them along when it goes.
 class QELT_HOST_API GlResource {
  public:
   GlResource(const GlResource&) = delete;
@@ -34,24 +35,19 @@ class QELT_HOST_API GlResource {
  private:
   friend class GlDevice;
 
-  // The context is still there and about to go: last chance to read something back. May throw
-  // std::bad_alloc: the context stays then.
-  virtual void save();
-  // The context stays after all: what was saved is not needed.
-  virtual void dropSaved() noexcept;
-  // The names are gone; no GL may be called.
-  virtual void forget() = 0;
-  // There is a context again. Must not throw.
-  virtual void remake() = 0;
+  // The context is gone, and the names with it: they are not to be used again, nor any GL called.
+  virtual void forget() noexcept = 0;
+  // There is a new context: makes the names again.
+  virtual void remake() noexcept = 0;
 
   GlDevice* mDevice;
 };
 
-// A GL context, what has been made in it, and a little of its state. Render thread.
+// A GL context, the resources that have been made in it, and a little of its state. Render thread.
 class QELT_HOST_API GlDevice {
  public:
   // Makes a context and leaves it current. Throws std::runtime_error when there is none to be had.
-  GlDevice();
+  explicit GlDevice(const Surface& surface);
   // Resources that are still there become inert for good.
   ~GlDevice();
   GlDevice(const GlDevice&) = delete;
@@ -67,10 +63,10 @@ class QELT_HOST_API GlDevice {
   void clearCurrent();
 
   bool isLost() const { return mContext == nullptr; }
-  // Drops the context: managed objects hear of it first, then resources save and forget. Twice counts once.
-  // Throws std::bad_alloc when there is no memory to save with; the context is still there then.
-  void lose();
-  // Makes a new context and everything in it: resources first, then managed objects hear of it. Throws
+  // The context has been taken away: destroys what is left of it, without a single GL call, has every
+  // resource forget its names, and then tells managed objects. Once more, it does nothing.
+  void lose() noexcept;
+  // Makes a new context and the names of every resource in it, then tells managed objects. Throws
   // std::runtime_error when there is no context to be had, std::bad_alloc when there is no memory; nothing
   // has changed then.
   void restore();
@@ -87,15 +83,25 @@ class QELT_HOST_API GlDevice {
  private:
   friend class GlResource;
   void readLimits();
-  std::vector<GlResource*> resources();
 
-  std::unique_ptr<EglContext> mContext;
-  std::mutex mLock;  // guards mResources
+  const Surface mSurface;
+  std::unique_ptr<GlContext> mContext;  // null while it is lost
+  std::mutex mLock;                     // guards mResources
   std::vector<GlResource*> mResources;
-  GLuint mProgram = 0;
+  GLuint mProgram = 0;  // the current one
   int mMaxTextureSize = 0;
   int mMaxViewportSize = 0;
   std::string mDescription;
+};
+
+// Tells the registered managed objects of a device what becomes of its context. What one object throws is
+// logged, and the others are told all the same. Render thread.
+class ManagedObjects {
+ public:
+  static void release(const GlDevice* device);
+  static void restore(const GlDevice* device);
+  // The device is going: whoever registered with it hears nothing any more.
+  static void forget(const GlDevice* device);
 };
 
 }  // namespace QeltDesktop

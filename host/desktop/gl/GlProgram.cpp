@@ -24,7 +24,7 @@ namespace QeltDesktop {
 
 namespace {
 
-// The host's number of a GL uniform type; the pens know the named ones only.
+// The host's number for a GL uniform type. Types that no pen uses share one.
 Qelt::BindingType bindingTypeOf(GLenum type) {
   switch (type) {
     case GL_FLOAT_MAT4:
@@ -49,7 +49,8 @@ struct Uniform {
   Qelt::BindingType type;
 };
 
-// The program itself, shared with its bindings, which may be given back after it.
+// The program itself, shared with its bindings, which may be given back after it. It keeps the shaders'
+// sources and is built again from them after a loss of the context.
 class ProgramState final : public GlResource {
  public:
   ProgramState(const char* vertexSource, const char* fragmentSource)
@@ -95,9 +96,14 @@ class ProgramState final : public GlResource {
   }
 
  private:
-  void forget() override { mProgram = 0; }
-  void remake() override {
-    if (!mReleased) build();
+  void forget() noexcept override { mProgram = 0; }
+  void remake() noexcept override {
+    if (mReleased) return;
+    try {
+      build();
+    } catch (const std::bad_alloc&) {
+      logError("there is no memory to say why a shader program does not come back");
+    }
   }
 
   // Shaders are shared by the whole process, contexts are not: a second queue's strokes stay invisible.
@@ -166,7 +172,7 @@ class ProgramState final : public GlResource {
     }
   }
 
-  // Copies: the program may outlive the library that brought them, and is built again from them.
+  // Copies: the program may outlive the library that brought them.
   std::string mVertexSource;
   std::string mFragmentSource;
   GLuint mProgram = 0;

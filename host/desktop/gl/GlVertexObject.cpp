@@ -22,14 +22,14 @@ namespace QeltDesktop {
 
 namespace {
 
-// Those with batches of several slices that the running task has uploaded.
+// The list of those whose batches of several slices the running task has uploaded.
 thread_local GlVertexObject* tFirstLarge = nullptr;
 
 std::atomic<std::uint64_t> gUndrawn{0};
 
 constexpr std::size_t kAlwaysFits = std::size_t{1} << 20;  // bytes
 
-// Drivers take memory as they draw and crash when there is none: is there some left?
+// Drivers allocate while they draw, and crash where they cannot. Returns whether memory is left for them.
 bool hasRoomForDriver() {
   constexpr std::size_t kRoom = std::size_t{128} << 20;
   void* const room = ::operator new(kRoom, std::nothrow);
@@ -37,7 +37,7 @@ bool hasRoomForDriver() {
   return room != nullptr;
 }
 
-// Strips, fans and loops hang together; what is separate looks the same in slices, drawn in order.
+// Strips, fans and loops cannot be cut; points, lines and triangles look the same drawn slice by slice.
 bool isSeparate(GLenum primitive) {
   return primitive == GL_POINTS || primitive == GL_LINES || primitive == GL_TRIANGLES;
 }
@@ -85,14 +85,14 @@ bool GlVertexObject::upload(Buffer& buffer, const void* data, int vertices) {
   const auto most = static_cast<std::size_t>(mSliceVertices);
   if (!setSliceCount(buffer, std::max<std::size_t>(1, count / most + (count % most > 0 ? 1 : 0))))
     return false;
-  // Asking for errors waits for some drivers; a batch of a live event always fits.
+  // With some drivers, asking for errors waits for the GPU; a live event's batch is small and always fits.
   const bool asks = count * strideBytes() > kAlwaysFits;
   if (asks) takeGlErrors();  // whatever others left
   std::size_t done = 0;
   for (const Slice& slice : buffer.slices) {
     const std::size_t size = std::min(count - done, most) * strideBytes();
     glBindBuffer(GL_ARRAY_BUFFER, slice.store);
-    // A store of its own for each batch: draws of the last one may still be under way.
+    // A new store for each batch, because the GPU may still be drawing from the last one.
     glBufferData(GL_ARRAY_BUFFER, static_cast<GLsizeiptr>(size), nullptr, GL_DYNAMIC_DRAW);
     bool good = !asks || takeGlErrors();
     if (good && size > 0) {
@@ -138,7 +138,7 @@ std::uint64_t GlVertexObject::undrawnBatches() {
 void GlVertexObject::dropLargeBatches() {
   for (GlVertexObject** link = &tFirstLarge; *link != nullptr;) {
     GlVertexObject* const object = *link;
-    // Another queue's, whose task this thread goes on with later.
+    // It belongs to another queue, whose task this thread goes on with later.
     if (!object->isLive()) {
       link = &object->mNextLarge;
       continue;
@@ -188,7 +188,7 @@ bool GlVertexObject::setSliceCount(Buffer& buffer, std::size_t count) {
   return true;
 }
 
-void GlVertexObject::forget() {
+void GlVertexObject::forget() noexcept {
   unlinkLarge();
   for (Buffer& buffer : mBuffers) {
     buffer.slices.resize(1);
@@ -197,7 +197,7 @@ void GlVertexObject::forget() {
   }
 }
 
-void GlVertexObject::remake() {
+void GlVertexObject::remake() noexcept {
   for (Buffer& buffer : mBuffers) makeNames(buffer.slices.front());
 }
 

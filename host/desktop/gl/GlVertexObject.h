@@ -13,9 +13,9 @@
 
 namespace QeltDesktop {
 
-// Vertex buffers in GL's memory; this side keeps no copy. A context loss leaves them empty, and whoever draws
-// uploads first. A batch of more than 1 MiB that there is no memory for is logged in one line and not drawn.
-// Render thread.
+// Vertex buffers in GL's memory; the host keeps no copy of what is in them. After a context loss they are
+// there again, empty: whoever draws uploads first. A batch of more than 1 MiB that there is no memory for is
+// logged in one line and not drawn. Render thread.
 //
 // A large batch of points, lines or triangles lies in slices, each a store and a draw of its own: drivers
 // that count bytes in 32 bits crash on a store of some gigabytes. Such a batch goes with the render task that
@@ -23,8 +23,8 @@ namespace QeltDesktop {
 // until the next.
 class QELT_HOST_API GlVertexObject final : public Qelt::GraphicsObject, public GlResource {
  public:
-  // Vertices a slice. A multiple of 6, so that a border cuts through no line and no triangle, and the two
-  // triangles of a stamp stay together; over 32 MiB of any pen's, so that the C library gives freed slices
+  // Vertices per slice. A multiple of 6, so that a border cuts through no line and no triangle, and the two
+  // triangles of a stamp stay together; over 32 MiB for any pen, so that the C library gives freed slices
   // back to the system.
   static constexpr int kSliceVertices = 6 << 18;
 
@@ -54,12 +54,12 @@ class QELT_HOST_API GlVertexObject final : public Qelt::GraphicsObject, public G
     int vertices = 0;
   };
 
-  void forget() override;
-  void remake() override;
+  void forget() noexcept override;
+  void remake() noexcept override;
 
   std::size_t strideBytes() const;
   void makeNames(Slice& slice);
-  // False when there is no memory for them; then the buffer is in no good state.
+  // False when there is no memory for them; then `empty` must follow.
   bool setSliceCount(Buffer& buffer, std::size_t count);
   bool upload(Buffer& buffer, const void* data, int vertices);
   void empty(Buffer& buffer);

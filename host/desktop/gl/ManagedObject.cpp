@@ -10,7 +10,6 @@
 
 #include "desktop/base/Log.h"
 #include "desktop/gl/GlDevice.h"
-#include "desktop/gl/ManagedObjects.h"
 
 namespace {
 
@@ -26,7 +25,8 @@ struct Registry {
   std::uint64_t notices = 0;
 };
 
-// Never destroyed: objects with static lifetime still leave it at exit. In place: leaving takes no memory.
+// Never destroyed, since objects with static lifetime still leave it at exit. Not on the heap: it needs no
+// memory.
 Registry& registry() {
   alignas(Registry) static std::byte place[sizeof(Registry)];
   static Registry* const instance = new (place) Registry;
@@ -35,8 +35,8 @@ Registry& registry() {
 
 using Notice = void (Qelt::ManagedObject::*)();
 
-// Takes no memory: an object that were not told would stay without its contents. Objects may come and go
-// meanwhile; one that comes is not told.
+// Needs no memory, so that everybody is told even when none is left. Objects may come and go meanwhile; those
+// that come are not told.
 void notify(const QeltDesktop::GlDevice* device, Notice notice) {
   std::uint64_t number = 0;
   for (;;) {

@@ -44,7 +44,8 @@ bool runAndDelete(Qelt::ITask* task) noexcept {
   return ran;
 }
 
-// A call that somebody waits for, in that somebody's own memory: it can be posted when there is no other.
+// A call that somebody waits for. It lies in the memory of whoever waits, so that it can be posted when there
+// is no other memory left.
 class WaitedCall final : public Qelt::ITask {
  public:
   WaitedCall(const std::function<void()>& call, std::exception_ptr& thrown) : mCall(call), mThrown(thrown) {}
@@ -87,18 +88,19 @@ class CurrentDevice {
 
 }  // namespace
 
-RenderQueue::RenderQueue(Mode mode, GL gl) : mMode(mode), mRunner(std::this_thread::get_id()) {
+RenderQueue::RenderQueue(Mode mode, GL gl, const Surface& surface)
+    : mMode(mode), mRunner(std::this_thread::get_id()) {
   if (mMode == Mode::Caller) {
     const CurrentDevice outer(GlDevice::current());
-    openDevice(gl);
+    openDevice(gl, surface);
     if (mDevice != nullptr) mDevice->clearCurrent();
     return;
   }
   std::promise<void> opened;
   std::future<void> ready = opened.get_future();
-  mThread = std::thread([this, gl, opened = std::move(opened)]() mutable {
+  mThread = std::thread([this, gl, &surface, opened = std::move(opened)]() mutable {
     try {
-      openDevice(gl);
+      openDevice(gl, surface);
       const std::lock_guard guard(mMutex);
       mRunner = std::this_thread::get_id();
     } catch (...) {
@@ -129,10 +131,10 @@ RenderQueue::~RenderQueue() {
   shutDown();
 }
 
-void RenderQueue::openDevice(GL gl) {
+void RenderQueue::openDevice(GL gl, const Surface& surface) {
   mRendererName = "none";
   if (gl == GL::None) return;
-  mDevice = std::make_unique<GlDevice>();
+  mDevice = std::make_unique<GlDevice>(surface);
   mRendererName = mDevice->description();
 }
 
@@ -219,11 +221,14 @@ void RenderQueue::waitFor(std::unique_lock<std::mutex>& lock, std::uint64_t last
   }
 }
 
-void RenderQueue::finish() {
+bool RenderQueue::finish() {
   std::unique_lock lock(mMutex);
-  if (mRan == mPosted || isInsideTask() || !canWait()) return;
+  if (isInsideTask()) return mFirst == nullptr;
+  if (mRan == mPosted) return true;
+  if (!canWait()) return false;
   const CurrentDevice current(callersDevice());
   waitFor(lock, mPosted);
+  return true;
 }
 
 void RenderQueue::runPending() {

@@ -10,6 +10,7 @@
 #include <thread>
 
 #include "base/HostApi.h"
+#include "desktop/platform/Platform.h"
 #include "gl/IGLMsgQueue.h"
 
 namespace QeltDesktop {
@@ -21,28 +22,32 @@ class GlDevice;
 // waiting and `run` allocate nothing.
 //
 // `Post`, `run`, `finish`, `loseContext` and `restoreContext` may be called from any thread; `shutDown` and
-// the destructor by the thread that made the queue. In `Caller` mode there is no thread: tasks run on the
-// thread that made the queue, inside `finish`, `runPending`, `run` and the end of the queue; on any other
-// thread only `Post` does anything there.
+// the destructor by the thread that made the queue.
+//
+// In `Caller` mode there is no thread: for hosts that have none, such as a browser's main loop. The thread
+// that made the queue runs the tasks, whenever it calls `finish`, `runPending` or `run`, and at the latest
+// when it ends the queue. Any other thread may post, and nothing more.
 class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
  public:
   enum class Mode { Thread, Caller };
   enum class GL { None, Context };
 
-  // Throws std::runtime_error with one clear line when a context is wanted and there is none.
-  RenderQueue(Mode mode, GL gl);
-  // As `shutDown`. GL wrappers that are still there become inert. No other thread may be inside a call by
-  // then, but for a `Post` whose task has run. A task must not destroy its own queue: that logs one line and
-  // aborts.
+  // The surface is what the context can present to; by default none. Throws std::runtime_error with one clear
+  // line when a context is wanted and there is none.
+  RenderQueue(Mode mode, GL gl, const Surface& surface = {});
+  // Does what `shutDown` does. GL wrappers that still exist do nothing from then on. No other thread may be
+  // inside a call any more, except for a `Post` whose task has run. A task that destroys its own queue logs
+  // one line and aborts the process.
   ~RenderQueue() override;
   RenderQueue(const RenderQueue&) = delete;
   RenderQueue& operator=(const RenderQueue&) = delete;
 
   bool Post(Qelt::ITask* task) override;
 
-  // Waits until everything posted so far has run, and for nothing that is posted later. Inside a task it
-  // returns at once.
-  void finish();
+  // Waits until everything posted so far has run, and for nothing that is posted later. It cannot wait inside
+  // a task, nor on a thread that may only post. Returns false when something that was posted before has not
+  // run.
+  bool finish();
   // `Caller` mode: runs everything posted so far; otherwise does nothing.
   void runPending();
   // Runs a call on the render thread after everything posted so far, and waits for it; inside a task it runs
@@ -53,11 +58,13 @@ class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
   // it only refuses posts.
   void shutDown();
 
-  // Loses the GL context and makes another: managed objects hear of both, and the host's GL wrappers come
-  // back: vertex buffers empty, programs with their bindings, layers and what a canvas drew into with their
-  // pixels, other bitmaps zeroed. Each waits, and throws std::runtime_error when there is no context to
-  // be had. Without GL they do nothing.
+  // The GL context is gone: the system took it away, or a test wants to see what happens then. Nothing is
+  // read back from it. Managed objects hear OnRelease, and until the next context nothing is drawn. Waits.
   void loseContext();
+  // Makes the next context. In it the host's own objects exist again: programs with their bindings, vertex
+  // objects without vertices, bitmaps and layers transparent, except for what a canvas drew. Then managed
+  // objects hear OnRestore, and upload their textures. Layers wait for their owners (`CanvasLayer`). Waits.
+  // Throws std::runtime_error when there is no context to be had.
   void restoreContext();
 
   // How many tasks threw. Any thread.
@@ -69,7 +76,7 @@ class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
   // Called for every accepted task on the thread that posts it, before it can run. Must not throw or post.
   // Set both before the first post.
   std::function<void(const Qelt::ITask&)> onAccepted;
-  // When set and answering false, a post is refused.
+  // When it is set and returns false, a post is refused.
   std::function<bool(const Qelt::ITask&)> accept;
 
  private:
@@ -79,9 +86,9 @@ class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
   // The task's number, counted from 1.
   std::uint64_t enqueue(Qelt::ITask* task, bool internal);
   void threadMain();
-  void openDevice(GL gl);
+  void openDevice(GL gl, const Surface& surface);
 
-  // With the lock held; the two that run tasks or wait let go of it meanwhile.
+  // These are called with the lock held. The first two release it while they run a task or wait.
   void runNext(std::unique_lock<std::mutex>& lock);
   void waitFor(std::unique_lock<std::mutex>& lock, std::uint64_t last);
   bool isRunner() const;
@@ -92,7 +99,7 @@ class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
   GlDevice* callersDevice() const;
 
   const Mode mMode;
-  std::mutex mMutex;  // guards what follows, to the blank line
+  std::mutex mMutex;  // guards the members from here to the blank line
   std::condition_variable mWork;
   std::condition_variable mProgress;
   Qelt::ITask* mFirst = nullptr;
@@ -104,7 +111,7 @@ class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
   bool mClosed = false;
   bool mThreadWaits = false;
   bool mTaskRuns = false;
-  std::thread::id mRunner;  // nobody's once the thread has ended
+  std::thread::id mRunner;  // the thread that runs tasks; none once it has ended
 
   std::unique_ptr<GlDevice> mDevice;  // used by the runner alone
   std::string mRendererName;

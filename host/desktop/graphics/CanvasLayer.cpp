@@ -32,7 +32,7 @@ CanvasLayer::CanvasLayer(RenderQueue& queue, int width, int height, int tileSize
       throw std::runtime_error("a page of " + size + " is larger than OpenGL can draw here (" +
                                std::to_string(most) + " x " + std::to_string(most) + ")");
     }
-    mBitmap = std::make_unique<GlBitmap>(width, height, tileSize, GlBitmap::OnLoss::Keep);
+    mBitmap = std::make_unique<GlBitmap>(width, height, tileSize);
     if (!mBitmap->isRenderable()) {
       mBitmap.reset();
       throw std::runtime_error("OpenGL has no memory for a page of " + size);
@@ -55,6 +55,10 @@ Qelt::ISPBitmap* CanvasLayer::GetBitmap() {
 
 void CanvasLayer::clear() {
   mQueue.run([this] { mBitmap->clear(0.0f, 0.0f, 0.0f, 0.0f); });
+}
+
+int CanvasLayer::timesEmptied() const {
+  return mBitmap->timesEmptied();
 }
 
 std::vector<std::uint8_t> CanvasLayer::readPixels() {

@@ -14,9 +14,12 @@ class GlBitmap;
 class RenderQueue;
 
 // A layer that pens draw into: one RGBA8 texture whose first row is the top of the page, in tiles that are
-// windows into one framebuffer, numbered row by row. It starts transparent, holds premultiplied colour and
-// keeps its pixels over a context loss. Made, cleared, read and destroyed by the thread that made the
-// queue, which outlives the layer; drawn into on the render thread.
+// windows into one framebuffer, numbered row by row. It starts transparent and holds premultiplied colour.
+// Made, cleared, read and destroyed by the thread that made the queue, which outlives the layer; drawn into
+// on the render thread.
+//
+// A context loss takes the pixels: when the context is restored the layer is transparent, and `timesEmptied`
+// has gone up. Whoever owns the layer then has its strokes drawn again; nobody else knows what was on it.
 class QELT_HOST_API CanvasLayer : public Qelt::ISPLayer {
  public:
   static constexpr int kTileSize = 512;
@@ -37,6 +40,8 @@ class QELT_HOST_API CanvasLayer : public Qelt::ISPLayer {
   int height() const { return mHeight; }
   // Makes every pixel transparent, after everything posted so far.
   void clear();
+  // How often the layer has come back empty after a context loss. Any thread.
+  int timesEmptied() const;
   // width x height x 4 bytes, red first, premultiplied, first row = top, after everything posted so far.
   // Throws std::runtime_error while there is no context.
   std::vector<std::uint8_t> readPixels();

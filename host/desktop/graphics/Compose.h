@@ -9,10 +9,10 @@
 
 namespace QeltDesktop {
 
-// Lays layers over each other and onto a background, pixel by pixel. Each layer holds 4 bytes a pixel, red
+// Lays layers over each other and onto a background, pixel by pixel. Each layer holds 4 bytes per pixel, red
 // first, premultiplied, the lowest layer first; all have the same size. With a background (red, green,
-// blue) the result is opaque; without one it keeps its transparency, not premultiplied. 4 bytes a pixel
-// again. Layers of different sizes throw std::invalid_argument. Any thread.
+// blue) the result is opaque; without one it keeps its transparency, not premultiplied. 4 bytes per
+// pixel again. Layers of different sizes throw std::invalid_argument. Any thread.
 QELT_HOST_API std::vector<std::uint8_t> composeLayers(
     const std::vector<std::vector<std::uint8_t>>& layers,
     const std::optional<std::array<std::uint8_t, 3>>& background);

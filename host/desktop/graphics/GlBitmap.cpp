@@ -63,8 +63,8 @@ void GlTile::EndRender(int) {
   mBitmap.endRender();
 }
 
-GlBitmap::GlBitmap(int width, int height, int tileSize, OnLoss onLoss)
-    : mWidth(width), mHeight(height), mOnLoss(onLoss), mTextureInterface(*this) {
+GlBitmap::GlBitmap(int width, int height, int tileSize)
+    : mWidth(width), mHeight(height), mTextureInterface(*this) {
   for (int y = 0; tileSize > 0 && y < height; y += std::min(tileSize, height - y)) {
     for (int x = 0; x < width; x += std::min(tileSize, width - x)) {
       mTiles.push_back(std::make_unique<GlTile>(*this, x, y, std::min(tileSize, width - x),
@@ -147,33 +147,33 @@ std::vector<std::uint8_t> GlBitmap::readPixels() {
   return pixels;
 }
 
-void GlBitmap::save() {
-  if (mOnLoss == OnLoss::Keep) mSaved = readPixels();
+std::vector<std::uint8_t>& GlBitmap::canvasPixels() {
+  if (mCanvasPixels.empty()) mCanvasPixels.resize(byteCount(mWidth, mHeight));
+  return mCanvasPixels;
 }
 
-// An empty list assigned would leave the memory with the vector.
-void GlBitmap::dropSaved() noexcept {
-  mSaved = std::vector<std::uint8_t>();
+void GlBitmap::showCanvasPixels() {
+  SetPixels(mCanvasPixels.data(), mWidth, mHeight);
 }
 
-void GlBitmap::forget() {
+void GlBitmap::forget() noexcept {
   mTexture = mFramebuffer = 0;
 }
 
-void GlBitmap::remake() {
+void GlBitmap::remake() noexcept {
   makeTexture();
+  if (!mCanvasPixels.empty()) showCanvasPixels();
+  ++mTimesEmptied;
 }
 
 void GlBitmap::makeTexture() {
   gl(glGenTextures)(1, &mTexture);
   bindTexture();
   setUnpacking(0);
-  gl(glTexImage2D)(GL_TEXTURE_2D, 0, GL_RGBA8, mWidth, mHeight, 0, GL_RGBA, GL_UNSIGNED_BYTE,
-                   mSaved.empty() ? nullptr : mSaved.data());
+  gl(glTexImage2D)(GL_TEXTURE_2D, 0, GL_RGBA8, mWidth, mHeight, 0, GL_RGBA, GL_UNSIGNED_BYTE, nullptr);
   for (const auto& [name, value] : mParameters) gl(glTexParameteri)(GL_TEXTURE_2D, name, value);
   // Drivers need not zero a new texture.
-  if (mSaved.empty()) clear(0.0f, 0.0f, 0.0f, 0.0f);
-  dropSaved();
+  clear(0.0f, 0.0f, 0.0f, 0.0f);
 }
 
 bool GlBitmap::bindFramebuffer() {

@@ -2,6 +2,7 @@
 
 #include <GLES3/gl3.h>
 
+#include <atomic>
 #include <cstdint>
 #include <memory>
 #include <utility>
@@ -46,16 +47,14 @@ class GlTile final : public Qelt::ISPSubBitmap {
   Qelt::Matrix4<float> mProjection;
 };
 
-// An RGBA8 texture, its first row texture coordinate 0 and window coordinate 0. It is zeroed when made and
-// when it comes back after a context loss, unless it keeps its pixels. Render thread; one made
-// on a thread without a GL device stays empty for good.
+// An RGBA8 texture, its first row texture coordinate 0 and window coordinate 0. It is transparent when it is
+// made, and again when it comes back after a context loss: whoever uploaded to it or drew into it does so
+// again. What a canvas drew comes back by itself, because a canvas draws in the program's own memory. Render
+// thread; one made on a thread without a GL device stays empty for good.
 class QELT_HOST_API GlBitmap final : public Qelt::ISPBitmap, public GlResource {
  public:
-  // What happens to the pixels when the context is lost.
-  enum class OnLoss { Zero, Keep };
-
   // `tileSize` 0: no tiles, the bitmap is no render target for pens.
-  GlBitmap(int width, int height, int tileSize, OnLoss onLoss);
+  GlBitmap(int width, int height, int tileSize);
   ~GlBitmap() override;
 
   int GetWidth() const override { return mWidth; }
@@ -66,8 +65,13 @@ class QELT_HOST_API GlBitmap final : public Qelt::ISPBitmap, public GlResource {
   int GetTileCount() const override { return static_cast<int>(mTiles.size()); }
   Qelt::ISPSubBitmap* GetSubBitmap(int index) override;
 
-  // From here on the pixels outlive a context loss: nobody would draw them again.
-  void keepPixels() { mOnLoss = OnLoss::Keep; }
+  // The pixels that a canvas draws: 4 bytes each, premultiplied, the first row first, all transparent at the
+  // first call. Throws std::bad_alloc.
+  std::vector<std::uint8_t>& canvasPixels();
+  // Makes them the bitmap's, now and in every context to come.
+  void showCanvasPixels();
+  // How often the bitmap has come back empty after a context loss. Any thread.
+  int timesEmptied() const { return mTimesEmptied; }
   // True when the texture and a framebuffer around it exist in the current context.
   bool isRenderable();
   // Makes a rectangle the render target: framebuffer, viewport and scissor. False without a context.
@@ -80,10 +84,8 @@ class QELT_HOST_API GlBitmap final : public Qelt::ISPBitmap, public GlResource {
  private:
   friend class GlTexture;
 
-  void save() override;
-  void dropSaved() noexcept override;
-  void forget() override;
-  void remake() override;
+  void forget() noexcept override;
+  void remake() noexcept override;
 
   void makeTexture();
   bool bindFramebuffer();
@@ -92,11 +94,11 @@ class QELT_HOST_API GlBitmap final : public Qelt::ISPBitmap, public GlResource {
 
   const int mWidth;
   const int mHeight;
-  OnLoss mOnLoss;
   GlTexture mTextureInterface;
   std::vector<std::unique_ptr<GlTile>> mTiles;
   std::vector<std::pair<GLenum, GLint>> mParameters;  // set again in the next context
-  std::vector<std::uint8_t> mSaved;                   // while the context is lost
+  std::vector<std::uint8_t> mCanvasPixels;            // none where no canvas ever drew
+  std::atomic<int> mTimesEmptied{0};
   GLuint mTexture = 0;
   GLuint mFramebuffer = 0;
 };

@@ -9,7 +9,7 @@ namespace QeltDesktop {
 
 class CanvasLayer;
 
-// A view of a layer. Everything it is given is borrowed and outlives it. Main thread, but for the layer.
+// A view of a layer. Everything it is given is borrowed and outlives it. Main thread, except GetLayer.
 class QELT_HOST_API PenCanvas : public Qelt::ISPPenCanvas {
  public:
   // Without a layer nothing is drawn and no GL is needed.
@@ -32,7 +32,7 @@ class QELT_HOST_API PenCanvas : public Qelt::ISPPenCanvas {
   Qelt::IGLMsgQueue* mQueue;
   CanvasLayer* mLayer;
   Qelt::Matrix3<float> mMatrix;
-  Qelt::Vector2<float> mInverseScale{1.0f, 1.0f};  // of mMatrix: stroke units a pixel in x and y
+  Qelt::Vector2<float> mInverseScale{1.0f, 1.0f};  // of mMatrix: stroke units per pixel in x and y
 };
 
 }  // namespace QeltDesktop

@@ -6,15 +6,15 @@
 #include <unordered_map>
 
 #include "desktop/gl/GlDevice.h"
+#include "desktop/graphics/BitmapCanvas.h"
 #include "desktop/graphics/GlBitmap.h"
-#include "desktop/graphics/GlCanvas.h"
 #include "graphics/ISPBitmap.h"
 #include "graphics/ISPCanvas.h"
 
 namespace Qelt {
 
+using QeltDesktop::BitmapCanvas;
 using QeltDesktop::GlBitmap;
-using QeltDesktop::GlCanvas;
 using QeltDesktop::GlDevice;
 
 namespace {
@@ -39,7 +39,7 @@ ISPBitmap* SPGraphicsFactory::CreateBitmap(IGLMsgQueue*, int width, int height, 
   if (device == nullptr || width <= 0 || height <= 0) return nullptr;
   if (width > device->maxTextureSize() || height > device->maxTextureSize()) return nullptr;
   try {
-    auto bitmap = std::make_unique<GlBitmap>(width, height, 0, GlBitmap::OnLoss::Zero);
+    auto bitmap = std::make_unique<GlBitmap>(width, height, 0);
     if (pixels != nullptr) bitmap->SetPixels(pixels, width, height);
     LiveBitmaps& live = liveBitmaps();
     const std::lock_guard guard(live.lock);
@@ -65,10 +65,9 @@ void SPGraphicsFactory::ReleaseBitmap(ISPBitmap* bitmap) {
 
 ISPCanvas* SPGraphicsFactory::CreateCanvas(IGLMsgQueue*, ISPBitmap* bitmap, int) {
   auto* const target = dynamic_cast<GlBitmap*>(bitmap);
-  if (target == nullptr) return nullptr;
+  if (target == nullptr || target->GetTileCount() > 0) return nullptr;
   try {
-    auto canvas = std::make_unique<GlCanvas>(*target);
-    return canvas->isReady() ? canvas.release() : nullptr;
+    return new BitmapCanvas(*target);
   } catch (const std::bad_alloc&) {
     return nullptr;
   }

@@ -1,4 +1,4 @@
-#include "model/ObjectBase.h"
+#include "model/ObjectStroke.h"
 
 #include <map>
 #include <mutex>
@@ -64,5 +64,8 @@ ObjectBase* ObjectBase::FindObjectBase(int runtimeHandle) {
   const auto found = all.objects.find(runtimeHandle);
   return found == all.objects.end() ? nullptr : found->second;
 }
+
+ObjectStroke::ObjectStroke() = default;
+ObjectStroke::~ObjectStroke() = default;
 
 }  // namespace Qelt

@@ -13,7 +13,7 @@ namespace QeltDesktop {
 // stale (`SetRedrawingCacheDirtyFlag`).
 class QELT_HOST_API StoredStroke : public Qelt::ObjectStroke {
  public:
-  // `toolType`: 1 finger, 2 stylus, 3 mouse. Without angles, tilt and orientation answer null.
+  // `toolType`: 1 finger, 2 stylus, 3 mouse. Without angles, tilt and orientation are null.
   explicit StoredStroke(int toolType, bool hasAngles = true);
   ~StoredStroke() override;
 

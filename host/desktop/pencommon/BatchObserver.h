@@ -20,15 +20,15 @@ struct Batch {
   std::vector<std::vector<float>> buffers;  // one, or an outline's two: inner first
 };
 
-// Whom to show every batch that reaches a render drawable, on the render thread; an empty function ends it.
-// Any thread.
+// Sets who is shown every batch that reaches a render drawable, on the render thread; nobody by an empty
+// function. Any thread.
 QELT_HOST_API void setBatchObserver(std::function<void(Batch)> observer);
 
-// Bytes of vertices that drawables have written into batches since the process began; a call's are in it when
-// the call returns. Any thread.
+// Bytes of vertices that drawables have written into batches since the process began. Those of a call are
+// counted when the call returns. Any thread.
 QELT_HOST_API std::uint64_t writtenBytes();
 
-// Counts batches that nothing more is written into; null ones are left out. Main thread.
+// Counts batches that are complete; null ones are left out. Main thread.
 void countWritten(std::initializer_list<const std::vector<float>*> buffers);
 
 // Shows a hand-over to the observer, if there is one. Null buffers are left out, and a hand-over of nothing

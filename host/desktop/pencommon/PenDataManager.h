@@ -7,7 +7,7 @@
 
 namespace QeltDesktop {
 
-// The render-thread side of the desktop's pens: a queue, and a count of the pens that said goodbye.
+// What the desktop's pens share: the queue to the render thread, and a count of the pens that were deleted.
 class QELT_HOST_API PenDataManager : public Qelt::PenGLDataManager {
  public:
   // Borrowed; may be null.

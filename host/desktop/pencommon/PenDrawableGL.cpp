@@ -1,5 +1,6 @@
 #include "pencommon/PenDrawableGL.h"
 
+#include "desktop/base/Log.h"
 #include "desktop/gl/CallTask.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/graphics/CanvasLayer.h"
@@ -12,22 +13,29 @@ namespace Qelt {
 
 namespace {
 
-// The way to the render thread: the pens' own, else that of the last canvas.
+// The way to the render thread: the queue of the pens, or that of the last canvas where they have none.
 IGLMsgQueue* queueOf(PenGLDataManager* manager, IGLMsgQueue* ofCanvas) {
   IGLMsgQueue* const queue = manager != nullptr ? manager->GetMsgQueue() : nullptr;
   return queue != nullptr ? queue : ofCanvas;
 }
 
-// A canvas of ours tells its queue even where a subclass has none to give for the moment.
+// Where a subclass of our own canvas has no queue to give for the moment, the canvas itself still knows it.
 IGLMsgQueue* queueOf(ISPPenCanvas* canvas) {
   if (const auto* const ours = dynamic_cast<const QeltDesktop::PenCanvas*>(canvas)) return ours->queue();
   return canvas != nullptr ? canvas->GetMsgQueue() : nullptr;
 }
 
-// Runs a call once the queue has run everything it took: there, while it still runs, else here.
+// Runs a call after everything that the queue has taken: on the render thread, or here when that has ended.
+// Where this cannot be waited for, inside a render task or on a thread that may only post, the call is not
+// made.
 template <typename Call>
 void runAfterAll(IGLMsgQueue* queue, Call call) {
   auto* const renderQueue = dynamic_cast<QeltDesktop::RenderQueue*>(queue);
+  if (renderQueue != nullptr && !renderQueue->finish()) {
+    QeltDesktop::logError(
+        "a drawable stays in memory: it was destroyed where its tasks could not be waited for");
+    return;
+  }
   if (renderQueue == nullptr || !renderQueue->run(call)) call();
 }
 
@@ -41,8 +49,13 @@ PenDrawableGL::~PenDrawableGL() {
 
 void PenDrawableGL::SetCanvas(ISPPenCanvas* canvas) {
   mCanvas = canvas;
-  // One that was there stays: what was posted there still refers to the drawable.
-  if (IGLMsgQueue* const queue = queueOf(canvas); queue != nullptr) mCanvasQueue = queue;
+  IGLMsgQueue* const queue = queueOf(canvas);
+  if (queue != nullptr && queue != mCanvasQueue) {
+    // What was posted to the queue of the canvas before still refers to the drawable, and the two queues run
+    // side by side.
+    if (auto* const before = dynamic_cast<QeltDesktop::RenderQueue*>(mCanvasQueue)) before->finish();
+    mCanvasQueue = queue;
+  }
   prepareDrawableRT();
 }
 

@@ -1,5 +1,3 @@
-#include "desktop/gl/EglContext.h"
-
 #include <EGL/egl.h>
 #include <EGL/eglext.h>
 
@@ -8,6 +6,8 @@
 #include <stdexcept>
 #include <string_view>
 #include <vector>
+
+#include "desktop/platform/Platform.h"
 
 namespace QeltDesktop {
 
@@ -50,13 +50,14 @@ std::vector<EGLDisplay> candidateDisplays() {
 }
 
 struct Attempt {
+  EGLDisplay display = EGL_NO_DISPLAY;
   EGLSurface surface = EGL_NO_SURFACE;
   EGLContext context = EGL_NO_CONTEXT;
   const char* failedStep = nullptr;
 };
 
-Attempt tryDisplay(EGLDisplay display) {
-  Attempt attempt;
+Attempt tryDisplay(EGLDisplay display, const Surface& wanted) {
+  Attempt attempt{.display = display};
   if (display == EGL_NO_DISPLAY || eglInitialize(display, nullptr, nullptr) != EGL_TRUE) {
     attempt.failedStep = "eglInitialize";
     return attempt;
@@ -65,11 +66,13 @@ Attempt tryDisplay(EGLDisplay display) {
     attempt.failedStep = "eglBindAPI";
     return attempt;
   }
-  const bool surfaceless = lists(eglQueryString(display, EGL_EXTENSIONS), "EGL_KHR_surfaceless_context");
+  const bool isShown = wanted.width > 0 && wanted.height > 0;
+  const bool needsNone =
+      !isShown && lists(eglQueryString(display, EGL_EXTENSIONS), "EGL_KHR_surfaceless_context");
   const EGLint configAttributes[] = {EGL_RENDERABLE_TYPE,
                                      EGL_OPENGL_ES3_BIT,
                                      EGL_SURFACE_TYPE,
-                                     surfaceless ? 0 : EGL_PBUFFER_BIT,
+                                     needsNone ? 0 : EGL_PBUFFER_BIT,
                                      EGL_RED_SIZE,
                                      8,
                                      EGL_GREEN_SIZE,
@@ -85,8 +88,10 @@ Attempt tryDisplay(EGLDisplay display) {
     attempt.failedStep = "eglChooseConfig";
     return attempt;
   }
-  if (!surfaceless) {
-    const EGLint surfaceAttributes[] = {EGL_WIDTH, 1, EGL_HEIGHT, 1, EGL_NONE};
+  if (!needsNone) {
+    // Where contexts without any surface are not offered, a single pixel stands in.
+    const EGLint surfaceAttributes[] = {EGL_WIDTH, isShown ? wanted.width : 1, EGL_HEIGHT,
+                                        isShown ? wanted.height : 1, EGL_NONE};
     attempt.surface = eglCreatePbufferSurface(display, config, surfaceAttributes);
     if (attempt.surface == EGL_NO_SURFACE) {
       attempt.failedStep = "eglCreatePbufferSurface";
@@ -108,39 +113,40 @@ std::string eglErrorText() {
   return text;
 }
 
+class EglContext final : public GlContext {
+ public:
+  explicit EglContext(const Attempt& made) : mMade(made) {}
+  // The display stays initialised: other contexts of the process share it, and ending it would unload the
+  // driver whose threads may still be winding down.
+  ~EglContext() override {
+    if (eglGetCurrentContext() == mMade.context) EglContext::clearCurrent();
+    eglDestroyContext(mMade.display, mMade.context);
+    if (mMade.surface != EGL_NO_SURFACE) eglDestroySurface(mMade.display, mMade.surface);
+  }
+
+  void makeCurrent() override {
+    if (eglMakeCurrent(mMade.display, mMade.surface, mMade.surface, mMade.context) != EGL_TRUE) {
+      throw std::runtime_error("the OpenGL ES context cannot be made current (" + eglErrorText() + ")");
+    }
+  }
+  void clearCurrent() override {
+    eglMakeCurrent(mMade.display, EGL_NO_SURFACE, EGL_NO_SURFACE, EGL_NO_CONTEXT);
+  }
+
+ private:
+  const Attempt mMade;
+};
+
 }  // namespace
 
-EglContext::EglContext() {
+std::unique_ptr<GlContext> GlContext::make(const Surface& surface) {
   std::string reasons;
   for (EGLDisplay display : candidateDisplays()) {
-    const Attempt attempt = tryDisplay(display);
-    if (attempt.failedStep == nullptr) {
-      mDisplay = display;
-      mSurface = attempt.surface;
-      mContext = attempt.context;
-      return;
-    }
+    const Attempt attempt = tryDisplay(display, surface);
+    if (attempt.failedStep == nullptr) return std::make_unique<EglContext>(attempt);
     reasons += std::string(reasons.empty() ? "" : ", ") + attempt.failedStep + " " + eglErrorText();
   }
   throw std::runtime_error("no OpenGL ES 3.0 on this machine (" + reasons + ")");
-}
-
-// The display stays initialised: other contexts of the process share it, and ending it would unload the
-// driver whose threads may still be winding down.
-EglContext::~EglContext() {
-  if (eglGetCurrentContext() == mContext) clearCurrent();
-  eglDestroyContext(mDisplay, mContext);
-  if (mSurface != EGL_NO_SURFACE) eglDestroySurface(mDisplay, mSurface);
-}
-
-void EglContext::makeCurrent() {
-  if (eglMakeCurrent(mDisplay, mSurface, mSurface, mContext) != EGL_TRUE) {
-    throw std::runtime_error("the OpenGL ES context cannot be made current (" + eglErrorText() + ")");
-  }
-}
-
-void EglContext::clearCurrent() {
-  eglMakeCurrent(mDisplay, EGL_NO_SURFACE, EGL_NO_SURFACE, EGL_NO_CONTEXT);
 }
 
 }  // namespace QeltDesktop

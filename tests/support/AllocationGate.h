@@ -1,16 +1,28 @@
 #pragma once
 
-#include <cstddef>
 #include <string>
 
 namespace QeltTests {
 
+// While one lives, this thread may be inside the plug-in, or in a render task: what it allocates there is not
+// the test's own.
+class PlugInCall {
+ public:
+  PlugInCall() { ++sDepth; }
+  ~PlugInCall() { --sDepth; }
+  PlugInCall(const PlugInCall&) = delete;
+  PlugInCall& operator=(const PlugInCall&) = delete;
+
+  static bool isUnderWay() { return sDepth > 0; }
+
+ private:
+  static inline thread_local int sDepth = 0;
+};
+
 // Stands between the plug-in and the process's `new` and `delete`. Who asks is told by the caller's address,
 // so that one allocation of the plug-in's, or of the host's inside a PlugInCall, can be made to fail without
 // touching anybody else's. Everything new of the plug-in's is filled with 0xCD, everything deleted with 0xDD.
-// Any thread may allocate; the rest is for one.
-//
-// A test that links this file has no other `operator new`.
+// Any thread may allocate; the rest is for one. Programs that look at allocations link qelt_allocation_gate.
 class AllocationGate {
  public:
   enum class Whose { PlugIns, Everyones };  // every one of plug-in and host, not of a driver
@@ -31,17 +43,25 @@ class AllocationGate {
   static long allBlocks();
   // The plug-in's allocations so far, failed ones included.
   static long plugInAllocations();
-  // The same of plug-in and host.
-  static long watchedAllocations();
   // How many allocations failed so far that told it by an exception.
   static long thrownFailures();
   // How many deletions were of something that was not alive.
   static long badDeletions();
   // Which of the plug-in's allocations gave the block that begins here; 0 when none did.
   static long numberOf(const void* address);
-  // Where the living blocks of plug-in and host that are younger than `after` watched allocations were asked
-  // for: addresses in their libraries, for addr2line.
-  static std::string livingSince(long after);
+};
+
+// While one lives, the `number`th allocation from 0 that this thread asks of `new`, whoever's code it is,
+// fails, once.
+class FailingAllocation {
+ public:
+  explicit FailingAllocation(long number);
+  ~FailingAllocation();
+  FailingAllocation(const FailingAllocation&) = delete;
+  FailingAllocation& operator=(const FailingAllocation&) = delete;
+
+  // Whether there was such an allocation.
+  bool hasFailed() const;
 };
 
 }  // namespace QeltTests

@@ -1,12 +1,11 @@
-#include "AllocationGate.h"
+#include "support/AllocationGate.h"
 
 #include <link.h>
-#include <pthread.h>
 #include <unwind.h>
 
 #include <atomic>
+#include <cstddef>
 #include <cstdint>
-#include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <iterator>
@@ -14,8 +13,6 @@
 #include <new>
 #include <stdexcept>
 #include <string_view>
-
-#include "PlugInCall.h"
 
 namespace {
 
@@ -28,7 +25,6 @@ struct Header {
   std::size_t size;  // of the block itself
   Header* previous;  // of the living blocks of plug-in and host
   Header* next;
-  std::uintptr_t caller;
   long number;  // of their allocations
   Owner owner;
 };
@@ -44,13 +40,15 @@ struct Code {
   }
 };
 
-constexpr const char* kHostNames[] = {"libQeltBase.so", "libQeltModel.so",    "libQeltEngine.so",
-                                      "libQeltGL.so",   "libQeltGraphics.so", "libQeltPenCommon.so"};
+constexpr const char* kHostNames[] = {"libQeltPlatform.so", "libQeltBase.so", "libQeltModel.so",
+                                      "libQeltEngine.so",   "libQeltGL.so",   "libQeltGraphics.so",
+                                      "libQeltPenCommon.so"};
 Code plugIn, standardLibrary, hosts[std::size(kHostNames)];
 std::atomic<long> blocks{0}, ownBlocks{0}, hostsBlocks{0}, ownAllocations{0}, watched{0},
     deletionsOfNothing{0}, thrown{0};
 std::atomic<long> askedSince{0}, failFrom{0}, failTo{0};  // failing: from <= number <= to
 std::atomic<bool> everyones{false};                       // are numbered, not the plug-in's alone
+thread_local long untilFailure = -1;                      // of this thread's; below 0: none is to fail
 
 // Guards the list of the living blocks of plug-in and host. Not a std::mutex's business to allocate, nor this
 // one's.
@@ -95,6 +93,7 @@ bool isNumbered(Owner owner, std::uintptr_t caller) {
 void* allocate(std::size_t size, std::size_t alignment, const void* callerAddress) {
   const auto caller = reinterpret_cast<std::uintptr_t>(callerAddress);
   const Owner owner = ownerOf(caller);
+  if (untilFailure >= 0 && untilFailure-- == 0) return nullptr;
   const long number = owner != Owner::Other ? watched.fetch_add(1) + 1 : 0;
   if (owner == Owner::PlugIn) ownAllocations.fetch_add(1);
   if (isNumbered(owner, caller)) {
@@ -109,7 +108,7 @@ void* allocate(std::size_t size, std::size_t alignment, const void* callerAddres
   const auto start = reinterpret_cast<std::uintptr_t>(base) + sizeof(Header);
   const std::uintptr_t block = (start + alignment - 1) / alignment * alignment;
   auto* const header = reinterpret_cast<Header*>(block) - 1;
-  *header = {kAlive, base, size, nullptr, nullptr, caller, number, owner};
+  *header = {kAlive, base, size, nullptr, nullptr, number, owner};
   blocks.fetch_add(1, std::memory_order_relaxed);
   auto* const memory = reinterpret_cast<void*>(block);
   if (owner != Owner::Other) {
@@ -204,10 +203,6 @@ long AllocationGate::plugInAllocations() {
   return ownAllocations;
 }
 
-long AllocationGate::watchedAllocations() {
-  return watched;
-}
-
 long AllocationGate::thrownFailures() {
   return thrown;
 }
@@ -224,26 +219,16 @@ long AllocationGate::numberOf(const void* address) {
   return 0;
 }
 
-std::string AllocationGate::livingSince(long after) {
-  char text[2048];
-  int length = 0;
-  {
-    const std::lock_guard hold(listLock);
-    for (const Header* header = living; header != nullptr && length < 2000; header = header->next) {
-      if (header->number <= after) continue;
-      const char* name = "plug-in";
-      std::uintptr_t begin = plugIn.begin;
-      for (std::size_t i = 0; i < std::size(hosts); ++i) {
-        if (!hosts[i].holds(header->caller)) continue;
-        name = kHostNames[i];
-        begin = hosts[i].begin;
-      }
-      length +=
-          std::snprintf(text + length, sizeof text - static_cast<std::size_t>(length), " %s 0x%zx(%zu bytes)",
-                        name, static_cast<std::size_t>(header->caller - begin), header->size);
-    }
-  }
-  return std::string(text, static_cast<std::size_t>(length));
+FailingAllocation::FailingAllocation(long number) {
+  untilFailure = number;
+}
+
+FailingAllocation::~FailingAllocation() {
+  untilFailure = -1;
+}
+
+bool FailingAllocation::hasFailed() const {
+  return untilFailure < 0;
 }
 
 }  // namespace QeltTests

@@ -1,14 +1,11 @@
 #include <gtest/gtest.h>
 
 #include <limits>
-#include <memory>
 #include <vector>
 
 #include "base/RefCount.h"
 #include "desktop/graphics/PenCanvas.h"
-#include "desktop/model/StoredStroke.h"
 #include "math/Matrix3.h"
-#include "model/ObjectBase.h"
 #include "pencommon/PenStrokeDataManager.h"
 
 namespace {
@@ -23,7 +20,7 @@ PenStrokePointData* pointsOf(std::vector<float> floats) {
   return points;
 }
 
-class StrokeCache : public testing::Test {
+class StrokeDataManager : public testing::Test {
  protected:
   void SetUp() override { manager.SetInverseScale({1.0f, 1.0f}); }
   void TearDown() override { manager.DropStrokeData(kHandle); }
@@ -32,24 +29,8 @@ class StrokeCache : public testing::Test {
   PenStrokeDataManager& manager = *PenStrokeDataManager::GetInstance();
 };
 
-TEST_F(StrokeCache, OnlyThePageMakesEntriesAndPointsNeedABuffer) {
-  EXPECT_EQ(manager.GetStrokeData(kHandle), nullptr);
-  manager.ReleaseStrokeData(kHandle);
-  manager.CreateStrokeData(kHandle);
-  PenStrokeData* const data = manager.GetStrokeData(kHandle);
-  ASSERT_NE(data, nullptr);
-  manager.CreateStrokeData(kHandle);
-  EXPECT_EQ(manager.GetStrokeData(kHandle), data);
-  auto* const empty = new PenStrokePointData;
-  EXPECT_FALSE(data->SetPointData(empty));
-  EXPECT_EQ(data->GetPointData(), nullptr);
-  empty->Unref();
-  manager.ReleaseStrokeData(kHandle);
-  manager.ReleaseStrokeData(kHandle);
-}
-
 // Under AddressSanitizer this is the test that the last use frees, and no sooner.
-TEST_F(StrokeCache, ADroppedEntryGoesWithItsLastUseAndOneMadeAnewMeanwhileIsEmpty) {
+TEST_F(StrokeDataManager, ADroppedEntryGoesWithItsLastUseAndOneMadeAnewMeanwhileIsEmpty) {
   for (const bool isMadeAnew : {false, true}) {
     manager.CreateStrokeData(kHandle);
     PenStrokeData* const data = manager.GetStrokeData(kHandle);
@@ -73,7 +54,7 @@ TEST_F(StrokeCache, ADroppedEntryGoesWithItsLastUseAndOneMadeAnewMeanwhileIsEmpt
 }
 
 // That is the canvas that a pen asked for its matrix last, not the one that was made or moved last.
-TEST_F(StrokeCache, PointsRecordTheScaleOfTheViewThatTheyWereStoredIn) {
+TEST_F(StrokeDataManager, PointsRecordTheScaleOfTheViewThatTheyWereStoredIn) {
   QeltDesktop::PenCanvas canvas(nullptr, nullptr);
   Qelt::Matrix3<float> zoom;
   zoom.setScale(4.0f, 2.0f);
@@ -93,16 +74,6 @@ TEST_F(StrokeCache, PointsRecordTheScaleOfTheViewThatTheyWereStoredIn) {
   constexpr float kInfinity = std::numeric_limits<float>::infinity();
   EXPECT_FALSE(points->hasSameInverseScale({kInfinity, kInfinity}));
   points->Unref();
-}
-
-TEST(PageObjects, AreFoundByHandleWhileTheyLive) {
-  auto stroke = std::make_unique<QeltDesktop::StoredStroke>(2);
-  const int handle = stroke->GetRuntimeHandle();
-  const QeltDesktop::StoredStroke other(1);
-  EXPECT_NE(other.GetRuntimeHandle(), handle);
-  EXPECT_EQ(Qelt::ObjectBase::FindObjectBase(handle), stroke.get());
-  stroke.reset();
-  EXPECT_EQ(Qelt::ObjectBase::FindObjectBase(handle), nullptr);
 }
 
 }  // namespace

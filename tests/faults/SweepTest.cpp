@@ -1,0 +1,474 @@
+// Everything that can fail a pen from outside, made to fail at every single place: the first, the second, and
+// so on until a run meets no failure; alone, then with all after it. Whatever happened, the same drawable
+// draws as a fresh one afterwards, and nothing is left.
+
+#include <gtest/gtest.h>
+
+#include <functional>
+#include <limits>
+#include <map>
+#include <memory>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "desktop/gl/CallTask.h"
+#include "gl/ManagedObject.h"
+#include "support/AllocationGate.h"
+#include "support/LogCapture.h"
+#include "support/PenBoard.h"
+
+namespace QeltTests {
+namespace {
+
+using QeltDesktop::RenderQueue;
+
+// What a host does while something fails.
+struct Scenario {
+  const char* name;
+  void (*run)(PenBoard&);
+  bool everyVersion = false;             // or the newest alone; of pictures, one of each render drawable
+  bool picture = false;                  // or no GL
+  void (*prepare)(PenBoard&) = nullptr;  // before anything fails
+};
+
+void queueAndDie(PenBoard& board, std::initializer_list<Kind> kinds) {
+  board.keepsUp = false;
+  for (const Kind kind : kinds) board.draw(kind);
+  board.deletePen();
+}
+
+// Where a pen dies, it dies with work queued. Those with a picture: textures, shaders, buffers; loss of the
+// context.
+constexpr Scenario kLiveQueued{"LiveStrokeQueuedAsThePenDies",
+                               [](PenBoard& board) { queueAndDie(board, {Kind::Live}); }};
+constexpr Scenario kRedrawsQueued{"RedrawsQueuedAsThePenDies",
+                                  [](PenBoard& board) { queueAndDie(board, {Kind::Redraw}); }};
+constexpr Scenario kContextLoss{"ContextLoss",
+                                [](PenBoard& board) {
+                                  board.loseAndRestoreContext();
+                                  board.deletePen();
+                                },
+                                false, true,
+                                [](PenBoard& board) {
+                                  board.prepareAll();
+                                  board.finish();
+                                }};
+const Scenario kScenarios[] = {
+    {"Pen",
+     [](PenBoard& board) {
+       board.makePen();
+       board.deletePen();
+     }},
+    {"LiveStroke", [](PenBoard& board) { board.draw(Kind::Live); }, true},
+    {"Redraws", [](PenBoard& board) { board.draw(Kind::Redraw); }, true},
+    {"Outlines", [](PenBoard& board) { board.draw(Kind::Outline); }, true},
+    {"Preview", [](PenBoard& board) { board.draw(Kind::Preview); }},
+    {"Prediction", [](PenBoard& board) { board.draw(Kind::Prediction); }},
+    {"Straight",
+     [](PenBoard& board) {
+       board.setCurve(false);
+       for (const Kind kind : {Kind::Live, Kind::Redraw, Kind::Outline, Kind::Preview}) board.draw(kind);
+     },
+     true},
+    kLiveQueued,
+    kRedrawsQueued,
+    {"OthersQueuedAsThePenDies",
+     [](PenBoard& board) {
+       queueAndDie(board, {Kind::Outline, Kind::Preview, Kind::Prediction});
+     }},
+    {"VersionChange",
+     [](PenBoard& board) {
+       board.keepsUp = false;
+       for (const int version : {newestVersion(), 3, newestVersion()}) {
+         board.makePen();
+         if (board.pen == nullptr) return;
+         board.pen->setVersion(version);
+         board.draw(Kind::Live);
+       }
+     }},
+    {"InitAndRelease",
+     [](PenBoard& board) {
+       board.prepareAll();
+       board.deletePen();
+     },
+     true, true},
+    {"LivePicture", [](PenBoard& board) { board.draw(Kind::Live); }, false, true},
+    kContextLoss,
+};
+constexpr Scenario kEveryKind{"EveryKind", [](PenBoard& board) { board.drawAll(); }};
+constexpr Scenario kOneOfEach{"OneOfEach", [](PenBoard& board) { board.drawOneOfEach(); }, false, true};
+
+std::string nameOf(const testing::TestParamInfo<Scenario>& test) {
+  return test.param.name;
+}
+
+// Whether a scenario is swept in a version. The sanitizers take longer, and look at one version of each kind
+// of placement and of vertex.
+bool isSwept(const Scenario& scenario, int version) {
+  if (version == newestVersion()) return true;
+  if (!scenario.everyVersion) return false;
+  if (scenario.picture) return version == 1 || version == 7;  // with the newest all render drawables
+  return !QELT_SANITIZED || version == 1 || version == 5;
+}
+
+BoardOptions pencil(int version) {
+  return {.version = version, .size = 4.0f, .color = 0xFF305090u};
+}
+
+// Who fails in a sweep: the plug-in's own means, which must not be noticed; or the host, whose own tasks may
+// end in an exception then.
+enum class Failing { PlugIn, Host };
+
+// Where the sweeps run: a queue on the test's own thread, so that a number always means the same allocation
+// or post, and a layer where there is a picture.
+class SweepGround {
+ public:
+  explicit SweepGround(bool picture, Failing failing = Failing::PlugIn)
+      : mFailing(watched(failing)),
+        queue(RenderQueue::Mode::Caller, picture ? RenderQueue::GL::Context : RenderQueue::GL::None),
+        mLayer(picture ? std::make_unique<QeltDesktop::CanvasLayer>(queue, 160, 120, 128) : nullptr) {}
+
+  // Runs a scenario between `arm` and `disarm`, then draws with the same pen and compares; `disarm` returns
+  // false when nothing failed. Checks that nothing threw, leaked or was deleted twice. Returns `disarm`'s.
+  template <typename Arm, typename Disarm>
+  bool survives(const Scenario& scenario, int version, const std::string& what, Arm&& arm, Disarm&& disarm) {
+    const std::string where =
+        std::string(scenario.name) + ", version " + std::to_string(version) + ", " + what;
+    SCOPED_TRACE(where);
+    const Drawn& expected = fresh(version);
+    const Counts before = settle();
+    const long thrown = AllocationGate::thrownFailures();
+    bool failed = false;
+    {
+      PenBoard board(pencil(version), queue, mLayer.get());
+      board.keepsUp = true;
+      if (scenario.prepare != nullptr) scenario.prepare(board);
+      arm(board);
+      try {
+        scenario.run(board);
+        board.finish();
+      } catch (const std::exception& error) {
+        disarm();
+        ADD_FAILURE() << "let out " << error.what();
+      }
+      failed = disarm();
+      board.beforeCall = nullptr;
+      for (const LogLine& line : mLog.take()) {
+        if (mFailing == Failing::PlugIn && line.text.find("threw") != std::string::npos)
+          ADD_FAILURE() << line.text;
+      }
+      EXPECT_EQ(difference(board.drawEverything(), expected), "") << "draws differently afterwards";
+      EXPECT_LE(board.refusedBatches(), AllocationGate::thrownFailures() - thrown)
+          << "threw, and no batch had failed to grow";
+    }
+    const Counts after = settle();
+    EXPECT_EQ(after.plugIn, before.plugIn) << "blocks of the plug-in's left";
+    if (!testing::Test::HasFailure()) {
+      EXPECT_EQ(after.host, before.host) << "blocks of the host's left";
+      if (mLayer == nullptr) {
+        EXPECT_EQ(after.all, before.all) << "blocks left";
+      }
+    }
+    EXPECT_EQ(after.bad, before.bad) << "deleted twice";
+    return failed;
+  }
+
+  // The same in every version that is swept, with the first `thing` failing, the second, and so on until
+  // nothing fails; alone, then with all after it. Notes the number of failures.
+  template <typename Arm, typename Disarm>
+  void survivesEach(const Scenario& scenario, const std::string& thing, Arm&& arm, Disarm&& disarm) {
+    int total = 0;
+    for (const int version : allVersions()) {
+      if (!isSwept(scenario, version)) continue;
+      {
+        // What the host makes once and for all is there from here on.
+        PenBoard board(pencil(version), queue, mLayer.get());
+        scenario.run(board);
+      }
+      for (const bool andAllAfter : {false, true}) {
+        long number = 1;
+        while (survives(
+            scenario, version,
+            thing + " " + std::to_string(number) + (andAllAfter ? " and all after it" : " alone"),
+            [&](PenBoard&) { arm(number, andAllAfter); }, [&] { return disarm(number); })) {
+          ++number;
+        }
+        EXPECT_GT(number, 1) << "no " << thing << ": the sweep sees the plug-in no longer";
+        total += static_cast<int>(number - 1);
+      }
+    }
+    testing::Test::RecordProperty("failures", total);
+  }
+
+ private:
+  struct Counts {
+    long plugIn, host, all, bad;
+  };
+
+  // The gate knows plug-in and host before the ground makes anything of theirs.
+  static Failing watched(Failing failing) {
+    AllocationGate::watch(PenBoard::library().path());
+    return failing;
+  }
+  // What a fresh pen of a version draws.
+  const Drawn& fresh(int version) {
+    Drawn& drawn = mFresh[version];
+    if (drawn.batches.empty()) drawn = PenBoard(pencil(version), queue, mLayer.get()).drawEverything();
+    return drawn;
+  }
+  Counts settle() {
+    queue.finish();
+    mLog.take();
+    return {AllocationGate::plugInBlocks(), AllocationGate::hostBlocks(), AllocationGate::allBlocks(),
+            AllocationGate::badDeletions()};
+  }
+
+  const Failing mFailing;
+  LogCapture mLog;
+
+ public:
+  RenderQueue queue;
+
+ private:
+  std::unique_ptr<QeltDesktop::CanvasLayer> mLayer;
+  std::map<int, Drawn> mFresh;
+};
+
+// --- The plug-in's own means ---
+
+class PlugInSweep : public testing::TestWithParam<Scenario> {};
+INSTANTIATE_TEST_SUITE_P(Scenarios, PlugInSweep, testing::ValuesIn(kScenarios), nameOf);
+
+TEST_P(PlugInSweep, OutOfMemory) {
+  SweepGround ground(GetParam().picture);
+  ground.survivesEach(
+      GetParam(), "allocation",
+      [](long number, bool andAllAfter) { AllocationGate::fail(number, andAllAfter); },
+      [](long number) { return AllocationGate::open() >= number; });
+}
+
+// Answers for the queue, and holds a poster to its word: a refused task is gone by the next post.
+class Doorman {
+ public:
+  template <typename Refuses>
+  void watch(RenderQueue& queue, Refuses refuses) {
+    queue.accept = [this, refuses](const Qelt::ITask& task) {
+      check();
+      if (!refuses(++mPosts)) return true;
+      ++mRefusals;
+      // Tasks begin where their block does. Those of the host's own have no number.
+      mRefused = dynamic_cast<const void*>(&task);
+      mNumber = AllocationGate::numberOf(mRefused);
+      return false;
+    };
+  }
+  // Returns the number of refusals.
+  long leave(RenderQueue& queue) {
+    queue.accept = nullptr;
+    check();
+    mPosts = 0;
+    return std::exchange(mRefusals, 0);
+  }
+
+ private:
+  void check() {
+    if (mNumber != 0 && AllocationGate::numberOf(mRefused) == mNumber)
+      ADD_FAILURE() << "a refused task lives on";
+    mNumber = 0;
+  }
+
+  long mPosts = 0, mRefusals = 0, mNumber = 0;
+  const void* mRefused = nullptr;
+};
+
+TEST_P(PlugInSweep, RefusedPosts) {
+  SweepGround ground(GetParam().picture);
+  Doorman doorman;
+  ground.survivesEach(
+      GetParam(), "post",
+      [&](long number, bool andAllAfter) {
+        doorman.watch(ground.queue, [=](long post) { return andAllAfter ? post >= number : post == number; });
+      },
+      [&](long) { return doorman.leave(ground.queue) > 0; });
+}
+
+// --- The host's ---
+
+class HostSweep : public testing::TestWithParam<Scenario> {};
+INSTANTIATE_TEST_SUITE_P(Scenarios, HostSweep,
+                         testing::Values(kEveryKind, kOneOfEach, kLiveQueued, kRedrawsQueued, kContextLoss),
+                         nameOf);
+
+TEST_P(HostSweep, OutOfMemory) {
+  SweepGround ground(GetParam().picture, Failing::Host);
+  ground.survivesEach(
+      GetParam(), "allocation of plug-in or host",
+      [](long number, bool andAllAfter) {
+        AllocationGate::fail(number, andAllAfter, AllocationGate::Whose::Everyones);
+      },
+      [](long number) { return AllocationGate::open() >= number; });
+}
+
+TEST_P(HostSweep, FailingCalls) {
+  SweepGround ground(GetParam().picture, Failing::Host);
+  Scenario scenario = GetParam();
+  if (scenario.prepare != nullptr) {
+    // A context that comes back asks for nothing that may fail: what was prepared with failures loses it.
+    scenario.prepare = nullptr;
+    scenario.run = [](PenBoard& board) {
+      kContextLoss.prepare(board);
+      kContextLoss.run(board);
+    };
+  }
+  ground.survivesEach(scenario, "call of the host", HostFaults::fail,
+                      [](long number) { return HostFaults::open() >= number; });
+}
+
+// Loses the context as soon as there is one again.
+class Relapse final : public Qelt::ManagedObject {
+ public:
+  explicit Relapse(RenderQueue& queue) : mQueue(queue) { Register(this); }
+  void OnRelease() override {}
+  void OnRestore() override { mQueue.loseContext(); }
+
+ private:
+  RenderQueue& mQueue;
+};
+
+// For two tasks, and then for good.
+TEST(ContextSweep, LostForAWhile) {
+  SweepGround ground(true);
+  RenderQueue& queue = ground.queue;
+  long posts = 0;
+  ground.survivesEach(
+      kOneOfEach, "loss",
+      [&](long number, bool andAllAfter) {
+        posts = 0;
+        queue.accept = [&, number, andAllAfter](const Qelt::ITask&) {
+          ++posts;
+          const auto accept = std::exchange(queue.accept, nullptr);
+          if (posts == number) QeltDesktop::postCall(queue, [&] { queue.loseContext(); });
+          if (posts == number + 2 && !andAllAfter) {
+            QeltDesktop::postCall(queue, [&] {
+              {
+                const Relapse relapse(queue);
+                queue.restoreContext();
+              }
+              queue.restoreContext();
+            });
+          }
+          queue.accept = accept;
+          return true;
+        };
+      },
+      [&](long number) {
+        queue.accept = nullptr;
+        queue.restoreContext();
+        return posts >= number;
+      });
+}
+
+// Between any two calls the host changes canvas, view, size or option, until the next call or for good.
+using Change = std::function<void(PenBoard&, Qelt::PenDrawableGL&)>;
+
+std::vector<std::pair<const char*, Change>> changes() {
+  using Limits = std::numeric_limits<float>;
+  constexpr float kNaN = Limits::quiet_NaN();
+  std::vector<std::pair<const char*, Change>> all;
+  for (const float size : {0.0f, -3.0f, kNaN, Limits::infinity(), -Limits::infinity(), 1e30f, 40.0f})
+    all.emplace_back("size", [size](PenBoard& board, auto&) { board.pen->SetSize(size); });
+  for (const float size : {-3.0f, kNaN, Limits::infinity()}) {
+    all.emplace_back("outline size or opacity", [size](PenBoard&, Qelt::PenDrawableGL& drawable) {
+      if (auto* const outline = dynamic_cast<Qelt::PenOutlineDrawableGL*>(&drawable))
+        outline->SetOutlineSize(size);
+      if (auto* const ahead = dynamic_cast<Qelt::IPenPredictionDrawableGL*>(&drawable))
+        ahead->SetOpacity(size);
+    });
+  }
+  for (const float size : {0.0f, kNaN}) {
+    all.emplace_back("fixed width", [size](PenBoard& board, auto&) {
+      board.pen->GetMorphable()->SetFixedWidthEnabled(true);
+      board.pen->GetMorphable()->SetFixedWidth(size);
+    });
+    all.emplace_back("view", [size](PenBoard& board, auto&) { board.zoom(size); });
+  }
+  for (const Target target : {Target::NoLayer, Target::NoBitmap, Target::NoTiles})
+    all.emplace_back("canvas", [target](PenBoard& board, auto&) { board.canvas.setTarget(target); });
+  all.emplace_back("no canvas",
+                   [](PenBoard&, Qelt::PenDrawableGL& drawable) { drawable.SetCanvas(nullptr); });
+  all.emplace_back("no curve", [](PenBoard& board, auto&) { board.setCurve(false); });
+  all.emplace_back("no colour", [](PenBoard& board, auto&) { board.pen->SetColor(0); });
+  all.emplace_back("no screen", [](PenBoard& board, auto&) { board.pen->SetScreenResolution(0, -1); });
+  return all;
+}
+
+// One version of each way to place stamps, and of each way to widen them.
+class ChangeSweep : public testing::TestWithParam<int> {};
+INSTANTIATE_TEST_SUITE_P(Versions, ChangeSweep,
+                         testing::ValuesIn(QELT_SANITIZED ? std::vector{4, newestVersion()}
+                                                          : std::vector{1, 4, 5, newestVersion()}),
+                         versionName);
+
+TEST_P(ChangeSweep, LeavesThePenAsGoodAsNew) {
+  SweepGround ground(false);
+  const Scenario all{"Changes", [](PenBoard& board) {
+                       board.drawAll();
+                       board.setCurve(false);
+                       for (const Kind kind : {Kind::Live, Kind::Outline, Kind::Preview}) board.draw(kind);
+                     }};
+  for (const auto& [name, change] : changes()) {
+    for (const bool stays : {false, true}) {
+      long calls = 0;
+      long at = 1;
+      const auto arm = [&, &make = change](PenBoard& board) {
+        calls = 0;
+        board.watch();
+        board.beforeCall = [&](Qelt::PenDrawableGL& drawable) {
+          ++calls;
+          if (calls == at || (stays && calls > at)) make(board, drawable);
+          if (calls == at + 1 && !stays) {
+            board.setUsual(drawable);
+            board.canvas.setTarget(Target::Whole);
+          }
+        };
+      };
+      while (ground.survives(all, GetParam(),
+                             std::string("change of ") + name + ", before call " + std::to_string(at) +
+                                 (stays ? " and after" : ""),
+                             arm, [&] { return calls >= at; })) {
+        ++at;
+      }
+    }
+  }
+}
+
+// Another pen draws everything between any two calls of the first, in another view, on a page of its own and
+// on the first one's; both draw what they draw alone.
+TEST(ViewsInTurns, DrawWhatEachDrawsAlone) {
+  constexpr float kOtherZoom = 3.0f;
+  for (const bool sharesPage : {false, true}) {
+    for (const int version : {5, newestVersion()}) {
+      SCOPED_TRACE("version " + std::to_string(version) + (sharesPage ? ", shared page" : ""));
+      RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
+      const Drawn alone = PenBoard(pencil(version), queue, nullptr).drawEverything();
+      const Drawn otherAlone = PenBoard(pencil(version), queue, nullptr).drawEverything(kOtherZoom);
+      PenBoard board(pencil(version), queue, nullptr), other(pencil(version), queue, nullptr);
+      board.beforeCall = [&](Qelt::PenDrawableGL&) {
+        EXPECT_EQ(difference(other.drawEverything(kOtherZoom), otherAlone), "") << "the other";
+        if (sharesPage) {
+          EXPECT_TRUE(other.redrawsLastOf(board)) << "a drawing for another view";
+        }
+        other.turnPage();
+        board.watch();
+      };
+      Drawn drawn = board.drawEverything();
+      // One cache holds one drawing of a stroke: views that share a page take it from each other.
+      if (sharesPage) drawn.cached = alone.cached;
+      EXPECT_EQ(difference(drawn, alone), "");
+    }
+  }
+}
+
+}  // namespace
+}  // namespace QeltTests
