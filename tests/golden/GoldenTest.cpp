@@ -280,7 +280,13 @@ TEST(GrainGolden, PictureBelowTheFirstTilesIsThatOfTheRelease) {
     all = {picture.width, all.height + picture.height - 80, std::move(all.pixels), picture.renderer};
   };
   const BoardOptions options{.size = 7.0f, .color = 0x50203040u, .width = 160, .height = 144, .tile = 64};
-  const auto draws = [&](auto& board) { board.stroke(shading); };
+  const auto draws = [&](auto& board) {
+    board.stroke(shading);
+    // A lone stamp so dense that its alpha is cut off at 1.
+    board.settings.color = 0xFF203040u;
+    board.settings.size = 4.5f;
+    board.stroke({{35.71f, 68.39f, 1.0f}, {35.71f, 68.39f, 1.0f}});
+  };
   for (const int version : {1, 7, 8}) {
     BoardOptions ofVersion = options;
     ofVersion.version = version;
