@@ -75,10 +75,10 @@ void writePgm(const std::string& path, const GreyPicture& picture) {
              static_cast<std::streamsize>(picture.pixels.size()));
 }
 
-// A checksum of its pixels (FNV-1a).
+// A checksum of all it holds (FNV-1a).
 std::string sumOf(const GreyPicture& picture) {
   std::uint64_t sum = 0xcbf29ce484222325u;
-  for (const std::uint8_t pixel : picture.pixels) sum = (sum ^ pixel) * 0x100000001b3u;
+  for (const std::uint8_t byte : picture.channels) sum = (sum ^ byte) * 0x100000001b3u;
   return (std::ostringstream() << std::hex << sum).str();
 }
 
