@@ -6,7 +6,7 @@
 #include <vector>
 
 #include "engine/MotionEvent.h"
-#include "stroke/StrokeGuards.h"
+#include "stroke/StrokeVersions.h"
 #include "stroke/StrokeVersions.h"
 #include "support/DrawableBoard.h"
 #include "support/LogCapture.h"
