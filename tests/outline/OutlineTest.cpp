@@ -118,6 +118,16 @@ TEST(Outline, FingersTakeShortMovesEveryOtherTime) {
   pen.outline({{0.0f, 0.0f}, {20.0f, 0.0f}, {21.9f, 0.0f}, {40.0f, 0.0f}});
   // 16 to 20 and 16 to 40: the move below size / 5 is dropped, the others are not.
   EXPECT_THAT(pen.takeStamps(), SizeIs(33));
+  for (const int version : outlineVersions()) {
+    const auto stampsOf = [version](int tool, float move) {
+      OutlineBoard board({.version = version, .curve = false, .tool = tool});
+      board.outline({{0.0f, 0.0f}, {move, 0.0f}, {2.0f * move, 0.0f}});
+      return board.takeStamps().size();
+    };
+    // 50 units are far enough.
+    EXPECT_EQ(stampsOf(Qelt::kToolFinger, 50.2f), stampsOf(Qelt::kToolStylus, 50.2f)) << version;
+    EXPECT_NE(stampsOf(Qelt::kToolFinger, 49.8f), stampsOf(Qelt::kToolStylus, 49.8f)) << version;
+  }
 }
 
 // A record that could not be made is no reason to crash.

@@ -78,9 +78,11 @@ TEST(Preview, FingersTakeShortMovesEveryOtherTime) {
   ASSERT_THAT(placed, SizeIs(24));            // from 0 to 30
   EXPECT_NEAR(placed[0].alpha, 0.5f, 1e-5f);  // pressure 0.5 whatever is reported
   board.move({{31.9f, 0.0f}});                // below size / 5
-  board.move({{40.0f, 0.0f}});                // left out
-  board.move({{85.0f, 0.0f}});                // 55 away: always taken
-  EXPECT_THAT(board.takeStamps(), SizeIs(44));
+  board.move({{79.8f, 0.0f}});                // left out
+  board.move({{80.2f, 0.0f}});                // more than 50 away: always taken
+  EXPECT_THAT(board.takeStamps(), SizeIs(40));
+  board.move({{130.4f, 0.0f}});
+  EXPECT_THAT(board.takeStamps(), SizeIs(40));
 }
 
 TEST(Preview, AStylusOnATouchScreenHasItsPressureReplacedInTheEvent) {
