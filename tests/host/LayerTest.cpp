@@ -139,21 +139,29 @@ class Layer : public testing::TestWithParam<RenderQueue::Mode> {
 
 INSTANTIATE_TEST_SUITE_P(Modes, Layer, testing::Values(RenderQueue::Mode::Thread, RenderQueue::Mode::Caller));
 
-// What is drawn after a loss, or while it lasts, is looked at with a pen's pictures.
-TEST_P(Layer, CountsItsLossesAndOutlivesTheRenderThread) {
+TEST_P(Layer, ComesBackEmptyAfterEachOfTwoLossesAndOutlivesTheRenderThread) {
   CanvasLayer layer(queue, 10, 10);
+  std::unique_ptr<Painter> painter;
+  const auto paint = [&](bool uploads) {
+    queue.run([&] {
+      if (painter == nullptr) painter = std::make_unique<Painter>(kWindowShader);
+      if (uploads) painter->setQuad(0, 0, 5, 10);
+      painter->draw(*layer.GetBitmap());
+    });
+  };
   for (int round = 0; round < 2; ++round) {
+    paint(true);
     queue.loseContext();
     queue.loseContext();
     EXPECT_THROW(layer.readPixels(), std::runtime_error);
+    paint(false);  // without effect and harm
     EXPECT_EQ(layer.timesEmptied(), round);
     queue.restoreContext();
     queue.restoreContext();
     EXPECT_EQ(layer.timesEmptied(), round + 1);
+    paint(false);  // no vertices are left
     EXPECT_EQ(layer.readPixels(), Pixels(10 * 10 * 4));
   }
-  std::unique_ptr<Painter> painter;
-  queue.run([&] { painter = std::make_unique<Painter>(kWindowShader); });
   queue.shutDown();
   EXPECT_THROW(layer.readPixels(), std::runtime_error);
 }
