@@ -190,25 +190,6 @@ TEST_P(EachVersion, RampsTheClosingSegmentOfARecordedEvent) {
 INSTANTIATE_TEST_SUITE_P(Versions, EachVersion, testing::ValuesIn(kRows),
                          [](const auto& row) { return "Version" + std::to_string(row.param.version); });
 
-// The pressure that fingers, mice and a stylus on a touch screen are given shows in a tap's alpha: 0.5
-// squared is 0.25; 0.6 squared, times 15 / 10, over 6, is 0.09. A short move is left out.
-TEST(TouchInputTest, HasTheVersionsOwnPressureAndThinsOutShortMoves) {
-  for (const int version : allVersions()) {
-    for (const int tool : {Qelt::kToolFinger, Qelt::kToolMouse, Qelt::kToolStylus}) {
-      SCOPED_TRACE("version " + std::to_string(version) + ", tool " + std::to_string(tool));
-      DrawingBoard board(
-          {.version = version,
-           .color = 0x50202020u,
-           .tool = tool,
-           .source = tool == Qelt::kToolMouse ? Qelt::kSourceMouse : Qelt::kSourceTouchScreen});
-      board.stroke({{10.0f, 10.0f, 0.9f}, {19.0f, 10.0f, 0.9f}});
-      const std::vector<Stamp> stamps = board.takeStamps();
-      ASSERT_EQ(stamps.size(), 1u);
-      EXPECT_FLOAT_EQ(stamps[0].alpha, version == 8 ? 0.09f : 0.25f);
-    }
-  }
-}
-
 TEST(LargeCountTest, IsLoggedByVersions4And7Alone) {
   LogCapture log;
   for (const int version : allVersions()) {
