@@ -1,5 +1,6 @@
 #include "base/RectF.h"
 
+#include <cmath>
 #include <gtest/gtest.h>
 
 #include <limits>
