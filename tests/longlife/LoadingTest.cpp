@@ -123,9 +123,9 @@ TEST(Loading, AThousandTimesLeavesNothingBehind) {
   for (int i = 0; i < kTimes; ++i) {
     ASSERT_TRUE(drawsAndGoes(queue, nullptr)) << "still loaded after " << i + 1;
     log.take();
-    if (i == 4) early = AllocationGate::allBlocks();
+    if (i == 4) early = AllocationGate::counts().allBlocks;
   }
-  EXPECT_EQ(AllocationGate::allBlocks(), early);
+  EXPECT_EQ(AllocationGate::counts().allBlocks, early);
 }
 
 TEST(Loading, WithAPictureLeavesNoShaderOfTheLibraryBehind) {
