@@ -91,9 +91,9 @@ TEST(Loading, AThousandTimesLeavesNothingBehind) {
     }
     ASSERT_FALSE(Loaded::isThere(QELT_PLUGIN_PATH)) << "still loaded after " << i + 1;
     log.take();
-    if (i == 4) early = AllocationGate::allBlocks();
+    if (i == 4) early = AllocationGate::counts().allBlocks;
   }
-  EXPECT_EQ(AllocationGate::allBlocks(), early);
+  EXPECT_EQ(AllocationGate::counts().allBlocks, early);
 }
 
 TEST(Loading, TwoCopiesDrawInTurnsAsOneDoesAlone) {
