@@ -88,10 +88,10 @@ class StampRenderer : public HostBase {
 
   void AddPoint(Vector2<float>, float) final {}
 
-  // Appends stamps to the write buffer. Each has a centre and a direction (-sin a, cos a), two vectors in a
-  // row; a size in stroke units, the width of square stamps and half that of anti-aliased ones; an opacity
-  // factor; a tilt blend; and its shape, tile 0, 1 or 2. Must not outlive a change of the buffer or of the
-  // inverse scale.
+  // Appends stamps to the write buffer. Each has a centre and a direction (-sin a, cos a), as two vectors in
+  // a row; the width of a square stamp or half the width of an anti-aliased one, stroke units; an alpha; a
+  // tilt blend; and one of the shapes 0, 1 and 2. Must not outlive a change of the buffer or of the inverse
+  // scale.
   class Appender {
    public:
     // Makes room for so many stamps, so that appending them does not allocate. Throws std::bad_alloc.
@@ -99,7 +99,8 @@ class StampRenderer : public HostBase {
         : mStamps(renderer.mWriteBuffer, stamps), mInverseScale(renderer.mInverseScale) {}
 
     void AddPoint(const Vector2<float>* point, float size, float alpha, float tiltBlend, int tile) {
-      // Most stamps are as large as the one before; the divisions of an extent cost a third of a stamp.
+      // Most stamps are as large as the one before; the divisions of an extent take a third of the time that
+      // a stamp takes.
       if (size != mSize) {
         mExtent = extent(size);
         mSize = size;

@@ -64,7 +64,8 @@ class QELT_HOST_API GlDevice {
 
   bool isLost() const { return mContext == nullptr; }
   // The context has been taken away: destroys what is left of it, without a single GL call, has every
-  // resource forget its names, and then tells managed objects. Once more, it does nothing.
+  // resource forget its names, and then tells managed objects. Does nothing while the context is lost
+  // already.
   void lose() noexcept;
   // Makes a new context and the names of every resource in it, then tells managed objects. Throws
   // std::runtime_error when there is no context to be had, std::bad_alloc when there is no memory; nothing
