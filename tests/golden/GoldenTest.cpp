@@ -1,5 +1,8 @@
 #include <gtest/gtest.h>
 #include <unistd.h>
+#if defined __x86_64__
+#include <cpuid.h>
+#endif
 
 #include <algorithm>
 #include <cfenv>
@@ -32,11 +35,24 @@ std::string areaLine(const Qelt::RectF& rect) {
   return traceLine("area", {rect.left, rect.top, rect.right, rect.bottom});
 }
 
+// Who draws, as renderers.txt names it. A software renderer rounds as its processor does, so that belongs to
+// it.
+std::string rendererOf(const QeltDesktop::RenderQueue& queue) {
+  std::string name = queue.rendererName();
+#if defined __x86_64__
+  unsigned int most = 0, vendor[3] = {}, features = 0, unused = 0;
+  __cpuid(0, most, vendor[0], vendor[2], vendor[1]);
+  __cpuid(1, most, unused, features, unused);
+  name += ", " + std::string(reinterpret_cast<const char*>(vendor), sizeof vendor);
+  if ((features & bit_FMA) != 0) name += " with FMA";
+#endif
+  return name;
+}
+
 // Ink on paper: what a board's layer holds.
 GreyPicture pictureOf(Board& board) {
   board.queue.finish();
-  GreyPicture picture{
-      board.options.width, board.options.height, {}, board.pixels(), board.queue.rendererName()};
+  GreyPicture picture{board.options.width, board.options.height, {}, board.pixels(), rendererOf(board.queue)};
   for (std::size_t i = 3; i < picture.channels.size(); i += 4)
     picture.pixels.push_back(static_cast<std::uint8_t>(255 - picture.channels[i]));
   return picture;

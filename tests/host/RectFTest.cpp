@@ -1,14 +1,13 @@
 #include "base/RectF.h"
 
-#include <cmath>
 #include <gtest/gtest.h>
+#include <cmath>
 
 #include <limits>
 
 namespace {
 
 using Qelt::RectF;
-
 
 void expectEdges(const RectF& rect, float left, float top, float right, float bottom) {
   EXPECT_EQ(rect.left, left);

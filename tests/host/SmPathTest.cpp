@@ -15,7 +15,6 @@ namespace {
 using Qelt::SmPath;
 using Qelt::SmPoint;
 
-
 struct Quad {
   float x0, y0, cx, cy, x1, y1;
 };

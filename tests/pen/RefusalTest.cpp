@@ -203,8 +203,7 @@ TEST_P(Refusals, OfPressureAndAnglesThatAreNotFiniteTakeTheVersionsOwn) {
   std::vector<Sample> broken = kStroke, plain = kStroke;
   for (std::size_t i = 0; i < kStroke.size(); ++i) {
     plain[i] = {kStroke[i].x, kStroke[i].y, kind != Kind::Preview && version == 8 ? 0.6f : 0.5f};
-    broken[i] = {kStroke[i].x, kStroke[i].y, NAN, i % 2 == 0 ? INFINITY : NAN,
-                 i % 2 == 0 ? NAN : -INFINITY};
+    broken[i] = {kStroke[i].x, kStroke[i].y, NAN, i % 2 == 0 ? INFINITY : NAN, i % 2 == 0 ? NAN : -INFINITY};
   }
   EXPECT_EQ(drawn(broken), drawn(plain));
 }

@@ -73,7 +73,7 @@ TEST(Prediction, EveryStateOfTheLiveStrokeIsPredictedFromOnce) {
   EXPECT_FALSE(board.move({{30.0f, 0.0f}}));  // no stroke yet
   EXPECT_THAT(board.takePosts(), IsEmpty());
   // Any other event uses the state up and draws nothing.
-  leaveStroke(board.shared);
+  leaveStrokeAlongX(board.shared);
   EXPECT_FALSE(board.up({30.0f, 0.0f}));
   EXPECT_THAT(board.takePosts(), ElementsAre("SetRect", "Batch", "Render", "DeleteBatch"));
   EXPECT_THAT(board.takeStamps(), IsEmpty());
@@ -81,7 +81,7 @@ TEST(Prediction, EveryStateOfTheLiveStrokeIsPredictedFromOnce) {
   // Nothing is carried from one to the next.
   std::vector<float> once;
   for (const float x : {30.0f, 77.7f, 30.0f}) {
-    leaveStroke(board.shared);
+    leaveStrokeAlongX(board.shared);
     EXPECT_TRUE(board.move({{x, 0.0f}}));
     const std::vector<float> floats = board.takeFloats();
     EXPECT_FALSE(board.move({{x, 0.0f}}));
@@ -119,7 +119,7 @@ TEST(Prediction, StartsNowhereFromARecordOutOfBounds) {
        {&Data::mLastStampX, &Data::mLastStampY, &Data::mLastX, &Data::mLastY, &Data::mLastWidth,
         &Data::mLastOrientation, &Data::mLastAlpha, &Data::mTiltBlend}) {
     for (const float value : {NAN, INFINITY, -INFINITY}) {
-      leaveStroke(board.shared);
+      leaveStrokeAlongX(board.shared);
       board.shared.*field = value;
       EXPECT_FALSE(board.send(event));
       EXPECT_THAT(board.takeFloats(), IsEmpty());

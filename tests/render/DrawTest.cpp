@@ -30,8 +30,8 @@ TEST_P(Draw, IsFinishedInThePensColourWhenTheDrawableDies) {
   DrawingBoard board({.version = GetParam(),
                       .size = 9.0f,
                       .color = 0xFF00FF40u,  // red 0, green 255, blue 64
-                      .width = kSide,
-                      .height = kSide});
+                      .width = kPictureSide,
+                      .height = kPictureSide});
   std::vector<Sample> wave;
   for (int i = 0; i <= 24; ++i) {
     const auto t = static_cast<float>(i);

@@ -18,7 +18,6 @@ namespace {
 
 using testing::ElementsAre;
 
-
 // Against the mean as one would write it down: all slots from 0 upwards, in single precision.
 template <int Size>
 void expectTheSameMeans(unsigned seed) {

@@ -7,7 +7,6 @@
 
 #include "engine/MotionEvent.h"
 #include "stroke/StrokeVersions.h"
-#include "stroke/StrokeVersions.h"
 #include "support/DrawableBoard.h"
 #include "support/LogCapture.h"
 
