@@ -47,6 +47,21 @@ TEST(Preview, RampsMayOvershootAndTheNextSegmentBeginsFromTheirTargets) {
   EXPECT_NEAR(board.takeStamps()[0].halfWidth, (17.4561f + 1.0f) / 2.0f, 1e-3f);
 }
 
+// Pressures 0.8 and 0.1: 0.64 * 2 and, raised to 0.16, 0.16 * 2. Live strokes are given up half way.
+TEST(Preview, NothingFadesInAndNothingIsLeftOfTheStrokeBefore) {
+  Panel board(panel(10.0f));
+  for (const float pressure : {0.1f, 0.8f, 0.1f}) {
+    const Sample from{0.3f, 0.0f, pressure}, to{41.0f, 0.0f, pressure};
+    for (const bool live : {false, true}) {
+      if (live) board.down(from);
+      live ? board.move({to}) : board.redraw(board.recorded({from, to}));
+      const std::vector<Stamp> placed = board.takeStamps();
+      EXPECT_FALSE(placed.empty());
+      for (const Stamp& stamp : placed) EXPECT_NEAR(stamp.alpha, pressure == 0.8f ? 1.28f : 0.32f, 1e-5f);
+    }
+  }
+}
+
 TEST(Preview, FingersTakeShortMovesEveryOtherTime) {
   Panel board(
       {.color = 0xA0202020u, .curve = false, .tool = Qelt::kToolFinger, .source = Qelt::kSourceTouchScreen});

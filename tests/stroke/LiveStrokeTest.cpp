@@ -133,7 +133,7 @@ TEST_P(LiveStroke, WritesItsCorrectionsBackIntoTheEvent) {
     DrawingBoard board({.version = version});
     for (const int action : {Qelt::kActionDown, Qelt::kActionMove, Qelt::kActionUp}) {
       const MotionEvent event = motionEvent(
-          action, {{10.0f, 0.0f, 0.9f, 1.3f}, {20.0f, 0.0f, 0.9f, 0.6f}, {40.0f, 0.0f, 0.9f, 1.2f}}, tool,
+          action, {{10.0f, 0.0f, 0.9f, 1.3f}, {20.0f, 0.0f, 0.9f, 0.6f}, {80.0f, 0.0f, 0.9f, 1.2f}}, tool,
           source);
       board.send(event);
       EXPECT_EQ(event.GetPressure(0), pressure) << "action " << action;
