@@ -71,11 +71,6 @@ constexpr Scenario kContextLoss{"ContextLoss",
                                   board.finish();
                                 }};
 const Scenario kScenarios[] = {
-    {"Pen",
-     [](PenBoard& board) {
-       board.makePen();
-       board.deletePen();
-     }},
     {"LiveStroke", [](PenBoard& board) { board.draw(Kind::Live); }, true},
     {"Redraws", [](PenBoard& board) { board.draw(Kind::Redraw); }, true},
     {"Outlines", [](PenBoard& board) { board.draw(Kind::Outline); }, true},
@@ -307,20 +302,15 @@ TEST_P(HostSweep, FailingCalls) {
 
 // --- The GL context's ---
 
-struct Drawing {
-  Kind kind;
-  int version;
-};
-
-class ContextLoss : public testing::TestWithParam<Drawing> {};
+class ContextLoss : public testing::TestWithParam<std::pair<Kind, int>> {};
 INSTANTIATE_TEST_SUITE_P(Strokes, ContextLoss,
-                         testing::Values(Drawing{Kind::Live, 1}, Drawing{Kind::Live, 7},
-                                         Drawing{Kind::Live, 8}, Drawing{Kind::Redraw, 8},
-                                         Drawing{Kind::Outline, 8}, Drawing{Kind::Preview, 8},
-                                         Drawing{Kind::Prediction, 8}),
+                         testing::Values(std::pair(Kind::Live, 1), std::pair(Kind::Live, 7),
+                                         std::pair(Kind::Live, 8), std::pair(Kind::Redraw, 8),
+                                         std::pair(Kind::Outline, 8), std::pair(Kind::Preview, 8),
+                                         std::pair(Kind::Prediction, 8)),
                          [](const auto& test) {
-                           return testing::PrintToString(test.param.kind) + "Version" +
-                                  std::to_string(test.param.version);
+                           return testing::PrintToString(test.param.first) + "Version" +
+                                  std::to_string(test.param.second);
                          });
 
 // The context goes and comes back, at once or later, between any two tasks of the render thread: the layer
@@ -333,9 +323,9 @@ TEST_P(ContextLoss, EmptiesTheLayerAndSparesWhatIsDrawnAfterwards) {
   long posts = 0;
   const auto picture = [&](const std::map<long, Call>& calls) {
     layer.clear();
-    PenBoard board({.version = GetParam().version, .size = 4.0f}, queue, &layer);
+    PenBoard board({.version = GetParam().second, .size = 4.0f}, queue, &layer);
     callAhead(queue, posts, calls);
-    board.draw(GetParam().kind);
+    board.draw(GetParam().first);
     queue.finish();
     queue.accept = nullptr;
     queue.restoreContext();
