@@ -12,12 +12,17 @@ target_precompile_headers(qelt_test_headers PRIVATE
   <algorithm> <array> <cmath> <cstddef> <cstdint> <filesystem> <fstream> <functional> <limits> <map> <memory> <random>
   <set> <sstream> <string> <thread> <vector>)
 
-# qelt_compile_as_test(TARGET): with those headers, and in a release with little optimisation: a test is compiled more
-# often than run. What it tests keeps the options it is released with.
+# qelt_compile_as_test(TARGET): with those headers, some sources at once (QELT_UNITY_TESTS), and with little
+# optimisation: a test is compiled more often than run. What it tests keeps the options it is released with.
 function(qelt_compile_as_test target)
   if(CMAKE_BUILD_TYPE STREQUAL Release)
     # At this level GCC 12 takes `std::string(...) + "..."` for a write past the end.
     target_compile_options(${target} PRIVATE -O1 -Wno-array-bounds)
+  else()
+    target_compile_options(${target} PRIVATE -O0)
+  endif()
+  if(QELT_UNITY_TESTS)
+    set_property(TARGET ${target} PROPERTY UNITY_BUILD ON)
   endif()
   # Else CMake takes other options for programs than for libraries.
   set_property(TARGET ${target} PROPERTY POSITION_INDEPENDENT_CODE OFF)

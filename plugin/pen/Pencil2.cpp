@@ -20,7 +20,7 @@ namespace {
 
 constexpr float kMinSize = 0.477f;  // stroke units
 constexpr float kMaxSize = 6.571f;
-constexpr std::uint32_t kOpaqueBlack = 0xFF000000u;
+constexpr std::uint32_t kDefaultColor = 0xFF000000u;
 constexpr int kAdvancedSettingVersion = 8;
 
 // The newest stroke version that predictions continue.
@@ -41,7 +41,7 @@ Pencil2::Pencil2() {
   setting.Append(';');
   SetAdvancedSetting(&setting);
   SetSize(kMinSize);
-  SetColor(static_cast<int>(kOpaqueBlack));
+  SetColor(static_cast<int>(kDefaultColor));
 }
 
 // The drawables go first, then the data that they leave on the render thread. The record goes last, since the

@@ -4,6 +4,7 @@
 
 #include <gtest/gtest.h>
 
+#include <cmath>
 #include <functional>
 #include <limits>
 #include <map>
@@ -302,15 +303,15 @@ TEST_P(HostSweep, FailingCalls) {
 
 // --- The GL context's ---
 
-class ContextLoss : public testing::TestWithParam<std::pair<Kind, int>> {};
+class ContextLoss : public testing::TestWithParam<Drawing> {};
 INSTANTIATE_TEST_SUITE_P(Strokes, ContextLoss,
-                         testing::Values(std::pair(Kind::Live, 1), std::pair(Kind::Live, 7),
-                                         std::pair(Kind::Live, 8), std::pair(Kind::Redraw, 8),
-                                         std::pair(Kind::Outline, 8), std::pair(Kind::Preview, 8),
-                                         std::pair(Kind::Prediction, 8)),
+                         testing::Values(Drawing{Kind::Live, 1}, Drawing{Kind::Live, 7},
+                                         Drawing{Kind::Live, 8}, Drawing{Kind::Redraw, 8},
+                                         Drawing{Kind::Outline, 8}, Drawing{Kind::Preview, 8},
+                                         Drawing{Kind::Prediction, 8}),
                          [](const auto& test) {
-                           return testing::PrintToString(test.param.first) + "Version" +
-                                  std::to_string(test.param.second);
+                           return testing::PrintToString(test.param.kind) + "Version" +
+                                  std::to_string(test.param.version);
                          });
 
 // The context goes and comes back, at once or later, between any two tasks of the render thread: the layer
@@ -323,9 +324,9 @@ TEST_P(ContextLoss, EmptiesTheLayerAndSparesWhatIsDrawnAfterwards) {
   long posts = 0;
   const auto picture = [&](const std::map<long, Call>& calls) {
     layer.clear();
-    PenBoard board({.version = GetParam().second, .size = 4.0f}, queue, &layer);
+    PenBoard board({.version = GetParam().version, .size = 4.0f}, queue, &layer);
     callAhead(queue, posts, calls);
-    board.draw(GetParam().first);
+    board.draw(GetParam().kind);
     queue.finish();
     queue.accept = nullptr;
     queue.restoreContext();
@@ -397,11 +398,10 @@ using Change = std::function<void(PenBoard&, Qelt::PenDrawableGL&)>;
 
 std::vector<std::pair<const char*, Change>> changes() {
   using Limits = std::numeric_limits<float>;
-  constexpr float kNaN = Limits::quiet_NaN();
   std::vector<std::pair<const char*, Change>> all;
-  for (const float size : {0.0f, -3.0f, kNaN, Limits::infinity(), -Limits::infinity(), 1e30f, 40.0f})
+  for (const float size : {0.0f, -3.0f, NAN, Limits::infinity(), -Limits::infinity(), 1e30f, 40.0f})
     all.emplace_back("size", [size](PenBoard& board, auto&) { board.pen->SetSize(size); });
-  for (const float size : {-3.0f, kNaN, Limits::infinity()}) {
+  for (const float size : {-3.0f, NAN, Limits::infinity()}) {
     all.emplace_back("outline size or opacity", [size](PenBoard&, Qelt::PenDrawableGL& drawable) {
       if (auto* const outline = dynamic_cast<Qelt::PenOutlineDrawableGL*>(&drawable))
         outline->SetOutlineSize(size);
@@ -409,7 +409,7 @@ std::vector<std::pair<const char*, Change>> changes() {
         ahead->SetOpacity(size);
     });
   }
-  for (const float size : {0.0f, kNaN}) {
+  for (const float size : {0.0f, NAN}) {
     all.emplace_back("fixed width", [size](PenBoard& board, auto&) {
       board.pen->GetMorphable()->SetFixedWidthEnabled(true);
       board.pen->GetMorphable()->SetFixedWidth(size);

@@ -2,21 +2,21 @@
 
 #include <gtest/gtest.h>
 
+#include <cmath>
 #include <limits>
 
 // What frozen strokes do not come to: counts beyond int, and scales that drawings do not use.
 namespace Qelt::rules {
 namespace {
 
-constexpr float kInfinity = std::numeric_limits<float>::infinity();
 constexpr int kLargest = std::numeric_limits<int>::max();
 
 TEST(StampCountTest, SaturatesInsteadOfOverflowing) {
   EXPECT_EQ(saturatedCount(3e9f), kLargest);
   EXPECT_EQ(saturatedCount(2147483648.0f), kLargest);
   EXPECT_EQ(saturatedCount(2147483520.0f), 2147483520);  // the largest float below 2^31
-  EXPECT_EQ(saturatedCount(kInfinity), kLargest);
-  EXPECT_EQ(saturatedCount(-kInfinity), 0);
+  EXPECT_EQ(saturatedCount(INFINITY), kLargest);
+  EXPECT_EQ(saturatedCount(-INFINITY), 0);
   EXPECT_EQ(saturatedCount(std::numeric_limits<float>::quiet_NaN()), 0);
   EXPECT_EQ(saturatedCount(-1.5f), -1);
   EXPECT_EQ(incremented(kLargest), kLargest);

@@ -26,6 +26,11 @@ inline constexpr std::array kAllKinds = {Kind::Live, Kind::Redraw, Kind::Outline
                                          Kind::Prediction};
 std::ostream& operator<<(std::ostream& out, Kind kind);
 
+struct Drawing {
+  Kind kind;
+  int version;
+};
+
 // What a pen made of the same input: compared between a pen that went through a fault and a fresh one.
 struct Drawn {
   std::vector<std::vector<float>> steps;    // each call's answer and the edges of its rectangle

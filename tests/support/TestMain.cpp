@@ -1,5 +1,6 @@
 #include <dlfcn.h>
 #include <gmock/gmock.h>
+#include <malloc.h>
 #include <stdlib.h>
 
 namespace {
@@ -36,6 +37,10 @@ const char* __tsan_default_options() {
 
 int main(int argc, char** argv) {
   setenv("EGL_PLATFORM", "surfaceless", 0);
+  // Freed memory is used again instead of given back: the kernel took longer to hand out cleared pages for
+  // the next picture than a test to draw it.
+  mallopt(M_MMAP_MAX, 0);
+  mallopt(M_TRIM_THRESHOLD, -1);
   testing::InitGoogleMock(&argc, argv);
   // Listing the cases needs no driver.
   if (QELT_SANITIZED && !testing::GTEST_FLAG(list_tests)) keepDriverLoaded();

@@ -46,7 +46,7 @@ void takeOver(Brush& brush, const Brush& base) {
 }
 
 // For groups, besides the tools themselves.
-constexpr std::uint8_t kNoTool = 255, kUnknownTool = 254;
+constexpr std::uint8_t kNoGroupTool = 255, kUnknownTool = 254;
 
 std::string trimmedLower(std::string_view text) {
   std::string name = trimmed(text);
@@ -193,7 +193,7 @@ class Definitions::Collector final : public XmlVisitor {
     } else if (name == "traceGroup" || parent == nullptr) {
       open.what = What::Group;
       open.index = mAll.mGroupTools.size();
-      mAll.mGroupTools.push_back(kNoTool);
+      mAll.mGroupTools.push_back(kNoGroupTool);
     } else if (name == "annotation" && within == What::Group && element.text("type") == "tool") {
       open.what = What::Tool;
       open.index = parent->index;
@@ -237,7 +237,7 @@ class Definitions::Collector final : public XmlVisitor {
   // and of those only the first, as nothing after it is read.
   void takeTool(const Open& open) {
     std::uint8_t& tool = mAll.mGroupTools[open.index];
-    if (tool != kNoTool) return;
+    if (tool != kNoGroupTool) return;
     tool = kUnknownTool;
     if (const std::optional<int> known = toolCalled(trimmedLower(open.text))) {
       tool = static_cast<std::uint8_t>(*known);
