@@ -72,11 +72,6 @@ constexpr Scenario kContextLoss{"ContextLoss",
                                   board.finish();
                                 }};
 const Scenario kScenarios[] = {
-    {"Pen",
-     [](PenBoard& board) {
-       board.makePen();
-       board.deletePen();
-     }},
     {"LiveStroke", [](PenBoard& board) { board.draw(Kind::Live); }, true},
     {"Redraws", [](PenBoard& board) { board.draw(Kind::Redraw); }, true},
     {"Outlines", [](PenBoard& board) { board.draw(Kind::Outline); }, true},
@@ -307,11 +302,6 @@ TEST_P(HostSweep, FailingCalls) {
 }
 
 // --- The GL context's ---
-
-struct Drawing {
-  Kind kind;
-  int version;
-};
 
 class ContextLoss : public testing::TestWithParam<Drawing> {};
 INSTANTIATE_TEST_SUITE_P(Strokes, ContextLoss,
