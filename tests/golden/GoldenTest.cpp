@@ -303,7 +303,7 @@ TEST(GrainGolden, PictureBelowTheFirstTilesIsThatOfTheRelease) {
     board.stroke(shading);
     // A lone stamp so dense that its alpha is cut off at 1.
     board.settings.color = 0xFF203040u;
-    board.settings.size = 4.5f;
+    board.settings.size = board.options.version == 8 ? 4.5f : 12.0f;
     board.stroke({{35.71f, 68.39f, 1.0f}, {35.71f, 68.39f, 1.0f}});
   };
   for (const int version : {1, 7, 8}) {

@@ -114,7 +114,7 @@ TEST(Outline, FingersTakeShortMovesEveryOtherTime) {
       return board.takeStamps().size();
     };
     // 50 units are far enough.
-    EXPECT_EQ(stampsOf(Qelt::kToolFinger, 50.2f), stampsOf(Qelt::kToolStylus, 50.2f)) << version;
+    EXPECT_EQ(stampsOf(Qelt::kToolFinger, 50.7f), stampsOf(Qelt::kToolStylus, 50.7f)) << version;
     EXPECT_NE(stampsOf(Qelt::kToolFinger, 49.8f), stampsOf(Qelt::kToolStylus, 49.8f)) << version;
   }
 }
