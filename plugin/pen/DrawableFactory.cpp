@@ -33,15 +33,18 @@ struct Kind<Base, std::tuple<Drawables...>> {
   static Base* make(std::int32_t version, Pencil2Data* penData, PenGLDataManager* manager) {
     static_assert(has(1), "version 1 draws all versions that are not listed");
     Base* made = nullptr;
-    const auto makeIf = [&]<typename Drawable>(std::int32_t wanted) {
-      if (wanted != Drawable::Row::number) return false;
-      made = makeWhole<Drawable>(penData, manager);
-      return true;
-    };
-    if (!(makeIf.template operator()<Drawables>(version) || ...)) {
-      (makeIf.template operator()<Drawables>(1) || ...);
+    if (!(makeIf<Drawables>(version, penData, manager, &made) || ...)) {
+      static_cast<void>((makeIf<Drawables>(1, penData, manager, &made) || ...));
     }
     return made;
+  }
+
+  // False when the version is another class's.
+  template <typename Drawable>
+  static bool makeIf(std::int32_t version, Pencil2Data* penData, PenGLDataManager* manager, Base** made) {
+    if (version != Drawable::Row::number) return false;
+    *made = makeWhole<Drawable>(penData, manager);
+    return true;
   }
 
   static constexpr bool has(std::int32_t version) { return ((Drawables::Row::number == version) || ...); }
