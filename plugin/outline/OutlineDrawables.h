@@ -5,7 +5,7 @@
 #include "outline/OutlinePipeline.h"
 #include "outline/OutlineVersions.h"
 
-// The outline drawables, one class a version; all that makes one stands in its row of OutlineVersions.h.
+// The outline drawables, one class per version; all that makes one stands in its row of OutlineVersions.h.
 namespace Qelt {
 
 extern template class OutlinePipeline<OutlineV1>;
@@ -39,7 +39,7 @@ class Pencil2OutlineDrawableGLV5 final : public OutlinePipeline<OutlineV5> {
   using OutlinePipeline::OutlinePipeline;
 };
 
-// Lists the classes for the factory. Of a version that is not in the list no drawable is made.
+// Lists the classes for the factory. A version that is not in the list is drawn by version 1.
 using OutlineDrawables =
     std::tuple<Pencil2OutlineDrawableGLV1, Pencil2OutlineDrawableGLV2, Pencil2OutlineDrawableGLV3,
                Pencil2OutlineDrawableGLV4, Pencil2OutlineDrawableGLV5>;

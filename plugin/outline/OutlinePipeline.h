@@ -13,8 +13,8 @@
 
 namespace Qelt {
 
-// The outline drawable of one version: has its pen turn a whole stroke, recorded or stored, into stamps of
-// two streams, and hands these to the render thread. `Version` is a row of OutlineVersions.h. Main thread.
+// The outline drawable of one version: has its stamp pen turn a whole stroke, recorded or stored, into stamps
+// of two streams, and hands these to the render thread. `Version` is a row of OutlineVersions.h. Main thread.
 template <typename Version>
 class OutlinePipeline : public Pencil2OutlineDrawableGL {
  public:

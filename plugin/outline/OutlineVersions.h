@@ -46,7 +46,8 @@ struct OutlineProfile {
   float (*adjustTilt)(float meanTilt);
   float (*getPointSize)(float size, float tiltBlend);
   // Placement.
-  int (*getRepeat)(float length, float size);  // stamps on a segment; 0 drops it, the last point stays
+  // Stamps on a segment; at 0 the segment is dropped, and the next move is measured from the same point.
+  int (*getRepeat)(float length, float size);
   // Hand-over.
   float (*stampSize)(float width);
   float (*stampReach)(float width);

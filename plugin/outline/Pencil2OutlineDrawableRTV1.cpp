@@ -42,9 +42,9 @@ bool hasFloats(const std::vector<float>* batch) {
 
 void Pencil2OutlineDrawableRTV1::AddPoint(Vector2<float>, float) {}
 
-void Pencil2OutlineDrawableRTV1::AddPoint(const Vector2<float>* point, float size, float tiltFactor) {
+void Pencil2OutlineDrawableRTV1::AddPoint(const Vector2<float>* point, float size, float tiltBlend) {
   Appender one(*this, 1);
-  one.AddPoint(point, size, tiltFactor);
+  one.AddPoint(point, size, tiltBlend);
   one.flush();
 }
 

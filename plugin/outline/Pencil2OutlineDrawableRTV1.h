@@ -43,7 +43,7 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
   void AddPoint(Vector2<float> point, float size) override;
 
   // Appends stamps to the write buffers, or to the one that is there. Every stamp has a centre and a
-  // direction (-sin a, cos a), two vectors in a row; a width in stroke units; and a tilt factor. Must not
+  // direction (-sin a, cos a), as two vectors in a row; a width in stroke units; and a tilt blend. Must not
   // outlive a change of the buffers or of the outline size.
   class Appender {
    public:
@@ -53,8 +53,8 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
           mOuter(drawable.mOuterWriteBuffer, stamps),
           mOutlineSize(drawable.GetOutlineSize()) {}
 
-    void AddPoint(const Vector2<float>* point, float size, float tiltFactor) {
-      const StampLook look{0.0f, tiltFactor, 0.0f, point[1]};
+    void AddPoint(const Vector2<float>* point, float size, float tiltBlend) {
+      const StampLook look{0.0f, tiltBlend, 0.0f, point[1]};
       StampExtent extent = squareExtent(size);
       mInner.add(stampQuad(point[0], extent), look);
       extent.x = std::max(extent.x + mOutlineSize, 0.0f);
@@ -75,7 +75,7 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
   };
 
   // Appends one stamp. Throws std::bad_alloc where a buffer cannot grow.
-  void AddPoint(const Vector2<float>* point, float size, float tiltFactor);
+  void AddPoint(const Vector2<float>* point, float size, float tiltBlend);
 
   UnclaimedBatch* unclaimedBatch() { return &mUnclaimed; }
 

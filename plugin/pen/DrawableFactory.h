@@ -27,9 +27,9 @@ inline const RenderingVersion& renderingVersionOf(std::int32_t number) {
   return kRenderingVersions[static_cast<std::size_t>(versionRow(number) - 1)];
 }
 
-// The makers of drawables. Each drawable is made with everything that it draws with, or not at all: half a
-// drawable would draw nothing for the rest of its life, while the next demand for one tries again. Main
-// thread. The caller owns what is returned; null when memory ran out, and for a pen without a record.
+// The makers of drawables. Each drawable is made together with its render drawable, or not at all: without
+// one it would never draw, while a getter that returned null tries again. Main thread. The caller owns what
+// is returned; null when memory ran out, and for a pen without a record.
 
 // Versions that are not listed are drawn by version 1.
 Pencil2StrokeDrawableGL* createStrokeDrawable(std::int32_t strokeVersion, Pencil2Data* penData,

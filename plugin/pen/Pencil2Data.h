@@ -22,11 +22,12 @@ struct Pencil2Data {
   float mLastWidth;                // width reached at the end of the last segment
   float mLastStampX, mLastStampY;  // last stamp placed
   float mLastX, mLastY;            // last input point taken in
-  float mLastAlpha;                // alpha of the last stamp before its version's divisor; -1: no stamp yet
-  float mLastOrientation;          // mean pen orientation, radians
-  std::int32_t mStampCount;        // stamps placed in the stroke
-  float mTiltBlend;                // 0 to about 1
-  bool mHasLastStroke;             // something new since the last prediction
+  // Alpha that the ramp had at the last stamp, before the row's stampAlpha; -1: no stamp yet.
+  float mLastAlpha;
+  float mLastOrientation;    // mean pen orientation, radians
+  std::int32_t mStampCount;  // stamps placed in the stroke
+  float mTiltBlend;          // 0 to about 1
+  bool mHasLastStroke;       // something new since the last prediction
 };
 
 // The layouts are promised: of the record all of it, of the host's settings the two fields that lead them.

@@ -11,9 +11,10 @@ namespace Qelt {
 // What a pen of one rendering version draws with. A released row is frozen, since documents store the number.
 // What the row names is checked where the drawables are made, in DrawableFactory.cpp.
 struct RenderingVersion {
-  std::int32_t number;          // as documents store it and Pen::getVersion returns it
-  std::int32_t strokeVersion;   // of the stroke drawable
-  std::int32_t drawnBy;         // the stroke version whose class draws it: the same, but for 6, drawn by 4's
+  std::int32_t number;         // as documents store it and Pen::getVersion returns it
+  std::int32_t strokeVersion;  // of the stroke drawable
+  // The stroke version whose class draws it: strokeVersion itself, but 4 for rendering version 6.
+  std::int32_t drawnBy;
   std::int32_t outlineVersion;  // of the outline drawable
   int floatsPerVertex;          // in the batches of the stroke drawable: 9, or 11 with a smoothed rim
   bool predicts;                // whether the pen offers a predicted continuation

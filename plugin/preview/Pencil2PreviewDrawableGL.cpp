@@ -58,7 +58,8 @@ bool Pencil2PreviewDrawableGL::canDraw() const {
   return mRenderDrawable != nullptr && mCanvas != nullptr && settings().exist();
 }
 
-// What a call changed, for the guard to present and for the render drawable to know.
+// Passes the call's rectangle, stroke units, to the guard, which has the batch drawn into the tiles that it
+// meets, and to the render drawable.
 void Pencil2PreviewDrawableGL::report(Version::ReturnGuard& guard, const RectF& rect) {
   guard.setRect(rect);
   postRect(queueOf(mDataManager), mRenderDrawable, rect);

@@ -33,7 +33,8 @@ struct PreviewProfile {
 
   // What sets the preview apart from strokes; see StrokeProfile.
   static constexpr bool isOutline = false, publishes = false;
-  static constexpr float startAlpha = -1.0f;  // no fade-in, and nothing of the stroke before
+  // No alpha yet: the first segment begins with its own and does not fade in.
+  static constexpr float startAlpha = -1.0f;
   static constexpr bool postsStraightStarts = true;
   static constexpr bool shiftsPattern = true, restartsPatternShift = true;
   static constexpr float growth = 1.0f, endGrowth = 1.0f, closeGrowth = 0.0f;
@@ -68,7 +69,8 @@ struct PreviewVersion {
 };
 
 // Draws the sample stroke of a settings panel: live, while somebody drags in the panel, or a whole stroke
-// that one event carries as its history. Its pen is a stroke's, by the numbers of its own row. Main thread.
+// that one event carries as its history. Its stamp pen is that of strokes, with a row of its own. Main
+// thread.
 class Pencil2PreviewDrawableGL final : public PenPreviewDrawableGL {
  public:
   Pencil2PreviewDrawableGL(Pencil2Data* penData, PenGLDataManager* manager);

@@ -16,10 +16,10 @@
 // refuses a task on the way.
 namespace Qelt {
 
-// A batch that was handed over, but whose deletion (or release, if it came from the stroke-data cache) the
-// queue refused: the render thread may still read it, so nobody can free it yet. Its render drawable keeps
-// it, at most one: until the queue takes the deletion, no new batch is handed over. What is left when the
-// render drawable dies goes with it, after every task that might refer to it.
+// A batch that was handed over, but whose deletion (or release, if it came from the stroke cache) the queue
+// refused: the render thread may still read it, so nobody can free it yet. Its render drawable keeps it, at
+// most one: until the queue takes the deletion, no new batch is handed over. What is left when the render
+// drawable dies goes with it, after every task that might refer to it.
 //
 // Main thread, but for the destructor.
 class UnclaimedBatch {
@@ -64,7 +64,7 @@ class UnclaimedBatch {
 
 // Collects the batch of one call and hands it over when the call ends, however it ends: the batch, a render
 // message that draws it, and its deletion, in this order. The call makes its guard before it places a stamp
-// and tells it the area to present before it returns; the guard lives on the call's stack. Main thread.
+// and tells it the call's rectangle before it returns; the guard lives on the call's stack. Main thread.
 //
 // `Drawable` is the host's class of the render drawable, whose `SetBuffer` and `SendDataToGPU` take `Buffers`
 // vectors. The render drawable, canvas and `unclaimed`, which belongs to the render drawable, must outlive
@@ -88,7 +88,7 @@ class BatchGuard {
   BatchGuard(const BatchGuard&) = delete;
   BatchGuard& operator=(const BatchGuard&) = delete;
 
-  // The area to present, stroke units.
+  // The call's rectangle, stroke units: the batch is drawn into the tiles that it meets.
   void setRect(const RectF& rect) { mRect = rect; }
   // Null if it could not be allocated.
   const std::vector<float>* buffer() const { return mBuffers[0]; }
@@ -143,16 +143,16 @@ class BatchGuard {
   UnclaimedBatch* mUnclaimed;
 };
 
-// Presents a batch that the stroke-data cache holds. Main thread.
+// Presents a batch that the stroke cache holds. Main thread.
 template <typename Drawable>
 class CacheGuard {
  public:
   CacheGuard(Drawable* drawable, ISPPenCanvas* canvas, UnclaimedBatch* unclaimed)
       : mDrawable(drawable), mCanvas(canvas), mUnclaimed(unclaimed) {}
 
-  // Hands the batch over, with a render message that draws it; `rect` is the area to present, stroke units.
-  // Returns true if the render thread will read the batch, which must live until then. Null does nothing. An
-  // exception out of a post ends the process.
+  // Hands the batch over, with a render message that draws it; `rect` is the call's rectangle, stroke units:
+  // the batch is drawn into the tiles that it meets. Returns true if the render thread will read the batch,
+  // which must live until then. Null does nothing. An exception out of a post ends the process.
   bool present(std::vector<float>* batch, const RectF& rect) noexcept {
     if (batch == nullptr) return false;
     IGLMsgQueue* queue = mCanvas->GetMsgQueue();

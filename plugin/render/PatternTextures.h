@@ -5,7 +5,7 @@ namespace Qelt {
 class IGLMsgQueue;
 class ISPBitmap;
 
-// The two patterns of the pencil, one byte a pixel, row by row from the top, no header. Only read; live as
+// The two patterns of the pencil, one byte per pixel, row by row from the top, no header. Only read; live as
 // long as the library. The host and the shaders see them as the red channel of a texture.
 //
 // The bytes come from the pictures in resources/ when the build is configured (cmake/EmbedPatterns.cmake);
@@ -28,8 +28,8 @@ class PatternTextures {
   // What masks the stamps.
   enum class PointSource {
     StampShapes,  // the three round shapes
-    // Kept: the prediction masks its stamps with squares of paper grain, the first 10,000 bytes of it in rows
-    // of 100, in every tile.
+    // Kept: the prediction masks its stamps with a square of paper grain: the grain's first 10,000 bytes, in
+    // rows of 100, in place of each of the three shapes.
     PaperGrain,
   };
 

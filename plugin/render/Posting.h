@@ -13,8 +13,8 @@
 
 namespace Qelt {
 
-// Work for the render thread. A task neither owns nor counts its object, which must outlive it. All
-// destructors are trivial, so that a refused task takes nothing with it.
+// Work for the render thread. A task neither owns its object nor holds a reference on it; the object must
+// outlive the task. All destructors are trivial, so that a refused task takes nothing with it.
 namespace WorkerTask {
 
 // Calls a member without arguments.
@@ -130,7 +130,7 @@ inline void postRedrawState(IGLMsgQueue* queue, PenDrawableRT* drawable) {
   post(queue, drawable, &PenDrawableRT::SetRedrawState, true);
 }
 
-// The area that a call changed, grown to whole stroke units.
+// The call's rectangle, grown to whole stroke units.
 inline void postRect(IGLMsgQueue* queue, PenDrawableRT* drawable, RectF rect) {
   rect.ExtendRect();
   post(queue, drawable, &PenDrawableRT::SetRect, rect);

@@ -21,31 +21,32 @@ extern template class StampRenderer<Pencil2StrokeDrawableRT, StrokeRenderV3>;
 extern template class StampRenderer<PenPreviewDrawableRT, PreviewRender>;
 extern template class StampRenderer<PenPredictionDrawableRT, PredictionRender>;
 
-// Squares, grain repeating every 150 stroke units.
+// Draws square stamps; the grain repeats every 150 stroke units.
 class Pencil2StrokeDrawableRTV1 final : public StampRenderer<Pencil2StrokeDrawableRT, StrokeRenderV1> {
  public:
   using StampRenderer::StampRenderer;
 };
 
-// Version 1 with the grain at half the size: it repeats every 75 stroke units.
+// As RTV1, with the grain at half the size: it repeats every 75 stroke units.
 class Pencil2StrokeDrawableRTV2 final : public StampRenderer<Pencil2StrokeDrawableRT, StrokeRenderV2> {
  public:
   using StampRenderer::StampRenderer;
 };
 
-// Anti-aliased stamps that know the view's scale; grain repeating every 75 stroke units.
+// Draws anti-aliased stamps, smoothed by the view's scale; the grain repeats every 75 stroke units.
 class Pencil2StrokeDrawableRTV3 final : public StampRenderer<Pencil2StrokeDrawableRT, StrokeRenderV3> {
  public:
   using StampRenderer::StampRenderer;
 };
 
-// The settings preview: squares, grain repeating every 150 stroke units.
+// Draws the settings preview with square stamps; the grain repeats every 150 stroke units.
 class Pencil2PreviewDrawableRT final : public StampRenderer<PenPreviewDrawableRT, PreviewRender> {
  public:
   using StampRenderer::StampRenderer;
 };
 
-// The prediction: anti-aliased stamps under one opacity.
+// Draws the prediction with anti-aliased stamps, under one opacity; the grain repeats every 150 window
+// pixels.
 class Pencil2PredictionDrawableRT final : public StampRenderer<PenPredictionDrawableRT, PredictionRender> {
  public:
   using StampRenderer::StampRenderer;

@@ -13,10 +13,11 @@ struct RenderProfile {
   // kSquareVertex: a stamp's size is its width. kAntialiasedVertex: the size is half the width, and the
   // view's scale decides how the rim is smoothed.
   VertexLayout vertex;
-  float grainScale;       // the grain's size on screen, as a share of its natural one
-  bool grainFollowsView;  // natural: 150 stroke units under the view's transform; else 150 window pixels
+  float grainScale;  // factor on the grain's period of 150
+  // Whether the period is in stroke units, and so follows the zoom, or in window pixels.
+  bool grainFollowsView;
   PatternTextures::PointSource points;
-  bool hasCacheBuffer;  // draws from the stroke-data cache as well
+  bool hasCacheBuffer;  // draws from the stroke cache as well
   bool hasOpacity;      // an overall opacity in the shader
   bool logsSetup;       // notes Init and CreatePenCanvas in the debug log
 };

@@ -88,10 +88,10 @@ class StampRenderer : public HostBase {
 
   void AddPoint(Vector2<float>, float) final {}
 
-  // Appends stamps to the write buffer. Each has a centre and a direction (-sin a, cos a), two vectors in a
-  // row; a size in stroke units, the width of square stamps and half that of anti-aliased ones; an opacity
-  // factor; a tilt blend; and its shape, tile 0, 1 or 2. Must not outlive a change of the buffer or of the
-  // inverse scale.
+  // Appends stamps to the write buffer. Each has a centre and a direction (-sin a, cos a), as two vectors in
+  // a row; the width of a square stamp or half the width of an anti-aliased one, stroke units; an alpha; a
+  // tilt blend; and one of the shapes 0, 1 and 2. Must not outlive a change of the buffer or of the inverse
+  // scale.
   class Appender {
    public:
     // Makes room for so many stamps, so that appending them does not allocate. Throws std::bad_alloc.
@@ -99,7 +99,8 @@ class StampRenderer : public HostBase {
         : mStamps(renderer.mWriteBuffer, stamps), mInverseScale(renderer.mInverseScale) {}
 
     void AddPoint(const Vector2<float>* point, float size, float alpha, float tiltBlend, int tile) {
-      // Most stamps are as large as the one before; the divisions of an extent cost a third of a stamp.
+      // Most stamps are as large as the one before; the divisions of an extent take a third of the time that
+      // a stamp takes.
       if (size != mSize) {
         mExtent = extent(size);
         mSize = size;
@@ -152,7 +153,7 @@ class StampRenderer : public HostBase {
     if (mState == State::Released) return;
     const State reached = prepare();
     ManagedObject::Register(this);
-    mState = reached;
+    if (reached == State::Prepared) mState = reached;
   }
 
   void Release() final {
@@ -193,7 +194,7 @@ class StampRenderer : public HostBase {
   void Draw(ISPSubBitmap* tile, Matrix4<float>& matrix) final {
     const std::vector<float>* batch = currentBatch();
     if (tile == nullptr || batch == nullptr || batch->empty()) return;
-    if (mState != State::Prepared) return;
+    if (mGraphicsObject == nullptr || !canShade() || !mHasTextures) return;
 
     tile->BeginRender(0);
     const ScopeExit endRender([tile] { tile->EndRender(0); });
@@ -254,9 +255,12 @@ class StampRenderer : public HostBase {
     }
     mTextures.buildTextures(queueOf(this->mDataManager), kProfile.className);
     const bool filled = mTextures.setTextures(kProfile.points);
-    const bool complete = filled && mGraphicsObject != nullptr && mShader != nullptr && mShader->isLinked();
-    return complete ? State::Prepared : State::Incomplete;
+    mHasTextures = mHasTextures || filled;
+    return filled && mGraphicsObject != nullptr && canShade() ? State::Prepared : State::Incomplete;
   }
+
+  // Another drawable may have linked the shader that all share.
+  bool canShade() const { return mShader != nullptr && mShader->isLinked(); }
 
   const std::vector<float>* currentBatch() const {
     if constexpr (kProfile.hasCacheBuffer) {
@@ -273,6 +277,7 @@ class StampRenderer : public HostBase {
   GraphicsObject* mGraphicsObject = nullptr;
   typename Version::Shader* mShader = nullptr;
   PatternTextures mTextures;
+  bool mHasTextures = false;  // they were filled once
   State mState = State::Incomplete;
   GrainOrigin mGrainOrigin;
   Vector2<float> mInverseScale{1.0f, 1.0f};

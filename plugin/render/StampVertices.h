@@ -30,11 +30,11 @@ struct VertexLayout {
   }
 };
 
-// Corner x, y, u, v; opacity factor, narrowing, stamp shape; direction.
+// Corner x, y, u, v; alpha, tilt blend, stamp shape; direction.
 inline constexpr VertexLayout kSquareVertex{{4, 3, 2}};
 // The same; then inner radius and alpha by width.
 inline constexpr VertexLayout kAntialiasedVertex{{4, 3, 2, 2}};
-// Corner x, y, u, v; narrowing; direction.
+// Corner x, y, u, v; tilt blend; direction.
 inline constexpr VertexLayout kOutlineVertex{{4, 1, 2}};
 
 // A vertex object for triangles; null if the host could not make one. Render thread.
@@ -48,9 +48,9 @@ inline GraphicsObject* createStampObject(const VertexLayout& layout) {
 
 // What every vertex of a stamp carries besides its corner.
 struct StampLook {
-  float alpha;      // opacity factor; an outline's has none
-  float tiltBlend;  // narrowing: 0 none
-  float tile;       // stamp shape 0, 1 or 2; an outline's has none
+  float alpha;      // an outline's has none
+  float tiltBlend;  // 0: upright
+  float tile;       // which of the three stamp shapes, 0 to 2; an outline's has none
   Vector2<float> direction;
 };
 
@@ -58,8 +58,8 @@ struct StampLook {
 struct StampQuad {
   float left, top, right, bottom;
   // Of anti-aliased vertices alone.
-  float innerRadius;   // where the rim's ramp begins, 0.5 at the rim
-  float alphaByWidth;  // what a stamp widened to half a pixel is dimmed by
+  float innerRadius;   // where the rim's fade begins, in texture units from the centre; the rim ends at 0.5
+  float alphaByWidth;  // factor that dims a stamp widened to one pixel; else 1, or 0 to hide the stamp
 };
 
 // How far a stamp's square reaches from its centre, and how its rim is smoothed: all that its size decides.
@@ -74,9 +74,9 @@ inline StampExtent squareExtent(float width) {
   return {half, half, 0.0f, 1.0f};
 }
 
-// A square of the given half width, with a margin of half a device pixel for the rim. A stamp thinner than
-// half a pixel is widened to that and dimmed in proportion. A stamp that has no width left to widen, or whose
-// extent does not fit into a float, is made invisible. `inverseScale`: stroke units per device pixel,
+// A square of the given half width, with a margin of half a device pixel for the rim. A stamp less than one
+// pixel wide is widened to one pixel and dimmed in proportion. A stamp that has no width left to widen, or
+// whose extent does not fit into a float, is made invisible. `inverseScale`: stroke units per device pixel,
 // positive.
 inline StampExtent antialiasedExtent(float halfWidth, Vector2<float> inverseScale) {
   constexpr float kMostPixels = 1e37f;

@@ -41,6 +41,12 @@ struct ReleaseToHost {
 template <typename T>
 using HostOwned = std::unique_ptr<T, ReleaseToHost>;
 
+// Gives the object back now, and lets the host's exceptions out.
+template <typename T>
+void giveBack(HostOwned<T>& owned) {
+  if (T* const object = owned.release(); object != nullptr) object->release();
+}
+
 // The C++ type of each uniform type.
 template <BindingType N>
 struct BindingValue;
@@ -72,14 +78,14 @@ class ParameterBinding {
   // Looks the uniform up, in place of the one that was bound; returns false if the host has no interface to
   // it. Throws InvalidArgumentException if it has another type.
   bool bind(OpenGLShaderProgram* program, const char* name) {
-    mInterface.reset();
+    giveBack(mInterface);
     mInterface.reset(program->getBindingIntf(name, kBindingAny));
     if (mInterface == nullptr) return false;
     const BindingType found = mInterface->getType();
     if (found == N || found == kBindingAny) return true;
     __android_log_print(kLogInfo, kLogTag, "%s: Found %d but given %d", name, static_cast<int>(found),
                         static_cast<int>(N));
-    mInterface.reset();
+    giveBack(mInterface);
     throw InvalidArgumentException("ParameterBinding<>::bind - invalid parameter type!");
   }
 

@@ -3,7 +3,7 @@
 #include "gl/GraphicsFactory.h"
 #include "shaders/ParameterBinding.h"
 
-// The five shaders of the pencil. All of it is for the render thread.
+// The shaders of the pencil. Everything here is for the render thread.
 namespace Qelt {
 
 // What every shader that draws stamps takes. The bindings are named after the uniforms.
@@ -58,7 +58,7 @@ class PencilShader : public Uniforms {
   // Makes the program and binds its uniforms, in place of those there were. Throws as the constructor does.
   void link() {
     mLinked = false;
-    mProgram.reset();
+    giveBack(mProgram);
     mProgram.reset(GraphicsFactory::createOpenGLShaderProgram(Shader::szVertexShader,
                                                               Shader::szFragmentShader, nullptr));
     mLinked = mProgram != nullptr && Uniforms::bind(mProgram.get());
@@ -77,28 +77,28 @@ class PencilShader : public Uniforms {
 // The sources are GLSL ES 3.00, zero-terminated and exported. They come from glsl/, and plugin/CMakeLists.txt
 // says which class has which; two vertex shaders serve two classes each.
 
-// Stroke render drawables 1 and 2: a rim smoothed over one pixel.
+// For RTV1 and RTV2: a rim smoothed over one pixel.
 class Pencil2StrokeShaderV1 : public PencilShader<Pencil2StrokeShaderV1, StampUniforms> {
  public:
   __attribute__((visibility("default"))) static const char szVertexShader[];
   __attribute__((visibility("default"))) static const char szFragmentShader[];
 };
 
-// Stroke render drawable 3: the rim's ramp and the dimming of thin stamps come with the vertices.
+// For RTV3: the rim's fade and the dimming of thin stamps come with the vertices.
 class Pencil2StrokeShaderV2 : public PencilShader<Pencil2StrokeShaderV2, StampUniforms> {
  public:
   __attribute__((visibility("default"))) static const char szVertexShader[];
   __attribute__((visibility("default"))) static const char szFragmentShader[];
 };
 
-// The preview: version 1 of the stroke shaders with the grain's width and height swapped.
+// The preview: as Pencil2StrokeShaderV1, with the grain's width and height swapped.
 class Pencil2PreviewShader : public PencilShader<Pencil2PreviewShader, StampUniforms> {
  public:
   __attribute__((visibility("default"))) static const char szVertexShader[];
   __attribute__((visibility("default"))) static const char szFragmentShader[];
 };
 
-// The prediction: version 2 of the stroke shaders with an overall opacity.
+// The prediction: as Pencil2StrokeShaderV2, with an overall opacity.
 class Pencil2PredictionShader : public PencilShader<Pencil2PredictionShader, PredictionUniforms> {
  public:
   __attribute__((visibility("default"))) static const char szVertexShader[];

@@ -13,7 +13,7 @@
 
 namespace Qelt {
 
-// One redraw's look into the host's stroke-data cache, where the floats of a stored stroke wait for its next
+// One redraw's look into the host's stroke cache, where the floats of a stored stroke wait for its next
 // redraw. The plug-in never creates an entry; it fills those that the host has. Lives on the stack of the
 // redraw; main thread.
 //

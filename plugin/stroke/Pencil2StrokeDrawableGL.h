@@ -7,8 +7,8 @@ namespace Qelt {
 
 struct Pencil2Data;
 
-// The base of every stroke version: the link to the pen's record, and mappings from settings to numbers.
-// Main thread.
+// The base of every stroke version: reads the pen's record, and works out the scales that depend on the
+// screen. Main thread.
 class Pencil2StrokeDrawableGL : public PenStrokeDrawableGL {
  public:
   ~Pencil2StrokeDrawableGL() override;

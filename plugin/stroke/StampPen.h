@@ -25,10 +25,11 @@
 
 namespace Qelt {
 
-// What a pen takes from a row besides what placing stamps takes: how samples are cleaned and filtered, over
-// how many of them tilt and orientation are averaged, and the mappings from them to width and number.
+// What a stamp pen takes from a row besides what placing stamps takes: how samples are cleaned and filtered,
+// over how many of them tilt and orientation are averaged, the rules that turn them into width and number of
+// stamps, and how the drawable's kind begins, ends and reports a stroke.
 template <typename Version>
-concept PenRow = StampRow<Version> && requires(float x, int n) {
+concept PenRow = StampRow<Version> && requires(float x) {
   { Version::tiltWindow } -> std::convertible_to<int>;
   { Version::orientationWindow } -> std::convertible_to<int>;
   { Version::profile.unknownPressure } -> std::convertible_to<float>;
@@ -38,11 +39,28 @@ concept PenRow = StampRow<Version> && requires(float x, int n) {
   { Version::profile.getPointSize(x, x) } -> std::same_as<float>;
   { Version::profile.placement } -> std::convertible_to<Placement>;
   { Version::profile.getRepeat(x, x) } -> std::same_as<int>;
-};
+  { Version::profile.isOutline } -> std::convertible_to<bool>;
+  { Version::profile.shiftsPattern } -> std::convertible_to<bool>;
+  { Version::profile.publishes } -> std::convertible_to<bool>;
+  { Version::profile.growth } -> std::convertible_to<float>;
+  { Version::profile.endGrowth } -> std::convertible_to<float>;
+  { Version::profile.closeGrowth } -> std::convertible_to<float>;
+  { Version::profile.wrongDistanceInDrawLine } -> std::convertible_to<const char*>;
+  { Version::profile.wrongDistanceInEndPen } -> std::convertible_to<const char*>;
+} &&(Version::profile.isOutline ||
+     requires(float x) {
+       { Version::profile.getPressureAlpha(x, x, x) } -> std::same_as<float>;
+       { Version::profile.startAlpha } -> std::convertible_to<float>;
+       { Version::profile.postsStraightStarts } -> std::convertible_to<bool>;
+       { Version::profile.restartsPatternShift } -> std::convertible_to<bool>;
+     }) &&
+    (Version::profile.placement == Placement::Even || requires(float x) {
+      { Version::profile.getRepeatDistance(x) } -> std::same_as<float>;
+    });
 
-// The pen of a stroke, outline or preview drawable: turns a live event, or a whole stroke, into stamps in the
-// render drawable's batch. `Version` is the drawable's row and says all that differs; what stands here no
-// version does its own way.
+// The stamp pen of a stroke, outline or preview drawable: turns a live event, or a whole stroke, into stamps
+// in the render drawable's batch. `Version` is the drawable's row and says all that differs; what stands here
+// no version does its own way.
 //
 // Segment by segment: the sample is cleaned, filtered by distance, and joined to the path; the attitude of
 // the pen is averaged; then stamps are placed while width and alpha move from the last segment's targets to
@@ -63,7 +81,7 @@ class StampPen {
 
   void beginCall() { mPlacer.beginCall(); }
 
-  // Takes the distances that follow the pen size.
+  // Works out what follows from the pen size: the shortest move, and the distance from stamp to stamp.
   void takeSize() {
     mMoves.setMinimumMove(getSize() / 5.0f);
     if constexpr (kProfile.placement != Placement::Even) {
@@ -71,7 +89,8 @@ class StampPen {
     }
   }
 
-  // Draws one live event. `rect` becomes the area that it changed, where it changed any.
+  // Draws one live event. Sets `rect` to the rectangle of what changed; leaves it as it is when the event is
+  // ignored.
   //
   // Moves and ups count only after a down. A down begins anew at any time; a cancel changes nothing, so that
   // the next move goes on with the stroke.
@@ -91,8 +110,9 @@ class StampPen {
     }
   }
 
-  // Draws a whole stroke. `rect` becomes the area that it covers; of a straight one it takes in every point
-  // and is grown. False, with the host's error set, when there is no point to start from.
+  // Draws a whole stroke. `rect` becomes the rectangle of its stamps. A straight replay takes every point
+  // into it and grows it; after a curved one the caller grows it. False, with the host's error set, when
+  // there is no point to start from.
   template <SampleSource Source>
   bool replay(Source source, RectF* rect, Smoothing smoothing) {
     restartMoves(source.isCoarse());
@@ -129,7 +149,7 @@ class StampPen {
     return true;
   }
 
-  // Grows the area that a move or a replay changed. Stroke units.
+  // Grows the rectangle of a move or a replay. Stroke units.
   static void extendRectByStrokeWidthGL(RectF* rect) { rect->IncreaseRect(kProfile.growth); }
 
  private:
@@ -166,7 +186,7 @@ class StampPen {
   }
 
   // Ends a stroke at the event's point. If the point is not usable, the closing segment is left out. `rect`
-  // becomes the area of the end.
+  // becomes the rectangle of the end.
   bool endPen(const MotionEvent& event, RectF* rect, Smoothing smoothing) {
     if (!hasRepeatDistance(smoothing, kProfile.wrongDistanceInEndPen)) return false;
     substituteTouchPressure(event, kCleaner);
@@ -185,7 +205,7 @@ class StampPen {
       if (const int repeat = getRepeat(length); !isTooShort(repeat)) {
         placeSegment(length, repeat, sample.pressure, rect, smoothing);
       }
-      // Kept: the closing segment leaves the size that an outline has reached as it is.
+      // Kept: the closing segment leaves the width that an outline has reached as it is.
       if constexpr (kProfile.isOutline) mWidth = reached;
       if constexpr (kProfile.closeGrowth > 0.0f) rect->IncreaseRect(kProfile.closeGrowth);
     }
@@ -205,7 +225,7 @@ class StampPen {
     mPlacer.setCarried(mRepeatDistance);
     mAttitude.fill(start.tilt, start.orientation);
     mFirstSegment = true;
-    // Kept: the size reached goes on from one outline to the next.
+    // Kept: the width reached goes on from one outline to the next.
     if constexpr (!kProfile.isOutline) {
       mWidth = getSize();
       mAlpha = kProfile.startAlpha;
@@ -213,7 +233,8 @@ class StampPen {
     }
   }
 
-  // Takes one sample into the stroke; true when it placed a stamp.
+  // Takes one sample into the stroke. True when it placed at least one stamp, or left one out beyond the
+  // call's bound.
   bool drawLine(const PenSample& sample, RectF* rect, Smoothing smoothing) {
     if (!hasRepeatDistance(smoothing, kProfile.wrongDistanceInDrawLine)) return false;
     if (!mMoves.accepts(path().last(), sample.at)) return false;
@@ -257,7 +278,8 @@ class StampPen {
            (kProfile.placement == Placement::SpacedOnCurves && smoothing == Smoothing::Curve);
   }
 
-  // False where stamps are spaced and a stroke that began at size 0 has no distance to space them by.
+  // False, after logging the message, where stamps are spaced but the distance is 0 or negative, as in a
+  // stroke begun at size 0.
   bool hasRepeatDistance(Smoothing smoothing, const char* message) const {
     if (!isSpaced(smoothing) || !(mRepeatDistance <= 0.0f)) return true;
     if (message != nullptr) {
@@ -266,9 +288,9 @@ class StampPen {
     return false;
   }
 
-  // Places the stamps of the path's current segment; true when there was one. Afterwards width and alpha are
-  // at their targets, whatever the ramps reached. (Kept: where stamps are spaced and getRepeat counts the
-  // steps, the ramps may run past the targets.)
+  // Places the stamps of the path's current segment and returns what the placer returns. Afterwards width and
+  // alpha are at their targets, whatever the ramps reached. (Kept: where stamps are spaced and getRepeat
+  // counts the steps, the ramps may run past the targets.)
   bool placeSegment(float length, int repeat, float pressure, RectF* rect, Smoothing smoothing) {
     const float alpha = targetAlpha(pressure);
     const float blend = kProfile.adjustTilt(mAttitude.meanTilt());

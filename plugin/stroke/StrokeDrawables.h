@@ -5,7 +5,7 @@
 #include "stroke/StrokePipeline.h"
 #include "stroke/StrokeVersions.h"
 
-// The stroke drawables, one class a version; all that makes one stands in its row of StrokeVersions.h.
+// The stroke drawables, one class per version; all that makes one stands in its row of StrokeVersions.h.
 namespace Qelt {
 
 extern template class StrokePipeline<StrokeV1>;
@@ -51,7 +51,7 @@ class Pencil2StrokeDrawableGLV8 final : public StrokePipeline<StrokeV8> {
   using StrokePipeline::StrokePipeline;
 };
 
-// Lists the classes for the factory. Of a version that is not in the list no drawable is made.
+// Lists the classes for the factory. A version that is not in the list is drawn by version 1.
 using StrokeDrawables =
     std::tuple<Pencil2StrokeDrawableGLV1, Pencil2StrokeDrawableGLV2, Pencil2StrokeDrawableGLV3,
                Pencil2StrokeDrawableGLV4, Pencil2StrokeDrawableGLV5, Pencil2StrokeDrawableGLV7,

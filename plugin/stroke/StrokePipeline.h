@@ -16,11 +16,11 @@
 
 namespace Qelt {
 
-// The stroke drawable of one version: has its pen turn live events, recorded events and stored strokes into
-// stamps, and hands these to the render thread, one batch per call. `Version` is a row of StrokeVersions.h.
-// Main thread.
+// The stroke drawable of one version: has its stamp pen turn live events, recorded events and stored strokes
+// into stamps, and hands these to the render thread, one batch per call. `Version` is a row of
+// StrokeVersions.h. Main thread.
 //
-// Each call opens a return guard, under which the pen's stamps are collected and whose end hands them over; a
+// Each call opens a return guard, under which the stamps are collected and whose end hands them over; a
 // redraw of a stored stroke presents what the cache holds instead, where that still fits.
 template <typename Version>
 class StrokePipeline : public Pencil2StrokeDrawableGL {
@@ -99,7 +99,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     return areGiven(input, rect) && mPen.replay(sourceOf(*input), rect, smoothing);
   }
 
-  // Runs the replay that the curve option asks for and reports its area.
+  // Runs the replay that the curve option asks for and reports its rectangle.
   template <typename Input>
   bool redrawInto(ReturnGuard& guard, const Input* input, RectF* rect) {
     bool result;
@@ -161,7 +161,8 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     return result;
   }
 
-  // What a call changed, for the guard to present and for the render drawable to know.
+  // Passes the call's rectangle, stroke units, to the guard, which has the batch drawn into the tiles that it
+  // meets, and to the render drawable.
   void report(ReturnGuard& guard, const RectF& rect) {
     guard.setRect(rect);
     postRect(queue(), mRenderDrawable, rect);

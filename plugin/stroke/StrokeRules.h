@@ -151,7 +151,7 @@ inline float stampAlphaPrediction(float alpha) {
   return alpha / 3.0f;
 }
 
-// How far the dirty rectangle reaches from a stamp's centre. An outline's stamp reaches as far as a stroke's
+// How far a call's rectangle reaches from a stamp's centre. An outline's stamp reaches as far as a stroke's
 // of the same width.
 inline float stampReachV1(float width) {
   return stampWidthV1(width) / 2.0f;

@@ -15,7 +15,7 @@ namespace Qelt {
 enum class Placement {
   Even,            // getRepeat() stamps, evenly from the segment's start; nothing is carried over
   Spaced,          // every getRepeatDistance(); the leftover is carried from segment to segment
-  SpacedOnCurves,  // curves as Spaced, straight segments as Even; getRepeat() counts the ramps' steps in both
+  SpacedOnCurves,  // on curves as Spaced, else as Even; getRepeat() gives the steps of the ramps in both
 };
 
 struct StrokeProfile {
@@ -29,8 +29,9 @@ struct StrokeProfile {
   float (*getPressureAlpha)(float pressure, float colorAlpha, float size);
   // Placement. A rule that the placement does not ask for is null.
   Placement placement;
-  int (*getRepeat)(float length, float size);  // stamps on a segment; 0 drops it, the last point stays
-  float (*getRepeatDistance)(float size);      // stroke units from stamp to stamp; read when a stroke begins
+  // Stamps on a segment; at 0 the segment is dropped, and the next move is measured from the same point.
+  int (*getRepeat)(float length, float size);
+  float (*getRepeatDistance)(float size);  // stroke units from stamp to stamp; read when a stroke begins
   // Hand-over.
   float (*stampSize)(float width);
   float (*stampAlpha)(float alpha);
@@ -38,20 +39,21 @@ struct StrokeProfile {
   // Bookkeeping.
   bool shiftsPattern;     // moves the pattern offset every 300 segments
   bool publishes;         // tells Pencil2Data where the stroke stands
-  bool followsViewScale;  // smooths stamps by the view's scale, and caches by it
+  bool followsViewScale;  // smooths stamps by the view's scale; cached ones are used at that scale only
 
   // What all stroke versions have in common, and other drawables do not.
   static constexpr bool isOutline = false;
   static constexpr float startAlpha = 0.0f;            // the first segment fades in
   static constexpr bool postsStraightStarts = false;   // Kept: the grain stays where the stroke before had it
   static constexpr bool restartsPatternShift = false;  // Kept: the shift goes on from stroke to stroke
-  // Stroke units around what changed: in a move and in a straight replay; at the end; by the closing segment.
+  // By how much the rectangle is grown, stroke units: after a move or a replay; at a stroke's end; and, on
+  // top of that, where the end has a closing segment.
   static constexpr float growth = 5.0f, endGrowth = 5.0f, closeGrowth = 1.0f;
-  // What is logged where there is no distance to space stamps by; null for nothing.
+  // Logged when stamps are spaced but the distance is 0 or negative; null logs nothing.
   static constexpr const char *wrongDistanceInDrawLine = nullptr, *wrongDistanceInEndPen = nullptr;
 };
 
-// --- Guards: each version hands its batches over with its own, all alike ---
+// --- Guards: one class per version, all alike. Kept: version 8 uses version 7's cache guard ---
 
 class Pencil2V1ReturnCallback final : public BatchGuard<PenStrokeDrawableRT> {
  public:
@@ -88,7 +90,6 @@ class Pencil2V8ReturnCallback final : public BatchGuard<PenStrokeDrawableRT> {
   using BatchGuard::BatchGuard;
 };
 
-// Kept: version 8 has no cache guard of its own and uses version 7's.
 class Pencil2V1CacheRedrawCallback final : public CacheGuard<PenStrokeDrawableRT> {
  public:
   using CacheGuard::CacheGuard;

@@ -22,9 +22,23 @@ Function* hosts(Function*, const char* mangledName) {
   return reinterpret_cast<Function*>(dlsym(RTLD_NEXT, mangledName));
 }
 
-class FaultyObject final : public Qelt::GraphicsObject {
+// Stands before a host's object, and goes with it.
+template <typename Interface>
+class Faulty : public Interface {
  public:
-  explicit FaultyObject(GraphicsObject* real) : mReal(real) {}
+  explicit Faulty(Interface* real) : mReal(real) {}
+  void release() override {
+    mReal->release();
+    delete this;
+  }
+
+ protected:
+  Interface* const mReal;
+};
+
+class FaultyObject final : public Faulty<Qelt::GraphicsObject> {
+ public:
+  using Faulty::Faulty;
   void updateBuffer(int index, const void* data, int vertexCount) override {
     HostFaults::mayThrow();
     mReal->updateBuffer(index, data, vertexCount);
@@ -33,18 +47,11 @@ class FaultyObject final : public Qelt::GraphicsObject {
     HostFaults::mayThrow();
     mReal->draw(first, count, useVertexState, instances);
   }
-  void release() override {
-    mReal->release();
-    delete this;
-  }
-
- private:
-  GraphicsObject* mReal;
 };
 
-class FaultyBinding final : public Qelt::IParameterBinding {
+class FaultyBinding final : public Faulty<Qelt::IParameterBinding> {
  public:
-  FaultyBinding(IParameterBinding* real, bool lies) : mReal(real), mLies(lies) {}
+  using Faulty::Faulty;
   Qelt::BindingType getType() const override {
     return mLies ? static_cast<Qelt::BindingType>(100) : mReal->getType();
   }
@@ -53,10 +60,6 @@ class FaultyBinding final : public Qelt::IParameterBinding {
   void set(const Qelt::Vector4<float>& value) override { forward(value); }
   void set(float value) override { forward(value); }
   void set(int value) override { forward(value); }
-  void release() override {
-    mReal->release();
-    delete this;
-  }
 
  private:
   template <typename Value>
@@ -65,26 +68,18 @@ class FaultyBinding final : public Qelt::IParameterBinding {
     mReal->set(value);
   }
 
-  IParameterBinding* mReal;
-  bool mLies;  // about its type
+  const bool mLies = HostFaults::strikes();  // about its type
 };
 
-class FaultyProgram final : public Qelt::OpenGLShaderProgram {
+class FaultyProgram final : public Faulty<Qelt::OpenGLShaderProgram> {
  public:
-  explicit FaultyProgram(OpenGLShaderProgram* real) : mReal(real) {}
+  using Faulty::Faulty;
   void activate() override { mReal->activate(); }
   Qelt::IParameterBinding* getBindingIntf(const char* name, int type) override {
     if (HostFaults::strikes()) return nullptr;
     Qelt::IParameterBinding* const real = mReal->getBindingIntf(name, type);
-    return real != nullptr ? new FaultyBinding(real, HostFaults::strikes()) : nullptr;
+    return real != nullptr ? new FaultyBinding(real) : nullptr;
   }
-  void release() override {
-    mReal->release();
-    delete this;
-  }
-
- private:
-  OpenGLShaderProgram* mReal;
 };
 
 }  // namespace

@@ -4,8 +4,8 @@
 #include <gtest/gtest.h>
 
 #include <chrono>
-#include <cstdint>
 #include <cstdlib>
+#include <functional>
 #include <memory>
 #include <random>
 #include <string>
@@ -19,88 +19,77 @@
 namespace QeltTests {
 namespace {
 
-using Clock = std::chrono::steady_clock;
 using QeltDesktop::RenderQueue;
 
-double seconds() {
-  const char* const asked = std::getenv("QELT_SOAK_SECONDS");
-  return asked != nullptr ? std::strtod(asked, nullptr) : 1.5;
-}
-
-struct Pace {
+struct Surroundings {
+  const char* name;
+  RenderQueue::GL gl;
   int mostSleep;  // of the render thread after each action, microseconds
   int mostAhead;  // actions the main thread is ahead, at the most
+  int hosts = 1;
 };
 
+class Soak : public testing::TestWithParam<Surroundings> {};
+INSTANTIATE_TEST_SUITE_P(
+    Hosts, Soak,
+    testing::Values(Surroundings{"ARenderThreadThatKeepsUp", RenderQueue::GL::None, 0, 4},
+                    Surroundings{"ARenderThreadThatFallsBehind", RenderQueue::GL::None, 2000, 60},
+                    Surroundings{"TwoHostsInOneProcess", RenderQueue::GL::None, 300, 20, 2},
+                    Surroundings{"APictureAndALostContext", RenderQueue::GL::Context, 200, 12}),
+    [](const auto& test) { return std::string(test.param.name); });
+
 // Draws, redraws, predicts, and takes pens away with their work queued, without a pattern.
-void drawFor(double time, PenBoard& board, Pace pace, std::uint32_t seed) {
-  std::mt19937 random(seed);
-  const auto below = [&random](int bound) {
-    return static_cast<int>(random() % static_cast<unsigned>(bound));
+void act(PenBoard& board, const std::function<int(int)>& below) {
+  switch (const int action = below(12)) {
+    case 5:
+      return board.deletePen();
+    case 6:
+      return board.zoom(1.0f + 0.5f * static_cast<float>(below(4)));
+    case 7:
+      if (board.pen != nullptr) board.pen->setVersion(1 + below(newestVersion()));
+      return;
+    case 8:
+      board.turnPage();
+      if (board.layer != nullptr && below(4) == 0) board.loseAndRestoreContext();
+      return;
+    default:
+      return board.draw(kAllKinds[static_cast<std::size_t>(action % 5)]);
+  }
+}
+
+TEST_P(Soak, LetsNothingOut) {
+  const char* const asked = std::getenv("QELT_SOAK_SECONDS");
+  const std::chrono::duration<double> time(asked != nullptr ? std::strtod(asked, nullptr) : 1.5);
+  const auto soak = [time](const Surroundings& around, unsigned seed) {
+    RenderQueue queue(RenderQueue::Mode::Thread, around.gl);
+    std::unique_ptr<QeltDesktop::CanvasLayer> layer;
+    if (around.gl == RenderQueue::GL::Context)
+      layer = std::make_unique<QeltDesktop::CanvasLayer>(queue, 96, 64, 64);
+    PenBoard board({.size = 4.0f}, queue, layer.get());
+    std::mt19937 random(seed);
+    const auto below = [&random](int bound) {
+      return static_cast<int>(random() % static_cast<unsigned>(bound));
+    };
+    int ahead = 0;
+    for (const auto start = std::chrono::steady_clock::now();
+         std::chrono::steady_clock::now() - start < time;) {
+      act(board, below);
+      if (around.mostSleep > 0) {
+        const std::chrono::microseconds sleep(below(around.mostSleep));
+        QeltDesktop::postCall(queue, [sleep] { std::this_thread::sleep_for(sleep); });
+      }
+      if (++ahead > below(around.mostAhead)) {
+        board.finish();
+        ahead = 0;
+      }
+    }
   };
-  const Clock::time_point end =
-      Clock::now() + std::chrono::duration_cast<Clock::duration>(std::chrono::duration<double>(time));
-  for (int ahead = 0; Clock::now() < end;) {
-    switch (const int action = below(12)) {
-      case 5:
-        board.deletePen();
-        break;
-      case 6:
-        board.zoom(1.0f + 0.5f * static_cast<float>(below(4)));
-        break;
-      case 7:
-        if (board.pen != nullptr) board.pen->setVersion(1 + below(newestVersion()));
-        break;
-      case 8:
-        board.turnPage();
-        if (board.layer != nullptr && below(4) == 0) board.loseAndRestoreContext();
-        break;
-      default:
-        board.draw(kAllKinds[static_cast<std::size_t>(action % 5)]);
-        break;
-    }
-    if (pace.mostSleep > 0) {
-      const std::chrono::microseconds sleep(below(pace.mostSleep));
-      QeltDesktop::postCall(board.queue, [sleep] { std::this_thread::sleep_for(sleep); });
-    }
-    if (++ahead >= 1 + below(pace.mostAhead)) {
-      board.finish();
-      ahead = 0;
-    }
-  }
-}
-
-void soak(RenderQueue::GL gl, Pace pace, int hosts, double time) {
   LogCapture log;
-  std::vector<std::thread> threads;
-  for (int host = 0; host < hosts; ++host) {
-    threads.emplace_back([=] {
-      RenderQueue queue(RenderQueue::Mode::Thread, gl);
-      std::unique_ptr<QeltDesktop::CanvasLayer> layer;
-      const bool draws = gl == RenderQueue::GL::Context;
-      if (draws) layer = std::make_unique<QeltDesktop::CanvasLayer>(queue, 96, 64, 64);
-      PenBoard board({.size = 4.0f}, queue, layer.get());
-      drawFor(time, board, pace, 7u + static_cast<std::uint32_t>(host));
-    });
-  }
-  for (std::thread& thread : threads) thread.join();
+  std::vector<std::thread> hosts;
+  for (int host = 0; host < GetParam().hosts; ++host)
+    hosts.emplace_back(soak, GetParam(), 7u + static_cast<unsigned>(host));
+  for (std::thread& host : hosts) host.join();
   for (const LogLine& line : log.take()) EXPECT_EQ(line.text.find("threw"), std::string::npos) << line.text;
-}
-
-TEST(Soak, ARenderThreadThatKeepsUp) {
-  soak(RenderQueue::GL::None, {0, 4}, 1, seconds());
-}
-
-TEST(Soak, ARenderThreadThatFallsBehind) {
-  soak(RenderQueue::GL::None, {2000, 60}, 1, seconds());
-}
-
-TEST(Soak, TwoHostsInOneProcess) {
-  soak(RenderQueue::GL::None, {300, 20}, 2, seconds());
-}
-
-TEST(Soak, APictureAndALostContext) {
-  soak(RenderQueue::GL::Context, {200, 12}, 1, seconds());
 }
 
 }  // namespace

@@ -11,7 +11,6 @@
 
 #include "FuzzInput.h"
 #include "ink/InkmlReader.h"
-#include "ink/SourceText.h"
 #include "text/Refusal.h"
 
 namespace {
@@ -31,7 +30,7 @@ void check(const Page& page) {
   }
 }
 
-// A file of these bytes: that is where other encodings are told apart.
+// A file of these bytes, for that is where encodings are told apart.
 std::string fileOf(const std::uint8_t* data, std::size_t size) {
   static const int file = memfd_create("ink", 0);
   if (ftruncate(file, 0) != 0 || pwrite(file, data, size, 0) != static_cast<ssize_t>(size)) std::abort();
@@ -51,15 +50,9 @@ bool namesPlace(const std::string& text, const std::string& name) {
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
   if (size > 65536) return -1;
-  const bool marked =
-      size >= 2 && ((data[0] == 0xFE && data[1] == 0xFF) || (data[0] == 0xFF && data[1] == 0xFE));
-  const std::string name = marked ? fileOf(data, size) : "page";
+  const std::string name = fileOf(data, size);
   try {
-    if (marked) {
-      check(QeltDesktop::readInkmlFile(name));
-    } else {
-      check(QeltDesktop::readInkml({name, std::string(reinterpret_cast<const char*>(data), size)}));
-    }
+    check(QeltDesktop::readInkmlFile(name));
   } catch (const QeltDesktop::Refusal& refusal) {
     if (!namesPlace(refusal.what(), name))
       QeltTests::breakOff("the reader", "a refusal without file and line");

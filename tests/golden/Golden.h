@@ -22,14 +22,15 @@ void expectGoldenTrace(const Trace& trace, const std::string& file);
 struct GreyPicture {
   int width = 0, height = 0;
   std::vector<std::uint8_t> pixels;
-  std::string renderer;  // GL's name and version of what drew it
+  std::vector<std::uint8_t> channels;  // red, green, blue and alpha of each, as they were read
+  std::string renderer;                // GL's name and version of what drew it
 };
 
 // Compares a picture with the golden file of that name (PGM), or records it. On a renderer that renderers.txt
-// names for it, every pixel must be the approved one. Any other correct GL implementation passes as well: it
-// rounds blends and edges its own way, pixel by pixel. Other sizes, densities or grain do not. With
-// QELT_APPROVE_RENDERER set, what the running renderer draws is added to renderers.txt: for a new renderer,
-// once somebody has looked at its pictures.
+// names for it, every pixel must be the approved one, colour included. Any other correct GL implementation
+// passes as well: it rounds blends and edges its own way, pixel by pixel. Other sizes, densities or grain do
+// not. With QELT_APPROVE_RENDERER set, what the running renderer draws is added to renderers.txt: for a new
+// renderer, once somebody has looked at its pictures.
 void expectGoldenPicture(const GreyPicture& picture, const std::string& file);
 
 }  // namespace QeltTests

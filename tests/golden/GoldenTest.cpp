@@ -1,5 +1,8 @@
 #include <gtest/gtest.h>
 #include <unistd.h>
+#if defined __x86_64__
+#include <cpuid.h>
+#endif
 
 #include <algorithm>
 #include <cfenv>
@@ -12,7 +15,6 @@
 #include <locale>
 #include <map>
 #include <string>
-#include <utility>
 #include <vector>
 
 #include "golden/Golden.h"
@@ -33,13 +35,26 @@ std::string areaLine(const Qelt::RectF& rect) {
   return traceLine("area", {rect.left, rect.top, rect.right, rect.bottom});
 }
 
+// Who draws, as renderers.txt names it. A software renderer rounds as its processor does, so that belongs to
+// it.
+std::string rendererOf(const QeltDesktop::RenderQueue& queue) {
+  std::string name = queue.rendererName();
+#if defined __x86_64__
+  unsigned int most = 0, vendor[3] = {}, features = 0, unused = 0;
+  __cpuid(0, most, vendor[0], vendor[2], vendor[1]);
+  __cpuid(1, most, unused, features, unused);
+  name += ", " + std::string(reinterpret_cast<const char*>(vendor), sizeof vendor);
+  if ((features & bit_FMA) != 0) name += " with FMA";
+#endif
+  return name;
+}
+
 // Ink on paper: what a board's layer holds.
 GreyPicture pictureOf(Board& board) {
   board.queue.finish();
-  GreyPicture picture{board.options.width, board.options.height, {}, board.queue.rendererName()};
-  const std::vector<std::uint8_t> pixels = board.pixels();
-  for (std::size_t i = 3; i < pixels.size(); i += 4)
-    picture.pixels.push_back(static_cast<std::uint8_t>(255 - pixels[i]));
+  GreyPicture picture{board.options.width, board.options.height, {}, board.pixels(), rendererOf(board.queue)};
+  for (std::size_t i = 3; i < picture.channels.size(); i += 4)
+    picture.pixels.push_back(static_cast<std::uint8_t>(255 - picture.channels[i]));
   return picture;
 }
 
@@ -276,11 +291,21 @@ TEST(GrainGolden, PictureBelowTheFirstTilesIsThatOfTheRelease) {
     board.canvas.setMatrix(viewOf(1.5f, 32.0f, 22.0f));
     stroke(board);
     const GreyPicture picture = pictureOf(board);
-    all.pixels.insert(all.pixels.end(), picture.pixels.begin() + 80 * picture.width, picture.pixels.end());
-    all = {picture.width, all.height + picture.height - 80, std::move(all.pixels), picture.renderer};
+    const std::ptrdiff_t above = 80 * picture.width;
+    all.pixels.insert(all.pixels.end(), picture.pixels.begin() + above, picture.pixels.end());
+    all.channels.insert(all.channels.end(), picture.channels.begin() + 4 * above, picture.channels.end());
+    all.width = picture.width;
+    all.height += picture.height - 80;
+    all.renderer = picture.renderer;
   };
   const BoardOptions options{.size = 7.0f, .color = 0x50203040u, .width = 160, .height = 144, .tile = 64};
-  const auto draws = [&](auto& board) { board.stroke(shading); };
+  const auto draws = [&](auto& board) {
+    board.stroke(shading);
+    // A lone stamp so dense that its alpha is cut off at 1.
+    board.settings.color = 0xFF203040u;
+    board.settings.size = board.options.version == 8 ? 4.5f : 12.0f;
+    board.stroke({{35.71f, 68.39f, 1.0f}, {35.71f, 68.39f, 1.0f}});
+  };
   for (const int version : {1, 7, 8}) {
     BoardOptions ofVersion = options;
     ofVersion.version = version;

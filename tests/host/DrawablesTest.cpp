@@ -1,6 +1,6 @@
 #include <gmock/gmock.h>
-#include <gtest/gtest.h>
 
+#include <array>
 #include <chrono>
 #include <cmath>
 #include <future>
@@ -76,14 +76,13 @@ TEST(Drawables, OfACanvasWithoutALayerPrepareNothingAndOutliveWhatIsQueued) {
   }
 }
 
-TEST(Drawables, APartnerWithoutAnyQueueIsDeletedAtOnce) {
-  Notes notes;
+TEST(Drawables, DeleteAPartnerWithoutAnyQueueAtOnce) {
   PenDataManager queueless(nullptr);
   for (PenDataManager* const manager : {&queueless, static_cast<PenDataManager*>(nullptr)}) {
+    Notes notes;
     { const PlainGL drawable(manager, new NotingRT(notes)); }
     EXPECT_THAT(notes, ElementsAre("gone"));
-    notes.clear();
-    { const PlainGL drawable(manager, nullptr); }
+    const PlainGL alone(manager, nullptr);
   }
 }
 
@@ -122,9 +121,12 @@ TEST(Drawables, APartnerOutlivesItsWorkHoweverItsQueueEnds) {
   const QeltTests::LogCapture log;
   Notes notes;
   {
-    RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::None);
+    RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
     PenDataManager manager(&queue);
+    CanvasLayer layer(queue, 8, 8);
+    PenCanvas canvas(&queue, &layer);
     auto drawable = std::make_unique<PlainGL>(&manager, new NotingRT(notes));
+    drawable->SetCanvas(&canvas);
     std::promise<void> closed;
     // Both from the render thread: neither runs before both are posted.
     queue.run([&] {
@@ -137,7 +139,7 @@ TEST(Drawables, APartnerOutlivesItsWorkHoweverItsQueueEnds) {
     });
     closed.get_future().wait();
     drawable.reset();
-    EXPECT_THAT(notes, ElementsAre("drawn", "gone"));
+    EXPECT_THAT(notes, ElementsAre("create 8 x 8", "drawn", "release", "gone"));
   }
   notes.clear();
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None),
@@ -157,28 +159,11 @@ TEST(Drawables, APartnerOutlivesItsWorkHoweverItsQueueEnds) {
   EXPECT_THAT(notes, ElementsAre("drawn", "drawn on"));
 }
 
-TEST(Drawables, OutliveTheRenderThread) {
-  RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
-  PenDataManager manager(&queue);
-  CanvasLayer layer(queue, 8, 8);
-  PenCanvas canvas(&queue, &layer);
-  Notes notes;
-  {
-    PlainGL drawable(&manager, new NotingRT(notes));
-    drawable.SetCanvas(&canvas);
-    queue.shutDown();
-  }
-  EXPECT_THAT(notes, ElementsAre("create 8 x 8", "release", "gone"));
-}
-
 TEST(PenBase, AStrokesRectIsItsPointsGrownByTheSize) {
   Qelt::Pen pen;
   Qelt::PointF points[] = {{NAN, 5}, {10, 20}, {4, 30}, {INFINITY, 0}};
   const Qelt::RectF rect = pen.GetStrokeRect(points, nullptr, nullptr, 4, 2.0f, true, nullptr);
-  EXPECT_EQ(rect.left, 2.0f);
-  EXPECT_EQ(rect.top, 18.0f);
-  EXPECT_EQ(rect.right, 12.0f);
-  EXPECT_EQ(rect.bottom, 32.0f);
+  EXPECT_THAT((std::array{rect.left, rect.top, rect.right, rect.bottom}), ElementsAre(2, 18, 12, 32));
   EXPECT_EQ(pen.GetStrokeRect(nullptr, nullptr, nullptr, 4, 2.0f, true, nullptr).right, 0.0f);
   EXPECT_EQ(pen.GetStrokeRect(points, nullptr, nullptr, 1, 2.0f, true, nullptr).right, 0.0f);
 }

@@ -1,12 +1,13 @@
 #include <GLES3/gl3.h>
 #include <gmock/gmock.h>
-#include <gtest/gtest.h>
 
+#include <array>
 #include <cmath>
 #include <cstddef>
 #include <cstdint>
 #include <limits>
 #include <memory>
+#include <optional>
 #include <stdexcept>
 #include <utility>
 #include <vector>
@@ -32,6 +33,7 @@ using QeltDesktop::CanvasLayer;
 using QeltDesktop::GlVertexObject;
 using QeltDesktop::RenderQueue;
 using testing::HasSubstr;
+using Pixels = std::vector<std::uint8_t>;
 
 constexpr const char* kVertexShader = R"(#version 300 es
 layout(location = 0) in vec2 position;
@@ -113,10 +115,8 @@ class Painter {
   Qelt::GraphicsObject* quad;
 };
 
-const std::uint8_t* pixelAt(const std::vector<std::uint8_t>& pixels, int width, int x, int y) {
-  return &pixels[(static_cast<std::size_t>(y) * static_cast<std::size_t>(width) +
-                  static_cast<std::size_t>(x)) *
-                 4];
+const std::uint8_t* pixelAt(const Pixels& pixels, int width, int x, int y) {
+  return pixels.data() + (y * width + x) * 4;
 }
 
 class Layer : public testing::TestWithParam<RenderQueue::Mode> {
@@ -126,87 +126,54 @@ class Layer : public testing::TestWithParam<RenderQueue::Mode> {
     for (const QeltTests::LogLine& line : log.take()) ADD_FAILURE() << "logged: " << line.text;
   }
 
+  void expectOneLine(const char* text) {
+    const auto lines = log.take();
+    ASSERT_EQ(lines.size(), 1u);
+    EXPECT_EQ(lines[0].priority, 6);
+    EXPECT_THAT(lines[0].text, HasSubstr(text));
+  }
+
   QeltTests::LogCapture log;
   RenderQueue queue{GetParam(), RenderQueue::GL::Context};
 };
 
-INSTANTIATE_TEST_SUITE_P(Modes, Layer, testing::Values(RenderQueue::Mode::Thread, RenderQueue::Mode::Caller),
-                         [](const auto& mode) {
-                           return mode.param == RenderQueue::Mode::Thread ? "OwnThread" : "CallersThread";
-                         });
+INSTANTIATE_TEST_SUITE_P(Modes, Layer, testing::Values(RenderQueue::Mode::Thread, RenderQueue::Mode::Caller));
 
-TEST_P(Layer, WindowCoordinatesRunOnAcrossTilesAndTheFirstRowIsTheTop) {
-  constexpr int kColumns = 150, kRows = 90;
-  CanvasLayer layer(queue, kColumns, kRows, 64);
-  queue.run([&] {
-    Painter painter(kWindowShader);
-    // Over every border between tiles, one pixel short of the page's edges.
-    painter.setQuad(1, 1, kColumns - 1, kRows - 1);
-    painter.draw(*layer.GetBitmap());
-  });
-  EXPECT_EQ(layer.GetBitmap()->GetTileCount(), 6);
-  EXPECT_EQ(layer.GetBitmap()->GetSubBitmap(6), nullptr);
-  EXPECT_EQ(layer.GetBitmap()->GetSubBitmap(-1), nullptr);
-  const std::vector<std::uint8_t> pixels = layer.readPixels();
-  ASSERT_EQ(pixels.size(), static_cast<std::size_t>(kColumns * kRows * 4));
-  for (int y = 0; y < kRows; ++y) {
-    for (int x = 0; x < kColumns; ++x) {
-      const std::uint8_t* const pixel = pixelAt(pixels, kColumns, x, y);
-      const bool inside = x > 0 && y > 0 && x < kColumns - 1 && y < kRows - 1;
-      ASSERT_EQ(pixel[3], inside ? 255 : 0) << x << ", " << y;
-      ASSERT_EQ(pixel[0], inside ? x : 0) << x << ", " << y;
-      ASSERT_EQ(pixel[1], inside ? y : 0) << x << ", " << y;
-    }
-  }
-  layer.clear();
-  EXPECT_EQ(layer.readPixels(), std::vector<std::uint8_t>(pixels.size()));
-}
-
-TEST_P(Layer, ComesBackEmptyAndEveryWrapperWorksOnAfterEachOfTwoLosses) {
-  constexpr int kSize = 100;
-  CanvasLayer layer(queue, kSize, kSize, 64);
+TEST_P(Layer, ComesBackEmptyAfterEachOfTwoLossesAndOutlivesTheRenderThread) {
+  CanvasLayer layer(queue, 10, 10);
   std::unique_ptr<Painter> painter;
-  queue.run([&] {
-    painter = std::make_unique<Painter>(kWindowShader);
-    painter->setQuad(0, 0, 50, 100);
-    painter->draw(*layer.GetBitmap());
-  });
-  const std::vector<std::uint8_t> left = layer.readPixels(), empty(left.size());
+  const auto paint = [&](bool uploads) {
+    queue.run([&] {
+      if (painter == nullptr) painter = std::make_unique<Painter>(kWindowShader);
+      if (uploads) painter->setQuad(0, 0, 5, 10);
+      painter->draw(*layer.GetBitmap());
+    });
+  };
   for (int round = 0; round < 2; ++round) {
+    paint(true);
     queue.loseContext();
     queue.loseContext();
     EXPECT_THROW(layer.readPixels(), std::runtime_error);
-    // Whatever is done meanwhile has no effect and does no harm.
-    queue.run([&] {
-      painter->draw(*layer.GetBitmap());
-      EXPECT_EQ(Qelt::OpenGLRenderer::getViewport().z, 0);
-    });
+    paint(false);  // without effect and harm
     EXPECT_EQ(layer.timesEmptied(), round);
     queue.restoreContext();
     queue.restoreContext();
     EXPECT_EQ(layer.timesEmptied(), round + 1);
-    // No vertices are left to draw until the next are uploaded.
-    queue.run([&] { painter->draw(*layer.GetBitmap()); });
-    EXPECT_EQ(layer.readPixels(), empty);
-    queue.run([&] {
-      painter->setQuad(0, 0, 50, 100);
-      painter->draw(*layer.GetBitmap());
-    });
-    EXPECT_EQ(layer.readPixels(), left);
+    paint(false);  // no vertices are left
+    EXPECT_EQ(layer.readPixels(), Pixels(10 * 10 * 4));
   }
-  queue.run([&] { painter.reset(); });
+  queue.shutDown();
+  EXPECT_THROW(layer.readPixels(), std::runtime_error);
 }
 
 TEST_P(Layer, SaysClearlyWhatCannotBeDrawn) {
-  for (const int tile : {CanvasLayer::kTileSize, CanvasLayer::kOneTile}) {
-    try {
-      const CanvasLayer layer(queue, 1 << 20, 10, tile);
-      FAIL();
-    } catch (const std::runtime_error& error) {
-      EXPECT_THAT(error.what(), HasSubstr("1048576 x 10"));
-    }
-  }
-  EXPECT_EQ(CanvasLayer(queue, 1030, 600).GetBitmap()->GetTileCount(), 6) << "tiles are of 512 pixels";
+  for (const int tile : {CanvasLayer::kTileSize, CanvasLayer::kOneTile})
+    EXPECT_THAT([&] { CanvasLayer(queue, 1 << 20, 10, tile); },
+                testing::ThrowsMessage<std::runtime_error>(HasSubstr("1048576 x 10")));
+  CanvasLayer tiled(queue, 1030, 600);
+  EXPECT_EQ(tiled.GetBitmap()->GetTileCount(), 6) << "tiles are of 512 pixels";
+  EXPECT_EQ(tiled.GetBitmap()->GetSubBitmap(6), nullptr);
+  EXPECT_EQ(tiled.GetBitmap()->GetSubBitmap(-1), nullptr);
   EXPECT_EQ(CanvasLayer(queue, 1030, 600, CanvasLayer::kOneTile).GetBitmap()->GetTileCount(), 1);
   EXPECT_THROW(CanvasLayer(queue, 0, 10), std::runtime_error);
   EXPECT_THROW(CanvasLayer(queue, 10, 10, 0), std::runtime_error);
@@ -214,20 +181,12 @@ TEST_P(Layer, SaysClearlyWhatCannotBeDrawn) {
   EXPECT_THROW(CanvasLayer(blind, 10, 10), std::runtime_error);
 }
 
-TEST_P(Layer, MayOutliveTheRenderThread) {
-  CanvasLayer layer(queue, 10, 10);
-  std::unique_ptr<Painter> painter;
-  queue.run([&] { painter = std::make_unique<Painter>(kWindowShader); });
-  queue.shutDown();
-  EXPECT_THROW(layer.readPixels(), std::runtime_error);
-}
-
 // A bitmap's owner, filling it again when told to, as pens do.
 class PatternOwner : public Qelt::ManagedObject {
  public:
   PatternOwner() {
     bitmap = Qelt::SPGraphicsFactory::CreateBitmap(nullptr, 4, 4, nullptr, false, 0);
-    fill();
+    OnRestore();
     Register(this);
     Register(this);
   }
@@ -242,27 +201,23 @@ class PatternOwner : public Qelt::ManagedObject {
     ++released;
     EXPECT_EQ(Qelt::OpenGLRenderer::getViewport().z, 0);
   }
-  void OnRestore() override {
-    ++restored;
-    if (refill) fill();
-  }
   // Wider than the bitmap: what does not fit is left out, and rows keep their stride.
-  void fill() {
-    std::vector<std::uint8_t> pixels(6 * 2 * 4);
-    for (std::size_t i = 0; i < 12; ++i) pixels[4 * i] = static_cast<std::uint8_t>(i + 1);
-    bitmap->SetPixels(pixels.data(), 6, 2);
+  void OnRestore() override {
+    ++filled;
+    std::uint8_t pixels[2][6][4] = {};
+    for (int i = 0; i < 12; ++i) pixels[i / 6][i % 6][0] = static_cast<std::uint8_t>(i + 1);
+    bitmap->SetPixels(pixels, 6, 2);
     bitmap->SetPixels(nullptr, 4, 4);
-    bitmap->SetPixels(pixels.data(), 0, 4);
+    bitmap->SetPixels(pixels, 0, 4);
   }
 
   Qelt::ISPBitmap* bitmap;
-  bool refill = true;
   int released = 0;
-  int restored = 0;
+  int filled = 0;
 };
 
 // Draws a bitmap over the whole layer, pixel for pixel.
-std::vector<std::uint8_t> pictureOf(RenderQueue& queue, CanvasLayer& layer, Qelt::ISPBitmap& bitmap) {
+Pixels pictureOf(RenderQueue& queue, CanvasLayer& layer, Qelt::ISPBitmap& bitmap) {
   queue.run([&] {
     Painter painter(kTextureShader);
     painter.setQuad(0, 0, static_cast<float>(layer.width()), static_cast<float>(layer.height()));
@@ -274,53 +229,41 @@ std::vector<std::uint8_t> pictureOf(RenderQueue& queue, CanvasLayer& layer, Qelt
   return layer.readPixels();
 }
 
-TEST_P(Layer, BitmapsAreFilledFromTheTopLeftAndComeBackEmptyForTheirOwnersToFill) {
+TEST_P(Layer, BitmapsAreFilledFromTheTopLeftByTheirOwnersInTheNextContextToo) {
   CanvasLayer layer(queue, 4, 4);
-  std::unique_ptr<PatternOwner> owner;
+  std::optional<PatternOwner> owner;
   queue.run([&] {
-    owner = std::make_unique<PatternOwner>();
+    owner.emplace();
     EXPECT_EQ(owner->bitmap->GetTileCount(), 0);
     for (const int side : {0, 1 << 20})
       EXPECT_EQ(Qelt::SPGraphicsFactory::CreateBitmap(nullptr, side, 4, nullptr, false, 0), nullptr);
   });
-  const std::vector<std::uint8_t> filled = pictureOf(queue, layer, *owner->bitmap);
+  const Pixels filled = pictureOf(queue, layer, *owner->bitmap);
   // First row, first column of the upload is texture coordinate 0, and the page's top left.
   std::vector<int> reds;
   for (std::size_t i = 0; i < 16; ++i) reds.push_back(filled[4 * i]);
   EXPECT_THAT(reds, testing::ElementsAre(1, 2, 3, 4, 7, 8, 9, 10, 0, 0, 0, 0, 0, 0, 0, 0));
-  for (const bool refill : {true, false}) {
-    owner->refill = refill;
-    queue.loseContext();
-    EXPECT_EQ(owner->released, refill ? 1 : 2);
-    queue.restoreContext();
-    EXPECT_EQ(owner->restored, owner->released);
-    EXPECT_EQ(pictureOf(queue, layer, *owner->bitmap) == filled, refill);
-  }
-  EXPECT_EQ(pictureOf(queue, layer, *owner->bitmap), std::vector<std::uint8_t>(4 * 4 * 4));
+  queue.loseContext();
+  queue.restoreContext();
+  EXPECT_EQ(owner->released, 1);
+  EXPECT_EQ(owner->filled, 2);
+  EXPECT_EQ(pictureOf(queue, layer, *owner->bitmap), filled);
   queue.run([&] { owner.reset(); });
 }
 
-TEST_P(Layer, TheHostShapeFillsItsSquare) {
-  CanvasLayer layer(queue, 200, 200);
+// Half a pixel at the rim is half covered; the colour is premultiplied.
+TEST_P(Layer, TheHostShapeFillsItsSquareInTheNextContextToo) {
+  CanvasLayer layer(queue, 20, 30);
   Qelt::ISPBitmap* bitmap = nullptr;
   Qelt::ISPCanvas* canvas = nullptr;
-  Qelt::SPPaint paint;
-  paint.SetColor(0xFF000000u);
-  paint.SetStyle(Qelt::SPPaint::kFill);
-  paint.SetAntiAlias(true);
   queue.run([&] {
-    bitmap = Qelt::SPGraphicsFactory::CreateBitmap(nullptr, 200, 200, nullptr, false, 0);
+    bitmap = Qelt::SPGraphicsFactory::CreateBitmap(nullptr, 20, 30, nullptr, false, 0);
     canvas = Qelt::SPGraphicsFactory::CreateCanvas(nullptr, bitmap, 0);
-    canvas->Clear(0);
-    canvas->DrawShape(0.0f, 0.0f, 200.0f, paint);
   });
-  const std::vector<std::uint8_t> whole = pictureOf(queue, layer, *bitmap);
-  for (std::size_t i = 3; i < whole.size(); i += 4) ASSERT_EQ(whole[i], 255);
-  // It is there again in the next context, where the canvas draws on.
   queue.loseContext();
   queue.restoreContext();
-  EXPECT_EQ(pictureOf(queue, layer, *bitmap), whole);
-  // Half a pixel at the rim is half covered; the colour is premultiplied.
+  Qelt::SPPaint paint;
+  paint.SetAntiAlias(true);
   paint.SetColor(0xFFFF0000u);
   queue.run([&] {
     canvas->Clear(0);
@@ -330,13 +273,15 @@ TEST_P(Layer, TheHostShapeFillsItsSquare) {
     canvas->DrawShape(0.0f, 0.0f, -5.0f, paint);
     canvas->DrawShape(1e30f, 0.0f, 5.0f, paint);
   });
-  const std::vector<std::uint8_t> square = pictureOf(queue, layer, *bitmap);
-  EXPECT_NEAR(pixelAt(square, 200, 10, 20)[0], 128, 1);
-  EXPECT_NEAR(pixelAt(square, 200, 10, 20)[3], 128, 1);
-  EXPECT_EQ(pixelAt(square, 200, 11, 21)[0], 255);
-  EXPECT_NEAR(pixelAt(square, 200, 12, 21)[3], 128, 1);
-  EXPECT_EQ(pixelAt(square, 200, 9, 20)[3], 0);
-  EXPECT_EQ(pixelAt(square, 200, 11, 22)[3], 0);
+  const Pixels square = pictureOf(queue, layer, *bitmap);
+  for (const auto& [x, y, red, alpha] : {std::array{10, 20, 128, 128},
+                                         {11, 21, 255, 255},
+                                         {12, 21, 128, 128},
+                                         {9, 20, 0, 0},
+                                         {11, 22, 0, 0}}) {
+    EXPECT_NEAR(pixelAt(square, 20, x, y)[0], red, 1) << x << ", " << y;
+    EXPECT_NEAR(pixelAt(square, 20, x, y)[3], alpha, 1) << x << ", " << y;
+  }
   queue.run([&] {
     Qelt::SPGraphicsFactory::ReleaseCanvas(canvas);
     Qelt::SPGraphicsFactory::ReleaseBitmap(bitmap);
@@ -357,10 +302,7 @@ TEST_P(Layer, ShadersThatAreBrokenOrMisusedAreLoggedAndAnswerNull) {
     EXPECT_EQ(painter.program->getBindingIntf(nullptr, 0), nullptr);
     painter.projection->set(3.0f);  // of another type: dropped, no GL error
   });
-  const auto lines = log.take();
-  ASSERT_EQ(lines.size(), 1u);
-  EXPECT_EQ(lines[0].priority, 6);
-  EXPECT_THAT(lines[0].text, HasSubstr("vertex shader does not compile"));
+  expectOneLine("vertex shader does not compile");
 }
 
 // Overlapping triangles, each pair of a blue of its own: what is drawn last shows.
@@ -374,28 +316,28 @@ TEST_P(Layer, ALargeBatchLooksTheSameInSlicesAndGoesWithItsTask) {
                       {left + static_cast<float>(x), top + static_cast<float>(y), blue, 0.0f});
     }
   }
-  constexpr int kStamp = 6;
+  constexpr int kStamp = 6, kWhole = 40 * kStamp;
   CanvasLayer layer(queue, 32, 32, 20);
   const auto picture = [&](int sliceVertices, int first, int count, bool inLaterTask) {
     layer.clear();
     std::unique_ptr<Painter> painter;
     queue.run([&] {
       painter = std::make_unique<Painter>(kWindowShader, sliceVertices);
-      painter->quad->updateBuffer(0, vertices.data(), 40 * kStamp);
+      painter->quad->updateBuffer(0, vertices.data(), kWhole);
       if (!inLaterTask) painter->draw(*layer.GetBitmap(), first, count);
     });
-    if (inLaterTask) queue.run([&] { painter->draw(*layer.GetBitmap(), first, count); });
-    queue.run([&] { painter.reset(); });
+    queue.run([&] {
+      if (inLaterTask) painter->draw(*layer.GetBitmap(), first, count);
+      painter.reset();
+    });
     return layer.readPixels();
   };
-  const int whole = 40 * kStamp;
-  EXPECT_EQ(picture(whole, 0, -1, true), picture(whole, 0, -1, false));
-  EXPECT_EQ(picture(kStamp, 0, -1, true), std::vector<std::uint8_t>(32 * 32 * 4));
+  EXPECT_EQ(picture(kWhole, 0, -1, true), picture(kWhole, 0, -1, false));
+  EXPECT_EQ(picture(kStamp, 0, -1, true), Pixels(32 * 32 * 4));
   for (const auto& [first, count] : {std::pair{0, -1}, {0, 51}, {7 * kStamp, -1}, {5 * kStamp, 100}}) {
-    const std::vector<std::uint8_t> expected = picture(whole, first, count, false);
-    for (const int slice : {kStamp, 7 * kStamp, 39 * kStamp}) {
+    const Pixels expected = picture(kWhole, first, count, false);
+    for (const int slice : {kStamp, 7 * kStamp, 39 * kStamp})
       EXPECT_EQ(picture(slice, first, count, false), expected) << slice << ": " << first << ", " << count;
-    }
   }
 }
 
@@ -409,10 +351,8 @@ TEST_P(Layer, ABatchThatThereIsNoMemoryForIsLoggedOnceAndNotDrawn) {
     painter.quad->updateBuffer(0, &none, kMost);  // 32 GiB, and no driver looks at what it has no room for
     painter.draw(*layer.GetBitmap());
   });
-  const auto lines = log.take();
-  ASSERT_EQ(lines.size(), 1u);
-  EXPECT_THAT(lines[0].text, HasSubstr("no memory to draw a batch of 2147483647 vertices"));
-  EXPECT_EQ(layer.readPixels(), std::vector<std::uint8_t>(8 * 8 * 4));
+  expectOneLine("no memory to draw a batch of 2147483647 vertices");
+  EXPECT_EQ(layer.readPixels(), Pixels(8 * 8 * 4));
 }
 
 TEST(LayerQueues, TwoQueuesOnOneThreadKeepTheirContextsApart) {
@@ -424,14 +364,14 @@ TEST(LayerQueues, TwoQueuesOnOneThreadKeepTheirContextsApart) {
   one.run([&] {
     Painter painter(kWindowShader);
     painter.setQuad(0, 0, 16, 16);
-    EXPECT_EQ(second.readPixels(), std::vector<std::uint8_t>(16 * 16 * 4));  // inside the other's task
+    EXPECT_EQ(second.readPixels(), Pixels(16 * 16 * 4));  // inside the other's task
     painter.draw(*first.GetBitmap());
     EXPECT_TRUE(log.take().empty());
     two.run([&] { painter.draw(*second.GetBitmap()); });
     EXPECT_EQ(log.take().size(), 1u) << "the program is not this context's";
   });
   EXPECT_EQ(pixelAt(first.readPixels(), 16, 5, 6)[0], 5);
-  EXPECT_EQ(second.readPixels(), std::vector<std::uint8_t>(16 * 16 * 4));
+  EXPECT_EQ(second.readPixels(), Pixels(16 * 16 * 4));
 }
 
 }  // namespace

@@ -1,5 +1,4 @@
 #include <gmock/gmock.h>
-#include <gtest/gtest.h>
 
 #include <atomic>
 #include <chrono>
@@ -25,10 +24,7 @@ using QeltDesktop::RenderQueue;
 
 class Queue : public testing::TestWithParam<RenderQueue::Mode> {};
 
-INSTANTIATE_TEST_SUITE_P(Modes, Queue, testing::Values(RenderQueue::Mode::Thread, RenderQueue::Mode::Caller),
-                         [](const auto& mode) {
-                           return mode.param == RenderQueue::Mode::Thread ? "OwnThread" : "CallersThread";
-                         });
+INSTANTIATE_TEST_SUITE_P(Modes, Queue, testing::Values(RenderQueue::Mode::Thread, RenderQueue::Mode::Caller));
 
 // Counts the tasks alive, to see each one deleted once.
 class CountedTask final : public Qelt::ITask {
@@ -65,8 +61,6 @@ TEST_P(Queue, RefusesWithoutTakingOwnershipAndIgnoresNull) {
   RenderQueue queue(GetParam(), RenderQueue::GL::None);
   EXPECT_TRUE(queue.Post(nullptr));
   queue.accept = [](const Qelt::ITask&) { return false; };
-  int accepted = 0;
-  queue.onAccepted = [&](const Qelt::ITask&) { ++accepted; };
   auto task = std::make_unique<CountedTask>(alive, ran);
   EXPECT_FALSE(queue.Post(task.get()));
   EXPECT_EQ(alive, 1);
@@ -74,13 +68,11 @@ TEST_P(Queue, RefusesWithoutTakingOwnershipAndIgnoresNull) {
   bool called = false;
   EXPECT_TRUE(queue.run([&] { called = true; }));
   EXPECT_TRUE(called);
-  EXPECT_EQ(accepted, 0);
   queue.accept = nullptr;
   EXPECT_TRUE(queue.Post(task.release()));
   queue.finish();
   EXPECT_EQ(ran, 1);
   EXPECT_EQ(alive, 0);
-  EXPECT_EQ(accepted, 1);
 }
 
 // So a layer, too, can go while there is none; and a task that runs out of it takes nothing else along.
@@ -99,24 +91,20 @@ TEST_P(Queue, AsksForNoMemory) {
 
 TEST_P(Queue, ItsEndRunsWhatWasPostedAndTakesNoMore) {
   std::atomic<int> alive{0}, ran{0};
-  const auto postFifty = [&](RenderQueue& queue) {
+  for (const bool isShutDown : {true, false}) {
+    RenderQueue queue(GetParam(), RenderQueue::GL::None);
     for (int i = 0; i < 50; ++i) queue.Post(new CountedTask(alive, ran));
-  };
-  RenderQueue queue(GetParam(), RenderQueue::GL::None);
-  postFifty(queue);
-  queue.shutDown();
-  EXPECT_EQ(ran, 50);
-  const auto late = std::make_unique<CountedTask>(alive, ran);
-  EXPECT_FALSE(queue.Post(late.get()));
-  EXPECT_FALSE(queue.run([] { FAIL(); }));
-  queue.finish();
-  queue.shutDown();
-  {
-    RenderQueue destroyed(GetParam(), RenderQueue::GL::None);
-    postFifty(destroyed);
+    if (!isShutDown) continue;
+    queue.shutDown();
+    EXPECT_EQ(ran, 50);
+    const auto late = std::make_unique<CountedTask>(alive, ran);
+    EXPECT_FALSE(queue.Post(late.get()));
+    EXPECT_FALSE(queue.run([] { FAIL(); }));
+    queue.finish();
+    queue.shutDown();
   }
   EXPECT_EQ(ran, 100);
-  EXPECT_EQ(alive, 1);  // the late one
+  EXPECT_EQ(alive, 0);
 }
 
 TEST_P(Queue, LogsWhatATaskThrowsAndHandsBackWhatACallThrows) {
@@ -202,17 +190,16 @@ TEST(QueueThreads, MayGoAsSoonAsTheLastTaskHasRun) {
 TEST(QueueThreads, ManyPostersKeepTheirOwnOrderOnOneThreadThatIsNoneOfThem) {
   constexpr int kThreads = 4, kTasks = 2000;
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::None);
-  std::vector<std::vector<int>> seen(kThreads);
+  int next[kThreads] = {};
   std::set<std::thread::id> ranOn;
-  std::atomic<int> accepted{0};
+  std::atomic<int> accepted{0}, unordered{0};
   queue.onAccepted = [&](const Qelt::ITask&) { ++accepted; };
   std::vector<std::thread> posters;
-  for (int who = 0; who < kThreads; ++who) {
-    posters.emplace_back([&, who] {
-      auto& mine = seen[static_cast<std::size_t>(who)];
+  for (int& mine : next) {
+    posters.emplace_back([&] {
       for (int i = 0; i < kTasks; ++i) {
         postCall(queue, [&, i] {
-          mine.push_back(i);
+          if (mine++ != i) ++unordered;
           ranOn.insert(std::this_thread::get_id());
         });
       }
@@ -221,12 +208,10 @@ TEST(QueueThreads, ManyPostersKeepTheirOwnOrderOnOneThreadThatIsNoneOfThem) {
   for (std::thread& poster : posters) poster.join();
   queue.finish();
   EXPECT_EQ(accepted, kThreads * kTasks);
+  EXPECT_THAT(next, testing::Each(kTasks));
+  EXPECT_EQ(unordered, 0);
   EXPECT_EQ(ranOn.size(), 1u);
   EXPECT_FALSE(ranOn.contains(std::this_thread::get_id()));
-  for (const auto& mine : seen) {
-    ASSERT_EQ(mine.size(), static_cast<std::size_t>(kTasks));
-    for (int i = 0; i < kTasks; ++i) ASSERT_EQ(mine[static_cast<std::size_t>(i)], i);
-  }
 }
 
 }  // namespace

@@ -3,7 +3,6 @@
 
 #include <dlfcn.h>
 #include <gtest/gtest.h>
-#include <link.h>
 #include <unistd.h>
 
 #include <cstddef>
@@ -43,7 +42,6 @@ class Loaded {
     if (again != nullptr) dlclose(again);
     return again != nullptr;
   }
-  void* handle() const { return mHandle; }
   const void* symbol(const char* name) const { return dlsym(mHandle, name); }
   Qelt::Pen* makePen() const {
     const auto create = reinterpret_cast<Qelt::Pen* (*)()>(dlsym(mHandle, "createPenInst"));
@@ -63,20 +61,8 @@ class Desk : public PenBoard {
     keepsUp = true;
   }
 
-  static std::vector<Sample> samples() {
-    return {{10.3f, 10.4f, 0.6f, 0.3f, 0.4f}, {40.3f, 14.4f}, {60.3f, 44.4f}, {90.3f, 50.4f}};
-  }
-  void stroke() { draw(Kind::Live, samples()); }
+  void stroke() { draw(Kind::Live); }
 };
-
-// Whether the library really went after it was loaded and drew a stroke.
-bool drawsAndGoes(RenderQueue& queue, QeltDesktop::CanvasLayer* layer) {
-  {
-    const Loaded library(QELT_PLUGIN_PATH);
-    Desk(library, queue, layer).stroke();
-  }
-  return !Loaded::isThere(QELT_PLUGIN_PATH);
-}
 
 // A copy of the library under another name, for as long as this lives.
 class Copy {
@@ -93,56 +79,21 @@ class Copy {
 
 using Batches = std::vector<std::vector<float>>;
 
-// Bytes of the list of functions that the loader calls before anybody calls the library.
-std::size_t initialiserBytes(void* handle) {
-  link_map* map = nullptr;
-  if (dlinfo(handle, RTLD_DI_LINKMAP, &map) != 0) throw std::runtime_error(dlerror());
-  for (const ElfW(Dyn)* entry = map->l_ld; entry->d_tag != DT_NULL; ++entry) {
-    if (entry->d_tag == DT_INIT_ARRAYSZ) return entry->d_un.d_val;
-  }
-  return 0;
-}
-
-TEST(Loading, RunsNoneOfTheLibrarysCode) {
-  if (QELT_SANITIZED) GTEST_SKIP() << "the sanitizers bring constructors of their own";
-  const Loaded library(QELT_PLUGIN_PATH);
-  // The compiler's own start-up function is one; on 64-bit ARM its probe for atomic instructions is another.
-#if defined(__aarch64__)
-  constexpr std::size_t kCompilersOwn = 2;
-#else
-  constexpr std::size_t kCompilersOwn = 1;
-#endif
-  EXPECT_LE(initialiserBytes(library.handle()), kCompilersOwn * sizeof(void*));
-}
-
 TEST(Loading, AThousandTimesLeavesNothingBehind) {
   constexpr int kTimes = QELT_SANITIZED ? 100 : 1000;
   LogCapture log;
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
   long early = 0;
   for (int i = 0; i < kTimes; ++i) {
-    ASSERT_TRUE(drawsAndGoes(queue, nullptr)) << "still loaded after " << i + 1;
+    {
+      const Loaded library(QELT_PLUGIN_PATH);
+      Desk(library, queue, nullptr).stroke();
+    }
+    ASSERT_FALSE(Loaded::isThere(QELT_PLUGIN_PATH)) << "still loaded after " << i + 1;
     log.take();
-    if (i == 4) early = AllocationGate::allBlocks();
+    if (i == 4) early = AllocationGate::counts().allBlocks;
   }
-  EXPECT_EQ(AllocationGate::allBlocks(), early);
-}
-
-TEST(Loading, WithAPictureLeavesNoShaderOfTheLibraryBehind) {
-  LogCapture log;
-  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
-  QeltDesktop::CanvasLayer layer(queue, 128, 64);
-  std::vector<std::uint8_t> first;
-  for (int i = 0; i < 10; ++i) {
-    ASSERT_TRUE(drawsAndGoes(queue, &layer));
-    const std::vector<std::uint8_t> pixels = layer.readPixels();
-    // Nothing that is restored may be the library's.
-    queue.loseContext();
-    queue.restoreContext();
-    if (first.empty()) first = pixels;
-    EXPECT_TRUE(pixels == first) << "load " << i + 1;
-  }
-  EXPECT_NE(first, std::vector<std::uint8_t>(first.size())) << "nothing was drawn";
+  EXPECT_EQ(AllocationGate::counts().allBlocks, early);
 }
 
 TEST(Loading, TwoCopiesDrawInTurnsAsOneDoesAlone) {
@@ -158,7 +109,7 @@ TEST(Loading, TwoCopiesDrawInTurnsAsOneDoesAlone) {
   });
   left.stroke();
   const Batches alone = std::exchange(batches, {});
-  ASSERT_EQ(alone.size(), 4u);
+  ASSERT_GT(alone.size(), 3u);
   // Before each call of the one the other draws its stroke.
   left.beforeCall = [&](auto&) {
     const Batches ofLeft = std::exchange(batches, {});
@@ -170,29 +121,36 @@ TEST(Loading, TwoCopiesDrawInTurnsAsOneDoesAlone) {
   QeltDesktop::setBatchObserver(nullptr);
 }
 
-TEST(Loading, ACopyDrawsOnWithTheShadersThatAnotherBrought) {
+TEST(Loading, ACopyDrawsOnWithTheShadersThatAnotherBroughtAndNoneStays) {
   LogCapture log;
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
   QeltDesktop::CanvasLayer layer(queue, 128, 64);
   const Copy copy;
-  const Loaded other(copy.path);
-  std::vector<std::uint8_t> before;
-  auto one = std::make_unique<Loaded>(QELT_PLUGIN_PATH);
+  auto one = std::make_unique<Loaded>(QELT_PLUGIN_PATH), other = std::make_unique<Loaded>(copy.path);
   auto left = std::make_unique<Desk>(*one, queue, &layer);
   // The registry knows shaders by their class: this desk's are the left one's.
-  Desk right(other, queue, &layer);
+  auto right = std::make_unique<Desk>(*other, queue, &layer);
   left->prepareAll();
-  right.prepareAll();
+  right->prepareAll();
   left->stroke();
-  before = layer.readPixels();
+  const std::vector<std::uint8_t> before = layer.readPixels();
+  EXPECT_NE(before, std::vector<std::uint8_t>(before.size())) << "nothing was drawn";
   layer.clear();
   left.reset();
   one.reset();
   ASSERT_FALSE(Loaded::isThere(QELT_PLUGIN_PATH));
-  queue.loseContext();
-  queue.restoreContext();
-  right.stroke();
+  const auto loseAndRestore = [&] {
+    queue.loseContext();
+    queue.restoreContext();
+  };
+  loseAndRestore();
+  right->stroke();
   EXPECT_TRUE(layer.readPixels() == before);
+  // Nothing that is restored may be the library's.
+  right.reset();
+  other.reset();
+  ASSERT_FALSE(Loaded::isThere(copy.path));
+  loseAndRestore();
   for (const LogLine& line : log.take()) EXPECT_NE(line.priority, 6) << line.text;
 }
 

@@ -29,13 +29,11 @@ long residentKilobytes() {
 // What the process holds and has asked for at one moment.
 struct Moment {
   long resident = residentKilobytes();
-  long blocks = AllocationGate::allBlocks();
-  long plugInBlocks = AllocationGate::plugInBlocks();
-  long allocations = AllocationGate::plugInAllocations();
+  AllocationGate::Counts counts = AllocationGate::counts();
 };
 
 void expectFlat(const Moment& early, const Moment& late) {
-  EXPECT_EQ(late.plugInBlocks, early.plugInBlocks);
+  EXPECT_EQ(late.counts.plugInBlocks, early.counts.plugInBlocks);
   if (QELT_SANITIZED) return;
   EXPECT_LE(late.resident, early.resident + kSlack) << "KB";
 }
@@ -69,7 +67,7 @@ TEST_P(LongStroke, CostsAsMuchLateAsEarly) {
     ASSERT_TRUE(stroke.move(batch));
     for (const auto& floats : stroke.takeBuffers()) stamps += static_cast<long>(floats.size());
     stroke.takePosts();
-    if ((event + 1) % kRound == 0) rounds.push_back(AllocationGate::plugInAllocations());
+    if ((event + 1) % kRound == 0) rounds.push_back(AllocationGate::counts().plugInAllocations);
     if (event + 1 == kEvents / 10) early = Moment();
   }
   const Moment late;
@@ -103,7 +101,7 @@ TEST(LongLife, TenThousandStrokesLeaveNothingBehind) {
     if (round + 1 == kRounds / 5) early = Moment();
   }
   const Moment late;
-  EXPECT_EQ(late.blocks, early.blocks);
+  EXPECT_EQ(late.counts.allBlocks, early.counts.allBlocks);
   expectFlat(early, late);
 }
 

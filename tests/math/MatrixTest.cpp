@@ -1,10 +1,11 @@
-#include <gtest/gtest.h>
+#include <gmock/gmock.h>
 
 #include <array>
 #include <cmath>
 #include <cstddef>
-#include <cstring>
+#include <iterator>
 #include <limits>
+#include <utility>
 
 #include "base/RectF.h"
 #include "base/Vector.h"
@@ -25,12 +26,6 @@ Matrix4<float> of(const Sixteen& elements) {
   return Matrix4<float>(elements.data());
 }
 
-template <typename Matrix, std::size_t Count>
-void expectNear(const Matrix& matrix, const std::array<float, Count>& expected, float tolerance) {
-  for (std::size_t index = 0; index < Count; ++index)
-    EXPECT_NEAR(matrix[index], expected[index], tolerance) << "element " << index;
-}
-
 // The text-book product, written without the class: rows of the left times columns of the right.
 template <typename Left, std::size_t Count>
 std::array<float, Count> product(const Left& left, const std::array<float, Count>& right) {
@@ -46,6 +41,15 @@ std::array<float, Count> product(const Left& left, const std::array<float, Count
   return result;
 }
 
+template <typename Cases>
+void expectNear(const Cases& cases) {
+  for (std::size_t number = 0; number < std::size(cases); ++number) {
+    const auto& [made, expected] = cases[number];
+    for (std::size_t i = 0; i < expected.size(); ++i)
+      EXPECT_NEAR(made[i], expected[i], 1e-5f) << "case " << number << ", element " << i;
+  }
+}
+
 // No two elements alike, invertible; of three rows projective.
 constexpr Nine kAny3 = {2.0f, 0.5f, 0.125f, -1.0f, 3.0f, 0.25f, 7.0f, -4.0f, 1.5f};
 constexpr Nine kOther3 = {-3.0f, 0.75f, 0.5f, 2.0f, 1.0f, -0.25f, 4.0f, 9.0f, 2.0f};
@@ -54,8 +58,6 @@ constexpr Sixteen kAny4 = {2.0f, 0.5f,  0.125f, -0.75f, -1.0f, 3.0f,  0.25f, 1.2
                            7.0f, -4.0f, 1.5f,   0.0f,   5.0f,  -2.0f, 6.0f,  1.75f};
 constexpr Sixteen kUnit4 = {1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1};
 constexpr float kQuarter = 1.57079633f;
-
-// --- Both ---
 
 template <typename Matrix>
 class EitherMatrix : public testing::Test {};
@@ -94,7 +96,7 @@ TYPED_TEST(EitherMatrix, EqualityIsThatOfTheBytes) {
 template <typename Elements>
 void expectInverse(const Elements& elements, const Elements& unit, const Elements& singular) {
   const auto inverse = of(elements).inverse();
-  expectNear(product(inverse, elements), unit, 2e-6f);
+  EXPECT_THAT(product(inverse, elements), testing::Pointwise(testing::FloatNear(2e-6f), unit));
   auto itself = of(elements);
   EXPECT_TRUE(itself.inverseSelf() == inverse);
   // Only a determinant of exactly zero is singular.
@@ -111,29 +113,20 @@ TEST(Matrices, InverseTimesMatrixIsTheIdentity) {
 }
 
 TEST(Matrices, CofactorsAreTheInverseTimesTheDeterminant) {
-  double cofactors[16];
-  const auto expect = [&](std::initializer_list<double> expected) {
-    for (std::size_t i = 0; i < expected.size(); ++i) EXPECT_EQ(cofactors[i], expected.begin()[i]) << i;
-  };
-  // Rows (2 0 1), (0 3 0), (1 0 1): determinant 2 * 3 - 1 * 3 = 3.
-  of(Nine{2, 0, 1, 0, 3, 0, 1, 0, 1}).calculaeMatrix(cofactors);
-  expect({3, 0, -3, 0, 1, 0, -3, 0, 6});
+  std::array<double, 16> cofactors{};
   // Single precision: 16777216 + 1 is lost before the result is widened.
-  of(Nine{1, 0, 0, 0, 16777216, 1, 0, -1, 1}).calculaeMatrix(cofactors);
+  of(Nine{1, 0, 0, 0, 16777216, 1, 0, -1, 1}).calculaeMatrix(cofactors.data());
   EXPECT_EQ(cofactors[0], 16777216.0);
   // Diagonal (2, 3, 5, 7) with element (0, 1) = 4: determinant 210, the inverse's (0, 1) = -4 / 6.
-  of(Sixteen{2, 0, 0, 0, 4, 3, 0, 0, 0, 0, 5, 0, 0, 0, 0, 7}).calculaeMatrix(cofactors);
-  expect({105, 0, 0, 0, -140, 70, 0, 0, 0, 0, 42, 0, 0, 0, 0, 30});
+  of(Sixteen{2, 0, 0, 0, 4, 3, 0, 0, 0, 0, 5, 0, 0, 0, 0, 7}).calculaeMatrix(cofactors.data());
+  EXPECT_THAT(cofactors, testing::ElementsAre(105, 0, 0, 0, -140, 70, 0, 0, 0, 0, 42, 0, 0, 0, 0, 30));
 }
-
-// --- Of a plane ---
 
 TEST(Matrix3, NamesItsElementsAndKnowsTheIdentityWithoutTolerance) {
   const Matrix3<float> matrix = of(Nine{1, 2, 3, 4, 5, 6, 7, 8, 9});
-  const float named[] = {matrix.getScaleX(), matrix.getSkewY(),      matrix.getSkewX(),
-                         matrix.getScaleY(), matrix.getTranslateX(), matrix.getTranslateY()};
-  const float expected[] = {1, 2, 4, 5, 7, 8};
-  for (int i = 0; i < 6; ++i) EXPECT_EQ(named[i], expected[i]) << i;
+  EXPECT_THAT((std::array{matrix.getScaleX(), matrix.getSkewY(), matrix.getSkewX(), matrix.getScaleY(),
+                          matrix.getTranslateX(), matrix.getTranslateY()}),
+              testing::ElementsAre(1, 2, 4, 5, 7, 8));
   Matrix3<float> unit(2.5f);
   EXPECT_EQ(unit[7], 2.5f);
   EXPECT_TRUE(unit.identitySelf().isIdentity());
@@ -141,47 +134,45 @@ TEST(Matrix3, NamesItsElementsAndKnowsTheIdentityWithoutTolerance) {
   EXPECT_FALSE(unit.isIdentity());
 }
 
-TEST(Matrix3, PivotsStayWhereTheyAre) {
-  // 10 - 2 * 10 = -10, 20 - 3 * 20 = -40
-  expectNear(Matrix3<float>().setScale(2, 3, 10, 20), Nine{2, 0, 0, 0, 3, 0, -10, -40, 1}, 0.0f);
-  expectNear(of(kAny3).setTranslate(5, 6), Nine{1, 0, 0, 0, 1, 0, 5, 6, 1}, 0.0f);
-  // A quarter turn about (10, 20) takes (x, y) to (30 - y, 10 + x).
-  expectNear(of(kAny3).setRotate(90, 10, 20), Nine{0, 1, 0, -1, 0, 0, 30, 10, 1}, 2e-6f);
+// What comes before multiplies from the right, what comes after from the left.
+TEST(Matrix3, OperationsGiveTheTextBooksMatrices) {
+  const Nine moved = {1, 0, 0, 0, 1, 0, 5, 7, 1}, scaled = {3, 0, 0, 0, -2, 0, 0, 0, 1};
+  // About (5, 7): 5 - 3 * 5 and 7 + 2 * 7.
+  const Nine scaledAbout = {3, 0, 0, 0, -2, 0, -10, 21, 1};
+  // 30 degrees: cosine sqrt(3) / 2, sine 1 / 2. About (4, 2): 0.5 * 2 - c * 4 + 4 and -0.5 * 4 - c * 2 + 2.
+  const float c = 0.8660254f;
+  const Nine turned = {c, 0.5f, 0, -0.5f, c, 0, 0, 0, 1};
+  const Nine turnedAbout = {c, 0.5f, 0, -0.5f, c, 0, 5 - 4 * c, -2 * c, 1};
+  // Kept: element 1 grows by element 1 * ty; the true product would add element 2 * ty.
+  // 2 + 0.125 * 5, 0.5 + 0.5 * 7; -1 + 0.25 * 5, 3 + 0.25 * 7; 7 + 1.5 * 5, -4 + 1.5 * 7
+  const Nine movedAfter = {2.625f, 4.0f, 0.125f, 0.25f, 4.75f, 0.25f, 14.5f, 6.5f, 1.5f};
+  Matrix3<float> itself = of(kAny3);
+  const std::pair<Matrix3<float>, Nine> cases[] = {
+      {of(kAny3).setTranslate(5, 7), moved},
+      {of(kAny3).setScale(3, -2), scaled},
+      {of(kAny3).setScale(3, -2, 5, 7), scaledAbout},
+      {of(kAny3).setRotate(30), turned},
+      {of(kAny3).setRotate(30, 4, 2), turnedAbout},
+      {of(kAny3).preConcat(of(kOther3)), product(kAny3, kOther3)},
+      {itself.preConcat(itself), product(kAny3, kAny3)},
+      {of(kAny3).preTranslate(5, 7), product(kAny3, moved)},
+      {of(kAny3).preScale(3, -2), product(kAny3, scaled)},
+      {of(kAny3).preScale(3, -2, 5, 7), product(kAny3, scaledAbout)},
+      {of(kAny3).preRotate(30), product(kAny3, turned)},
+      {of(kAny3).preRotate(30, 4, 2), product(kAny3, turnedAbout)},
+      {of(kAny3).postConcat(of(kOther3)), product(kOther3, kAny3)},
+      {of(kAny3).postTranslate(5, 7), movedAfter},
+      {of(kAny3).postScale(3, -2), product(scaled, kAny3)},
+      {of(kAny3).postScale(3, -2, 5, 7), product(scaledAbout, kAny3)},
+      {of(kAny3).postRotate(30), product(turned, kAny3)},
+      {of(kAny3).postRotate(30, 4, 2), product(turnedAbout, kAny3)},
+  };
+  expectNear(cases);
   // A right angle leaves the cosine of single precision.
   const Matrix3<float> quarter = Matrix3<float>::rotateMatrix(90);
   EXPECT_EQ(quarter[1], 1.0f);
   EXPECT_NE(quarter[0], 0.0f);
   EXPECT_LT(std::abs(quarter[0]), 1e-7f);
-}
-
-TEST(Matrix3, PreMultipliesFromTheRightAndPostFromTheLeft) {
-  expectNear(of(kAny3).preConcat(of(kOther3)), product(kAny3, kOther3), 1e-5f);
-  expectNear(of(kAny3).postConcat(of(kOther3)), product(kOther3, kAny3), 1e-5f);
-  const Nine scale = {3, 0, 0, 0, -2, 0, 0, 0, 1};
-  expectNear(of(kAny3).preScale(3, -2), product(kAny3, scale), 1e-6f);
-  expectNear(of(kAny3).postScale(3, -2), product(scale, kAny3), 1e-6f);
-  const Nine scaleAboutPivot = {3, 0, 0, 0, -2, 0, -10, 21, 1};  // pivot (5, 7)
-  expectNear(of(kAny3).preScale(3, -2, 5, 7), product(kAny3, scaleAboutPivot), 1e-5f);
-  expectNear(of(kAny3).postScale(3, -2, 5, 7), product(scaleAboutPivot, kAny3), 1e-5f);
-  // 30 degrees: cosine sqrt(3) / 2, sine 1 / 2.
-  const float c = 0.8660254f;
-  const Nine turn = {c, 0.5f, 0, -0.5f, c, 0, 0, 0, 1};
-  expectNear(of(kAny3).preRotate(30), product(kAny3, turn), 2e-6f);
-  expectNear(of(kAny3).postRotate(30), product(turn, kAny3), 2e-6f);
-  // About (4, 2): 0.5 * 2 - c * 4 + 4 and -0.5 * 4 - c * 2 + 2.
-  const Nine turnAboutPivot = {c, 0.5f, 0, -0.5f, c, 0, 5 - 4 * c, -2 * c, 1};
-  expectNear(of(kAny3).preRotate(30, 4, 2), product(kAny3, turnAboutPivot), 1e-5f);
-  expectNear(of(kAny3).postRotate(30, 4, 2), product(turnAboutPivot, kAny3), 1e-5f);
-  expectNear(of(kAny3).preTranslate(5, 7), product(kAny3, Nine{1, 0, 0, 0, 1, 0, 5, 7, 1}), 1e-5f);
-  Matrix3<float> itself = of(kAny3);
-  expectNear(itself.preConcat(itself), product(kAny3, kAny3), 1e-5f);
-}
-
-// Kept: element 1 grows by element 1 * ty; the true product would add element 2 * ty.
-TEST(Matrix3, PostTranslateFeedsTheSkewBackIntoItself) {
-  // 2 + 0.125 * 5, 0.5 + 0.5 * 7; -1 + 0.25 * 5, 3 + 0.25 * 7; 7 + 1.5 * 5, -4 + 1.5 * 7
-  expectNear(of(kAny3).postTranslate(5, 7),
-             Nine{2.625f, 4.0f, 0.125f, 0.25f, 4.75f, 0.25f, 14.5f, 6.5f, 1.5f}, 0.0f);
 }
 
 TEST(Matrix3, MapRectBoxesAllFourCorners) {
@@ -212,89 +203,51 @@ TEST(Matrix3, MapRectBoxesAllFourCorners) {
   EXPECT_EQ(whole.right, std::numeric_limits<int>::max());
 }
 
-// --- Of space ---
-
-TEST(Matrix4, MultipliesTheOtherFromTheRightAndHasRowsAndColumns) {
+TEST(Matrix4, OperationsGiveTheTextBooksMatrices) {
+  using M = Matrix4<float>;
   const Sixteen other = {-3, 0.75f, 0.5f, 1, 2, 1, -0.25f, 0, 4, 9, 2, -1, 0.5f, 6, -7, 3};
-  expectNear(of(kAny4) * of(other), product(kAny4, other), 1e-5f);
-  EXPECT_EQ(of(kAny4).row(1).x, 0.5f);
-  EXPECT_EQ(of(kAny4).row(1).w, -2.0f);
-  EXPECT_EQ(of(kAny4).column(3).z, 6.0f);
-}
-
-TEST(Matrix4, ProjectsByFieldOfViewAndByBox) {
+  const Sixteen moved = {1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1, 0, 2, 3, 4, 1};
+  const Sixteen scaled = {2, 0, 0, 0, 0, 3, 0, 0, 0, 0, 4, 0, 0, 0, 0, 1};
+  Sixteen turnOnly = kAny4;
+  turnOnly[12] = turnOnly[13] = turnOnly[14] = 0;
   // 90 degrees: f = near, so element 5 is 1; aspect 2 halves element 0. near 1, far 3:
   // -(1 + 3) / 2 = -2 and -(2 * 3 * 1) / 2 = -3.
-  expectNear(Matrix4<float>::perspectiveMatrix(90, 2, 1, 3),
-             Sixteen{0.5f, 0, 0, 0, 0, 1, 0, 0, 0, 0, -2, -1, 0, 0, -3, 0}, 1e-6f);
+  const Sixteen perspective = {0.5f, 0, 0, 0, 0, 1, 0, 0, 0, 0, -2, -1, 0, 0, -3, 0};
   // 2 / 4, 2 / (2 - 10), -2 / 8, -(1 + 5) / 4, -(10 + 2) / -8, -(1 + 9) / 8
-  expectNear(Matrix4<float>::orthoMatrix(1, 5, 10, 2, 1, 9),
-             Sixteen{0.5f, 0, 0, 0, 0, -0.25f, 0, 0, 0, 0, -0.25f, 0, -1.5f, 1.5f, -1.25f, 1}, 0.0f);
-}
-
-TEST(Matrix4, TranslationAndScaleInBothForms) {
-  const Sixteen moved = {1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1, 0, 2, 3, 4, 1};
-  expectNear(Matrix4<float>::translateMatrix(2, 3, 4), moved, 0.0f);
-  expectNear(Matrix4<float>::translateMatrix(Vector3<float>{2, 3, 4}), moved, 0.0f);
-  const Sixteen scaled = {2, 0, 0, 0, 0, 3, 0, 0, 0, 0, 4, 0, 0, 0, 0, 1};
-  expectNear(Matrix4<float>::scaleMatrix(2, 3, 4), scaled, 0.0f);
-  expectNear(Matrix4<float>::scaleMatrix(Vector3<float>{2, 3, 4}), scaled, 0.0f);
-  Sixteen untranslated = kAny4;
-  untranslated[12] = untranslated[13] = untranslated[14] = 0;
-  expectNear(of(kAny4).rotation(), untranslated, 0.0f);
-  expectNear(of(kAny4).translation(), Sixteen{1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1, 0, 5, -2, 6, 1}, 0.0f);
-}
-
-// In radians, counter-clockwise about each axis.
-TEST(Matrix4, EulerAnglesTurnAboutZThenYThenX) {
-  expectNear(Matrix4<float>::rotateMatrix(kQuarter, 0, 0),
-             Sixteen{1, 0, 0, 0, 0, 0, 1, 0, 0, -1, 0, 0, 0, 0, 0, 1}, 1e-6f);
-  expectNear(Matrix4<float>::rotateMatrix(0, kQuarter, 0),
-             Sixteen{0, 0, -1, 0, 0, 1, 0, 0, 1, 0, 0, 0, 0, 0, 0, 1}, 1e-6f);
-  expectNear(Matrix4<float>::rotateMatrix(0, 0, kQuarter),
-             Sixteen{0, 1, 0, 0, -1, 0, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1}, 1e-6f);
-  const Matrix4<float> euler = Matrix4<float>::rotateMatrix(0.3f, -0.7f, 1.1f);
-  const Matrix4<float> inTurn = Matrix4<float>::rotateMatrix(0.3f, 0, 0) *
-                                Matrix4<float>::rotateMatrix(0, -0.7f, 0) *
-                                Matrix4<float>::rotateMatrix(0, 0, 1.1f);
-  expectNear(euler, product(inTurn, kUnit4), 1e-6f);
-  // Rotating replaces the upper three by three; of itself it leaves the fourth row, of a copy not.
-  const Matrix4<float> made = of(kAny4).rotate(0.3f, -0.7f, 1.1f);
-  const Matrix4<float> changed = of(kAny4).rotateSelf(0.3f, -0.7f, 1.1f);
-  for (int column = 0; column < 3; ++column) {
-    for (int row = 0; row < 3; ++row) {
-      EXPECT_EQ(made(row, column), euler(row, column));
-      EXPECT_EQ(changed(row, column), euler(row, column));
-    }
-    EXPECT_EQ(made(3, column), 0.0f);
-    EXPECT_EQ(changed(3, column), kAny4[4 * column + 3]);
-    EXPECT_EQ(made(column, 3), kAny4[12 + column]);
-    EXPECT_EQ(changed(column, 3), kAny4[12 + column]);
-  }
-  EXPECT_EQ(made[15], 1.0f);
-  EXPECT_EQ(changed[15], 1.75f);
-}
-
-// Kept: about an axis the angle runs the other way than Euler's.
-TEST(Matrix4, AxisAndAngleTurnAgainstTheEulerSense) {
-  Vector3<float> axis{0, 0, 5};  // any length
-  expectNear(Matrix4<float>::rotateMatrix(kQuarter, axis),
-             Sixteen{0, -1, 0, 0, 1, 0, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1}, 1e-6f);
-  EXPECT_EQ(axis.z, 5.0f);
-  // A third of a turn about the diagonal takes y to x, z to y and x to z.
-  Vector3<float> diagonal{1, 1, 1};
-  expectNear(Matrix4<float>::rotateMatrix(2.0943951f, diagonal),
-             Sixteen{0, 0, 1, 0, 1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 0, 1}, 1e-6f);
-}
-
-TEST(Matrix4, ADirectionAndAnUpwardMakeAFrame) {
-  // dir z, up y: z x y = -x, (-x) x z = y.
-  expectNear(Matrix4<float>::rotateMatrix(Vector3<float>{0, 0, 2}, Vector3<float>{0, 3, 1}),
-             Sixteen{-1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1}, 1e-6f);
-  const Matrix4<float> m = Matrix4<float>::rotateMatrix({1, 2, 3}, {0, 1, 0});
-  EXPECT_NEAR(m[9] / m[8], 2.0f, 1e-5f);
-  EXPECT_NEAR(m[10] / m[8], 3.0f, 1e-5f);
-  EXPECT_FALSE(std::isfinite(Matrix4<float>::rotateMatrix({0, 0, 1}, {0, 0, 1})[0]));
+  const Sixteen box = {0.5f, 0, 0, 0, 0, -0.25f, 0, 0, 0, 0, -0.25f, 0, -1.5f, 1.5f, -1.25f, 1};
+  // In radians, counter-clockwise: about z, then y, then x.
+  const Sixteen turned = {0.346929f,  0.765048f,  0.542533f, 0, -0.681633f, 0.603004f, -0.414442f, 0,
+                          -0.644218f, -0.226026f, 0.730682f, 0, 0,          0,         0,          1};
+  Vector3<float> upward{0, 0, 5}, diagonal{1, 1, 1};  // of any length
+  const std::pair<M, Sixteen> cases[] = {
+      {of(kAny4) * of(other), product(kAny4, other)},
+      {M::perspectiveMatrix(90, 2, 1, 3), perspective},
+      {M::orthoMatrix(1, 5, 10, 2, 1, 9), box},
+      {M::translateMatrix(2, 3, 4), moved},
+      {M::translateMatrix(Vector3<float>{2, 3, 4}), moved},
+      {M::scaleMatrix(2, 3, 4), scaled},
+      {M::scaleMatrix(Vector3<float>{2, 3, 4}), scaled},
+      {of(kAny4).rotation(), turnOnly},
+      {of(kAny4).translation(), {1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1, 0, 5, -2, 6, 1}},
+      {M::rotateMatrix(0.3f, -0.7f, 1.1f), turned},
+      // Of itself it leaves the fourth row, of a copy not.
+      {of(kAny4).rotate(0, 0, kQuarter), {0, 1, 0, 0, -1, 0, 0, 0, 0, 0, 1, 0, 5, -2, 6, 1}},
+      {of(kAny4).rotateSelf(0, 0, kQuarter), {0, 1, 0, -0.75f, -1, 0, 0, 1.25f, 0, 0, 1, 0, 5, -2, 6, 1.75f}},
+      // Kept: about an axis the angle runs the other way. A third of a turn about the diagonal takes y to x,
+      // z to y and x to z.
+      {M::rotateMatrix(kQuarter, upward), {0, -1, 0, 0, 1, 0, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1}},
+      {M::rotateMatrix(2.0943951f, diagonal), {0, 0, 1, 0, 1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 0, 1}},
+      // dir z, up y: z x y = -x, (-x) x z = y.
+      {M::rotateMatrix({0, 0, 2}, {0, 3, 1}), {-1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1}},
+  };
+  expectNear(cases);
+  EXPECT_EQ(upward.z, 5.0f);
+  const M frame = M::rotateMatrix({1, 2, 3}, {0, 1, 0});
+  EXPECT_NEAR(frame[9] / frame[8], 2.0f, 1e-5f);
+  EXPECT_NEAR(frame[10] / frame[8], 3.0f, 1e-5f);
+  EXPECT_FALSE(std::isfinite(M::rotateMatrix({0, 0, 1}, {0, 0, 1})[0]));
+  EXPECT_EQ(of(kAny4).row(1).w, -2.0f);
+  EXPECT_EQ(of(kAny4).column(3).z, 6.0f);
 }
 
 }  // namespace

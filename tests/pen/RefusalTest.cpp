@@ -60,48 +60,41 @@ class Refusals : public testing::TestWithParam<Drawing> {
     return all;
   }
 
-  // A call of the kind with one input; null where the second is false.
+  // A call of the kind with its input, or with null.
   using Way = std::function<bool(bool hasInput, Qelt::RectF*)>;
+  template <typename Input, typename Drawable>
+  static Way way(Drawable* drawable, bool (Drawable::*call)(const Input*, Qelt::RectF*), const Input& input) {
+    return [=, &input](bool has, auto* area) { return (drawable->*call)(has ? &input : nullptr, area); };
+  }
   // The drawable of the kind, and what can be called with an event or a stroke.
   std::pair<Qelt::PenDrawableGL*, std::vector<Way>> ways(PenBoard& board, const MotionEvent& event,
-                                                         const StoredStroke& stroke) {
-    const Qelt::ObjectStroke& object = stroke;
-    const auto of = [&](auto* drawable, std::vector<Way> some) {
+                                                         const Qelt::ObjectStroke& stroke) {
+    using Stroke = Qelt::PenStrokeDrawableGL;
+    using Outline = Qelt::PenOutlineDrawableGL;
+    using Preview = Qelt::PenPreviewDrawableGL;
+    using Prediction = Qelt::IPenPredictionDrawableGL;
+    const auto of = [&](auto* drawable, const auto&... some) {
       drawable->SetCanvas(&board.canvas);
-      return std::pair<Qelt::PenDrawableGL*, std::vector<Way>>(drawable, std::move(some));
+      return std::pair<Qelt::PenDrawableGL*, std::vector<Way>>(drawable, {some...});
     };
-    Qelt::Pen& pen = *board.pen;
-    auto* const live = pen.GetStrokeDrawableGL();
-    if (kind == Kind::Live)
-      return of(live,
-                {[=, &event](bool has, auto* area) { return live->Draw(has ? &event : nullptr, area); }});
+    Stroke* const live = board.pen->GetStrokeDrawableGL();
+    if (kind == Kind::Live) return of(live, way(live, &Stroke::Draw, event));
     if (kind == Kind::Redraw)
-      return of(
-          live,
-          {[=, &event](bool has, auto* area) { return live->RedrawPen(has ? &event : nullptr, area); },
-           [=, &object](bool has, auto* area) { return live->RedrawPen(has ? &object : nullptr, area); }});
+      return of(live, way(live, &Stroke::RedrawPen, event), way(live, &Stroke::RedrawPen, stroke));
     if (kind == Kind::Outline) {
-      auto* const outline = pen.GetOutlineDrawableGL();
-      return of(outline, {[=, &event](bool has, auto* area) {
-                            return outline->DrawOutline(has ? &event : nullptr, area);
-                          },
-                          [=, &object](bool has, auto* area) {
-                            return outline->DrawOutline(has ? &object : nullptr, area);
-                          }});
+      Outline* const outline = board.pen->GetOutlineDrawableGL();
+      return of(outline, way(outline, &Outline::DrawOutline, event),
+                way(outline, &Outline::DrawOutline, stroke));
     }
     if (kind == Kind::Preview) {
-      auto* const preview = pen.GetPreviewDrawableGL();
-      return of(
-          preview,
-          {[=, &event](bool has, auto* area) { return preview->RedrawPen(has ? &event : nullptr, area); },
-           [=, &event](bool has, auto* area) { return preview->Draw(has ? &event : nullptr, area); }});
+      Preview* const preview = board.pen->GetPreviewDrawableGL();
+      return of(preview, way(preview, &Preview::RedrawPen, event), way(preview, &Preview::Draw, event));
     }
     // A prediction needs a stroke to go on from.
     board.down(kStroke[0]);
     board.move({kStroke[1], kStroke[2]});
-    auto* const ahead = pen.GetPredictionStrokeDrawableGL();
-    return of(ahead,
-              {[=, &event](bool has, auto* area) { return ahead->Draw(has ? &event : nullptr, area); }});
+    Prediction* const ahead = board.pen->GetPredictionStrokeDrawableGL();
+    return of(ahead, way(ahead, &Prediction::Draw, event));
   }
 };
 INSTANTIATE_TEST_SUITE_P(Drawings, Refusals, testing::ValuesIn(drawings()), [](const auto& test) {
@@ -175,29 +168,26 @@ TEST_P(Refusals, OfPointsThatAreNotFiniteAreAsIfTheyHadNotBeen) {
   for (const bool curve : {true, false}) {
     EXPECT_EQ(drawn(broken, curve), drawn(kStroke, curve)) << (curve ? "curve" : "straight");
   }
-  PenBoard board(page());
-  const auto whole = [&](std::vector<Sample> samples, bool brokenFirst, bool brokenLast) {
-    if (brokenFirst) samples.insert(samples.begin(), {NAN, 1.0f, 0.9f, 0.5f, 1.0f});
-    if (brokenLast) samples.push_back({NAN, NAN});
-    const MotionEvent event = board.recorded(samples);
-    const auto stroke = board.stored(samples);
-    const auto [drawable, all] = ways(board, event, *stroke);
-    board.takeFloats();
-    for (const Way& call : all) {
-      if (&call == &all[1] && kind == Kind::Preview) break;
-      call(true, &(board.rect = {}));
-      EXPECT_TRUE(board.rect.left <= board.rect.right);
-    }
-    return board.takeFloats();
+  // All that is drawn of whole strokes. A live stroke cannot begin nowhere, nor goes it on from there.
+  const auto whole = [this](const std::vector<Sample>& samples) {
+    PenBoard board(page());
+    board.draw(kind, samples);
+    EXPECT_TRUE(board.rect.left <= board.rect.right);
+    std::vector<std::vector<float>> buffers = board.takeBuffers();
+    if (kind == Kind::Preview) buffers.erase(buffers.begin(), buffers.end() - 1);
+    return buffers;
   };
   if (kind == Kind::Redraw || kind == Kind::Outline || kind == Kind::Preview) {
-    whole(kStroke, false, false);  // brings an outline's size up
-    const std::vector<float> clean = whole(kStroke, false, false);
-    EXPECT_EQ(whole(kStroke, true, false), clean);
+    broken = kStroke;
+    broken.insert(broken.begin(), {NAN, 1.0f, 0.9f, 0.5f, 1.0f});
+    EXPECT_EQ(whole(broken), whole(kStroke));
     // At the very end there is no point to close to.
-    EXPECT_LT(whole(kStroke, false, true).size(), clean.size());
+    broken = kStroke;
+    broken.push_back({NAN, NAN});
+    EXPECT_LT(whole(broken).back().size(), whole(kStroke).back().size());
   }
   if (kind == Kind::Live) {
+    PenBoard board(page());
     EXPECT_FALSE(board.down({NAN, 10.0f}));
     EXPECT_FALSE(board.move({kStroke[1]}));  // nothing has begun
     board.down(kStroke[0]);
@@ -213,8 +203,7 @@ TEST_P(Refusals, OfPressureAndAnglesThatAreNotFiniteTakeTheVersionsOwn) {
   std::vector<Sample> broken = kStroke, plain = kStroke;
   for (std::size_t i = 0; i < kStroke.size(); ++i) {
     plain[i] = {kStroke[i].x, kStroke[i].y, kind != Kind::Preview && version == 8 ? 0.6f : 0.5f};
-    broken[i] = {kStroke[i].x, kStroke[i].y, NAN, i % 2 == 0 ? INFINITY : NAN,
-                 i % 2 == 0 ? NAN : -INFINITY};
+    broken[i] = {kStroke[i].x, kStroke[i].y, NAN, i % 2 == 0 ? INFINITY : NAN, i % 2 == 0 ? NAN : -INFINITY};
   }
   EXPECT_EQ(drawn(broken), drawn(plain));
 }

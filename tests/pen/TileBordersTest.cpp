@@ -1,11 +1,7 @@
 #include <gtest/gtest.h>
 
-#include <algorithm>
 #include <cstddef>
 #include <cstdint>
-#include <cstdlib>
-#include <ostream>
-#include <string>
 #include <vector>
 
 #include "support/PenBoard.h"
@@ -52,12 +48,6 @@ struct Case {
   bool staysDown = false;
 };
 
-std::ostream& operator<<(std::ostream& out, const Case& c) {
-  return out << c.kind << ", version " << c.version << ", width " << c.width
-             << (c.curve ? ", curve" : ", straight") << (c.tap ? ", tap" : "")
-             << (c.staysDown ? ", stays down" : "") << ", zoom " << c.zoom;
-}
-
 // How far from the border, in pixels, strokes run so that their stamps hang over it. An outline's also lie
 // where a stamp's centre, once cut, takes it over the border and its rectangle ends before it.
 std::vector<float> distancesOf(const Case& c) {
@@ -85,28 +75,22 @@ std::vector<Sample> besideTheBorder(const Case& c, float distance, bool turned) 
   return samples;
 }
 
-// A stroke's picture, and the rectangles of the calls that placed its stamps, in pixels.
-struct Picture {
-  std::vector<std::uint8_t> pixels;
-  std::vector<Qelt::RectF> areas;
-};
+using Picture = std::vector<std::uint8_t>;
 
 // Draws a case on all its ways beside the border. Both kinds of tiles meet at the same borders and round
-// alike, so that pictures can be compared byte by byte. One tile rounds corners of stamps its own way, by up
-// to 1/256 of a pixel.
-std::vector<Picture> drawn(const Case& c, Target target, int tile) {
+// alike, so that pictures can be compared byte by byte.
+std::vector<Picture> drawn(const Case& c, Target target) {
   PenBoard board({.version = c.version,
                   .size = c.width,
                   .curve = c.curve,
                   .width = kSide,
                   .height = kSide,
-                  .tile = tile});
+                  .tile = kTile});
   board.canvas.setTarget(target);
   board.zoom(c.zoom);
   std::vector<Picture> pictures;
   for (const float distance : distancesOf(c)) {
     for (const bool turned : {false, true}) {
-      Picture& picture = pictures.emplace_back();
       board.layer->clear();
       int calls = 0;
       board.draw(c.kind, besideTheBorder(c, distance, turned), [&](const PenBoard::Call& call) {
@@ -114,12 +98,9 @@ std::vector<Picture> drawn(const Case& c, Target target, int tile) {
         if (c.staysDown && calls > 3) return;
         // Of a prediction only what it adds is looked at.
         if (c.kind == Kind::Prediction && calls == 4) board.layer->clear();
-        call(&(board.rect = {}));
-        if (board.takeFloats().empty() || (c.kind == Kind::Prediction && calls < 4)) return;
-        Qelt::RectF& area = picture.areas.emplace_back(board.rect);
-        for (float* edge : {&area.left, &area.top, &area.right, &area.bottom}) *edge *= c.zoom;
+        call(&board.rect);
       });
-      picture.pixels = board.pixels();
+      pictures.push_back(board.pixels());
     }
   }
   return pictures;
@@ -127,42 +108,34 @@ std::vector<Picture> drawn(const Case& c, Target target, int tile) {
 
 // What the borders of tiles do to a stroke, in pixels.
 struct Effect {
-  int inked = 0;
-  int overBorder = 0;   // inked and outside the tile that the stroke runs in
-  int missing = 0;      // other than on boundless tiles
-  int unexplained = 0;  // of these, in tiles that every call's rectangle meets
-  int shifted = 0;      // far from what one tile shows: grain that does not meet
+  int overBorder = 0;  // inked and outside the tile that the stroke runs in
+  int missing = 0;     // other than on boundless tiles
 };
 
 Effect effectOf(const Case& c) {
-  const std::vector<Picture> tiled = drawn(c, Target::Whole, kTile);
-  const std::vector<Picture> whole = drawn(c, Target::BoundlessTiles, kTile);
-  const std::vector<Picture> one = drawn(c, Target::Whole, QeltDesktop::CanvasLayer::kOneTile);
+  const std::vector<Picture> tiled = drawn(c, Target::Whole), whole = drawn(c, Target::BoundlessTiles);
   Effect effect;
   for (std::size_t i = 0; i < whole.size(); ++i) {
     const int home = i % 2 == 0 ? 0 : 3;
-    for (int at = 0; at < kSide * kSide; ++at) {
-      const int column = at % kSide / kTile, row = at / kSide / kTile;
-      const auto alpha = [at](const Picture& p) { return p.pixels[static_cast<std::size_t>(at) * 4 + 3]; };
-      if (std::abs(alpha(one[i]) - alpha(whole[i])) > 40) ++effect.shifted;
-      if (alpha(whole[i]) != 0) {
-        ++effect.inked;
-        if (row * 2 + column != home) ++effect.overBorder;
-      }
-      if (alpha(tiled[i]) == alpha(whole[i])) continue;
-      ++effect.missing;
-      Qelt::RectF tile;
-      tile.Set(static_cast<float>(column * kTile), static_cast<float>(row * kTile),
-               static_cast<float>((column + 1) * kTile), static_cast<float>((row + 1) * kTile));
-      const auto meets = [&](const Qelt::RectF& area) { return tile.IsIntersect(area); };
-      if (std::all_of(tiled[i].areas.begin(), tiled[i].areas.end(), meets)) ++effect.unexplained;
+    for (int pixel = 0; pixel < kSide * kSide; ++pixel) {
+      const int tile = pixel / kSide / kTile * 2 + pixel % kSide / kTile;
+      const std::size_t alpha = static_cast<std::size_t>(pixel) * 4 + 3;
+      effect.overBorder += whole[i][alpha] != 0 && tile != home ? 1 : 0;
+      effect.missing += tiled[i][alpha] != whole[i][alpha] ? 1 : 0;
     }
   }
   return effect;
 }
 
 TEST(TileBorders, CutNothingThatTheRectanglesReach) {
-  std::vector<Case> cases;
+  std::vector<Case> cases = {{Kind::Live, 8, 20.0f, true, 1.0f, false, true},
+                             {Kind::Live, 8, 18.0f, true, 0.5f, false, true},
+                             {Kind::Live, 8, 18.0f, true, 2.0f, false, true},
+                             {Kind::Live, 8, 10.0f, true, 1.0f, true},
+                             {Kind::Redraw, 8, 20.0f, true, 1.0f, true},
+                             {Kind::Preview, 8, 9.0f, true, 1.0f, true},
+                             {Kind::Prediction, 8, 4.0f},
+                             {Kind::Prediction, 8, 4.0f, true, 4.0f}};
   for (const bool curve : {true, false}) {
     for (const int version : allVersions()) {
       cases.push_back({Kind::Live, version, version == 8 ? 12.0f : 9.0f, curve});
@@ -170,43 +143,23 @@ TEST(TileBorders, CutNothingThatTheRectanglesReach) {
     }
     cases.push_back({Kind::Preview, 8, 9.0f, curve});
   }
-  for (const float zoom : {0.5f, 1.0f, 2.0f})
-    cases.push_back({Kind::Live, 8, 18.0f, true, zoom, false, true});
-  cases.push_back({Kind::Live, 8, 20.0f, true, 1.0f, false, true});
-  for (const Qelt::RenderingVersion& row : Qelt::kRenderingVersions) {
-    if (row.outlineVersion == row.number) cases.push_back({Kind::Outline, row.number, 2.6f, false, 4.0f});
-  }
-  for (const float zoom : {1.0f, 4.0f}) cases.push_back({Kind::Prediction, 8, 4.0f, true, zoom});
-  cases.push_back({Kind::Live, 1, 9.0f, true, 1.0f, true});
-  cases.push_back({Kind::Live, 8, 10.0f, true, 1.0f, true});
-  cases.push_back({Kind::Redraw, 8, 20.0f, true, 1.0f, true});
-  cases.push_back({Kind::Preview, 8, 9.0f, true, 1.0f, true});
+  for (const int version : outlineVersions()) cases.push_back({Kind::Outline, version, 2.6f, false, 4.0f});
   for (const Case& c : cases) {
-    SCOPED_TRACE(testing::PrintToString(c));
     const Effect effect = effectOf(c);
-    EXPECT_GT(effect.overBorder, 40);
-    EXPECT_EQ(effect.missing, 0);
-    EXPECT_LE(effect.shifted, effect.inked / 50);
+    EXPECT_GT(effect.overBorder, 40) << "case " << &c - cases.data();
+    EXPECT_EQ(effect.missing, 0) << "case " << &c - cases.data();
   }
 }
 
 // Kept: the rectangles are promised, so what is too wide for them is cut at the borders of tiles.
 TEST(TileBorders, CutWhatHangsOutOfTheRectangles) {
-  std::vector<Case> cases{
+  std::vector<Case> cases = {
       {Kind::Prediction, 8, 6.571f, true, 4.0f},                                // upright
       {Kind::Prediction, 8, 11.499f, true, 4.0f},                               // the same pen laid down
       {Kind::Live, 8, 40.0f, true, 1.0f, false, true}, {Kind::Live, 8, 18.0f},  // its closing segment
-      {Kind::Live, 8, 18.0f, true, 1.0f, true},        {Kind::Redraw, 8, 40.0f},
-  };
-  for (const Qelt::RenderingVersion& row : Qelt::kRenderingVersions) {
-    if (row.outlineVersion == row.number) cases.push_back({Kind::Outline, row.number, 2.6f, true, 4.0f});
-  }
-  for (const Case& c : cases) {
-    SCOPED_TRACE(testing::PrintToString(c));
-    const Effect effect = effectOf(c);
-    EXPECT_GT(effect.missing, 10);
-    EXPECT_EQ(effect.unexplained, 0);
-  }
+      {Kind::Live, 8, 18.0f, true, 1.0f, true},        {Kind::Redraw, 8, 40.0f}};
+  for (const int version : outlineVersions()) cases.push_back({Kind::Outline, version, 2.6f, true, 4.0f});
+  for (const Case& c : cases) EXPECT_GT(effectOf(c).missing, 10) << "case " << &c - cases.data();
 }
 
 }  // namespace

@@ -47,23 +47,18 @@ TEST(Preview, RampsMayOvershootAndTheNextSegmentBeginsFromTheirTargets) {
   EXPECT_NEAR(board.takeStamps()[0].halfWidth, (17.4561f + 1.0f) / 2.0f, 1e-3f);
 }
 
-// Pressures 0.8 and 0.1: 0.64 * 2 and, raised to 0.16, 0.16 * 2.
+// Pressures 0.8 and 0.1: 0.64 * 2 and, raised to 0.16, 0.16 * 2. Live strokes are given up half way.
 TEST(Preview, NothingFadesInAndNothingIsLeftOfTheStrokeBefore) {
   Panel board(panel(10.0f));
-  const auto expectAlpha = [&board](float alpha) {
-    const std::vector<Stamp> placed = board.takeStamps();
-    EXPECT_FALSE(placed.empty());
-    for (const Stamp& stamp : placed) EXPECT_NEAR(stamp.alpha, alpha, 1e-5f);
-  };
   for (const float pressure : {0.1f, 0.8f, 0.1f}) {
-    board.redraw(board.recorded({{0.3f, 0.0f, pressure}, {41.0f, 0.0f, pressure}}));
-    expectAlpha(pressure == 0.8f ? 1.28f : 0.32f);
-  }
-  // Live, after one that was given up half way.
-  for (const float pressure : {0.8f, 0.1f}) {
-    board.down({0.3f, 0.0f, pressure});
-    board.move({{41.0f, 0.0f, pressure}});
-    expectAlpha(pressure == 0.8f ? 1.28f : 0.32f);
+    const Sample from{0.3f, 0.0f, pressure}, to{41.0f, 0.0f, pressure};
+    for (const bool live : {false, true}) {
+      if (live) board.down(from);
+      live ? board.move({to}) : board.redraw(board.recorded({from, to}));
+      const std::vector<Stamp> placed = board.takeStamps();
+      EXPECT_FALSE(placed.empty());
+      for (const Stamp& stamp : placed) EXPECT_NEAR(stamp.alpha, pressure == 0.8f ? 1.28f : 0.32f, 1e-5f);
+    }
   }
 }
 
@@ -78,9 +73,11 @@ TEST(Preview, FingersTakeShortMovesEveryOtherTime) {
   ASSERT_THAT(placed, SizeIs(24));            // from 0 to 30
   EXPECT_NEAR(placed[0].alpha, 0.5f, 1e-5f);  // pressure 0.5 whatever is reported
   board.move({{31.9f, 0.0f}});                // below size / 5
-  board.move({{40.0f, 0.0f}});                // left out
-  board.move({{85.0f, 0.0f}});                // 55 away: always taken
-  EXPECT_THAT(board.takeStamps(), SizeIs(44));
+  board.move({{79.8f, 0.0f}});                // left out
+  board.move({{80.2f, 0.0f}});                // more than 50 away: always taken
+  EXPECT_THAT(board.takeStamps(), SizeIs(40));
+  board.move({{130.4f, 0.0f}});
+  EXPECT_THAT(board.takeStamps(), SizeIs(40));
 }
 
 TEST(Preview, AStylusOnATouchScreenHasItsPressureReplacedInTheEvent) {
@@ -128,12 +125,6 @@ TEST(Preview, WithoutASizeCurvesLogAndNothingIsPlaced) {
   EXPECT_TRUE(board.redraw(board.recorded({{50.0f, 60.0f}, {90.0f, 60.0f}})));
   EXPECT_EQ(board.rect.left, 49.0f);
   EXPECT_EQ(board.rect.top, 59.0f);
-  // Straight segments do not ask for a spacing.
-  board.shared.mCurveEnabled = false;
-  board.down({0.0f, 0.0f});
-  board.move({{40.0f, 0.0f}});
-  EXPECT_TRUE(board.up({80.0f, 0.0f}));
-  EXPECT_THAT(board.takeStamps(), IsEmpty());
 }
 
 }  // namespace

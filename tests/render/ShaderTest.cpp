@@ -19,55 +19,41 @@ MATCHER_P2(LogOf, priority, text, "") {
   return arg.priority == priority && arg.tag == "qel_log" && arg.text == text;
 }
 
-struct Alive {
-  Alive() { ++count; }
-  ~Alive() { --count; }
+struct Shader {
+  Shader() { ++alive; }
+  ~Shader() { --alive; }
   bool isLinked() const { return true; }
   void link() {}
-  static inline int count = 0;
+  static inline int alive = 0;
 };
-struct OneShader : Alive {};
-struct OtherShader : Alive {};
-ShaderManager& registry() {
-  return *ShaderManager::GetInstance();
-}
+struct OtherShader : Shader {};
 
 TEST(ShaderRegistryTest, SharesOneShaderAClassAndDestroysItWithItsLastUser) {
   LogCapture log;
-  OneShader* const first = registry().GetShader<OneShader>();
-  EXPECT_THAT(log.take(), ElementsAre(LogOf(3, std::string("ShaderManager::GetShader, New ") +
-                                                   typeid(OneShader).name() + " is added")));
-  EXPECT_EQ(registry().GetShader<OneShader>(), first);
-  OtherShader* const other = registry().GetShader<OtherShader>();
-  EXPECT_EQ(Alive::count, 2);
-  EXPECT_THAT(log.take(), SizeIs(1));  // of the other one
-
-  registry().ReleaseShader(first);
-  EXPECT_EQ(Alive::count, 2);
-  registry().ReleaseShader(first);
-  EXPECT_EQ(Alive::count, 1);
-  registry().ReleaseShader(other);
-  EXPECT_EQ(Alive::count, 0);
+  ShaderManager& registry = *ShaderManager::GetInstance();
+  const std::string name = typeid(Shader).name();
+  const std::string complaint = "ReleaseShader. Shader (" + name + ") not in shader manager ";
+  Shader stranger;
+  registry.ReleaseShader<Shader>(nullptr);
   EXPECT_THAT(log.take(), IsEmpty());
-}
-
-TEST(ShaderRegistryTest, ReportsMisuseAndLeavesTheRegisteredOneAlone) {
-  LogCapture log;
-  OneShader stranger;
-  registry().ReleaseShader<OneShader>(nullptr);
-  EXPECT_THAT(log.take(), IsEmpty());
-  const std::string complaint =
-      std::string("ReleaseShader. Shader (") + typeid(OneShader).name() + ") not in shader manager ";
-  registry().ReleaseShader(&stranger);
+  registry.ReleaseShader(&stranger);
   EXPECT_THAT(log.take(), ElementsAre(LogOf(6, complaint + "(not found).")));
 
-  OneShader* const registered = registry().GetShader<OneShader>();
-  log.take();
-  registry().ReleaseShader(&stranger);
+  Shader* const first = registry.GetShader<Shader>();
+  EXPECT_THAT(log.take(), ElementsAre(LogOf(3, "ShaderManager::GetShader, New " + name + " is added")));
+  EXPECT_EQ(registry.GetShader<Shader>(), first);
+  OtherShader* const other = registry.GetShader<OtherShader>();
+  EXPECT_THAT(log.take(), SizeIs(1));  // of the other one
+  registry.ReleaseShader(&stranger);
   EXPECT_THAT(log.take(), ElementsAre(LogOf(6, complaint + "(pointer mismatch).")));
-  EXPECT_EQ(Alive::count, 2);
-  registry().ReleaseShader(registered);
-  EXPECT_EQ(Alive::count, 1);
+
+  registry.ReleaseShader(first);
+  EXPECT_EQ(Shader::alive, 3);
+  registry.ReleaseShader(first);
+  EXPECT_EQ(Shader::alive, 2);
+  registry.ReleaseShader(other);
+  EXPECT_EQ(Shader::alive, 1);
+  EXPECT_THAT(log.take(), IsEmpty());
 }
 
 }  // namespace

@@ -23,9 +23,6 @@
 namespace QeltDesktop {
 namespace {
 
-using testing::ElementsAre;
-using testing::Pair;
-
 Page read(const std::string& text) {
   return readInkml(SourceText("page.inkml", text));
 }
@@ -38,17 +35,10 @@ std::vector<Sample> samplesOf(const std::string& channels, const std::string& tr
   return {samples.begin(), samples.end()};
 }
 
-constexpr const char* kXY = R"(<channel name="X"/><channel name="Y"/>)";
+const std::string kXY = R"(<channel name="X"/><channel name="Y"/>)";
 
 std::vector<double> valuesOf(const Sample& s) {
   return {s.x, s.y, s.pressure, s.tilt, s.orientation, s.time};
-}
-
-// The points alone.
-std::vector<std::pair<float, float>> pointsOf(const std::vector<Sample>& samples) {
-  std::vector<std::pair<float, float>> points;
-  for (const Sample& sample : samples) points.emplace_back(sample.x, sample.y);
-  return points;
 }
 
 std::string refusalOf(const std::string& text) {
@@ -81,28 +71,32 @@ TEST(InkmlReader, TakesChannelsInAnyOrderAndLeavesOthersOut) {
   EXPECT_EQ(valuesOf(samples[1]), (std::vector<double>{11, 21, 341.0f / 1023.0f, 0, 0, 750}));
 }
 
-// The recommendation's own example of differences, with its intermittent switches at the end.
-TEST(InkmlReader, AddsUpDifferencesWrittenWithoutSpaces) {
-  const auto samples = samplesOf(
-      std::string(kXY) +
-          R"(<intermittentChannels><channel name="S1" type="boolean"/><channel name="S2" type="boolean"/>
-             </intermittentChannels>)",
-      "1125 18432,'23'43,\"7\"-8,3-5,7 -3,6 2,6 8,3 6 T,2 4*T,3 6,3-6 F F");
-  EXPECT_THAT(pointsOf(samples),
-              ElementsAre(Pair(1125, 18432), Pair(1148, 18475), Pair(1178, 18510), Pair(1211, 18540),
-                          Pair(1251, 18567), Pair(1297, 18596), Pair(1349, 18633), Pair(1404, 18676),
-                          Pair(1461, 18723), Pair(1521, 18776), Pair(1584, 18823)));
-}
-
-TEST(InkmlReader, KeepsAPrefixForItsChannelUntilTheNextOne) {
-  EXPECT_THAT(pointsOf(samplesOf(kXY, "10 0, '2 *, * '1, !100 \"1, * *")),
-              ElementsAre(Pair(10, 0), Pair(12, 0), Pair(14, 1), Pair(100, 3), Pair(100, 6)));
+TEST(InkmlReader, ReadsPointsHoweverTheyAreWritten) {
+  const struct {
+    std::string channels, trace;
+    std::vector<float> places;  // x, y, x, ...
+  } cases[] = {
+      // The recommendation's own example of differences, with its intermittent switches at the end.
+      {kXY +
+           R"(<intermittentChannels><channel name="S1" type="boolean"/><channel name="S2" type="boolean"/>
+              </intermittentChannels>)",
+       "1125 18432,'23'43,\"7\"-8,3-5,7 -3,6 2,6 8,3 6 T,2 4*T,3 6,3-6 F F",
+       {1125,  18432, 1148,  18475, 1178,  18510, 1211,  18540, 1251,  18567, 1297,
+        18596, 1349,  18633, 1404,  18676, 1461,  18723, 1521,  18776, 1584,  18823}},
+      // A prefix is its channel's until the next one.
+      {kXY, "10 0, '2 *, * '1, !100 \"1, * *", {10, 0, 12, 0, 14, 1, 100, 3, 100, 6}},
+      {kXY, "1 <!-- , 5 -->2,<![CDATA[ 3 4 ]]>, &apos;1&#39;2", {1, 2, 3, 4, 4, 6}}};
+  for (const auto& [channels, trace, places] : cases) {
+    std::vector<float> read;
+    for (const Sample& sample : samplesOf(channels, trace)) read.insert(read.end(), {sample.x, sample.y});
+    EXPECT_EQ(read, places) << trace;
+  }
 }
 
 TEST(InkmlReader, KeepsTheLastReadingWhereOneIsNotReported) {
-  const float pressures[] = {1.0f, 0.5f, 0.5f};
-  const auto samples = samplesOf(kXY + std::string(R"(<channel name="F"/>)"), "1 1 ?, 2 2 0.5, 3 3 ?");
-  for (std::size_t i = 0; i < 3; ++i) EXPECT_EQ(samples[i].pressure, pressures[i]);
+  const auto samples = samplesOf(kXY + R"(<channel name="F"/>)", "1 1 ?, 2 2 0.5, 3 3 ?");
+  EXPECT_EQ(samples.at(0).pressure, 1.0f);
+  EXPECT_EQ(samples.at(2).pressure, 0.5f);
 }
 
 TEST(InkmlReader, TurnsAnglesIntoTiltAndOrientation) {
@@ -116,12 +110,10 @@ TEST(InkmlReader, TurnsAnglesIntoTiltAndOrientation) {
                {spherical, "90 270", 0.0f, -kPi / 2},
                // Half a turn is plus pi, whichever way it was written.
                {spherical, "0 -180", kPi / 2, kPi},
-               {spherical, "30 540", kPi / 3, kPi},
                {R"(<channel name="OE" units="rad"/>)", "1", kPi / 2 - 1.0f, 0.0f},
                {R"(<channel name="OA" units="rad"/>)", "1", 0.0f, 1.0f},
                {axes, "45 0", kPi / 4, kPi / 2},  // towards +x: a quarter clockwise from up
                {axes, "0 -30", kPi / 6, 0.0f},    // towards -y: up
-               {axes, "0 30", kPi / 6, kPi},
                {axes, "45 -45", std::atan(std::sqrt(2.0f)), kPi / 4},
                // Where elevation is recorded the axes do not count.
                {axes + R"(<channel name="OE"/>)", "45 0 90", 0.0f, 0.0f}};
@@ -183,11 +175,6 @@ TEST(InkmlReader, NamesTheToolOfATraceOrItsGroup) {
   for (std::size_t i = 0; i < 4; ++i) EXPECT_EQ(page.strokes[i].tool, tools[i]) << i;
 }
 
-TEST(InkmlReader, ReadsTextAroundCommentsCharacterDataAndEntities) {
-  EXPECT_THAT(pointsOf(samplesOf(kXY, "1 <!-- , 5 -->2,<![CDATA[ 3 4 ]]>, &apos;1&#39;2")),
-              ElementsAre(Pair(1, 2), Pair(3, 4), Pair(4, 6)));
-}
-
 TEST(InkmlReader, ReadsFilesOfUtf16AndRefusesWhatIsNoFile) {
   std::string bytes("\xFF\xFE", 2);
   for (const char c : std::string("<ink>\n<trace>1 2</trace></ink>")) bytes += {c, '\0'};
@@ -213,8 +200,8 @@ std::string format(const std::string& channels, const std::string& points = "0 0
   return "<ink><traceFormat>\n" + channels + "</traceFormat><trace>" + points + "</trace></ink>";
 }
 
-std::string xyAnd(const std::string& channel) {
-  return std::string(kXY) + "\n" + channel;
+std::string formatAnd(const std::string& channel) {
+  return format(kXY + "\n" + channel);
 }
 
 std::string brush(const std::string& property) {
@@ -226,7 +213,6 @@ TEST(InkmlReader, RefusesWhatIsMalformedWithFileLineAndValue) {
     std::string text;
     std::string refusal;  // after "page.inkml:", to its beginning
   } pages[] = {
-      {"hello", "1: not XML"},
       {"", "1: not XML"},
       {"<ink>\n<trace>1 2</trac></ink>", "2: not XML"},
       {std::string("<ink>\n\0</ink>", 13), "2: not XML"},
@@ -235,10 +221,7 @@ TEST(InkmlReader, RefusesWhatIsMalformedWithFileLineAndValue) {
       {"<ink>\n</ink>", "1: no trace in the page"},
       {trace(" \n "), "2: trace without points"},
       {trace("1 2,\r\n3 x7, 5 6"), "3: not a number: x7"},
-      {trace("1.2.3 4"), "2: not a number: 1.2.3"},
       {trace("1 -"), "2: not a number: -"},
-      {trace("1 2e"), "2: not a number: 2e"},
-      {trace("1px 2"), "2: not a number: 1px"},
       {trace("1 NaN"), "2: not a number: NaN"},
       {trace("1 -inf"), "2: not a number: -inf"},
       {trace("1 2,\n3 1e39"), "3: number out of range: 1e39"},
@@ -257,13 +240,11 @@ TEST(InkmlReader, RefusesWhatIsMalformedWithFileLineAndValue) {
       {trace("1 2<br/>"), "2: element that a trace cannot hold: br"},
       {format(R"(<channel name="X"/>)"), "1: traceFormat without channel: Y"},
       {format(R"(<channel name="Y"/>)"), "1: traceFormat without channel: X"},
-      {format(xyAnd("<channel/>")), "3: channel without a name"},
-      {format(xyAnd(R"(<channel name="X"/>)")), "3: channel named twice: X"},
-      {format(xyAnd(R"(<channel name="F" max="0"/>)")), "3: max of channel F must be a number above 0: 0"},
-      {format(xyAnd(R"(<channel name="F" max="inf"/>)")),
-       "3: max of channel F must be a number above 0: inf"},
-      {format(xyAnd(R"(<channel name="OE" units="grad"/>)")), "3: unknown unit of channel OE: grad"},
-      {format(xyAnd(R"(<channel name="T" units="h"/>)")), "3: unknown unit of channel T: h"},
+      {formatAnd("<channel/>"), "3: channel without a name"},
+      {formatAnd(R"(<channel name="X"/>)"), "3: channel named twice: X"},
+      {formatAnd(R"(<channel name="F" max="0"/>)"), "3: max of channel F must be a number above 0: 0"},
+      {formatAnd(R"(<channel name="F" max="inf"/>)"), "3: max of channel F must be a number above 0: inf"},
+      {formatAnd(R"(<channel name="OE" units="grad"/>)"), "3: unknown unit of channel OE: grad"},
       {format(R"(<channel name="X" type="boolean"/><channel name="Y"/>)", "T 0"),
        "2: channel X cannot be: boolean"},
       {"<ink>" + times(200'000, "<traceGroup>") + times(200'000, "</traceGroup>") + "</ink>",
@@ -271,17 +252,11 @@ TEST(InkmlReader, RefusesWhatIsMalformedWithFileLineAndValue) {
       {"<ink>\n<trace brushRef='#none'>0 0</trace></ink>", "2: unknown brushRef: #none"},
       {"<ink>\n<trace contextRef='#none'>0 0</trace></ink>", "2: unknown contextRef: #none"},
       {"<ink><brush xml:id='b'/>\n<trace contextRef='#b'>0 0</trace></ink>", "2: unknown contextRef: #b"},
-      {"<ink><context xml:id='a' contextRef='#b'/><context xml:id='b' contextRef='#a'/><trace>0 "
-       "0</trace></ink>",
-       "1: contextRef leads back to itself"},
-      {"<ink><brush xml:id='a' brushRef='#a'/><trace>0 0</trace></ink>", "1: brushRef leads back to itself"},
-      {"<ink><brush xml:id='a'/>\n<brush xml:id='a'/><trace>0 0</trace></ink>", "2: id given twice: a"},
       {"<ink><brush xml:id='a'/><brush xml:id='b'/>\n<brush xml:id='b'/>\n<brush xml:id='a'/>\n"
        "<traceFormat/></ink>",
        "2: id given twice: b"},
       {"<ink><brush xml:id='a'/>\n<traceFormat/>\n<brush xml:id='a'/></ink>", "2: traceFormat"},
       {"<ink><brush xml:id='a'/>\n<brush xml:id='a'/>\n</ink", "3: not XML"},
-      {brush("<brushProperty name='width' value='wide'/>"), "3: brush width must be a number above 0: wide"},
       {brush("<brushProperty name='width' value='-2'/>"), "3: brush width must be a number above 0: -2"},
       {brush("<brushProperty name='color' value='red'/>"), "3: brush color must be #RRGGBB: red"},
       {brush("<brushProperty name='transparency' value='256'/>"),
@@ -329,10 +304,10 @@ TEST(InkmlReader, TakesNoLongerForATraceOfALargePage) {
       lastWidth(chain("context", "contextRef", kMany, "c") + "<context xml:id='c'>" + end + "</context>",
                 inContext),
       7.0f);
-  EXPECT_EQ(refusalOf("<ink>" + chain("brush", "brushRef", kMany, "x0") + ofBrush + "</ink>"),
-            "page.inkml:1: brushRef leads back to itself");
-  EXPECT_EQ(refusalOf("<ink>" + chain("context", "contextRef", kMany, "x0") + inContext + "</ink>"),
-            "page.inkml:1: contextRef leads back to itself");
+  for (const auto& [element, trace] :
+       {std::pair<std::string, std::string>("brush", ofBrush), {"context", inContext}})
+    EXPECT_EQ(refusalOf("<ink>" + chain(element, element + "Ref", kMany, "x0") + trace + "</ink>"),
+              "page.inkml:1: " + element + "Ref leads back to itself");
   EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(15));
 }
 
@@ -370,26 +345,24 @@ TEST(InkmlReader, HoldsNoMoreThanThreeTimesItsFile) {
   if (QELT_SANITIZED) GTEST_SKIP() << "the sanitizers have a memory of their own";
   // Larger than what the allocator keeps ready.
   const std::string ink = times(2'000'000, "123.5 456,") + "7 8";
-  const auto chained = [](const std::string& element, const std::string& reference) {
-    return "<ink>" + chain(element, reference, 200'000, "end") + "<" + element + " xml:id='end'/><trace " +
-           reference + "='#x0'>1 2</trace></ink>";
-  };
-  const std::pair<const char*, std::string> pages[] = {
+  std::vector<std::pair<std::string, std::string>> pages{
       {"a long trace", "<ink><trace>" + ink + "</trace></ink>"},
       {"a long trace in pieces", "<ink><trace><!-- -->" + ink + "<!-- --> </trace></ink>"},
       {"traces of 20 points",
        "<ink>" + times(100'000, "<trace>" + ink.substr(0, 200) + "7 8</trace>\n") + "</ink>"},
-      {"traces of 2 points", "<ink>" + times(300'000, "<trace>1.5 2,3.5 4</trace>\n") + "</ink>"},
       {"traces of 1 point", "<ink>" + times(500'000, "<trace>1 2</trace>") + "</ink>"},
       {"tools that are not drawn",
        "<ink><definitions>" +
            times(50'000, "<traceGroup><annotation type='tool'>x</annotation></traceGroup>") +
-           "</definitions><trace>1 2</trace></ink>"},
-      {"plain brushes", "<ink>" + times(1'000'000, "<brush/>") + "<trace>1 2</trace></ink>"},
-      {"plain contexts", "<ink>" + times(1'000'000, "<context/>") + "<trace>1 2</trace></ink>"},
-      {"brushes built on one another", chained("brush", "brushRef")},
-      {"contexts built on one another", chained("context", "contextRef")},
-  };
+           "</definitions><trace>1 2</trace></ink>"}};
+  for (const std::string element : {"brush", "context"}) {
+    const std::string reference = element + "Ref";
+    pages.emplace_back("plain " + element,
+                       "<ink>" + times(1'000'000, "<" + element + "/>") + "<trace>1 2</trace></ink>");
+    pages.emplace_back(element + " built on one another",
+                       "<ink>" + chain(element, reference, 200'000, "end") + "<" + element +
+                           " xml:id='end'/><trace " + reference + "='#x0'>1 2</trace></ink>");
+  }
   for (const auto& [name, text] : pages) {
     const double growth = growthOf(text);
     EXPECT_GE(growth, 1.0) << name;

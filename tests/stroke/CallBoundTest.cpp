@@ -65,10 +65,14 @@ TEST(CallBound, HoldsForEveryKindOfDrawable) {
     // between the mid points of the last three points.
     EXPECT_EQ(board.shared.mStampCount, kPoints * 262144);
     EXPECT_NEAR(board.shared.mLastStampY, 19.0f, 0.5f);
-    // The next call may place as many again.
-    const std::uint64_t before = QeltDesktop::writtenBytes();
-    board.move({{40.0f, 20.0f}});
-    EXPECT_EQ(QeltDesktop::writtenBytes() - before, 262144u * 6 * 11 * sizeof(float));
+    // The next call may place as many again: one long segment, and then 40 units, a stamp every 0.4.
+    const auto stampsOfMove = [&board](const Sample& to) {
+      const std::uint64_t before = QeltDesktop::writtenBytes();
+      board.move({to});
+      return static_cast<double>(QeltDesktop::writtenBytes() - before) / (6 * 11 * sizeof(float));
+    };
+    EXPECT_EQ(stampsOfMove({40.0f, 20.0f}), 262144.0);
+    EXPECT_NEAR(stampsOfMove({80.0f, 20.0f}), 100.0, 1.0);
   }
   {
     OutlineBoard board({.version = 4, .size = 6.0f});

@@ -7,11 +7,9 @@
 #include <cstdint>
 #include <limits>
 #include <random>
-#include <utility>
 #include <vector>
 
 #include "base/RectF.h"
-#include "stroke/input/MoveFilter.h"
 #include "stroke/input/PenAttitude.h"
 #include "stroke/placing/StampRun.h"
 
@@ -19,31 +17,6 @@ namespace Qelt {
 namespace {
 
 using testing::ElementsAre;
-
-// --- Input ---
-
-constexpr PointF kOrigin{0.0f, 0.0f};
-
-MoveFilter filter(float minimumMove, float skipDistance) {
-  MoveFilter moves;
-  moves.setMinimumMove(minimumMove);
-  moves.restart(skipDistance);
-  return moves;
-}
-
-// Each move from the origin along x, and whether it is taken.
-TEST(MoveFilterTest, TakesShortMovesEveryOtherTimeBeginningWithTheSecond) {
-  MoveFilter moves = filter(2.0f, 20.0f);
-  const std::pair<float, bool> cases[] = {{5.0f, false},  {5.0f, true},
-                                          {19.9f, false}, {1.0f, false},  // below the minimum nothing toggles
-                                          {5.0f, true},   {5.0f, false},  // the next short one would be taken
-                                          {20.0f, true},  {5.0f, false}};  // a long one begins anew
-  for (const auto& [x, taken] : cases) EXPECT_EQ(moves.accepts(kOrigin, {x, 0.0f}), taken) << x;
-  moves.restart(20.0f);  // as each stroke does
-  EXPECT_FALSE(moves.accepts(kOrigin, {5.0f, 0.0f}));
-}
-
-// --- Attitude ---
 
 // Against the mean as one would write it down: all slots from 0 upwards, in single precision.
 template <int Size>

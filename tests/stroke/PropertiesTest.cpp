@@ -60,19 +60,6 @@ std::vector<float> redrawn(DrawingBoard& board, const Input& input) {
   return board.takeFloats();
 }
 
-// How many stamps the two have in common from the first on.
-std::size_t commonStamps(const std::vector<float>& a, const std::vector<float>& b, int stride) {
-  std::size_t i = 0;
-  while (i < a.size() && i < b.size() && a[i] == b[i]) ++i;
-  return i / (6 * static_cast<std::size_t>(stride));
-}
-
-// Sets the alpha of every vertex to 0.
-std::vector<float> withoutAlpha(std::vector<float> floats, int stride) {
-  for (std::size_t i = 4; i < floats.size(); i += static_cast<std::size_t>(stride)) floats[i] = 0.0f;
-  return floats;
-}
-
 struct Hand {
   int tool, source;
   const char* name;
@@ -92,84 +79,54 @@ class StrokesByLot : public testing::TestWithParam<std::tuple<int, bool, Hand>> 
   }
 };
 
-TEST_P(StrokesByLot, DoNotDependOnHowTheirSamplesAreSplitIntoEvents) {
-  DrawingBoard board(options());
-  for (unsigned seed = 1; seed <= kStrokes; ++seed) {
-    const std::vector<Sample> samples = strokeByLot(seed);
-    const std::vector<float> oneByOne = drawnLive(board, samples, 1);
-    for (const int batch : {2, 3, 7, 1000}) {
-      EXPECT_EQ(drawnLive(board, samples, batch), oneByOne) << batch << " samples a move, seed " << seed;
-    }
-  }
-}
-
 // Live, recorded and stored, one stroke is fed the same way to the same code: the first sample begins it, the
 // others are drawn to, and the last one, once more, ends it. (A live up event repeats the last point, a
 // recorded event's current sample does, and a stored stroke's last point counts twice by design.) So every
-// stamp is the same, with one exception.
-//
-// The exception: an up event forgets the alpha of the last segment, so that the closing segment has the end
-// pressure's alpha throughout; a replay keeps it, and ramps. Where the last sample was drawn to, the two are
-// the same; where it was dropped (too near, or skipped), or the stroke is closed with other than its own
-// pressure, the closing segment's alphas differ, and nothing else does.
+// stamp is the same, with one exception: an up event forgets the alpha of the last segment, so that the
+// closing segment has the end pressure's alpha throughout; a replay keeps it, and ramps.
 TEST_P(StrokesByLot, AreTheSameLiveRecordedAndStored) {
-  const int stride = strideOf(options().version);
-  int unlike = 0;
+  const auto stride = static_cast<std::size_t>(strideOf(options().version));
+  DrawingBoard board(options());
   for (unsigned seed = 1; seed <= kStrokes; ++seed) {
     SCOPED_TRACE("seed " + std::to_string(seed));
     const std::vector<Sample> samples = strokeByLot(seed);
-    DrawingBoard board(options());
-    const std::vector<float> live = drawnLive(board, samples);
-    const std::vector<float> recorded = redrawn(board, board.recorded(samples));
-    const std::vector<float> stored = redrawn(board, *board.stored(samples));
-    EXPECT_EQ(recorded, stored);
-    EXPECT_EQ(withoutAlpha(live, stride), withoutAlpha(recorded, stride));
-
-    // All that comes before the closing segment has the same alphas too.
-    DrawingBoard withoutEnd(options());
-    withoutEnd.down(samples.front());
-    withoutEnd.move({samples.begin() + 1, samples.end()});
-    const std::size_t beforeTheEnd = withoutEnd.takeStamps().size();
-    EXPECT_GE(commonStamps(live, recorded, stride), beforeTheEnd);
-    if (live != recorded) ++unlike;
-  }
-  // Every finger presses alike.
-  if (options().tool != Qelt::kToolStylus) {
-    EXPECT_EQ(unlike, 0);
+    std::vector<float> live = drawnLive(board, samples);
+    std::vector<float> recorded = redrawn(board, board.recorded(samples));
+    EXPECT_EQ(recorded, redrawn(board, *board.stored(samples)));
+    ASSERT_EQ(live.size(), recorded.size());
+    // Every finger presses alike.
+    const bool looksAtAlpha = options().tool != Qelt::kToolStylus;
+    for (std::size_t i = 4; i < live.size() && !looksAtAlpha; i += stride) live[i] = recorded[i] = 0.0f;
+    EXPECT_EQ(live, recorded);
   }
 }
 
-TEST_P(StrokesByLot, AreDrawnAndRedrawnTheSameWhateverWasDrawnBefore) {
+TEST_P(StrokesByLot, DependNeitherOnTheirEventsNorOnWhatWasDrawnBefore) {
   for (unsigned seed = 1; seed <= kStrokes; ++seed) {
     SCOPED_TRACE("seed " + std::to_string(seed));
-    const std::vector<Sample> samples = strokeByLot(seed);
+    const std::vector<Sample> samples = strokeByLot(seed), other = strokeByLot(seed + 100);
     const auto onFresh = [&](auto draw) {
       DrawingBoard fresh(options());
       return draw(fresh);
     };
-    const auto live = [&](DrawingBoard& board) { return drawnLive(board, samples); };
-    const auto recorded = [&](DrawingBoard& board) { return redrawn(board, board.recorded(samples)); };
-    const auto stored = [&](DrawingBoard& board) { return redrawn(board, *board.stored(samples)); };
-    const std::vector<float> ofLive = onFresh(live), ofRecorded = onFresh(recorded),
-                             ofStored = onFresh(stored);
-
+    const auto live = onFresh([&](auto& fresh) { return drawnLive(fresh, samples, 1); });
+    const auto redraw = onFresh([&](auto& fresh) { return redrawn(fresh, fresh.recorded(samples)); });
     DrawingBoard used(options());
-    const std::vector<Sample> other = strokeByLot(seed + 100);
     used.stroke(other);
-    EXPECT_EQ(recorded(used), ofRecorded);
+    EXPECT_EQ(redrawn(used, used.recorded(samples)), redraw);
     // In the middle of a live stroke.
     used.down(other.front());
     used.move({other.begin() + 1, other.end()});
-    EXPECT_EQ(stored(used), ofStored);
+    EXPECT_EQ(redrawn(used, *used.stored(samples)), redraw);
     used.settings.size = 17.0f;
     used.shared.mCurveEnabled = !used.shared.mCurveEnabled;
     used.redraw(used.recorded(other));
     used.settings.size = 6.0f;
     used.shared.mCurveEnabled = !used.shared.mCurveEnabled;
-    EXPECT_EQ(recorded(used), ofRecorded);
-    used.redraw(*used.stored(other));
-    EXPECT_EQ(live(used), ofLive);
-    EXPECT_EQ(stored(used), ofStored);
+    for (const int batch : {2, 3, 7, 1000}) {
+      EXPECT_EQ(drawnLive(used, samples, batch), live) << batch << " samples a move";
+    }
+    EXPECT_EQ(redrawn(used, *used.stored(samples)), redraw);
   }
 }
 

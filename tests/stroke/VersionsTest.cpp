@@ -7,7 +7,6 @@
 
 #include "engine/MotionEvent.h"
 #include "stroke/StrokeVersions.h"
-#include "stroke/StrokeVersions.h"
 #include "support/DrawableBoard.h"
 #include "support/LogCapture.h"
 
@@ -191,7 +190,7 @@ INSTANTIATE_TEST_SUITE_P(Versions, EachVersion, testing::ValuesIn(kRows),
                          [](const auto& row) { return "Version" + std::to_string(row.param.version); });
 
 // The pressure that fingers, mice and a stylus on a touch screen are given shows in a tap's alpha: 0.5
-// squared is 0.25; 0.6 squared, times 15 / 10, over 6, is 0.09. A short move is left out.
+// squared is 0.25; 0.6 squared, times 15 / 10, over 6, is 0.09. A move below 50 units, or 20, is left out.
 TEST(TouchInputTest, HasTheVersionsOwnPressureAndThinsOutShortMoves) {
   for (const int version : allVersions()) {
     for (const int tool : {Qelt::kToolFinger, Qelt::kToolMouse, Qelt::kToolStylus}) {
@@ -201,10 +200,14 @@ TEST(TouchInputTest, HasTheVersionsOwnPressureAndThinsOutShortMoves) {
            .color = 0x50202020u,
            .tool = tool,
            .source = tool == Qelt::kToolMouse ? Qelt::kSourceMouse : Qelt::kSourceTouchScreen});
-      board.stroke({{10.0f, 10.0f, 0.9f}, {19.0f, 10.0f, 0.9f}});
+      const float taken = version == 8 ? 20.0f : 50.0f;
+      board.stroke({{10.0f, 10.0f, 0.9f}, {9.8f + taken, 10.0f, 0.9f}});
       const std::vector<Stamp> stamps = board.takeStamps();
       ASSERT_EQ(stamps.size(), 1u);
       EXPECT_FLOAT_EQ(stamps[0].alpha, version == 8 ? 0.09f : 0.25f);
+      board.down({10.0f, 10.0f});
+      board.move({{10.2f + taken, 10.0f}});
+      EXPECT_GT(board.takeStamps().size(), 1u);
     }
   }
 }

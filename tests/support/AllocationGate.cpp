@@ -3,13 +3,13 @@
 #include <link.h>
 #include <unwind.h>
 
+#include <algorithm>
 #include <atomic>
 #include <cstddef>
 #include <cstdint>
 #include <cstdlib>
 #include <cstring>
 #include <iterator>
-#include <mutex>
 #include <new>
 #include <stdexcept>
 #include <string_view>
@@ -23,9 +23,6 @@ struct Header {
   std::uint64_t mark;
   void* base;        // what malloc gave
   std::size_t size;  // of the block itself
-  Header* previous;  // of the living blocks of plug-in and host
-  Header* next;
-  long number;  // of their allocations
   Owner owner;
 };
 
@@ -44,16 +41,10 @@ constexpr const char* kHostNames[] = {"libQeltPlatform.so", "libQeltBase.so", "l
                                       "libQeltEngine.so",   "libQeltGL.so",   "libQeltGraphics.so",
                                       "libQeltPenCommon.so"};
 Code plugIn, standardLibrary, hosts[std::size(kHostNames)];
-std::atomic<long> blocks{0}, ownBlocks{0}, hostsBlocks{0}, ownAllocations{0}, watched{0},
-    deletionsOfNothing{0}, thrown{0};
+std::atomic<long> blocks{0}, ownBlocks{0}, hostsBlocks{0}, ownAllocations{0}, deletionsOfNothing{0},
+    thrown{0};
 std::atomic<long> askedSince{0}, failFrom{0}, failTo{0};  // failing: from <= number <= to
 std::atomic<bool> everyones{false};                       // are numbered, not the plug-in's alone
-thread_local long untilFailure = -1;                      // of this thread's; below 0: none is to fail
-
-// Guards the list of the living blocks of plug-in and host. Not a std::mutex's business to allocate, nor this
-// one's.
-std::mutex listLock;
-Header* living = nullptr;
 
 Owner ownerOf(std::uintptr_t caller) {
   if (plugIn.holds(caller)) return Owner::PlugIn;
@@ -93,8 +84,7 @@ bool isNumbered(Owner owner, std::uintptr_t caller) {
 void* allocate(std::size_t size, std::size_t alignment, const void* callerAddress) {
   const auto caller = reinterpret_cast<std::uintptr_t>(callerAddress);
   const Owner owner = ownerOf(caller);
-  if (untilFailure >= 0 && untilFailure-- == 0) return nullptr;
-  const long number = owner != Owner::Other ? watched.fetch_add(1) + 1 : 0;
+  if (QeltTests::FailingAllocation::isDue()) return nullptr;
   if (owner == Owner::PlugIn) ownAllocations.fetch_add(1);
   if (isNumbered(owner, caller)) {
     const long asked = askedSince.fetch_add(1) + 1;
@@ -108,16 +98,12 @@ void* allocate(std::size_t size, std::size_t alignment, const void* callerAddres
   const auto start = reinterpret_cast<std::uintptr_t>(base) + sizeof(Header);
   const std::uintptr_t block = (start + alignment - 1) / alignment * alignment;
   auto* const header = reinterpret_cast<Header*>(block) - 1;
-  *header = {kAlive, base, size, nullptr, nullptr, number, owner};
+  *header = {kAlive, base, size, owner};
   blocks.fetch_add(1, std::memory_order_relaxed);
   auto* const memory = reinterpret_cast<void*>(block);
   if (owner != Owner::Other) {
     if (owner == Owner::PlugIn) std::memset(memory, 0xCD, size);
     (owner == Owner::PlugIn ? ownBlocks : hostsBlocks).fetch_add(1);
-    const std::lock_guard hold(listLock);
-    header->next = living;
-    if (living != nullptr) living->previous = header;
-    living = header;
   }
   return memory;
 }
@@ -134,9 +120,6 @@ void release(void* memory) {
   if (header->owner != Owner::Other) {
     (header->owner == Owner::PlugIn ? ownBlocks : hostsBlocks).fetch_sub(1);
     if (header->owner == Owner::PlugIn) std::memset(memory, 0xDD, header->size);
-    const std::lock_guard hold(listLock);
-    (header->previous != nullptr ? header->previous->next : living) = header->next;
-    if (header->next != nullptr) header->next->previous = header->previous;
   }
   std::free(header->base);
 }
@@ -156,8 +139,8 @@ int note(dl_phdr_info* info, std::size_t, void* plugInPath) {
     const ElfW(Phdr)& segment = info->dlpi_phdr[i];
     if (segment.p_type != PT_LOAD) continue;
     const std::uintptr_t at = info->dlpi_addr + segment.p_vaddr;
-    begin = at < begin ? at : begin;
-    end = at + segment.p_memsz > end ? at + segment.p_memsz : end;
+    begin = std::min(begin, at);
+    end = std::max<std::uintptr_t>(end, at + segment.p_memsz);
   }
   code->begin = begin;
   code->end = end;
@@ -187,48 +170,8 @@ long AllocationGate::open() {
   return askedSince;
 }
 
-long AllocationGate::plugInBlocks() {
-  return ownBlocks;
-}
-
-long AllocationGate::hostBlocks() {
-  return hostsBlocks;
-}
-
-long AllocationGate::allBlocks() {
-  return blocks;
-}
-
-long AllocationGate::plugInAllocations() {
-  return ownAllocations;
-}
-
-long AllocationGate::thrownFailures() {
-  return thrown;
-}
-
-long AllocationGate::badDeletions() {
-  return deletionsOfNothing;
-}
-
-long AllocationGate::numberOf(const void* address) {
-  const std::lock_guard hold(listLock);
-  for (const Header* header = living; header != nullptr; header = header->next) {
-    if (header + 1 == address && header->owner == Owner::PlugIn) return header->number;
-  }
-  return 0;
-}
-
-FailingAllocation::FailingAllocation(long number) {
-  untilFailure = number;
-}
-
-FailingAllocation::~FailingAllocation() {
-  untilFailure = -1;
-}
-
-bool FailingAllocation::hasFailed() const {
-  return untilFailure < 0;
+AllocationGate::Counts AllocationGate::counts() {
+  return {ownBlocks, hostsBlocks, blocks, ownAllocations, thrown, deletionsOfNothing};
 }
 
 }  // namespace QeltTests

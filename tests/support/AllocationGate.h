@@ -36,32 +36,33 @@ class AllocationGate {
   // Nothing fails from here on. Answers how many of these allocations were asked for since `fail`.
   static long open();
 
-  // Blocks that are alive: the plug-in's, those that the host's own code asked for, and those of the whole
-  // process.
-  static long plugInBlocks();
-  static long hostBlocks();
-  static long allBlocks();
-  // The plug-in's allocations so far, failed ones included.
-  static long plugInAllocations();
-  // How many allocations failed so far that told it by an exception.
-  static long thrownFailures();
-  // How many deletions were of something that was not alive.
-  static long badDeletions();
-  // Which of the plug-in's allocations gave the block that begins here; 0 when none did.
-  static long numberOf(const void* address);
+  struct Counts {
+    // Blocks that are alive: the plug-in's, those that the host's own code asked for, and those of the whole
+    // process.
+    long plugInBlocks, hostBlocks, allBlocks;
+    long plugInAllocations;  // so far, failed ones included
+    long thrownFailures;     // how many allocations failed so far that told it by an exception
+    long badDeletions;       // how many deletions were of something that was not alive
+  };
+  static Counts counts();
 };
 
 // While one lives, the `number`th allocation from 0 that this thread asks of `new`, whoever's code it is,
 // fails, once.
 class FailingAllocation {
  public:
-  explicit FailingAllocation(long number);
-  ~FailingAllocation();
+  explicit FailingAllocation(long number) { sUntilFailure = number; }
+  ~FailingAllocation() { sUntilFailure = -1; }
   FailingAllocation(const FailingAllocation&) = delete;
   FailingAllocation& operator=(const FailingAllocation&) = delete;
 
   // Whether there was such an allocation.
-  bool hasFailed() const;
+  bool hasFailed() const { return sUntilFailure < 0; }
+  // Asked at each allocation.
+  static bool isDue() { return sUntilFailure >= 0 && sUntilFailure-- == 0; }
+
+ private:
+  static inline thread_local long sUntilFailure = -1;  // below 0: none is to fail
 };
 
 }  // namespace QeltTests

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <algorithm>
 #include <cmath>
 #include <cstddef>
 #include <string_view>
@@ -12,14 +13,23 @@
 
 namespace QeltTests {
 
-// Whether a buffer is of whole stamps with so many floats a vertex: two triangles each, told by the texture
-// coordinates of their corners.
+// Whether a buffer is of whole stamps with so many floats a vertex: two triangles each, which are one
+// rectangle with one set of values.
 inline bool isOfStamps(const std::vector<float>& buffer, std::size_t stride) {
-  static constexpr float kCorners[6][2] = {{0, 1}, {0, 0}, {1, 1}, {1, 1}, {0, 0}, {1, 0}};
+  // Vertex by vertex: 0 the left or top edge, 1 the right or bottom one.
+  static constexpr int kRight[6] = {0, 0, 1, 1, 0, 1};
+  static constexpr int kBottom[6] = {0, 1, 0, 0, 1, 1};
   if (buffer.size() % (6 * stride) != 0) return false;
-  for (std::size_t vertex = 0; vertex * stride < buffer.size(); ++vertex) {
-    const float* const at = &buffer[vertex * stride];
-    if (at[2] != kCorners[vertex % 6][0] || at[3] != kCorners[vertex % 6][1]) return false;
+  for (std::size_t number = 0; number * stride < buffer.size(); ++number) {
+    const int right = kRight[number % 6], bottom = kBottom[number % 6];
+    const float* const first = &buffer[(number - number % 6) * stride];
+    const float* const last = first + 5 * stride;
+    const float* const vertex = &buffer[number * stride];
+    if (vertex[0] != (right != 0 ? last : first)[0] || vertex[1] != (bottom != 0 ? last : first)[1] ||
+        vertex[2] != static_cast<float>(right) || vertex[3] != static_cast<float>(1 - bottom) ||
+        !std::equal(vertex + 4, vertex + stride, first + 4)) {
+      return false;
+    }
   }
   return true;
 }

@@ -18,15 +18,6 @@ using QeltDesktop::Batch;
 using QeltDesktop::RenderQueue;
 using QeltDesktop::StoredStroke;
 
-namespace {
-
-// A board that draws nothing has no layer, which spares the tests of batches the render messages' walk.
-Target targetOf(const BoardOptions& wanted) {
-  return wanted.width > 0 ? Target::Whole : Target::NoLayer;
-}
-
-}  // namespace
-
 Board::Board(const BoardOptions& wanted)
     : options(wanted),
       mOwnQueue(
@@ -37,7 +28,7 @@ Board::Board(const BoardOptions& wanted)
                                  : nullptr),
       queue(*mOwnQueue),
       layer(mOwnLayer.get()),
-      canvas(&queue, layer, targetOf(wanted)),
+      canvas(&queue, layer, wanted.width > 0 ? Target::Whole : Target::NoLayer),
       data(&queue) {}
 
 Board::Board(const BoardOptions& wanted, RenderQueue& itsQueue, QeltDesktop::CanvasLayer* itsLayer)
@@ -148,16 +139,10 @@ std::string taskName(const Qelt::ITask& task) {
   const char* const mangled = typeid(task).name();
   const std::unique_ptr<char, void (*)(void*)> demangled(
       abi::__cxa_demangle(mangled, nullptr, nullptr, &status), std::free);
-  // Each C++ library keeps its templates in an inline namespace of its own.
-  std::string type = status == 0 ? demangled.get() : mangled;
-  for (std::size_t at = 0; (at = type.find("std::__", at)) != std::string::npos; at += 5) {
-    if (const std::size_t end = type.find("::", at + 5); end != std::string::npos) {
-      type.erase(at + 5, end + 2 - (at + 5));
-    }
-  }
+  const std::string type = status == 0 ? demangled.get() : mangled;
   // What the type says, and whom it concerns; the first that fits.
   static constexpr const char* kNames[][2] = {{"PenGLRenderMsg", "Render"},
-                                              {"Delete<std::vector<float", "DeleteBatch"},
+                                              {"Delete<std::", "DeleteBatch"},
                                               {"Delete<Qelt::String>", "DeleteName"},
                                               {"RefCount::*)()", "Unref"},
                                               {"PenStrokeDataManager::*)(int)", "ReleaseStrokeData"},
@@ -166,7 +151,7 @@ std::string taskName(const Qelt::ITask& task) {
                                               {"PenDrawableRT::*)(float, int)", "SetPenData"},
                                               {"PenDrawableRT::*)(bool)", "SetRedrawState"},
                                               {"PenDrawableRT::*)(Qelt::RectF)", "SetRect"},
-                                              {"DrawableRT::*)(std::vector<float", "Batch"},
+                                              {"DrawableRT::*)(std::", "Batch"},
                                               {"PenDrawableRT::*)()", "Clear"}};
   for (const auto& [part, name] : kNames) {
     if (type.find(part) != std::string::npos) return name;

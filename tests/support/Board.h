@@ -116,7 +116,8 @@ class Board {
   QeltDesktop::PenDataManager data;
 
  protected:
-  // With a queue of its own, and a layer where the options have pixels.
+  // With a queue of its own, and a layer where the options have pixels; without, the canvas has none either,
+  // which spares the tests of batches the render messages' walk.
   explicit Board(const BoardOptions& wanted);
   // On what others own.
   Board(const BoardOptions& wanted, QeltDesktop::RenderQueue& itsQueue, QeltDesktop::CanvasLayer* itsLayer);

@@ -20,20 +20,11 @@ std::ostream& operator<<(std::ostream& out, Kind kind) {
   return out << kNames[static_cast<std::size_t>(kind)];
 }
 
-std::string difference(const Drawn& drawn, const Drawn& expected) {
-  const auto ofLists = [](const char* name, const auto& some, const auto& others) {
-    if (some.size() != others.size()) {
-      return std::to_string(some.size()) + " " + name + "s instead of " + std::to_string(others.size());
-    }
-    for (std::size_t i = 0; i < some.size(); ++i) {
-      if (some[i] != others[i]) return std::string(name) + " " + std::to_string(i);
-    }
-    return std::string();
-  };
-  std::string found = ofLists("step", drawn.steps, expected.steps);
-  if (found.empty()) found = ofLists("batch", drawn.batches, expected.batches);
-  if (found.empty() && drawn.cached != expected.cached) found = "hits of the cache";
-  return found.empty() && drawn.pixels != expected.pixels ? "pixels" : found;
+void expectAlike(const Drawn& drawn, const Drawn& expected) {
+  EXPECT_EQ(drawn.steps, expected.steps);
+  EXPECT_TRUE(drawn.batches == expected.batches) << "batches";
+  EXPECT_EQ(drawn.cached, expected.cached);
+  EXPECT_TRUE(drawn.pixels == expected.pixels) << "pixels";
 }
 
 namespace {
@@ -46,6 +37,10 @@ void hostCall(Call&& call) {
     call();
   } catch (const std::bad_alloc&) {
   }
+}
+
+void makeCacheEntry(const StoredStroke& stroke) {
+  hostCall([&] { PenStrokeDataManager::GetInstance()->CreateStrokeData(stroke.GetRuntimeHandle()); });
 }
 
 }  // namespace
@@ -129,14 +124,14 @@ bool PenBoard::draw(const MotionEvent& event) {
   return onCanvas(&Qelt::Pen::GetStrokeDrawableGL)->Draw(&event, &rect);
 }
 
-template <typename Made>
-void PenBoard::call(Qelt::PenDrawableGL& drawable, const std::function<void(const Call&)>& around,
-                    Made&& made) {
-  if (beforeCall) beforeCall(drawable);
+template <typename Drawable, typename Made>
+void PenBoard::call(Drawable* drawable, const std::function<void(const Call&)>& around, Made&& made) {
+  if (drawable == nullptr) return;
+  if (beforeCall) beforeCall(*drawable);
   around([&](RectF* area) {
     try {
       const PlugInCall inside;
-      return made(area);
+      return made(*drawable, area);
     } catch (const std::bad_alloc&) {
       ++mRefusedBatches;
       return false;
@@ -149,7 +144,6 @@ void PenBoard::call(Qelt::PenDrawableGL& drawable, const std::function<void(cons
 template <typename Drawable>
 void PenBoard::drawLive(Drawable* drawable, const std::vector<Sample>& samples, bool ends,
                         const std::function<void(const Call&)>& around) {
-  if (drawable == nullptr) return;
   const auto middle = samples.begin() + static_cast<std::ptrdiff_t>(samples.size() / 2);
   const std::pair<int, std::vector<Sample>> events[] = {{Qelt::kActionDown, {samples.front()}},
                                                         {Qelt::kActionMove, {samples.begin() + 1, middle}},
@@ -158,7 +152,7 @@ void PenBoard::drawLive(Drawable* drawable, const std::vector<Sample>& samples, 
   for (const auto& [action, some] : events) {
     if (action == Qelt::kActionUp && !ends) return;
     const MotionEvent event = eventOf(action, some);
-    call(*drawable, around, [&](RectF* area) { return drawable->Draw(&event, area); });
+    call(drawable, around, [&](auto& it, RectF* area) { return it.Draw(&event, area); });
   }
 }
 
@@ -174,14 +168,12 @@ void PenBoard::draw(Kind kind, const std::vector<Sample>& samples,
       return drawLive(onCanvas(&Qelt::Pen::GetStrokeDrawableGL), samples, true, around);
     case Kind::Redraw: {
       auto* const drawable = onCanvas(&Qelt::Pen::GetStrokeDrawableGL);
-      if (drawable == nullptr) return;
-      call(*drawable, around, [&](RectF* area) { return drawable->RedrawPen(&whole, area); });
+      call(drawable, around, [&](auto& it, RectF* area) { return it.RedrawPen(&whole, area); });
       StoredStroke& stroke = newStroke(samples);
       for (const char* const entry : {"none", "empty", "full", "dirty"}) {
-        if (*entry == 'e')
-          hostCall([&] { PenStrokeDataManager::GetInstance()->CreateStrokeData(stroke.GetRuntimeHandle()); });
+        if (*entry == 'e') makeCacheEntry(stroke);
         if (*entry == 'd') stroke.SetRedrawingCacheDirtyFlag();
-        call(*drawable, around, [&](RectF* area) { return drawable->RedrawPen(&stroke, area); });
+        call(drawable, around, [&](auto& it, RectF* area) { return it.RedrawPen(&stroke, area); });
       }
       return;
     }
@@ -191,14 +183,13 @@ void PenBoard::draw(Kind kind, const std::vector<Sample>& samples,
       drawable->SetOutlineSize(3.0f);
       drawable->SetOutlineColor(static_cast<int>(options.color));
       const StoredStroke& stroke = newStroke(samples);
-      call(*drawable, around, [&](RectF* area) { return drawable->DrawOutline(&whole, area); });
-      return call(*drawable, around, [&](RectF* area) { return drawable->DrawOutline(&stroke, area); });
+      call(drawable, around, [&](auto& it, RectF* area) { return it.DrawOutline(&whole, area); });
+      return call(drawable, around, [&](auto& it, RectF* area) { return it.DrawOutline(&stroke, area); });
     }
     case Kind::Preview: {
       auto* const drawable = onCanvas(&Qelt::Pen::GetPreviewDrawableGL);
-      if (drawable == nullptr) return;
       drawLive(drawable, samples, true, around);
-      return call(*drawable, around, [&](RectF* area) { return drawable->RedrawPen(&whole, area); });
+      return call(drawable, around, [&](auto& it, RectF* area) { return it.RedrawPen(&whole, area); });
     }
     case Kind::Prediction: {
       if (!rowOf(options.version).predicts) return;
@@ -207,7 +198,7 @@ void PenBoard::draw(Kind kind, const std::vector<Sample>& samples,
       if (drawable == nullptr) return;
       drawable->SetOpacity(0.75f);
       const MotionEvent ahead = eventOf(Qelt::kActionMove, {samples.rbegin(), samples.rend()});
-      return call(*drawable, around, [&](RectF* area) { return drawable->Draw(&ahead, area); });
+      return call(drawable, around, [&](auto& it, RectF* area) { return it.Draw(&ahead, area); });
     }
   }
 }
@@ -234,28 +225,26 @@ std::vector<Sample> PenBoard::usualStroke() {
 }
 
 void PenBoard::drawOneOfEach() {
-  const MotionEvent whole = recorded(usualStroke());
+  const std::vector<Sample> samples = usualStroke();
+  const MotionEvent whole = recorded(samples);
+  const MotionEvent ahead = eventOf(Qelt::kActionMove, {samples[2], samples[3], samples[4]});
+  const StoredStroke& stroke = newStroke(samples);
   const auto around = [](const Call& call) {
     RectF area;
     call(&area);
   };
-  if (auto* const drawable = onCanvas(&Qelt::Pen::GetStrokeDrawableGL)) {
-    const StoredStroke& stroke = newStroke(usualStroke());
-    hostCall([&] { PenStrokeDataManager::GetInstance()->CreateStrokeData(stroke.GetRuntimeHandle()); });
-    for (int i = 0; i < 2; ++i)
-      call(*drawable, around, [&](RectF* area) { return drawable->RedrawPen(&stroke, area); });
-  }
-  if (auto* const drawable = onCanvas(&Qelt::Pen::GetOutlineDrawableGL)) {
-    drawable->SetOutlineSize(2.0f);
-    call(*drawable, around, [&](RectF* area) { return drawable->DrawOutline(&whole, area); });
-  }
-  if (auto* const drawable = onCanvas(&Qelt::Pen::GetPreviewDrawableGL))
-    call(*drawable, around, [&](RectF* area) { return drawable->RedrawPen(&whole, area); });
-  if (auto* const drawable = onCanvas(&Qelt::Pen::GetPredictionStrokeDrawableGL)) {
-    const std::vector<Sample> samples = usualStroke();
-    const MotionEvent ahead = eventOf(Qelt::kActionMove, {samples[2], samples[3], samples[4]});
-    call(*drawable, around, [&](RectF* area) { return drawable->Draw(&ahead, area); });
-  }
+  makeCacheEntry(stroke);
+  for (int i = 0; i < 2; ++i)
+    call(onCanvas(&Qelt::Pen::GetStrokeDrawableGL), around,
+         [&](auto& it, RectF* area) { return it.RedrawPen(&stroke, area); });
+  call(onCanvas(&Qelt::Pen::GetOutlineDrawableGL), around, [&](auto& it, RectF* area) {
+    it.SetOutlineSize(2.0f);
+    return it.DrawOutline(&whole, area);
+  });
+  call(onCanvas(&Qelt::Pen::GetPreviewDrawableGL), around,
+       [&](auto& it, RectF* area) { return it.RedrawPen(&whole, area); });
+  call(onCanvas(&Qelt::Pen::GetPredictionStrokeDrawableGL), around,
+       [&](auto& it, RectF* area) { return it.Draw(&ahead, area); });
   finish();
 }
 
@@ -295,24 +284,6 @@ Drawn PenBoard::drawEverything(float zoomFactor) {
   mSteps = nullptr;
   if (layer != nullptr) drawn.pixels = layer->readPixels();
   return drawn;
-}
-
-bool PenBoard::redrawsLastOf(PenBoard& other) {
-  if (other.mPage.empty()) return true;
-  setCurve(other.pen->GetMorphable()->IsCurveEnabled());
-  auto* const drawable = onCanvas(&Qelt::Pen::GetStrokeDrawableGL);
-  StoredStroke& stroke = *other.mPage.back();
-  finish();
-  std::vector<std::vector<float>> drawn[2];
-  for (auto& buffers : drawn) {
-    watch();
-    RectF area;
-    drawable->RedrawPen(&stroke, &area);
-    buffers = takeBuffers();
-    unwatch();
-    stroke.SetRedrawingCacheDirtyFlag();
-  }
-  return drawn[0] == drawn[1];
 }
 
 void PenBoard::turnPage() {

@@ -39,8 +39,7 @@ struct Drawn {
   std::vector<std::uint8_t> pixels;         // only where there is a layer
 };
 
-// The first difference, for people; empty where there is none.
-std::string difference(const Drawn& drawn, const Drawn& expected);
+void expectAlike(const Drawn& drawn, const Drawn& expected);
 
 // A whole pen of the built library and everything it draws, call by call as a host makes them. None of it
 // minds that the pen or a drawable could not be made. Events of the board itself go to the pen's stroke
@@ -83,9 +82,6 @@ class PenBoard : public Board {
   void prepareAll();
   // Draws all kinds, or with a layer one of each, beginning as every stroke does, and tells what came of it.
   Drawn drawEverything(float zoomFactor = 1.0f);
-  // Draws the last stroke of another's page in this view, as the other pen would: as it comes, and without
-  // the cache. Returns whether these are alike.
-  bool redrawsLastOf(PenBoard& other);
   // Takes all stored strokes away, whatever the render thread still does with their drawings.
   void turnPage();
   void loseAndRestoreContext();
@@ -111,9 +107,9 @@ class PenBoard : public Board {
   void drawLive(Drawable* drawable, const std::vector<Sample>& samples, bool ends,
                 const std::function<void(const Call&)>& around);
   QeltDesktop::StoredStroke& newStroke(const std::vector<Sample>& samples);
-  // Has `around` make a call, which may fail.
-  template <typename Made>
-  void call(Qelt::PenDrawableGL& drawable, const std::function<void(const Call&)>& around, Made&& made);
+  // Has `around` make a call, which may fail; none where there is no drawable.
+  template <typename Drawable, typename Made>
+  void call(Drawable* drawable, const std::function<void(const Call&)>& around, Made&& made);
 
   const MakePen mMakePen;
   std::vector<std::unique_ptr<QeltDesktop::StoredStroke>> mPage;

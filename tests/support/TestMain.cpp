@@ -37,8 +37,8 @@ const char* __tsan_default_options() {
 
 int main(int argc, char** argv) {
   setenv("EGL_PLATFORM", "surfaceless", 0);
-  // Freed memory is used again instead of given back: the kernel took longer to hand out cleared pages for the
-  // next picture than a test to draw it.
+  // Freed memory is used again instead of given back: the kernel took longer to hand out cleared pages for
+  // the next picture than a test to draw it.
   mallopt(M_MMAP_MAX, 0);
   mallopt(M_TRIM_THRESHOLD, -1);
   testing::InitGoogleMock(&argc, argv);

@@ -161,12 +161,16 @@ Picture drawPage(const PluginLibrary& plugin, RenderQueue& queue, const Page& pa
   Drawing drawing(queue, size, layout, drawables, progress);
   // What was drawn before the context was lost is gone: then the page is drawn anew, by a new pen.
   constexpr int kMostTries = 8;
+  std::vector<std::vector<std::uint8_t>> layers;
   int timesBefore = 0, tries = 0;
   do {
     if (++tries > kMostTries) throw std::runtime_error("the GL context is lost again and again");
     timesBefore = drawing.timesEmptied();
-    PenSession session(plugin, queue, options);
-    PagePlayer(session, page, options, drawing.canvases()).play(drawing);
+    {
+      PenSession session(plugin, queue, options);
+      PagePlayer(session, page, options, drawing.canvases()).play(drawing);
+    }
+    layers = drawing.readLayers();
   } while (drawing.timesEmptied() != timesBefore);
   std::optional<std::array<std::uint8_t, 3>> background;
   if (!options.background.transparent) {
@@ -174,7 +178,7 @@ Picture drawPage(const PluginLibrary& plugin, RenderQueue& queue, const Page& pa
     background = {static_cast<std::uint8_t>(rgb >> 16), static_cast<std::uint8_t>(rgb >> 8),
                   static_cast<std::uint8_t>(rgb)};
   }
-  return Picture(size.width, size.height, composeLayers(drawing.readLayers(), background));
+  return Picture(size.width, size.height, composeLayers(layers, background));
 }
 
 }  // namespace QeltDesktop

@@ -10,8 +10,8 @@ struct Rect {
   int left = 0, top = 0, right = 0, bottom = 0;
 };
 
-// An axis-aligned rectangle, y down. Growing is plain minimum and maximum: a rectangle without area
-// counts as the point or line it is, and an operand that is not a number is ignored.
+// An axis-aligned rectangle, y down. Growing is plain minimum and maximum: a rectangle without area counts as
+// the point or line it is, and an operand that is NaN is ignored.
 class QELT_HOST_API RectF {
  public:
   float left = 0.0f, top = 0.0f, right = 0.0f, bottom = 0.0f;

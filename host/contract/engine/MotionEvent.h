@@ -25,9 +25,9 @@ enum MotionAction : int { kActionDown = 0, kActionUp = 1, kActionMove = 2, kActi
 enum ToolType : int { kToolUnknown = 0, kToolFinger = 1, kToolStylus = 2, kToolMouse = 3, kToolEraser = 4 };
 enum InputSource : int { kSourceTouchScreen = 4098, kSourceMouse = 8194, kSourceStylus = 16386 };
 
-// One input event of one pointer: a current sample and the older samples batched with it. The pen
-// writes its corrections of pressure and tilt back, so that later consumers of the event see them.
-// Main thread. Chosen here: one pointer; a pointer index above 0 answers as pointer 0 does.
+// One input event of one pointer: a current sample and the older samples batched with it. The pen writes its
+// corrections of pressure and tilt back, so that later consumers of the event see them. Main thread. Chosen
+// here: one pointer; a pointer index above 0 is taken as 0.
 class QELT_HOST_API MotionEvent {
  public:
   // Times are milliseconds. `properties` and `coords` hold `pointerCount` entries; they are copied.
@@ -55,7 +55,7 @@ class QELT_HOST_API MotionEvent {
   float GetTilt(int pointer) const;
   float GetOrientation(int pointer) const;
 
-  // History, oldest first: `position` runs from 0 to GetHistorySize() - 1; outside it answers 0.
+  // History, oldest first: `position` runs from 0 to GetHistorySize() - 1; outside it they return 0.
   int GetHistorySize() const;
   float GetHistoricalX(int position) const;
   float GetHistoricalY(int position) const;

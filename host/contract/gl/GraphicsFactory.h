@@ -8,7 +8,7 @@ class GraphicsObject;
 class OpenGLShaderProgram;
 class VertexDescriptor;
 
-// Makes GL objects. Render thread. Every maker answers null when it cannot.
+// Makes GL objects. Render thread. Every maker returns null when it fails.
 class QELT_HOST_API GraphicsFactory {
  public:
   static constexpr int kTriangles = 4;

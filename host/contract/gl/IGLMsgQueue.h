@@ -10,9 +10,9 @@ class ITask;
 class QELT_HOST_API IGLMsgQueue {
  public:
   virtual ~IGLMsgQueue();
-  // True: the queue owns the task, will run it and then destroy it, both on the render thread.
-  // False: it refused; the caller still owns the task. A null task is ignored. Any thread.
-  // Chosen here: the operation's name; a null task answers true.
+  // True: the queue owns the task, will run it and then destroy it, both on the render thread. False: it
+  // refused; the caller still owns the task. A null task is ignored. Any thread. Chosen here: the operation's
+  // name; for a null task it returns true.
   virtual bool Post(ITask* task) = 0;
 };
 

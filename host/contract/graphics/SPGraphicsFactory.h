@@ -8,7 +8,7 @@ class IGLMsgQueue;
 class ISPBitmap;
 class ISPCanvas;
 
-// Makes bitmaps and canvases. Render thread. Makers answer null when they cannot; releasing null is allowed.
+// Makes bitmaps and canvases. Render thread. Makers return null when they fail; releasing null is allowed.
 class QELT_HOST_API SPGraphicsFactory {
  public:
   // A width x height RGBA8 bitmap, with `pixels` as its first contents when given, else zeros. The pen

@@ -10,7 +10,7 @@ struct SmPoint {
   float x = 0.0f, y = 0.0f;
 };
 
-// A path of straight and quadratic segments that answers positions by arc length. Main thread.
+// A path of straight and quadratic segments that finds positions by arc length. Main thread.
 class QELT_HOST_API SmPath {
  public:
   SmPath();

@@ -11,8 +11,8 @@ class ISPPenCanvas;
 class PenDrawableRT;
 class PenGLDataManager;
 
-// The main-thread half of every drawable: its canvas and its render-thread partner. Main thread. Slots:
-// destructor pair, then as declared. Chosen here: that the four kinds share one base with these fields.
+// The base of every drawable: its canvas and its render drawable. Main thread. Slots: destructor pair, then
+// as declared. Chosen here: that the four kinds share one base with these fields.
 class QELT_HOST_API PenDrawableGL {
  public:
   explicit PenDrawableGL(PenGLDataManager* manager);  // borrowed
@@ -20,7 +20,8 @@ class QELT_HOST_API PenDrawableGL {
   PenDrawableGL(const PenDrawableGL&) = delete;
   PenDrawableGL& operator=(const PenDrawableGL&) = delete;
 
-  // The canvas to draw into, borrowed; null takes it away. Has the partner prepared on the render thread.
+  // The canvas to draw into, borrowed; null takes it away. Has the render drawable prepared on the render
+  // thread.
   virtual void SetCanvas(ISPPenCanvas* canvas);
   virtual ISPPenCanvas* GetCanvas();
   virtual int GetCanvasBitmapType();
@@ -29,18 +30,18 @@ class QELT_HOST_API PenDrawableGL {
   virtual IDepthMapBitmapSettable* GetDepthMapBitmapSettable();
 
  protected:
-  // Hands over the partner, which may be null; the base owns it from here on.
+  // Hands over the render drawable, which may be null; the base owns it from here on.
   void setDrawableRT(PenDrawableRT* drawable);
-  // Has the partner released and deleted on the render thread, after everything posted before. Where the
-  // queue refuses, waits until what it took has run and has the partner gone on return. To be called by
-  // the destructor of the final class; the base's does it too, for whoever forgot.
+  // Has the render drawable released and deleted on the render thread, after everything posted before. Where
+  // the queue refuses, waits until what it took has run and has the render drawable gone on return. To be
+  // called by the destructor of the final class; the base's does it too, for whoever forgot.
   void destroy();
 
   PenGLDataManager* mDataManager;
   ISPPenCanvas* mCanvas = nullptr;
 
  private:
-  // Posts `CreatePenCanvas` for a partner on a canvas that can be drawn into.
+  // Posts `CreatePenCanvas` for a render drawable on a canvas that can be drawn into.
   void prepareDrawableRT();
 
   PenDrawableRT* mDrawableRT = nullptr;

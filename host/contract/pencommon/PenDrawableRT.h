@@ -32,8 +32,8 @@ class QELT_HOST_API IDepthMapBitmapSettable {
   virtual ~IDepthMapBitmapSettable();
 };
 
-// The render-thread half of every drawable. Everything runs on the render thread but what is marked.
-// Slots: ManagedObject's, then as declared.
+// The base of every render drawable. Everything runs on the render thread but what is marked. Slots:
+// ManagedObject's, then as declared.
 class QELT_HOST_API PenDrawableRT : public ManagedObject {
  public:
   explicit PenDrawableRT(PenGLDataManager* manager);  // main thread; borrowed
@@ -58,7 +58,7 @@ class QELT_HOST_API PenDrawableRT : public ManagedObject {
 
   void SetPenData(float size, int argb);
   void SetRedrawState(bool redrawing);
-  // The dirty rectangle, whole stroke units.
+  // The call's rectangle, in whole stroke units.
   void SetRect(RectF rect);
 
  protected:

@@ -6,7 +6,7 @@
 
 namespace Qelt {
 
-// The render-thread half of an outline: two streams of vertices. No vector is owned. Size and colour are
+// The base of render drawables of outlines: two streams of vertices. No vector is owned. Size and colour are
 // set by the main thread and read by both; a batch is drawn in the colour that is set when it is drawn.
 class QELT_HOST_API PenOutlineDrawableRT : public PenDrawableRT {
  public:

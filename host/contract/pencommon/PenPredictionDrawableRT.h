@@ -6,7 +6,8 @@
 
 namespace Qelt {
 
-// The render-thread half of a prediction: one batch at a time, and how opaque. No vector is owned.
+// The base of render drawables of predictions: one batch at a time, and how opaque it is drawn. No vector is
+// owned.
 class QELT_HOST_API PenPredictionDrawableRT : public PenDrawableRT {
  public:
   explicit PenPredictionDrawableRT(PenGLDataManager* manager);

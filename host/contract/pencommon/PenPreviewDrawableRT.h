@@ -4,7 +4,7 @@
 
 namespace Qelt {
 
-// The render-thread half of a settings preview: one batch at a time. No vector is owned.
+// The base of render drawables of settings previews: one batch at a time. No vector is owned.
 class QELT_HOST_API PenPreviewDrawableRT : public PenDrawableRT {
  public:
   explicit PenPreviewDrawableRT(PenGLDataManager* manager);

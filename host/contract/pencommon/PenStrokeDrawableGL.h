@@ -18,8 +18,8 @@ class QELT_HOST_API IPenListRedrawable {
   virtual ~IPenListRedrawable();
 };
 
-// Draws strokes. Each call fills `rect` with the area it changed, in stroke units, and returns true when
-// something was drawn or begun. Null arguments set the host error 7 and return false. Main thread.
+// Draws strokes. Each call sets `rect` to the rectangle of what it changed, in stroke units, and returns true
+// when something was drawn or begun. Null arguments set the host error 7 and return false. Main thread.
 class QELT_HOST_API PenStrokeDrawableGL : public PenDrawableGL, public IPenListRedrawable {
  public:
   explicit PenStrokeDrawableGL(PenGLDataManager* manager);

@@ -4,7 +4,7 @@
 
 namespace Qelt {
 
-// The render-thread half of a stroke drawable: its batches. No vector is owned.
+// The base of render drawables of strokes: their batches. No vector is owned.
 class QELT_HOST_API PenStrokeDrawableRT : public PenDrawableRT {
  public:
   explicit PenStrokeDrawableRT(PenGLDataManager* manager);

@@ -6,8 +6,7 @@ namespace Qelt {
 
 namespace {
 
-// Each is one instruction, and keeps the edge when `other` is not a number. Pens grow rectangles once per
-// stamp.
+// Each is one instruction, and keeps the edge when `other` is NaN. Pens grow rectangles once per stamp.
 float smaller(float edge, float other) {
   return other < edge ? other : edge;
 }
@@ -16,7 +15,7 @@ float larger(float edge, float other) {
   return other > edge ? other : edge;
 }
 
-// An edge that is not a number gives way to one that is.
+// An edge that is NaN gives way to one that is not.
 float numberOf(float edge, float other) {
   return std::isnan(edge) ? other : edge;
 }

@@ -38,7 +38,12 @@ bool GlResource::isLive() const {
 
 GlDevice::GlDevice(const Surface& surface) : mSurface(surface), mContext(GlContext::make(surface)) {
   makeCurrent();
-  readLimits();
+  try {
+    readLimits();
+  } catch (...) {
+    clearCurrent();
+    throw;
+  }
 }
 
 GlDevice::~GlDevice() {

@@ -64,7 +64,8 @@ class QELT_HOST_API GlDevice {
 
   bool isLost() const { return mContext == nullptr; }
   // The context has been taken away: destroys what is left of it, without a single GL call, has every
-  // resource forget its names, and then tells managed objects. Once more, it does nothing.
+  // resource forget its names, and then tells managed objects. Does nothing while the context is lost
+  // already.
   void lose() noexcept;
   // Makes a new context and the names of every resource in it, then tells managed objects. Throws
   // std::runtime_error when there is no context to be had, std::bad_alloc when there is no memory; nothing
@@ -74,6 +75,8 @@ class QELT_HOST_API GlDevice {
   // Makes a program the current one, without asking GL when it is so already.
   void useProgram(GLuint program);
   void forgetProgram(GLuint program);
+  // Whether a program is current; without one GL draws nothing of use.
+  bool hasProgram() const { return mProgram != 0; }
   // The longest sides that a texture may have, and that can be drawn into at once.
   int maxTextureSize() const { return mMaxTextureSize; }
   int maxViewportSize() const { return mMaxViewportSize; }

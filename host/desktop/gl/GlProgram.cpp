@@ -1,4 +1,5 @@
 #include <algorithm>
+#include <array>
 #include <atomic>
 #include <iterator>
 #include <memory>
@@ -58,18 +59,20 @@ class ProgramState final : public GlResource {
   ~ProgramState() override { destroy(); }
 
   bool build() {
-    const GLuint vertex = compile(GL_VERTEX_SHADER, mVertexSource.c_str());
-    const GLuint fragment = vertex != 0 ? compile(GL_FRAGMENT_SHADER, mFragmentSource.c_str()) : 0;
-    if (fragment != 0) link(vertex, fragment);
-    if (fragment != 0) gl(glDeleteShader)(fragment);
-    if (vertex != 0) gl(glDeleteShader)(vertex);
+    mMayBuildAgain = true;  // until it is known that memory is not what it lacks
+    const Stage vertex{compile(GL_VERTEX_SHADER, mVertexSource.c_str())};
+    const Stage fragment{vertex.name != 0 ? compile(GL_FRAGMENT_SHADER, mFragmentSource.c_str()) : 0};
+    if (fragment.name != 0) link(vertex.name, fragment.name);
     if (mProgram != 0) readUniforms();
+    mMayBuildAgain = false;
     return mProgram != 0;
   }
 
-  // Makes the program current; false when there is none.
+  // Makes the program current; false when there is none. Nothing is drawn with another's program then.
   bool use() {
+    if (mProgram == 0 && mMayBuildAgain && isLive() && !mReleased) remake();
     if (mProgram == 0 || !isLive()) {
+      if (GlDevice* const drawing = GlDevice::live(); drawing != nullptr) drawing->useProgram(0);
       noteForeignContext();
       return false;
     }
@@ -106,11 +109,25 @@ class ProgramState final : public GlResource {
     }
   }
 
+  // A compiled stage, until the program is linked.
+  struct Stage {
+    GLuint name;
+    explicit Stage(GLuint made) : name(made) {}
+    ~Stage() {
+      if (name != 0) gl(glDeleteShader)(name);
+    }
+    Stage(const Stage&) = delete;
+    Stage& operator=(const Stage&) = delete;
+  };
+
   // Shaders are shared by the whole process, contexts are not: a second queue's strokes stay invisible.
   void noteForeignContext() {
     if (GlDevice::live() == nullptr || GlDevice::live() == device() || mSaidForeign.exchange(true)) return;
     logError("a shader program belongs to another render queue's context; nothing is drawn with it here");
   }
+
+  // What GL has to say of a failure, as far as it fits.
+  using Report = std::array<GLchar, 2048>;
 
   static GLuint compile(GLenum stage, const char* source) {
     const GLuint shader = gl(glCreateShader)(stage);
@@ -119,14 +136,11 @@ class ProgramState final : public GlResource {
     GLint compiled = GL_FALSE;
     gl(glGetShaderiv)(shader, GL_COMPILE_STATUS, &compiled);
     if (compiled == GL_TRUE) return shader;
-    GLint length = 0;
-    gl(glGetShaderiv)(shader, GL_INFO_LOG_LENGTH, &length);
-    std::string report(static_cast<std::size_t>(std::max(length, 1)), '\0');
-    gl(glGetShaderInfoLog)(shader, static_cast<GLsizei>(report.size()), &length, report.data());
-    report.resize(static_cast<std::size_t>(length));
-    logError(std::string(stage == GL_VERTEX_SHADER ? "vertex" : "fragment") +
-             " shader does not compile: " + report);
+    Report report{};
+    gl(glGetShaderInfoLog)(shader, static_cast<GLsizei>(report.size()), nullptr, report.data());
     gl(glDeleteShader)(shader);
+    logError(std::string(stage == GL_VERTEX_SHADER ? "vertex" : "fragment") +
+             " shader does not compile: " + report.data());
     return 0;
   }
 
@@ -143,13 +157,10 @@ class ProgramState final : public GlResource {
       mProgram = program;
       return;
     }
-    GLint length = 0;
-    gl(glGetProgramiv)(program, GL_INFO_LOG_LENGTH, &length);
-    std::string report(static_cast<std::size_t>(std::max(length, 1)), '\0');
-    gl(glGetProgramInfoLog)(program, static_cast<GLsizei>(report.size()), &length, report.data());
-    report.resize(static_cast<std::size_t>(length));
-    logError(std::string("shader program does not link: ") + report);
+    Report report{};
+    gl(glGetProgramInfoLog)(program, static_cast<GLsizei>(report.size()), nullptr, report.data());
     gl(glDeleteProgram)(program);
+    logError(std::string("shader program does not link: ") + report.data());
   }
 
   // Indices stay what they were the first time: bindings keep them across contexts.
@@ -177,6 +188,7 @@ class ProgramState final : public GlResource {
   std::string mFragmentSource;
   GLuint mProgram = 0;
   bool mReleased = false;
+  bool mMayBuildAgain = false;
   std::atomic<bool> mSaidForeign{false};  // whichever render thread comes first
   std::vector<Uniform> mUniforms;
 };

@@ -107,7 +107,7 @@ bool GlVertexObject::upload(Buffer& buffer, const void* data, int vertices) {
 }
 
 void GlVertexObject::draw(int first, int count, bool, int instances) {
-  if (!isLive()) return;
+  if (!isLive() || !device()->hasProgram()) return;
   for (const Buffer& buffer : mBuffers) {
     const int begin = std::clamp(first, 0, buffer.vertices);
     int left = count < 0 ? buffer.vertices - begin : std::min(count, buffer.vertices - begin);

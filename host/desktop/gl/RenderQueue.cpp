@@ -8,6 +8,7 @@
 #include <future>
 #include <new>
 #include <utility>
+#include <vector>
 
 #include "desktop/base/Log.h"
 #include "desktop/gl/GlDevice.h"
@@ -28,6 +29,16 @@ bool ITask::isGlobalLockAllowed() {
 namespace QeltDesktop {
 
 namespace {
+
+// Every render queue there is. Never destroyed: a queue may live as long as the process.
+struct LiveQueues {
+  std::mutex mutex;
+  std::vector<RenderQueue*> queues;
+};
+LiveQueues& liveQueues() {
+  static LiveQueues* const all = new LiveQueues;
+  return *all;
+}
 
 // False when the task threw. Takes no memory: its end may be what the task ran into.
 bool runAndDelete(Qelt::ITask* task) noexcept {
@@ -116,6 +127,24 @@ RenderQueue::RenderQueue(Mode mode, GL gl, const Surface& surface)
     mThread.join();
     throw;
   }
+}
+
+RenderQueue::Registration::Registration(RenderQueue* queue) : mQueue(queue) {
+  const std::lock_guard guard(liveQueues().mutex);
+  liveQueues().queues.push_back(queue);
+}
+
+RenderQueue::Registration::~Registration() {
+  const std::lock_guard guard(liveQueues().mutex);
+  std::erase(liveQueues().queues, mQueue);
+}
+
+RenderQueue* RenderQueue::ifAlive(const Qelt::IGLMsgQueue* queue) {
+  const std::lock_guard guard(liveQueues().mutex);
+  for (RenderQueue* const live : liveQueues().queues) {
+    if (static_cast<const Qelt::IGLMsgQueue*>(live) == queue) return live;
+  }
+  return nullptr;
 }
 
 RenderQueue::~RenderQueue() {

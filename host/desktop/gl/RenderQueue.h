@@ -42,6 +42,10 @@ class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
   RenderQueue(const RenderQueue&) = delete;
   RenderQueue& operator=(const RenderQueue&) = delete;
 
+  // The queue itself where it is a render queue that has not been destroyed; else null. `queue` is compared
+  // and never looked into.
+  static RenderQueue* ifAlive(const Qelt::IGLMsgQueue* queue);
+
   bool Post(Qelt::ITask* task) override;
 
   // Waits until everything posted so far has run, and for nothing that is posted later. It cannot wait inside
@@ -51,8 +55,9 @@ class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
   // `Caller` mode: runs everything posted so far; otherwise does nothing.
   void runPending();
   // Runs a call on the render thread after everything posted so far, and waits for it; inside a task it runs
-  // at once. What the call throws is thrown here. False, and nothing ran, when the queue has been shut
-  // down, or has no thread and is another thread's. Neither `accept` nor `onAccepted` sees it.
+  // at once. What the call throws is thrown here. Returns false, and runs nothing, when the queue has been
+  // shut down, or when it is in `Caller` mode and the calling thread is not the one that made it. Neither
+  // `accept` nor `onAccepted` sees it.
   bool run(const std::function<void()>& call);
   // Refuses posts from now on, runs what was posted, ends the thread and destroys the context. Inside a task
   // it only refuses posts.
@@ -116,6 +121,19 @@ class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
   std::unique_ptr<GlDevice> mDevice;  // used by the runner alone
   std::string mRendererName;
   std::thread mThread;
+
+  // Has the queue among those that `ifAlive` knows.
+  class Registration {
+   public:
+    explicit Registration(RenderQueue* queue);
+    ~Registration();
+    Registration(const Registration&) = delete;
+    Registration& operator=(const Registration&) = delete;
+
+   private:
+    RenderQueue* mQueue;
+  };
+  const Registration mRegistration{this};
 };
 
 }  // namespace QeltDesktop

@@ -11,8 +11,8 @@ class GlBitmap;
 // thread.
 class BitmapCanvas final : public Qelt::ISPCanvas {
  public:
-  // `bitmap` outlives the canvas. Whatever was uploaded to it before a canvas drew for the first time goes.
-  // Throws std::bad_alloc.
+  // `bitmap` outlives the canvas. The canvas's first drawing replaces whatever was uploaded to the bitmap
+  // before. Throws std::bad_alloc.
   explicit BitmapCanvas(GlBitmap& bitmap);
 
   void Clear(unsigned int argb) override;

@@ -17,7 +17,7 @@ namespace QeltDesktop {
 
 class GlBitmap;
 
-// The texture of a bitmap: nothing but the bitmap seen from another side.
+// The bitmap's texture, as the host's interface has it.
 class GlTexture final : public Qelt::ISPTexture {
  public:
   explicit GlTexture(GlBitmap& bitmap) : mBitmap(bitmap) {}

@@ -9,7 +9,8 @@ namespace QeltDesktop {
 
 class CanvasLayer;
 
-// A view of a layer. Everything it is given is borrowed and outlives it. Main thread, except GetLayer.
+// A view of a layer. Everything it is given is borrowed and outlives it. Main thread, except GetLayer,
+// BeginTile and EndTile, which are for the render thread.
 class QELT_HOST_API PenCanvas : public Qelt::ISPPenCanvas {
  public:
   // Without a layer nothing is drawn and no GL is needed.
@@ -22,7 +23,7 @@ class QELT_HOST_API PenCanvas : public Qelt::ISPPenCanvas {
   Qelt::IGLMsgQueue* queue() const { return mQueue; }
 
   Qelt::IGLMsgQueue* GetMsgQueue() override;
-  // Also tells the cache of stored strokes that this is the view they are drawn for now.
+  // Also tells the stroke cache that this is the view that strokes are drawn for now.
   const Qelt::Matrix3<float>& GetMatrix() override;
   Qelt::ISPLayer* GetLayer() override;
   void BeginTile(int index) override;

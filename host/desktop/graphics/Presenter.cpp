@@ -65,6 +65,17 @@ Presenter::Presenter(RenderQueue& queue) : mQueue(queue) {
   }
 }
 
+// On the render thread: what lets GL go elsewhere would leave it to the context.
+void Presenter::release() {
+  for (std::size_t i = 0; i < kMostLayers; ++i) {
+    mLayers[i].reset();
+    mPlaces[i].reset();
+  }
+  mPaper.reset();
+  mHeight.reset();
+  mProgram.reset();
+}
+
 void Presenter::make() {
   if (GlDevice::live() == nullptr) throw std::runtime_error("nothing can be shown without OpenGL");
   gl(glBindFramebuffer)(GL_FRAMEBUFFER, 0);
@@ -73,6 +84,15 @@ void Presenter::make() {
   }
   mProgram.reset(Qelt::GraphicsFactory::createOpenGLShaderProgram(kVertexShader, kFragmentShader, nullptr));
   if (mProgram == nullptr) throw std::runtime_error("the shader that shows layers cannot be made");
+  try {
+    bindAll();
+  } catch (...) {
+    release();
+    throw;
+  }
+}
+
+void Presenter::bindAll() {
   const auto bind = [this](const std::string& name) {
     Binding binding(mProgram->getBindingIntf(name.c_str(), Qelt::kBindingAny));
     if (binding == nullptr) throw std::bad_alloc();
@@ -88,7 +108,7 @@ void Presenter::make() {
 
 Presenter::~Presenter() {
   try {
-    mQueue.run([this] { mProgram.reset(); });
+    mQueue.run([this] { release(); });
   } catch (...) {
     logError("a shader program could not be given back to OpenGL; it goes with the context");
   }
@@ -110,6 +130,7 @@ void Presenter::draw(std::span<const ShownLayer> layers,
   }
   gl(glColorMask)(GL_TRUE, GL_TRUE, GL_TRUE, GL_TRUE);
   mProgram->activate();
+  if (!GlDevice::live()->hasProgram()) return;
   const auto share = [&paper](std::size_t i) { return static_cast<float>((*paper)[i]) / 255.0f; };
   mPaper->set(paper ? Qelt::Vector4<float>{share(0), share(1), share(2), 1.0f} : Qelt::Vector4<float>{});
   mHeight->set(static_cast<float>(height));

@@ -42,12 +42,12 @@ class QELT_HOST_API Presenter {
   Presenter& operator=(const Presenter&) = delete;
 
   // Lays the layers over each other, the lowest first, on paper (red, green, blue) that fills the surface of
-  // width x height pixels; without paper the surface is transparent where they are, and premultiplied. The
-  // colours are those of `composeLayers`, give or take a rounding. At a scale of 1 and whole-number positions
-  // pixels are shown as they are, else smoothly. Every other pixel of the surface is drawn as well, after
-  // everything posted so far. A layer whose place is not finite, or whose scale is not positive, is left out.
-  // Does nothing while the context is lost. Throws std::invalid_argument when there are more than
-  // kMostLayers.
+  // width x height pixels. Without paper the surface keeps the layers' transparency and holds premultiplied
+  // colour. The colours are those of `composeLayers`, give or take a rounding. At a scale of 1 and
+  // whole-number positions pixels are shown as they are, else smoothly. Every other pixel of the surface is
+  // drawn as well, after everything posted so far. A layer whose place is not finite, or whose scale is not
+  // positive, is left out. Does nothing while the context is lost. Throws std::invalid_argument when there
+  // are more than kMostLayers.
   void present(std::span<const ShownLayer> layers, const std::optional<std::array<std::uint8_t, 3>>& paper,
                int width, int height);
 
@@ -58,6 +58,8 @@ class QELT_HOST_API Presenter {
   using Binding = std::unique_ptr<Qelt::IParameterBinding, Release>;
 
   void make();
+  void bindAll();
+  void release();
   void draw(std::span<const ShownLayer> layers, const std::optional<std::array<std::uint8_t, 3>>& paper,
             int width, int height);
 

@@ -11,7 +11,7 @@ namespace Qelt {
 
 namespace {
 
-// How the path answers quickly: each quadratic is cut into pieces, few where it bends gently, and each piece
+// How positions are found fast: each quadratic is cut into pieces, few where it bends gently, and each piece
 // carries x and y as cubics of the arc length, fitted to its end points and unit tangents. A query is then
 // two polynomials. The cut bounds the fit's error beforehand: over a length h it is at most
 // h^4 / 384 times the largest fourth derivative of the curve by its arc length. For a parabola that
@@ -188,7 +188,7 @@ struct SmPath::Measure {
   std::vector<Contour> contours;
   double x = 0.0, y = 0.0;  // the current point
   double length = 0.0;      // of the measured contour
-  double limit = -1.0;      // the largest distance that is answered
+  double limit = -1.0;      // the largest distance that has a position
   double tolerance = kTolerance;
   std::size_t first = 0;  // the measured segments
   std::size_t last = 0;

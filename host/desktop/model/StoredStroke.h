@@ -17,7 +17,8 @@ class QELT_HOST_API StoredStroke : public Qelt::ObjectStroke {
   explicit StoredStroke(int toolType, bool hasAngles = true);
   ~StoredStroke() override;
 
-  // One sample: stroke units, milliseconds, 0 to 1, radians from upright, radians clockwise from up.
+  // Adds one sample: position in stroke units, time in milliseconds, pressure from 0 to 1, tilt in radians
+  // from upright, orientation in radians clockwise from up.
   void addPoint(Qelt::PointF at, std::int64_t time, float pressure, float tilt = 0.0f,
                 float orientation = 0.0f);
   void reserve(int points);

@@ -53,7 +53,10 @@ void PenDrawableGL::SetCanvas(ISPPenCanvas* canvas) {
   if (queue != nullptr && queue != mCanvasQueue) {
     // What was posted to the queue of the canvas before still refers to the drawable, and the two queues run
     // side by side.
-    if (auto* const before = dynamic_cast<QeltDesktop::RenderQueue*>(mCanvasQueue)) before->finish();
+    auto* const before = QeltDesktop::RenderQueue::ifAlive(mCanvasQueue);
+    if (before != nullptr && !before->finish()) {
+      QeltDesktop::logError("a drawable changed its render queue where the old one could not be waited for");
+    }
     mCanvasQueue = queue;
   }
   prepareDrawableRT();

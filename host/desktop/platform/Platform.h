@@ -11,7 +11,7 @@ namespace QeltDesktop {
 // library, and the log. A folder beside this header implements it for one system; CMake's QELT_PLATFORM says
 // which one is built.
 
-// What a context shows its pictures on: its framebuffer 0.
+// Where a context shows its pictures: its default framebuffer (0).
 struct Surface {
   // Which window, as the platform names it (a browser's canvas, by its selector). Linux has no windows: its
   // surfaces lie off screen, and only a reader of pixels sees them.

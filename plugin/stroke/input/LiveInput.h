@@ -44,9 +44,10 @@ void takeMove(const MotionEvent& event, const SampleCleaner& cleaner, Take&& tak
   take(current);
 }
 
-// At most how many stamps a move will place every `spacing` stroke units, when the pen stands at `mid` and
-// was last seen at `last`. Room for them is made at once, since a batch that grows from segment to segment is
-// copied again and again. Curves are no longer than the way from point to point.
+// For how many stamps a move should make room: about as many as it places, one every `spacing` stroke units,
+// but at most 8192. The pen stands at `mid` and was last seen at `last`. Room is made at once, since a batch
+// that grows from segment to segment is copied again and again. Curves are no longer than the way from point
+// to point.
 inline int stampsOfMove(const MotionEvent& event, PointF mid, PointF last, float spacing) {
   constexpr float kMostAtOnce = 8192.0f;  // 2 MB; beyond it the batch grows by doubling
   const int history = event.GetHistorySize();

@@ -13,7 +13,7 @@ struct PenSample {
   float orientation;  // radians, clockwise from up
 };
 
-// Whether segments are smoothed through the middles between samples, or run straight from sample to sample.
+// Whether segments are curves from mid point to mid point, or run straight from input point to input point.
 enum class Smoothing { Curve, Straight };
 
 // False for a point that is not finite, or too far off to draw to. Such points are dropped.

@@ -42,7 +42,7 @@ struct SampleCleaner {
   static float orientation(float reported) { return isUsableCoordinate(reported) ? reported : 0.0f; }
 };
 
-// A stylus on a touch screen reports no pressure.
+// Whether the tool is a stylus on a touch screen, which reports no pressure worth using.
 inline bool isTouchStylus(int toolType, int source) {
   return toolType == kToolStylus && source == kSourceTouchScreen;
 }

@@ -100,7 +100,7 @@ class StrokeSource {
 
   void prepare(const SampleCleaner&) {}
 
-  // Carries the pressure as stored, whatever the tool; the pen's `endPen` substitutes it.
+  // Carries the pressure as stored, whatever the tool; `StampPen::endPen` substitutes it.
   MotionEvent upEvent(const SampleCleaner& cleaner) const {
     const int last = count() - 1;
     const PointF at = point(last);

@@ -15,7 +15,7 @@ namespace Qelt {
 
 // Places the stamps of a stroke, one segment after another: every drawable of the pencil does it through this
 // class, and its row says what differs. Owns what goes on from segment to segment: the path, the count of
-// stamps, where the next one lies, and the bounds.
+// stamps, how far into the next segment its first stamp lies, and the call's bound.
 //
 // Once per call of the drawable `beginCall`, once per stroke `begin`; then, for each segment, the path is
 // extended and one of `placeSpaced`, `placeEvenly` and `placeOne` called. Main thread; allocates only where
@@ -42,8 +42,8 @@ class SegmentPlacer {
   SegmentPath& path() { return mPath; }
   const SegmentPath& path() const { return mPath; }
 
-  // Stamps every `spacing` along the path's segment, the leftover carried to the next one. True when there
-  // was one.
+  // Stamps every `spacing` along the path's segment, the leftover carried to the next one. True when at least
+  // one stamp was placed or, beyond the call's bound, left out.
   bool placeSpaced(float length, float spacing, const SegmentLook& look, RectF* rect) {
     return place(spacedStamps(mCarried, spacing, length), length, look, rect, [&](auto& run, int most) {
       const WalkResult walk = walkSpaced(mPath.path(), mCarried, spacing, length, most, run);
@@ -53,13 +53,14 @@ class SegmentPlacer {
   }
 
   // `count` stamps along the path's segment; the next segment begins with a stamp at its own start. True when
-  // there was one.
+  // at least one stamp was placed or, beyond the call's bound, left out.
   bool placeEvenly(float length, int count, const SegmentLook& look, RectF* rect) {
     return place(std::min(count, kMostStampsPerSegment), length, look, rect,
                  [&](auto& run, int most) { return walkEvenly(mPath.path(), count, length, most, run); });
   }
 
-  // One stamp at the last point, whatever the path. The bounds do not count it.
+  // One stamp at the last point, whatever the path. It does not count towards the call's bound
+  // (StampLimits.h).
   void placeOne(const SegmentLook& look, RectF* rect) {
     Appender appender(*mRenderDrawable, 1);
     StampRun<Version> run(appender, look, mStamps);

@@ -11,9 +11,9 @@
 
 namespace Qelt {
 
-// What placing stamps takes from a row: the drawable's name, for the log; the render drawable that the stamps
-// go to; and in the profile how a running width and alpha are handed over, and how far the stamp reaches.
-// Outlines have no alpha.
+// What placing stamps takes from a row: the drawable's name, for the log; its render drawable; and rules for
+// what a stamp is handed over with at the width and alpha that the ramps have reached, and how far it
+// reaches. Outlines have no alpha.
 template <typename Version>
 concept StampRow = requires(float running) {
   { Version::name } -> std::convertible_to<const char*>;
@@ -25,8 +25,8 @@ concept StampRow = requires(float running) {
   { Version::profile.stampAlpha(running) } -> std::same_as<float>;
 });
 
-// Gathers the squares around the stamps of a segment, so that the caller's rectangle is touched once a
-// segment: growing takes minimum and maximum, so the order does not matter. Stroke units.
+// Gathers the squares around the stamps of a segment, so that the caller's rectangle is grown once per
+// segment. Growing is minimum and maximum, so the order does not matter. Stroke units.
 class DirtyBox {
  public:
   void add(float x, float y, float reach) {
@@ -63,7 +63,7 @@ class StampCounter {
   // The shape of the next stamp, 0 to 2.
   int next() {
     const int shape = mCount % kShapes;
-    // The shapes go on taking turns past the largest count, which is shape 1; only the count is off.
+    // Past the largest count, whose shape is 1, the count begins again at 2: the shapes stay in turn.
     mCount = mCount == INT32_MAX ? 2 : mCount + 1;
     return shape;
   }
@@ -72,7 +72,7 @@ class StampCounter {
   std::int32_t mCount;
 };
 
-// The rotation axis of stamps at a pen orientation (radians).
+// The direction of stamps at a pen orientation in radians: a unit vector.
 inline Vector2<float> stampDirection(float orientation) {
   float sine, cosine;
   sincosf(orientation, &sine, &cosine);
@@ -80,7 +80,7 @@ inline Vector2<float> stampDirection(float orientation) {
 }
 
 // What the stamps of one segment look like: where width and alpha stand at the first stamp, and by how much
-// they change from stamp to stamp; narrowing and rotation are the same for all of them.
+// they change from stamp to stamp; tilt blend and direction are the same for all of them.
 struct SegmentLook {
   float width, alpha;
   float widthStep, alphaStep;
@@ -127,7 +127,8 @@ class StampRun {
     advance();
   }
 
-  // From here on the batch holds all stamps, and `rect` their area. `path`: the segment's.
+  // Call after the last stamp: from then on the batch holds all stamps, and `rect` takes in their area.
+  // `path` is the segment's.
   void finish(const SmPath& path, RectF* rect) {
     mAppender.flush();
     mBox.uniteInto(rect);
