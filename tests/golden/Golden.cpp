@@ -173,7 +173,9 @@ void expectGoldenPicture(const GreyPicture& picture, const std::string& file) {
   EXPECT_LE(difference.farOff, 0.01) << file;
   const Approvals approvals = readApprovals();
   const auto approved = approvals.find({file, picture.renderer});
-  if (approved != approvals.end()) EXPECT_EQ(sumOf(picture), approved->second) << file;
+  if (approved != approvals.end()) {
+    EXPECT_EQ(sumOf(picture), approved->second) << file;
+  }
   if (testing::Test::HasFailure()) {
     const std::string drawn = testing::TempDir() + file;
     writePgm(drawn, picture);

@@ -115,9 +115,21 @@ TEST(Drawables, PrepareAndReleaseTheirPartnerThroughAQueueThatMayRefuse) {
   }
 }
 
-// The queue still has work for the partner, and takes no more: then the partner goes after that work, or
+TEST(Drawables, DoNotAskAQueueThatIsGoneWithItsCanvas) {
+  PenDataManager manager(nullptr);
+  PlainGL drawable(&manager, nullptr);
+  for (int i = 0; i < 2; ++i) {
+    const auto queue = std::make_unique<RenderQueue>(RenderQueue::Mode::Caller, RenderQueue::GL::None);
+    PenCanvas canvas(queue.get(), nullptr);
+    drawable.SetCanvas(&canvas);
+    EXPECT_EQ(RenderQueue::ifAlive(queue.get()), queue.get());
+    drawable.SetCanvas(nullptr);
+  }
+}
+
+// The queue still has work for the render drawable, and takes no more: then that goes after that work, or
 // stays where nobody could wait for it.
-TEST(Drawables, APartnerOutlivesItsWorkHoweverItsQueueEnds) {
+TEST(Drawables, ARenderDrawableOutlivesItsWorkHoweverItsQueueEnds) {
   const QeltTests::LogCapture log;
   Notes notes;
   {

@@ -153,7 +153,9 @@ TEST(SmPath, QueriesInAnyOrderAnswerTheSame) {
   for (std::size_t i = 0; i <= kCount; ++i) {
     rising.push_back(at(i));
     // No step is longer than the way along the path.
-    if (i > 0) ASSERT_LE(std::hypot(at(i).x - rising[i - 1].x, at(i).y - rising[i - 1].y), step + 0.002f);
+    if (i > 0) {
+      ASSERT_LE(std::hypot(at(i).x - rising[i - 1].x, at(i).y - rising[i - 1].y), step + 0.002f);
+    }
   }
   EXPECT_NEAR(rising.back().x, 10.0f, 1e-3f);
   std::mt19937 bits(7);
