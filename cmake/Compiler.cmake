@@ -2,6 +2,10 @@
 # reorder it, on any processor.
 add_compile_options(-ffp-contract=off -Wall -Wextra -Wshadow -Wnon-virtual-dtor -Werror=missing-field-initializers
                     -Werror=return-type)
+if(CMAKE_UNITY_BUILD)
+  # Several sources as one look to GCC like one header's; then it warns of types that only one source knows.
+  add_compile_options(-Wno-subobject-linkage)
+endif()
 if(QELT_WERROR)
   add_compile_options(-Werror)
 endif()

@@ -36,7 +36,8 @@ qelt_compile_as_test(qelt_test_headers)
 add_custom_target(qelt_threaded_tests)
 
 # qelt_add_tests(TARGET SOURCES ... [LIBRARIES ...] [LABEL ...] [SHARDS N]): one executable of GoogleTest
-# cases, each of them a test of ctest's. The label "threaded" marks what ./check runs under ThreadSanitizer.
+# cases, each of them a test of ctest's. The label "threaded" marks what ./check runs under ThreadSanitizer, "long" what
+# ./check --quick leaves out and what is begun first.
 # Under an emulator or a sanitizer, where starting a program takes longer than most cases, one test of ctest's
 # runs them all, or SHARDS of them share the cases.
 function(qelt_add_tests target)
@@ -49,6 +50,10 @@ function(qelt_add_tests target)
   qelt_compile_as_test(${target})
   if(arg_LABEL STREQUAL threaded)
     add_dependencies(qelt_threaded_tests ${target})
+  endif()
+  set(properties LABELS ${arg_LABEL} COST 0)
+  if(arg_LABEL STREQUAL long)
+    set(properties LABELS long COST 1000)
   endif()
   # A test that needs a GL context takes the software renderer; a loaded machine may need minutes to start it.
   set(environment "EGL_PLATFORM=surfaceless")
@@ -63,13 +68,13 @@ function(qelt_add_tests target)
         string(APPEND name .${shard})
       endif()
       add_test(NAME ${name} COMMAND ${target})
-      set_tests_properties(${name} PROPERTIES TIMEOUT 900 LABELS ${arg_LABEL}
+      set_tests_properties(${name} PROPERTIES TIMEOUT 900 ${properties}
         ENVIRONMENT "${environment};GTEST_TOTAL_SHARDS=${arg_SHARDS};GTEST_SHARD_INDEX=${index}")
     endforeach()
   else()
     gtest_discover_tests(${target}
       NO_PRETTY_VALUES
       DISCOVERY_TIMEOUT 120
-      PROPERTIES TIMEOUT 300 LABELS ${arg_LABEL} ENVIRONMENT ${environment})
+      PROPERTIES TIMEOUT 300 ${properties} ENVIRONMENT ${environment})
   endif()
 endfunction()

@@ -182,7 +182,7 @@ TEST_P(Layer, SaysClearlyWhatCannotBeDrawn) {
 }
 
 // A bitmap's owner, filling it again when told to, as pens do.
-class PatternOwner : public Qelt::ManagedObject {
+class PatternOwner final : public Qelt::ManagedObject {
  public:
   PatternOwner() {
     bitmap = Qelt::SPGraphicsFactory::CreateBitmap(nullptr, 4, 4, nullptr, false, 0);

@@ -394,6 +394,7 @@ TEST(Samples, ComeOutBitForBit) {
   const Samples samples = strokes.back().samples;
   ASSERT_EQ(samples.size(), in.size());
   for (std::size_t i = 0; i < in.size(); ++i)
+    // To the last bit. NOLINTNEXTLINE(bugprone-suspicious-memory-comparison)
     EXPECT_EQ(std::memcmp(valuesOf(in[i]).data(), valuesOf(samples[i]).data(), 6 * sizeof(double)), 0) << i;
 }
 

@@ -194,6 +194,7 @@ std::size_t bytes(std::align_val_t alignment) {
 }  // namespace
 
 // Both of a form: for one and for many.
+// NOLINTBEGIN(bugprone-macro-parentheses): parameter lists are not expressions.
 #define QELT_NEW(PARAMETERS, MEMORY) \
   void* operator new PARAMETERS {    \
     return MEMORY;                   \
@@ -220,3 +221,4 @@ QELT_DELETE((void* memory, const std::nothrow_t&))
 QELT_DELETE((void* memory, std::align_val_t))
 QELT_DELETE((void* memory, std::size_t, std::align_val_t))
 QELT_DELETE((void* memory, std::align_val_t, const std::nothrow_t&))
+// NOLINTEND(bugprone-macro-parentheses)
