@@ -262,9 +262,17 @@ Definitions::Definitions(const SourceText& source) : mSource(source) {
 }
 
 const char* Definitions::keptText(std::string_view text) {
-  char* const kept = static_cast<char*>(mTexts.allocate(text.size() + 1, 1));
-  kept[text.copy(kept, text.size())] = '\0';
-  return kept;
+  constexpr std::size_t kFirst = 1 << 10, kLargest = 1 << 16;
+  const std::size_t size = text.size() + 1;
+  if (mTexts.empty() || mTexts.back().capacity() - mTexts.back().size() < size) {
+    const std::size_t usual = mTexts.empty() ? kFirst : std::min(2 * mTexts.back().capacity(), kLargest);
+    mTexts.emplace_back().reserve(std::max(usual, size));
+  }
+  std::vector<char>& block = mTexts.back();
+  const std::size_t at = block.size();
+  block.insert(block.end(), text.begin(), text.end());
+  block.push_back('\0');
+  return block.data() + at;
 }
 
 std::uint32_t Definitions::keptReference(const Reference& reference) {

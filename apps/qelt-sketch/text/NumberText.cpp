@@ -1,6 +1,7 @@
 #include "text/NumberText.h"
 
 #include <locale.h>
+#include <array>
 #include <charconv>
 #include <cmath>
 #include <cstddef>
@@ -24,12 +25,9 @@ double fromPlain(const char* text, double) {
   return strtod_l(text, nullptr, plainLocale());
 }
 
+#ifdef __cpp_lib_to_chars
 template <typename Number>
-std::optional<Number> parse(std::string_view text) {
-  if (!text.empty() && text.front() == '+') {
-    text.remove_prefix(1);
-    if (text.empty() || text.front() == '-') return std::nullopt;
-  }
+std::optional<Number> parsePlain(std::string_view text) {
   Number value{};
   const char* const end = text.data() + text.size();
   const auto [stop, error] = std::from_chars(text.data(), end, value);
@@ -37,6 +35,50 @@ std::optional<Number> parse(std::string_view text) {
   // from_chars reports too large and too small alike and leaves the value alone; strtof tells them apart.
   if (error == std::errc::result_out_of_range) return fromPlain(std::string(text).c_str(), Number{});
   return value;
+}
+
+std::string_view print(float value, std::array<char, 32>& text) {
+  const auto [end, error] = std::to_chars(text.data(), text.data() + text.size(), value);
+  static_cast<void>(error);  // 32 characters hold any float
+  return {text.data(), static_cast<std::size_t>(end - text.data())};
+}
+#else
+// This C++ library has neither for floating point.
+template <typename Number>
+std::optional<Number> parsePlain(std::string_view text) {
+  // What strtof reads beyond from_chars: white space and a plus in front, hexadecimal digits, "nan(...)".
+  const std::size_t first = text.find_first_not_of('-');
+  if (first > 1 || text[first] == '+' || text.find_first_of("xX( \t\n\v\f\r") != std::string_view::npos) {
+    return std::nullopt;
+  }
+  const std::string copy(text);
+  char* stop = nullptr;
+  Number value{};
+  if constexpr (sizeof value == sizeof(float)) {
+    value = strtof_l(copy.c_str(), &stop, plainLocale());
+  } else {
+    value = strtod_l(copy.c_str(), &stop, plainLocale());
+  }
+  return stop == copy.c_str() + copy.size() ? std::optional(value) : std::nullopt;
+}
+
+std::string_view print(float value, std::array<char, 32>& text) {
+  int length = 0;
+  for (int digits = 1; digits <= 9; ++digits) {
+    length = std::snprintf(text.data(), text.size(), "%.*g", digits, static_cast<double>(value));
+    if (fromPlain(text.data(), value) == value) break;
+  }
+  return {text.data(), static_cast<std::size_t>(length)};
+}
+#endif
+
+template <typename Number>
+std::optional<Number> parse(std::string_view text) {
+  if (!text.empty() && text.front() == '+') {
+    text.remove_prefix(1);
+    if (text.empty() || text.front() == '-') return std::nullopt;
+  }
+  return parsePlain<Number>(text);
 }
 
 std::optional<unsigned int> parseHexColor(std::string_view text, std::size_t digits) {
@@ -76,10 +118,8 @@ void appendJson(std::string& out, float value) {
     out += value > 0.0f ? "\"Infinity\"" : "\"-Infinity\"";
     return;
   }
-  char text[32];
-  const auto [end, error] = std::to_chars(text, text + sizeof text, value);
-  static_cast<void>(error);  // 32 characters hold any float
-  const std::string_view digits(text, static_cast<std::size_t>(end - text));
+  std::array<char, 32> text;
+  const std::string_view digits = print(value, text);
   out += digits;
   if (digits.find_first_of(".e") == std::string_view::npos) out += ".0";
 }
