@@ -18,11 +18,11 @@ locale_t plainLocale() {
   return kPlain;
 }
 
-float fromPlain(const char* text, float) {
-  return strtof_l(text, nullptr, plainLocale());
+float fromPlain(const char* text, float, char** stop = nullptr) {
+  return strtof_l(text, stop, plainLocale());
 }
-double fromPlain(const char* text, double) {
-  return strtod_l(text, nullptr, plainLocale());
+double fromPlain(const char* text, double, char** stop = nullptr) {
+  return strtod_l(text, stop, plainLocale());
 }
 
 #ifdef __cpp_lib_to_chars
@@ -46,19 +46,14 @@ std::string_view print(float value, std::array<char, 32>& text) {
 // This C++ library has neither for floating point.
 template <typename Number>
 std::optional<Number> parsePlain(std::string_view text) {
-  // What strtof reads beyond from_chars: white space and a plus in front, hexadecimal digits, "nan(...)".
+  // What strtof reads beyond from_chars: white space and a plus in front, and hexadecimal digits.
   const std::size_t first = text.find_first_not_of('-');
-  if (first > 1 || text[first] == '+' || text.find_first_of("xX( \t\n\v\f\r") != std::string_view::npos) {
+  if (first > 1 || text[first] == '+' || text.find_first_of("xX \t\n\v\f\r") != std::string_view::npos) {
     return std::nullopt;
   }
   const std::string copy(text);
   char* stop = nullptr;
-  Number value{};
-  if constexpr (sizeof value == sizeof(float)) {
-    value = strtof_l(copy.c_str(), &stop, plainLocale());
-  } else {
-    value = strtod_l(copy.c_str(), &stop, plainLocale());
-  }
+  const Number value = fromPlain(copy.c_str(), Number{}, &stop);
   return stop == copy.c_str() + copy.size() ? std::optional(value) : std::nullopt;
 }
 
