@@ -36,9 +36,8 @@ export class Engine {
   constructor(module, canvas, gl) {
     this.#module = module;
     this.#canvas = canvas;
-    module.specialHTMLTargets ||= [];
-    module.specialHTMLTargets['!page'] = canvas;
-    const selector = this.#bytes(new TextEncoder().encode('!page\0'));
+    // The compiled code looks the canvas up by its id, and gets the context that it has.
+    const selector = this.#bytes(new TextEncoder().encode(`#${canvas.id}\0`));
     this.#call('open', selector, canvas.width, canvas.height);
     const real = gl.getExtension('WEBGL_debug_renderer_info');
     this.renderer = gl.getParameter(real ? real.UNMASKED_RENDERER_WEBGL : gl.RENDERER);
