@@ -96,7 +96,7 @@ TEST(InkmlWriter, WritesWhatReadsBackBitForBit) {
       if (any.below(2) != 0) brush.width = std::fabs(any()) + 1e-30f;
       if (any.below(2) != 0) brush.rgb = any.below(0x1000000);
       if (any.below(2) != 0) brush.transparency = static_cast<std::uint8_t>(any.below(256));
-      if (any.below(2) != 0) brush.renderingVersion = static_cast<int>(any.below(12)) - 2;
+      if (any.below(2) != 0) brush.renderingVersion = 1 + static_cast<int>(any.below(99));
       if (any.below(2) != 0) brush.curve = any.below(2) != 0;
       if (any.below(2) != 0) brush.outlineSize = any.between(0.1f, 50.0f);
       if (any.below(2) != 0) brush.outlineArgb = any.below(0xFFFFFFFF);

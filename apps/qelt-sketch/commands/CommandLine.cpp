@@ -184,6 +184,10 @@ void addPen(CLI::App& app, Options& options) {
 void addFeeding(CLI::App& app, Options& options) {
   app.add_flag_callback(
       "--no-curve", [&options] { options.curve = false; }, "straight segments");
+  app.add_flag_callback(
+         "--curve", [&options] { options.curve = true; },
+         "smooth segments (default: the stroke's, else smooth)")
+      ->excludes("--no-curve");
   addValue<Mode>(app, "--mode", options.mode, oneOf(kModeNames),
                  withDefault("how strokes reach the plug-in", nameOf(kDefaults.mode)));
   addValue<int>(app, "--batch", options.samplesPerMove, kCount,
@@ -197,7 +201,7 @@ void addFeeding(CLI::App& app, Options& options) {
 
 void addDrawing(CLI::App& app, Options& options) {
   addValue<int>(app, "--rendering-version", options.renderingVersion, kInteger,
-                withDefault("of the pen", numberText(kDefaults.renderingVersion)));
+                "of the pen (default: the stroke's, else " + numberText(kUsualRenderingVersion) + ")");
   addPen(app, options);
   addFeeding(app, options);
   addValue<int>(app, "--repeat", options.repeat, kCount,
@@ -211,7 +215,7 @@ void addDrawing(CLI::App& app, Options& options) {
   addValue<Background>(app, "--background", options.background, kBackground,
                        "default " + backgroundName(kDefaults.background));
   addValue<OutlineOptions>(app, "--outline", options.outline, kOutline,
-                           "draw every stroke's outline under the strokes");
+                           "draw every stroke's outline under the strokes (default: those of the file)");
   addValue<int>(
       app, "--predict", options.predict, kPredictionCount,
       "live: K predicted samples, at most " + std::to_string(kMostPredicted) + ", after every move event");

@@ -70,8 +70,7 @@ std::string inputPath(const Options& options) {
 
 // The margin of a page that is drawn or traced with all its options.
 float marginFor(const PluginLibrary& plugin, RenderQueue& queue, const Page& page, const Options& options) {
-  return pageMargin(largestPenSize(plugin, queue, page, options),
-                    options.outline ? options.outline->size : 0.0f);
+  return pageMargin(largestPenSize(plugin, queue, page, options), largestOutlineSize(page, options));
 }
 
 std::size_t strokesToPlay(const Page& page, const Options& options) {
@@ -90,20 +89,22 @@ void draw(const Options& options) {
 
   Progress progress("drawing stroke", strokesToPlay(page, options));
   const Picture picture = drawPage(plugin, queue, page, options, layOut(area, options.zoom, options.rotate),
-                                   drawablesFor(options), progress);
+                                   drawablesFor(page, options), progress);
   file.write(encodePng(picture));
   file.commit();
 }
 
-std::string traceHeader(PenSession& session, const Page& page, const Options& options) {
-  const PenStyle style = styleFor(page.strokes.front().brush, session.ownStyle(), options);
-  const bool curve = session.pen().GetMorphable()->IsCurveEnabled();
-  std::string line = R"({"kind":"header","renderingVersion":)" + std::to_string(options.renderingVersion);
+// It tells how the first stroke is drawn.
+std::string traceHeader(const PenSet& pens, const Page& page, const Options& options) {
+  const Brush brush = page.strokes.front().brush;
+  const int version = renderingVersionFor(brush, options);
+  const PenStyle style = styleFor(brush, pens.of(version).ownStyle(), options);
+  std::string line = R"({"kind":"header","renderingVersion":)" + std::to_string(version);
   line += R"(,"size":)";
   appendJson(line, style.size);
   line += R"(,"color":")" + formatArgb(style.argb);
   line += R"(","curve":)";
-  line += curve ? "true" : "false";
+  line += curveFor(brush, options) ? "true" : "false";
   line += R"(,"mode":")";
   line += nameOf(options.mode);
   line += R"(","drawable":")";
@@ -128,7 +129,7 @@ void trace(const Options& options) {
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
   Progress progress("tracing stroke", strokesToPlay(page, options));
-  CallRecorder recorder(queue, file, progress, options.drawable, options.renderingVersion);
+  CallRecorder recorder(queue, file, progress, options.drawable);
 
   PenCanvas canvas(&queue, nullptr);
   const PageArea area = pageArea(page, options.page, marginFor(plugin, queue, page, options));
@@ -136,9 +137,9 @@ void trace(const Options& options) {
   if (options.points) cutLastStroke(page, *options.points);
 
   {
-    PenSession session(plugin, queue, options);
-    PagePlayer player(session, page, options, canvasesFor(options.drawable, canvas));
-    file.write(traceHeader(session, page, options));
+    const PenSet pens(plugin, queue, page, options);
+    PagePlayer player(pens, page, options, canvasesFor(options.drawable, canvas));
+    file.write(traceHeader(pens, page, options));
     player.play(recorder);
   }
   file.commit();
@@ -201,7 +202,9 @@ void sheet(const Options& asked) {
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
 
-  const PageArea area = pageArea(page, std::nullopt, marginFor(plugin, queue, page, options));
+  // Without outlines.
+  const float margin = pageMargin(largestPenSize(plugin, queue, page, options), 0.0f);
+  const PageArea area = pageArea(page, std::nullopt, margin);
   const double fit = std::min({1.0, kWidestCell / area.width, kHighestCell / area.height});
   const PageLayout layout = layOut(area, static_cast<float>(fit), 0.0f);
 
@@ -276,7 +279,7 @@ void info(const Options& options) {
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
   std::printf("GL renderer  %s\n", queue.rendererName().c_str());
 
-  PenSession session(plugin, queue, options);
+  PenSession session(plugin, queue, kUsualRenderingVersion);
   const PenStyle& style = session.ownStyle();
   std::printf("pen size     %g to %g, a new pen has %g\n", static_cast<double>(session.pen().GetMinSize()),
               static_cast<double>(session.pen().GetMaxSize()), static_cast<double>(style.size));

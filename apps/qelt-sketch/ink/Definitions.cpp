@@ -13,6 +13,9 @@
 namespace QeltDesktop {
 namespace {
 
+// Far above those that any pen has.
+constexpr int kHighestVersion = 99;
+
 void readBrushProperty(const SourceText& source, const XmlElement& element, Brush& brush) {
   const std::string name = element.text("name");
   const std::string value = element.text("value");
@@ -40,7 +43,11 @@ void readBrushProperty(const SourceText& source, const XmlElement& element, Brus
     brush.transparency = static_cast<std::uint8_t>(std::lround(*transparency));
   } else if (name == "renderingVersion") {
     const std::optional<int> version = parseInt(value);
-    if (!version) throw malformed("brush renderingVersion must be a whole number");
+    // Each takes a pen of its own, so a page must not name any number of them.
+    if (!version || *version < 1 || *version > kHighestVersion) {
+      throw malformed("brush renderingVersion must be a whole number from 1 to " +
+                      std::to_string(kHighestVersion));
+    }
     brush.renderingVersion = version;
   } else if (name == "curve") {
     const bool on = value == "true" || value == "1";

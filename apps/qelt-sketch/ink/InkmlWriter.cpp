@@ -137,7 +137,7 @@ class Writer {
       return digits;
     };
     if (brush.width) property("width", length(*brush.width));
-    if (brush.rgb) property("color", "#" + formatArgb(*brush.rgb).substr(3));
+    if (brush.rgb) property("color", formatArgb(*brush.rgb).erase(1, 2));
     if (brush.transparency) property("transparency", std::to_string(int{*brush.transparency}));
     if (brush.renderingVersion) property("renderingVersion", std::to_string(*brush.renderingVersion));
     if (brush.curve) property("curve", *brush.curve ? "true" : "false");
