@@ -15,11 +15,13 @@
 #include <string>
 #include <system_error>
 
+#include "commands/CommandLine.h"
+#include "commands/PageInput.h"
 #include "desktop/engine/PluginLibrary.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/graphics/PenCanvas.h"
 #include "desktop/platform/Platform.h"
-#include "ink/InkmlReader.h"
+#include "ink/InkmlWriter.h"
 #include "output/LabelFont.h"
 #include "output/OutputFile.h"
 #include "output/Picture.h"
@@ -77,9 +79,34 @@ std::size_t strokesToPlay(const Page& page, const Options& options) {
   return page.strokes.size() * static_cast<std::size_t>(options.repeat);
 }
 
-void draw(const Options& options) {
-  Page page = readInkmlFile(inputPath(options));
+// The page, with the options that the picture was drawn with where it is one.
+Page readPage(Options& options) {
+  PageInput input = readPageInput(inputPath(options));
+  if (input.drawnWith) options = withInstruction(options, input.page.name, *input.drawnWith);
+  return std::move(input.page);
+}
+
+// What a picture of the page carries, so that it can be drawn again from nothing else.
+PictureText inkOf(const Page& page, Options options) {
+  // Strokes without a rendering version look the same when another one has become usual.
+  const bool someHaveTheirOwn =
+      std::any_of(page.strokes.begin(), page.strokes.end(),
+                  [](const Stroke& stroke) { return stroke.brush.renderingVersion.has_value(); });
+  if (!options.renderingVersion && !someHaveTheirOwn) options.renderingVersion = kUsualRenderingVersion;
+  PictureText ink{.keyword = kInkKeyword, .text = writeInkml(page.strokes)};
+  ink.text += std::string("<?") + kInstructionTarget + instructionFor(options) + "?>\n";
+  if (ink.text.size() > kMostInkBytes) {
+    throw Refusal(page.name + ": too large to go with its picture: " + std::to_string(ink.text.size()) +
+                  " bytes as InkML, at most " + std::to_string(kMostInkBytes) + "; --no-ink leaves it out");
+  }
+  return ink;
+}
+
+void draw(const Options& asked) {
+  Options options = asked;
+  Page page = readPage(options);
   OutputFile file(options.output, page.name);
+  const PictureText ink = options.ink ? inkOf(page, options) : PictureText{};
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
 
@@ -90,7 +117,7 @@ void draw(const Options& options) {
   Progress progress("drawing stroke", strokesToPlay(page, options));
   const Picture picture = drawPage(plugin, queue, page, options, layOut(area, options.zoom, options.rotate),
                                    drawablesFor(page, options), progress);
-  file.write(encodePng(picture));
+  file.write(encodePng(picture, ink));
   file.commit();
 }
 
@@ -123,8 +150,9 @@ Canvases canvasesFor(DrawableKind wanted, PenCanvas& canvas) {
   return canvases;
 }
 
-void trace(const Options& options) {
-  Page page = readInkmlFile(inputPath(options));
+void trace(const Options& asked) {
+  Options options = asked;
+  Page page = readPage(options);
   OutputFile file(options.output, page.name);
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
@@ -197,7 +225,7 @@ void sheet(const Options& asked) {
   constexpr std::uint32_t kPaper = 0xE8E8E8, kInk = 0x404040;
 
   Options options = asked;
-  const Page page = readInkmlFile(inputPath(options));
+  const Page page = readPage(options);
   OutputFile file(options.output, page.name);
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);

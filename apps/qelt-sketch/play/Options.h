@@ -5,6 +5,7 @@
 #include <optional>
 #include <string>
 #include <utility>
+#include <vector>
 
 #include "pen/RenderingVersions.h"
 
@@ -60,9 +61,13 @@ constexpr bool kUsualCurve = true;
 
 // What the command line asks for. The defaults stand here alone; the help takes them from here.
 struct Options {
+  // As it was written, to be read once more over what a picture says.
+  std::vector<std::string> commandLine;
+
   Command command = Command::Draw;
   std::optional<std::string> input;   // none: the sample page
   std::string output;                 // "-": standard output
+  bool ink = true;                    // the picture carries the page that it shows
   std::optional<std::string> plugin;  // none: the one built with the program
   bool log = false;                   // show the platform log
 
