@@ -25,10 +25,14 @@ constexpr std::string_view kPngSignature("\x89PNG\r\n\x1A\n", 8);
 class PictureReader {
  public:
   PictureReader(const std::string& name, std::string_view png)
-      : mName(name), mDecoder(spng_ctx_new(0), &spng_ctx_free) {
+      : mName(name), mPng(png), mDecoder(spng_ctx_new(0), &spng_ctx_free) {
     if (!mDecoder) throw std::bad_alloc();
     check(spng_set_image_limits(mDecoder.get(), kLongestSide, kLongestSide));
-    check(spng_set_chunk_limits(mDecoder.get(), kMostInkBytes, kMostInkBytes));
+    check(spng_set_crc_action(mDecoder.get(), SPNG_CRC_ERROR, SPNG_CRC_ERROR));
+    // So that a small file cannot fill the memory. Of text that is unpacked, the room that is kept for it
+    // counts, which is doubled whenever it is full.
+    constexpr std::size_t kMostKept = 2 * kMostInkBytes + kMostInkBytes / 2;
+    check(spng_set_chunk_limits(mDecoder.get(), kMostKept, kMostKept));
     check(spng_set_png_buffer(mDecoder.get(), png.data(), png.size()));
   }
 
@@ -49,8 +53,10 @@ class PictureReader {
       if (found != nullptr) throw refusal("the picture carries ink twice");
       found = &text;
     }
-    if (found == nullptr) throw refusal("the picture carries no ink");
+    if (found == nullptr)
+      throw refusal(holdsDamagedInk() ? "the picture's ink is damaged" : "the picture carries no ink");
     if (found->type != SPNG_ITXT) throw refusal("the picture's ink is not in an iTXt chunk");
+    if (found->length > kMostInkBytes) throw refusal("the picture's ink is too large");
     std::string ink(found->text, found->length);
     if (!isUtf8(ink)) throw refusal("the picture's ink is not UTF-8");
     return ink;
@@ -80,7 +86,13 @@ class PictureReader {
 
   Refusal refusal(const std::string& what) const { return Refusal(mName + ": " + what); }
 
+  // The decoder passes over text that it cannot read.
+  bool holdsDamagedInk() const {
+    return mPng.find("iTXt" + std::string(kInkKeyword) + '\0') != std::string_view::npos;
+  }
+
   const std::string& mName;
+  const std::string_view mPng;
   const std::unique_ptr<spng_ctx, void (*)(spng_ctx*)> mDecoder;
 };
 

@@ -9,10 +9,9 @@
 
 namespace QeltDesktop {
 
-// The keyword of the text chunk (iTXt) in which a picture carries its page, and the most bytes of text that
-// it may hold, so that a small file cannot fill the memory.
+// The keyword of the text chunk (iTXt) in which a picture carries its page, and the most bytes of text in it.
 constexpr const char* kInkKeyword = "InkML";
-constexpr std::size_t kMostInkBytes = std::size_t{256} << 20;
+constexpr std::size_t kMostInkBytes = std::size_t{128} << 20;
 
 // The processing instruction behind a page in a picture, which holds the options that it was drawn with.
 constexpr const char* kInstructionTarget = "qelt-sketch";
