@@ -5,8 +5,10 @@
 #include <charconv>
 #include <cmath>
 #include <cstddef>
+#include <cstdint>
 #include <cstdio>
 #include <cstdlib>
+#include <limits>
 #include <string>
 #include <system_error>
 
@@ -86,7 +88,79 @@ std::optional<unsigned int> parseHexColor(std::string_view text, std::size_t dig
   return value;
 }
 
+// `digits` / 10^`places`, as a decimal.
+void appendFixed(std::string& out, bool negative, std::uint64_t digits, std::size_t places) {
+  char text[24];
+  const auto [end, error] = std::to_chars(text, text + sizeof text, digits);
+  static_cast<void>(error);  // 24 characters hold any of them
+  const std::string_view written(text, static_cast<std::size_t>(end - text));
+  if (negative) out += '-';
+  if (written.size() > places) {
+    out += written.substr(0, written.size() - places);
+  } else {
+    out += '0';
+  }
+  if (places == 0) return;
+  out += '.';
+  if (written.size() < places) out.append(places - written.size(), '0');
+  out += written.size() > places ? written.substr(written.size() - places) : written;
+}
+
+// Appends the decimal near `value` with the fewest digits after the point for which `isRight` holds, given
+// the double nearest to it; false if none has so few digits in all.
+template <typename IsRight>
+bool appendShort(std::string& out, double value, double mostDigits, const IsRight& isRight) {
+  constexpr std::size_t kMostPlaces = 16;
+  const double size = std::fabs(value);
+  double scale = 1.0;
+  for (std::size_t places = 0; places <= kMostPlaces; ++places, scale *= 10.0) {
+    const double digits = std::nearbyint(size * scale);
+    if (!(digits < mostDigits)) return false;
+    // Both are exact, so the quotient is the double nearest to the decimal.
+    if (!isRight(std::copysign(digits / scale, value))) continue;
+    appendFixed(out, std::signbit(value), static_cast<std::uint64_t>(digits), places);
+    return true;
+  }
+  return false;
+}
+
+// For numbers of many digits, and for very large and very small ones.
+template <typename Number>
+void appendLong(std::string& out, Number value) {
+  constexpr int kFewest = 6, kMost = std::numeric_limits<Number>::max_digits10;
+  // printf writes the decimal point of the locale.
+  const locale_t before = uselocale(plainLocale());
+  char text[40];
+  for (int digits = kFewest; digits <= kMost; ++digits) {
+    std::snprintf(text, sizeof text, "%.*g", digits, static_cast<double>(value));
+    if (fromPlain(text, Number{}) == value) break;
+  }
+  uselocale(before);
+  out += text;
+}
+
 }  // namespace
+
+void appendDecimal(std::string& out, double value, const std::function<bool(double)>& isRight) {
+  if (!appendShort(out, value, 1e15, isRight)) appendLong(out, value);
+}
+
+void appendNumber(std::string& out, double value) {
+  if (!appendShort(out, value, 1e15, [value](double decimal) { return decimal == value; }))
+    appendLong(out, value);
+}
+
+void appendNumber(std::string& out, float value) {
+  // The decimal is rounded once when it is read. That gives the same float as rounding by way of a double
+  // unless the double lies in the middle between two floats.
+  const auto isRight = [value](double decimal) {
+    constexpr double kInfinity = std::numeric_limits<double>::infinity();
+    return static_cast<float>(decimal) == value &&
+           static_cast<float>(std::nextafter(decimal, -kInfinity)) == value &&
+           static_cast<float>(std::nextafter(decimal, kInfinity)) == value;
+  };
+  if (!appendShort(out, static_cast<double>(value), 1e9, isRight)) appendLong(out, value);
+}
 
 std::optional<float> parseFloat(std::string_view text) {
   return parse<float>(text);
