@@ -50,11 +50,11 @@ class Pencil2 final : public Pen, public IPenMorphable {
   Pencil2PredictionDrawableGL* mPredictionDrawable = nullptr;
   Pencil2OutlineDrawableGL* mOutlineDrawable = nullptr;
   Pencil2PreviewDrawableGL* mPreviewDrawable = nullptr;
-  void* mSpareDrawable = nullptr;     // Kept: never filled
-  Pencil2Data* mData = nullptr;       // see `record`
-  std::int32_t mStrokeVersion = -1;   // that the stroke drawable was made for
-  std::int32_t mOutlineVersion = -1;  // that the outline drawable was made for
-  IGLMsgQueue* mMsgQueue = nullptr;   // last one the data manager gave
+  [[maybe_unused]] void* mSpareDrawable = nullptr;  // Kept: never filled
+  Pencil2Data* mData = nullptr;                     // see `record`
+  std::int32_t mStrokeVersion = -1;                 // that the stroke drawable was made for
+  std::int32_t mOutlineVersion = -1;                // that the outline drawable was made for
+  IGLMsgQueue* mMsgQueue = nullptr;                 // last one the data manager gave
 };
 
 }  // namespace Qelt

@@ -261,6 +261,13 @@ TEST(InkmlReader, RefusesWhatIsMalformedWithFileLineAndValue) {
       {brush("<brushProperty name='color' value='red'/>"), "3: brush color must be #RRGGBB: red"},
       {brush("<brushProperty name='transparency' value='256'/>"),
        "3: brush transparency must be a number from 0 to 255: 256"},
+      {brush("<brushProperty name='renderingVersion' value='100'/>"),
+       "3: brush renderingVersion must be a whole number from 1 to 99: 100"},
+      {brush("<brushProperty name='curve' value='maybe'/>"), "3: brush curve must be true or false: maybe"},
+      {brush("<brushProperty name='outlineSize' value='0'/>"),
+       "3: brush outlineSize must be a number above 0: 0"},
+      {brush("<brushProperty name='outlineColor' value='#102030'/>"),
+       "3: brush outlineColor must be #AARRGGBB: #102030"},
       {"<ink><trace>\n<annotation type='tool'>quill</annotation>0 0</trace></ink>", "2: unknown tool: quill"},
       {"<ink><definitions><traceGroup><annotation type='tool'>x</annotation></traceGroup></definitions>\n"
        "<traceGroup><traceGroup><annotation type='tool'>y</annotation></traceGroup>\n"

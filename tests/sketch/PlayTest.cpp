@@ -99,9 +99,10 @@ TEST(CallRecorder, LeavesNoCallWithoutItsBatches) {
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
   OutputFile file("/dev/null");
   Progress progress("tracing stroke", 1);
-  CallRecorder recorder(queue, file, progress, DrawableKind::Stroke, 8);
+  CallRecorder recorder(queue, file, progress, DrawableKind::Stroke);
   const auto call = [&](const std::function<void()>& task) {
-    recorder.call({DrawableKind::Stroke, 0, "Draw", {}}, [&](Qelt::RectF*) { return postCall(queue, task); });
+    recorder.call({DrawableKind::Stroke, 0, 8, "Draw", {}},
+                  [&](Qelt::RectF*) { return postCall(queue, task); });
   };
   EXPECT_NO_THROW(call([] {}));
   EXPECT_THROW(call([] { throw std::bad_alloc(); }), std::runtime_error);

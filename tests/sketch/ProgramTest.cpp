@@ -363,6 +363,81 @@ TEST_F(Program, DrawsPredictionsWholeAcrossTheBordersOfTiles) {
   EXPECT_LE(differing, 2);
 }
 
+// Strokes of one shape under one another; each may have settings of its own.
+std::string threeStrokes(const std::string& first, const std::string& second, const std::string& third) {
+  std::string page = "<ink>";
+  for (const std::string& settings : {first, second, third}) {
+    page += "<brush><brushProperty name='width' value='5'/>" + settings + "</brush><trace>";
+    for (const char* const point : {"20 0.7", "40 15.1", "60 0.2", "80 18.4", "100 2.9"})
+      page += (page.back() == '>' ? "" : ",") + std::string(point);
+    page += "</trace>";
+  }
+  return page + "</ink>";
+}
+
+std::string setting(const std::string& name, const std::string& value) {
+  return "<brushProperty name='" + name + "' value='" + value + "'/>";
+}
+
+TEST_F(Program, DrawsEachStrokeWithItsOwnSettingsUnlessAskedOtherwise) {
+  const std::string size = setting("outlineSize", "3"), color = setting("outlineColor", "#FF00FF00");
+  write("plain.inkml", threeStrokes("", "", ""));
+  write("own.inkml", threeStrokes(setting("renderingVersion", "3"), setting("curve", "false"), size + color));
+  // The calls of one stroke.
+  const auto calls = [&](const std::string& ink, const std::string& options, int stroke) {
+    std::string found;
+    for (const Json& line : trace(options, ink))
+      if (line["kind"] == "call" && line["stroke"] == stroke) found += line.dump();
+    return found;
+  };
+  for (const std::string mode : {"--mode live", "--mode event", "--mode stroke --repeat 2"}) {
+    const std::string ownWay[] = {" --rendering-version 3", " --no-curve", ""};
+    for (int stroke = 0; stroke < 3; ++stroke)
+      EXPECT_EQ(calls("own.inkml", mode, stroke), calls("plain.inkml", mode + ownWay[stroke], stroke))
+          << mode;
+    const std::string asked = mode + " --rendering-version 5";
+    for (int stroke = 0; stroke < 3; ++stroke)
+      EXPECT_EQ(calls("own.inkml", asked + " --curve", stroke), calls("plain.inkml", asked, stroke)) << mode;
+    const std::string outlines = mode + " --drawable outline", green = " --outline 3,#FF00FF00";
+    EXPECT_EQ(calls("own.inkml", outlines, 2), calls("plain.inkml", outlines + green, 2));
+    EXPECT_EQ(calls("own.inkml", outlines, 0), calls("plain.inkml", outlines + " --rendering-version 3", 0));
+  }
+  expectHas(trace("", "own.inkml")[0], {{"renderingVersion", 3}, {"curve", true}});
+
+  write("outlined.inkml", threeStrokes(size + color, size + color, size + color));
+  EXPECT_EQ(draw("draw outlined.inkml").bytes, draw("draw plain.inkml --outline 3,#FF00FF00").bytes);
+  write("last.inkml", threeStrokes("", "", size + color));
+  const Rgba last = draw("draw last.inkml"), none = draw("draw plain.inkml");
+  EXPECT_NE(last.bytes, draw("draw outlined.inkml").bytes);
+  EXPECT_NE(last.bytes, none.bytes);
+}
+
+TEST_F(Program, DrawsAPictureAgainFromNothingElse) {
+  write("own.inkml", threeStrokes(setting("renderingVersion", "3"), setting("curve", "false"),
+                                  setting("outlineSize", "4") + "<annotation/>"));
+  sh("iconv -f UTF-8 -t UTF-16 own.inkml >own16.inkml");
+  for (const std::string options :
+       {"ink.inkml", "own.inkml --zoom 1.7 --rotate 33 --background transparent", "own16.inkml --mode stroke",
+        "ink.inkml --page 90x60.5 --predict 3 --points 1 --no-curve --tool finger --size 9",
+        "ink.inkml --mode event --outline 2,#8000FF00 --rendering-version 2 --color '#30405060'"}) {
+    const Rgba drawn = draw("draw " + options);
+    EXPECT_EQ(
+        sh("cp drawn.png a.png; cp a.png named.inkml; $sketch draw named.inkml -o b.png && cmp a.png b.png; "
+           "$sketch trace " +
+           options + " -o a.jsonl; $sketch trace a.png -o b.jsonl && cmp a.jsonl b.jsonl")
+            .out,
+        "")
+        << options;
+    EXPECT_EQ(draw("draw " + options + " --no-ink").bytes, drawn.bytes) << options;
+    EXPECT_EQ(contentsOf(path("drawn.png")).find("iTXt"), std::string::npos) << options;
+  }
+  draw("draw ink.inkml --predict 3 --background '#102030'");
+  EXPECT_EQ(sh("$sketch trace drawn.png -o a.jsonl --drawable prediction && wc -l <a.jsonl").out, "4\n");
+  EXPECT_EQ(sh("$sketch sheet drawn.png -o a.png; $sketch sheet ink.inkml -o b.png; cmp a.png b.png").out,
+            "");
+  EXPECT_EQ(run("draw drawn.png -o drawn.png").status, 1);
+}
+
 TEST_F(Program, DrawsThePreviewAndTheSheet) {
   const Rgba preview = draw("preview --size 6 --color '#FF0000FF'");
   // The stroke runs across most of the panel, several pixels wide.
@@ -381,6 +456,7 @@ TEST_F(Program, DrawsThePreviewAndTheSheet) {
 
 TEST_F(Program, SaysWhatCannotBeDoneInOneLineAndLeavesAnOlderFileAlone) {
   write("older.png", "older");
+  write("unsound.png", "\x89PNG\r\n\x1A\n");
   write("bad.inkml", "<ink>\n<trace>1 2, 3 four</trace>\n</ink>");
   const std::pair<std::string, std::string> cases[] = {
       {"draw bad.inkml -o no.png", "bad.inkml:2: not a number: four\n"},
@@ -390,6 +466,7 @@ TEST_F(Program, SaysWhatCannotBeDoneInOneLineAndLeavesAnOlderFileAlone) {
       {"draw ink.inkml --page 40000x1 -o older.png",
        "--page: the picture is too large to draw: 40000 x 1 pixels, at most 32767 a side and 67108864 in "
        "all\n"},
+      {"draw unsound.png -o no.png", "unsound.png: not a sound PNG picture: end of stream\n"},
       {"draw none.inkml -o no.png", "none.inkml: cannot be read: "},
       {"draw ink.inkml -o no/folder/a.png", "no/folder/a.png: cannot be written: "},
       {"draw ink.inkml -o ./", "Is a directory\n"},

@@ -1,14 +1,18 @@
 #include "commands/CommandLine.h"
 
+#include <algorithm>
 #include <array>
 #include <cmath>
 #include <functional>
+#include <iterator>
 #include <sstream>
 #include <string_view>
 #include <utility>
+#include <vector>
 
 #include <CLI/CLI.hpp>
 
+#include "commands/PageInput.h"
 #include "engine/MotionEvent.h"
 #include "ink/Definitions.h"
 #include "play/PageDrawing.h"
@@ -18,28 +22,56 @@
 namespace QeltDesktop {
 namespace {
 
-// What an option takes: how the help shows it, how a refusal names it, and the parser of its value. Every
-// number goes through our own parsers, which do not depend on the locale.
+// What an option takes: how the help shows it, how a refusal names it, the parser of its value, and what
+// writes a value so that the parser reads it back. Every number goes through our own parsers, which do not
+// depend on the locale.
 template <typename Value>
 struct Form {
   std::string shape;
   std::string wanted;
   std::function<std::optional<Value>(const std::string&)> parse;
+  std::function<std::string(const Value&)> print;
 };
 
-template <typename Value, typename Target>
-void addValue(CLI::App& app, const char* name, Target& target, const Form<Value>& form,
-              const std::string& help) {
-  app.add_option_function<std::string>(
-         name,
-         [&target, form, name](const std::string& text) {
-           const std::optional<Value> value = form.parse(text);
-           if (!value) throw CLI::ValidationError(name, "expects " + form.wanted + ", not '" + text + "'");
-           target = *value;
-         },
-         help)
-      ->type_name(form.shape);
-}
+// Options of a command that are read into one Options. The values that those have there before can be
+// written as on a command line.
+class OptionGroup {
+ public:
+  explicit OptionGroup(CLI::App& app) : mApp(app) {}
+
+  // The target holds a Value, or an optional one.
+  template <typename Value, typename Target>
+  void add(const char* name, Target& target, const Form<Value>& form, const std::string& help) {
+    mApp.add_option_function<std::string>(
+            name,
+            [&target, form, name](const std::string& text) {
+              const std::optional<Value> value = form.parse(text);
+              if (!value) throw CLI::ValidationError(name, "expects " + form.wanted + ", not '" + text + "'");
+              target = *value;
+            },
+            help)
+        ->type_name(form.shape);
+    if (const std::optional<Value> value = target)
+      mWritten += ' ' + std::string(name) + '=' + form.print(*value);
+  }
+
+  // Two flags for one choice.
+  void addChoice(const char* yes, const std::string& yesHelp, const char* no, const std::string& noHelp,
+                 std::optional<bool>& target) {
+    CLI::Option* const off = mApp.add_flag_callback(
+        no, [&target] { target = false; }, noHelp);
+    mApp.add_flag_callback(
+            yes, [&target] { target = true; }, yesHelp)
+        ->excludes(off);
+    if (target) mWritten += ' ' + std::string(*target ? yes : no);
+  }
+
+  const std::string& written() const { return mWritten; }
+
+ private:
+  CLI::App& mApp;
+  std::string mWritten;
+};
 
 std::optional<int> countFrom(int least, const std::string& text) {
   const std::optional<int> count = parseInt(text);
@@ -115,27 +147,53 @@ template <typename Value, std::size_t count>
 Form<Value> oneOf(const std::array<std::pair<const char*, Value>, count>& names) {
   std::string shape;
   for (const auto& [name, value] : names) shape += (shape.empty() ? "" : "|") + std::string(name);
-  return {shape, shape, [&names](const std::string& text) -> std::optional<Value> {
+  return {shape, shape,
+          [&names](const std::string& text) -> std::optional<Value> {
             for (const auto& [name, value] : names) {
               if (text == name) return value;
             }
             return std::nullopt;
-          }};
+          },
+          [&names](const Value& value) -> std::string { return nameIn(names, value); }};
 }
 
-const Form<int> kCount{"N", "a whole number from 1", count};
-const Form<int> kInteger{"N", "a whole number", integer};
+std::string printInt(const int& value) {
+  return std::to_string(value);
+}
+std::string printFloat(const float& value) {
+  if (std::isnan(value)) return "nan";
+  if (std::isinf(value)) return value > 0.0f ? "inf" : "-inf";
+  std::string text;
+  appendNumber(text, value);
+  return text;
+}
+std::string printColor(const std::uint32_t& argb) {
+  return formatArgb(argb);
+}
+std::string printPage(const PageSize& page) {
+  return printFloat(page.width) + 'x' + printFloat(page.height);
+}
+std::string printOutline(const OutlineOptions& outline) {
+  return printFloat(outline.size) + ',' + formatArgb(outline.argb);
+}
+std::string printBackground(const Background& background) {
+  if (background.transparent) return "transparent";
+  return background.rgb == 0xFFFFFF ? "white" : formatArgb(background.rgb).erase(1, 2);
+}
+
+const Form<int> kCount{"N", "a whole number from 1", count, printInt};
+const Form<int> kInteger{"N", "a whole number", integer, printInt};
 const Form<int> kPredictionCount{"K", "a whole number from 0 to " + std::to_string(kMostPredicted),
-                                 predictionCount};
-const Form<float> kSize{"S", "a number", anyFloat};
-const Form<float> kZoom{"Z", "a number above 0", positiveFloat};
-const Form<float> kDegrees{"DEG", "a number of degrees", finiteFloat};
-const Form<float> kShare{"O", "a number from 0 to 1", share};
-const Form<std::uint32_t> kColor{"'#AARRGGBB'", "a colour as #AARRGGBB", argbColor};
-const Form<PageSize> kPage{"WxH", "WxH, two numbers above 0", pageSize};
-const Form<Background> kBackground{"white|transparent|'#RRGGBB'", "white, transparent or #RRGGBB",
-                                   background};
-const Form<OutlineOptions> kOutline{"SIZE,'#AARRGGBB'", "SIZE,#AARRGGBB", outline};
+                                 predictionCount, printInt};
+const Form<float> kSize{"S", "a number", anyFloat, printFloat};
+const Form<float> kZoom{"Z", "a number above 0", positiveFloat, printFloat};
+const Form<float> kDegrees{"DEG", "a number of degrees", finiteFloat, printFloat};
+const Form<float> kShare{"O", "a number from 0 to 1", share, printFloat};
+const Form<std::uint32_t> kColor{"'#AARRGGBB'", "a colour as #AARRGGBB", argbColor, printColor};
+const Form<PageSize> kPage{"WxH", "WxH, two numbers above 0", pageSize, printPage};
+const Form<Background> kBackground{"white|transparent|'#RRGGBB'", "white, transparent or #RRGGBB", background,
+                                   printBackground};
+const Form<OutlineOptions> kOutline{"SIZE,'#AARRGGBB'", "SIZE,#AARRGGBB", outline, printOutline};
 
 // What the help tells as defaults.
 const Options kDefaults;
@@ -143,21 +201,13 @@ const Options kDefaults;
 std::string withDefault(const std::string& help, const std::string& value) {
   return help + " (default " + value + ")";
 }
-template <typename Number>
-std::string numberText(Number number) {
-  std::ostringstream text;
-  text << number;
-  return text.str();
-}
-std::string backgroundName(const Background& background) {
-  if (background.transparent) return "transparent";
-  return background.rgb == 0xFFFFFF ? "white" : "#" + formatArgb(background.rgb).substr(3);
-}
 
 // Option by option, in the order the help shows them.
 
 void addInput(CLI::App& app, Options& options) {
-  app.add_option("INPUT", options.input, "page of W3C InkML (default: the sample page)")->type_name("");
+  app.add_option("INPUT", options.input,
+                 "page of W3C InkML, or a picture that draw made (default: the sample page)")
+      ->type_name("");
 }
 
 std::string limits() {
@@ -175,50 +225,50 @@ void addPlugin(CLI::App& app, Options& options) {
   app.add_flag("--log", options.log, "show what plug-in and host log, on standard error");
 }
 
-void addPen(CLI::App& app, Options& options) {
-  addValue<float>(app, "--size", options.size, kSize, "pen size (default: the file's, else the pen's)");
-  addValue<std::uint32_t>(app, "--color", options.argb, kColor,
-                          "pen colour (default: the file's, else the pen's)");
+void addPen(OptionGroup& group, Options& options) {
+  group.add<float>("--size", options.size, kSize, "pen size (default: the file's, else the pen's)");
+  group.add<std::uint32_t>("--color", options.argb, kColor,
+                           "pen colour (default: the file's, else the pen's)");
 }
 
-void addFeeding(CLI::App& app, Options& options) {
-  app.add_flag_callback(
-      "--no-curve", [&options] { options.curve = false; }, "straight segments");
-  addValue<Mode>(app, "--mode", options.mode, oneOf(kModeNames),
-                 withDefault("how strokes reach the plug-in", nameOf(kDefaults.mode)));
-  addValue<int>(app, "--batch", options.samplesPerMove, kCount,
-                withDefault("live: samples a move event", numberText(kDefaults.samplesPerMove)));
-  addValue<int>(app, "--tool", options.tool, oneOf(kToolNames), "tool (default: the file's, else stylus)");
-  addValue<int>(app, "--source", options.source, kInteger,
-                withDefault("event source", std::to_string(Qelt::kSourceStylus) + " stylus, " +
-                                                std::to_string(Qelt::kSourceTouchScreen) + " finger, " +
-                                                std::to_string(Qelt::kSourceMouse) + " mouse"));
+void addFeeding(OptionGroup& group, Options& options) {
+  group.addChoice("--curve", "smooth segments (default: the stroke's, else smooth)", "--no-curve",
+                  "straight segments", options.curve);
+  group.add<Mode>("--mode", options.mode, oneOf(kModeNames),
+                  withDefault("how strokes reach the plug-in", nameOf(kDefaults.mode)));
+  group.add<int>("--batch", options.samplesPerMove, kCount,
+                 withDefault("live: samples a move event", printInt(kDefaults.samplesPerMove)));
+  group.add<int>("--tool", options.tool, oneOf(kToolNames), "tool (default: the file's, else stylus)");
+  group.add<int>("--source", options.source, kInteger,
+                 withDefault("event source", std::to_string(Qelt::kSourceStylus) + " stylus, " +
+                                                 std::to_string(Qelt::kSourceTouchScreen) + " finger, " +
+                                                 std::to_string(Qelt::kSourceMouse) + " mouse"));
 }
 
-void addDrawing(CLI::App& app, Options& options) {
-  addValue<int>(app, "--rendering-version", options.renderingVersion, kInteger,
-                withDefault("of the pen", numberText(kDefaults.renderingVersion)));
-  addPen(app, options);
-  addFeeding(app, options);
-  addValue<int>(app, "--repeat", options.repeat, kCount,
-                "draw the page N times, each onto a cleared layer; in stroke mode from the cache");
-  addValue<float>(app, "--zoom", options.zoom, kZoom,
-                  withDefault("canvas pixels a stroke unit", numberText(kDefaults.zoom)));
-  addValue<float>(app, "--rotate", options.rotate, kDegrees,
-                  withDefault("turn clockwise about the page's centre", numberText(kDefaults.rotate)));
-  addValue<PageSize>(app, "--page", options.page, kPage,
-                     "page in stroke units, from (0, 0) (default: the file's extent plus a margin)");
-  addValue<Background>(app, "--background", options.background, kBackground,
-                       "default " + backgroundName(kDefaults.background));
-  addValue<OutlineOptions>(app, "--outline", options.outline, kOutline,
-                           "draw every stroke's outline under the strokes");
-  addValue<int>(
-      app, "--predict", options.predict, kPredictionCount,
+void addDrawing(OptionGroup& group, Options& options) {
+  group.add<int>("--rendering-version", options.renderingVersion, kInteger,
+                 "of the pen (default: the stroke's, else " + printInt(kUsualRenderingVersion) + ")");
+  addPen(group, options);
+  addFeeding(group, options);
+  group.add<int>("--repeat", options.repeat, kCount,
+                 "draw the page N times, each onto a cleared layer; in stroke mode from the cache");
+  group.add<float>("--zoom", options.zoom, kZoom,
+                   withDefault("canvas pixels a stroke unit", printFloat(kDefaults.zoom)));
+  group.add<float>("--rotate", options.rotate, kDegrees,
+                   withDefault("turn clockwise about the page's centre", printFloat(kDefaults.rotate)));
+  group.add<PageSize>("--page", options.page, kPage,
+                      "page in stroke units, from (0, 0) (default: the file's extent plus a margin)");
+  group.add<Background>("--background", options.background, kBackground,
+                        "default " + printBackground(kDefaults.background));
+  group.add<OutlineOptions>("--outline", options.outline, kOutline,
+                            "draw every stroke's outline under the strokes (default: those of the file)");
+  group.add<int>(
+      "--predict", options.predict, kPredictionCount,
       "live: K predicted samples, at most " + std::to_string(kMostPredicted) + ", after every move event");
-  addValue<float>(app, "--opacity", options.opacity, kShare,
-                  withDefault("of the prediction, 0 to 1", numberText(kDefaults.opacity)));
-  addValue<int>(app, "--points", options.points, kCount,
-                "stop after the first N points of the last trace, the pen still down");
+  group.add<float>("--opacity", options.opacity, kShare,
+                   withDefault("of the prediction, 0 to 1", printFloat(kDefaults.opacity)));
+  group.add<int>("--points", options.points, kCount,
+                 "stop after the first N points of the last trace, the pen still down");
 }
 
 // Refuses combinations of options that contradict each other.
@@ -238,35 +288,60 @@ UsageEnd usageEnd(const CLI::App& app, const CLI::ParseError& error) {
   return {text.str(), asked ? 0 : 2};
 }
 
-}  // namespace
+// Reads the options of a drawing, or those among them that a sheet has too. Throws CLI::ParseError.
+void readInstruction(const std::string& instruction, Options& options, Command command) {
+  CLI::App app;
+  app.set_help_flag();
+  OptionGroup group(app);
+  if (command == Command::Sheet) {
+    app.allow_extras();
+    addPen(group, options);
+    addFeeding(group, options);
+  } else {
+    addDrawing(group, options);
+  }
+  std::istringstream text(instruction);
+  std::vector<std::string> words{std::istream_iterator<std::string>(text), {}};
+  std::reverse(words.begin(), words.end());  // it takes them from the back
+  app.parse(std::move(words));
+}
 
-std::variant<Options, UsageEnd> parseOptions(int argc, const char* const* argv) {
-  Options options;
+// Reads the command line; where it says nothing, the options stay as they are.
+std::variant<Options, UsageEnd> parseOver(Options options, bool pictureIsRead) {
+  std::vector<const char*> argv;
+  for (const std::string& word : options.commandLine) argv.push_back(word.c_str());
+  const int argc = static_cast<int>(argv.size());
   CLI::App app("Draws recorded ink with the pencil plug-in.", "qelt-sketch");
   app.require_subcommand(1);
 
   CLI::App* const draw = app.add_subcommand("draw", "draw the page as a PNG picture");
   addInput(*draw, options);
   addOutput(*draw, options, "picture to write");
-  addDrawing(*draw, options);
+  draw->add_flag_callback(
+      "--no-ink", [&options] { options.ink = false; }, "a picture without the page and the options in it");
+  OptionGroup drawn(*draw);
+  addDrawing(drawn, options);
 
   CLI::App* const trace =
       app.add_subcommand("trace", "write what the plug-in did, call by call, as JSON Lines");
   addInput(*trace, options);
   addOutput(*trace, options, "file to write; - is standard output");
-  addDrawing(*trace, options);
-  addValue<DrawableKind>(*trace, "--drawable", options.drawable, oneOf(kDrawableNames),
-                         withDefault("whose calls to write", nameOf(kDefaults.drawable)));
+  OptionGroup traced(*trace);
+  addDrawing(traced, options);
+  traced.add<DrawableKind>("--drawable", options.drawable, oneOf(kDrawableNames),
+                           withDefault("whose calls to write", nameOf(kDefaults.drawable)));
 
   CLI::App* const preview = app.add_subcommand("preview", "draw the settings panel's sample stroke");
   addOutput(*preview, options, "picture to write");
-  addPen(*preview, options);
+  OptionGroup previewed(*preview);
+  addPen(previewed, options);
 
   CLI::App* const sheet = app.add_subcommand("sheet", "draw the page once in every rendering version");
   addInput(*sheet, options);
   addOutput(*sheet, options, "picture to write");
-  addPen(*sheet, options);
-  addFeeding(*sheet, options);
+  OptionGroup shown(*sheet);
+  addPen(shown, options);
+  addFeeding(shown, options);
 
   CLI::App* const info =
       app.add_subcommand("info", "show plug-in path, GL renderer, version table and pen limits");
@@ -280,11 +355,16 @@ std::variant<Options, UsageEnd> parseOptions(int argc, const char* const* argv) 
   for (CLI::App* const command : {draw, trace, sheet}) command->footer(limits());
 
   try {
-    app.parse(argc, argv);
+    app.parse(argc, argv.data());
     for (const auto& [command, value] : commands) {
       if (command->parsed()) options.command = value;
     }
-    checkTogether(options);
+    try {
+      checkTogether(options);
+    } catch (const CLI::ValidationError&) {
+      // What is missing may be in the picture.
+      if (pictureIsRead || !options.input || !isPng(*options.input)) throw;
+    }
   } catch (const CLI::RequiredError& error) {
     if (!app.get_subcommands().empty() || argc < 2) return usageEnd(app, error);
     return UsageEnd{"no command '" + oneLine(argv[1]) + "'; see qelt-sketch --help\n", 2};
@@ -292,6 +372,39 @@ std::variant<Options, UsageEnd> parseOptions(int argc, const char* const* argv) 
     return usageEnd(app, error);
   }
   return options;
+}
+
+}  // namespace
+
+std::variant<Options, UsageEnd> parseOptions(int argc, const char* const* argv) {
+  Options options;
+  options.commandLine.assign(argv, argv + argc);
+  return parseOver(std::move(options), false);
+}
+
+std::string instructionFor(const Options& options) {
+  Options written = options;
+  CLI::App app;
+  OptionGroup group(app);
+  addDrawing(group, written);
+  return group.written();
+}
+
+Options withInstruction(const Options& asked, const std::string& name, const std::string& instruction) {
+  Options options;
+  try {
+    Options all;
+    readInstruction(instruction, all, Command::Draw);
+    readInstruction(instruction, options, asked.command);
+  } catch (const CLI::ParseError& error) {
+    throw Refusal(name + ": the picture says how it was drawn in a way that is not understood: " +
+                  oneLine(error.what()));
+  }
+  options.commandLine = asked.commandLine;
+  std::variant<Options, UsageEnd> merged = parseOver(std::move(options), true);
+  if (const auto* const usage = std::get_if<UsageEnd>(&merged))
+    throw Refusal(name + ": as the picture was drawn, " + usage->text.substr(0, usage->text.find('\n')));
+  return std::get<Options>(std::move(merged));
 }
 
 }  // namespace QeltDesktop

@@ -16,4 +16,12 @@ struct UsageEnd {
 
 std::variant<Options, UsageEnd> parseOptions(int argc, const char* const* argv);
 
+// The options that a picture depends on, as on a command line.
+std::string instructionFor(const Options& options);
+
+// The options as they were asked for; where the command line says nothing, an instruction counts that the
+// picture `name` was drawn with. A sheet goes by those that it has itself. Throws Refusal for an instruction
+// that has anything but such options, or that does not go with the command line.
+Options withInstruction(const Options& asked, const std::string& name, const std::string& instruction);
+
 }  // namespace QeltDesktop

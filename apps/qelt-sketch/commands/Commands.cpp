@@ -13,11 +13,13 @@
 #include <string>
 #include <system_error>
 
+#include "commands/CommandLine.h"
+#include "commands/PageInput.h"
 #include "desktop/engine/PluginLibrary.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/graphics/PenCanvas.h"
 #include "desktop/platform/Platform.h"
-#include "ink/InkmlReader.h"
+#include "ink/InkmlWriter.h"
 #include "output/LabelFont.h"
 #include "output/OutputFile.h"
 #include "output/Picture.h"
@@ -69,17 +71,41 @@ std::string inputPath(const Options& options) {
 
 // The margin of a page that is drawn or traced with all its options.
 float marginFor(const PluginLibrary& plugin, RenderQueue& queue, const Page& page, const Options& options) {
-  return pageMargin(largestPenSize(plugin, queue, page, options),
-                    options.outline ? options.outline->size : 0.0f);
+  return pageMargin(largestPenSize(plugin, queue, page, options), largestOutlineSize(page, options));
 }
 
 std::size_t strokesToPlay(const Page& page, const Options& options) {
   return page.strokes.size() * static_cast<std::size_t>(options.repeat);
 }
 
-void draw(const Options& options) {
-  Page page = readInkmlFile(inputPath(options));
+// The page, with the options that the picture was drawn with where it is one.
+Page readPage(Options& options) {
+  PageInput input = readPageInput(inputPath(options));
+  if (input.drawnWith) options = withInstruction(options, input.page.name, *input.drawnWith);
+  return std::move(input.page);
+}
+
+// What a picture of the page carries, so that it can be drawn again from nothing else.
+PictureText inkOf(const Page& page, Options options) {
+  // Strokes without a rendering version look the same when another one has become usual.
+  const bool someHaveTheirOwn =
+      std::any_of(page.strokes.begin(), page.strokes.end(),
+                  [](const Stroke& stroke) { return stroke.brush.renderingVersion.has_value(); });
+  if (!options.renderingVersion && !someHaveTheirOwn) options.renderingVersion = kUsualRenderingVersion;
+  PictureText ink{.keyword = kInkKeyword, .text = writeInkml(page.strokes)};
+  ink.text += std::string("<?") + kInstructionTarget + instructionFor(options) + "?>\n";
+  if (ink.text.size() > kMostInkBytes) {
+    throw Refusal(page.name + ": too large to go with its picture: " + std::to_string(ink.text.size()) +
+                  " bytes as InkML, at most " + std::to_string(kMostInkBytes) + "; --no-ink leaves it out");
+  }
+  return ink;
+}
+
+void draw(const Options& asked) {
+  Options options = asked;
+  Page page = readPage(options);
   OutputFile file(options.output, page.name);
+  const PictureText ink = options.ink ? inkOf(page, options) : PictureText{};
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
 
@@ -89,20 +115,22 @@ void draw(const Options& options) {
 
   Progress progress("drawing stroke", strokesToPlay(page, options));
   const Picture picture = drawPage(plugin, queue, page, options, layOut(area, options.zoom, options.rotate),
-                                   drawablesFor(options), progress);
-  file.write(encodePng(picture));
+                                   drawablesFor(page, options), progress);
+  file.write(encodePng(picture, ink));
   file.commit();
 }
 
-std::string traceHeader(PenSession& session, const Page& page, const Options& options) {
-  const PenStyle style = styleFor(page.strokes.front().brush, session.ownStyle(), options);
-  const bool curve = session.pen().GetMorphable()->IsCurveEnabled();
-  std::string line = R"({"kind":"header","renderingVersion":)" + std::to_string(options.renderingVersion);
+// It tells how the first stroke is drawn.
+std::string traceHeader(const PenSet& pens, const Page& page, const Options& options) {
+  const Brush brush = page.strokes.front().brush;
+  const int version = renderingVersionFor(brush, options);
+  const PenStyle style = styleFor(brush, pens.of(version).ownStyle(), options);
+  std::string line = R"({"kind":"header","renderingVersion":)" + std::to_string(version);
   line += R"(,"size":)";
   appendJson(line, style.size);
   line += R"(,"color":")" + formatArgb(style.argb);
   line += R"(","curve":)";
-  line += curve ? "true" : "false";
+  line += curveFor(brush, options) ? "true" : "false";
   line += R"(,"mode":")";
   line += nameOf(options.mode);
   line += R"(","drawable":")";
@@ -121,13 +149,14 @@ Canvases canvasesFor(DrawableKind wanted, PenCanvas& canvas) {
   return canvases;
 }
 
-void trace(const Options& options) {
-  Page page = readInkmlFile(inputPath(options));
+void trace(const Options& asked) {
+  Options options = asked;
+  Page page = readPage(options);
   OutputFile file(options.output, page.name);
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
   Progress progress("tracing stroke", strokesToPlay(page, options));
-  CallRecorder recorder(queue, file, progress, options.drawable, options.renderingVersion);
+  CallRecorder recorder(queue, file, progress, options.drawable);
 
   PenCanvas canvas(&queue, nullptr);
   const PageArea area = pageArea(page, options.page, marginFor(plugin, queue, page, options));
@@ -135,9 +164,9 @@ void trace(const Options& options) {
   if (options.points) cutLastStroke(page, *options.points);
 
   {
-    PenSession session(plugin, queue, options);
-    PagePlayer player(session, page, options, canvasesFor(options.drawable, canvas));
-    file.write(traceHeader(session, page, options));
+    const PenSet pens(plugin, queue, page, options);
+    PagePlayer player(pens, page, options, canvasesFor(options.drawable, canvas));
+    file.write(traceHeader(pens, page, options));
     player.play(recorder);
   }
   file.commit();
@@ -169,12 +198,14 @@ void sheet(const Options& asked) {
   constexpr std::uint32_t kPaper = 0xE8E8E8, kInk = 0x404040;
 
   Options options = asked;
-  const Page page = readInkmlFile(inputPath(options));
+  const Page page = readPage(options);
   OutputFile file(options.output, page.name);
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
 
-  const PageArea area = pageArea(page, std::nullopt, marginFor(plugin, queue, page, options));
+  // Without outlines.
+  const float margin = pageMargin(largestPenSize(plugin, queue, page, options), 0.0f);
+  const PageArea area = pageArea(page, std::nullopt, margin);
   const double fit = std::min({1.0, kWidestCell / area.width, kHighestCell / area.height});
   const PageLayout layout = layOut(area, static_cast<float>(fit), 0.0f);
 
@@ -249,7 +280,7 @@ void info(const Options& options) {
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
   std::printf("GL renderer  %s\n", queue.rendererName().c_str());
 
-  PenSession session(plugin, queue, options);
+  PenSession session(plugin, queue, kUsualRenderingVersion);
   const PenStyle& style = session.ownStyle();
   std::printf("pen size     %g to %g, a new pen has %g\n", static_cast<double>(session.pen().GetMinSize()),
               static_cast<double>(session.pen().GetMaxSize()), static_cast<double>(style.size));

@@ -13,18 +13,24 @@
 namespace QeltDesktop {
 namespace {
 
+// Far above those that any pen has.
+constexpr int kHighestVersion = 99;
+
 void readBrushProperty(const SourceText& source, const XmlElement& element, Brush& brush) {
   const std::string name = element.text("name");
   const std::string value = element.text("value");
   const auto malformed = [&](const std::string& what) {
     return source.refusalAt(element.offset(), what, value.empty() ? "\"\"" : value);
   };
-  if (name == "width") {
-    const std::optional<float> width = parseFloat(value);
-    if (!width || !std::isfinite(*width) || *width <= 0.0f) {
-      throw malformed("brush width must be a number above 0");
+  const auto length = [&] {
+    const std::optional<float> number = parseFloat(value);
+    if (!number || !std::isfinite(*number) || *number <= 0.0f) {
+      throw malformed("brush " + name + " must be a number above 0");
     }
-    brush.width = width;
+    return number;
+  };
+  if (name == "width") {
+    brush.width = length();
   } else if (name == "color") {
     const std::optional<unsigned int> rgb = parseRgb(value);
     if (!rgb) throw malformed("brush color must be #RRGGBB");
@@ -35,14 +41,39 @@ void readBrushProperty(const SourceText& source, const XmlElement& element, Brus
       throw malformed("brush transparency must be a number from 0 to 255");
     }
     brush.transparency = static_cast<std::uint8_t>(std::lround(*transparency));
+  } else if (name == "renderingVersion") {
+    const std::optional<int> version = parseInt(value);
+    // Each takes a pen of its own, so a page must not name any number of them.
+    if (!version || *version < 1 || *version > kHighestVersion) {
+      throw malformed("brush renderingVersion must be a whole number from 1 to " +
+                      std::to_string(kHighestVersion));
+    }
+    brush.renderingVersion = version;
+  } else if (name == "curve") {
+    const bool on = value == "true" || value == "1";
+    if (!on && value != "false" && value != "0") throw malformed("brush curve must be true or false");
+    brush.curve = on;
+  } else if (name == "outlineSize") {
+    brush.outlineSize = length();
+  } else if (name == "outlineColor") {
+    const std::optional<unsigned int> argb = parseArgb(value);
+    if (!argb) throw malformed("brush outlineColor must be #AARRGGBB");
+    brush.outlineArgb = argb;
   }
 }
 
 // Fills in from `base` what `brush` leaves open.
 void takeOver(Brush& brush, const Brush& base) {
-  if (!brush.width) brush.width = base.width;
-  if (!brush.rgb) brush.rgb = base.rgb;
-  if (!brush.transparency) brush.transparency = base.transparency;
+  const auto fillIn = [&](auto property) {
+    if (!(brush.*property)) brush.*property = base.*property;
+  };
+  fillIn(&Brush::width);
+  fillIn(&Brush::rgb);
+  fillIn(&Brush::transparency);
+  fillIn(&Brush::renderingVersion);
+  fillIn(&Brush::curve);
+  fillIn(&Brush::outlineSize);
+  fillIn(&Brush::outlineArgb);
 }
 
 // For groups, besides the tools themselves.
@@ -262,9 +293,17 @@ Definitions::Definitions(const SourceText& source) : mSource(source) {
 }
 
 const char* Definitions::keptText(std::string_view text) {
-  char* const kept = static_cast<char*>(mTexts.allocate(text.size() + 1, 1));
-  kept[text.copy(kept, text.size())] = '\0';
-  return kept;
+  constexpr std::size_t kFirst = 1 << 10, kLargest = 1 << 16;
+  const std::size_t size = text.size() + 1;
+  if (mTexts.empty() || mTexts.back().capacity() - mTexts.back().size() < size) {
+    const std::size_t usual = mTexts.empty() ? kFirst : std::min(2 * mTexts.back().capacity(), kLargest);
+    mTexts.emplace_back().reserve(std::max(usual, size));
+  }
+  std::vector<char>& block = mTexts.back();
+  const std::size_t at = block.size();
+  block.insert(block.end(), text.begin(), text.end());
+  block.push_back('\0');
+  return block.data() + at;
 }
 
 std::uint32_t Definitions::keptReference(const Reference& reference) {

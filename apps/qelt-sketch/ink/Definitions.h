@@ -3,11 +3,11 @@
 #include <cstddef>
 #include <cstdint>
 #include <deque>
-#include <memory_resource>
 #include <optional>
 #include <string>
 #include <string_view>
 #include <utility>
+#include <vector>
 
 #include "ink/Ink.h"
 #include "ink/SourceText.h"
@@ -117,7 +117,7 @@ class Definitions {
                                                const);
 
   const SourceText& mSource;
-  std::pmr::monotonic_buffer_resource mTexts;  // of ids and references
+  std::deque<std::vector<char>> mTexts;  // blocks of ids and references, which never move
   std::deque<BrushEntry> mBrushes;
   std::deque<Brush> mBrushTexts;
   std::deque<ContextEntry> mContexts;

@@ -18,6 +18,13 @@ struct Brush {
   std::optional<float> width;                // stroke units, above 0
   std::optional<std::uint32_t> rgb;          // 0xRRGGBB
   std::optional<std::uint8_t> transparency;  // 0 opaque, 255 invisible
+  // Settings of this pen, in properties that InkML leaves to the program.
+  std::optional<int> renderingVersion;  // 1 to 99
+  std::optional<bool> curve;            // false: straight segments
+  std::optional<float> outlineSize;     // stroke units, above 0; a stroke with it has an outline
+  std::optional<std::uint32_t> outlineArgb;
+
+  bool operator==(const Brush&) const = default;
 };
 
 // Brushes, formats and the like are numbered in 30 bits: more of one kind would fill many gigabytes.

@@ -4,12 +4,12 @@
 #include <array>
 #include <cmath>
 #include <cstddef>
-#include <numbers>
 #include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
 
+#include "ink/Angles.h"
 #include "ink/XmlWalk.h"
 #include "text/NumberText.h"
 
@@ -233,22 +233,14 @@ const Reading& of(const Readings& readings, Quantity quantity) {
   return readings[static_cast<std::size_t>(quantity)];
 }
 
-float wrappedAngle(double radians) {
-  const double wrapped = std::remainder(radians, 2.0 * std::numbers::pi);
-  const auto angle = static_cast<float>(wrapped);
-  // The range is open below, so that half a turn is always +pi.
-  constexpr float kHalfTurn = std::numbers::pi_v<float>;
-  return angle <= -kHalfTurn ? kHalfTurn : angle;
-}
-
 // Sets tilt and orientation from elevation and azimuth, independently of each other; where neither is
 // recorded, from the tilts along the axes.
 void setAttitude(Sample& sample, const Readings& readings, bool hasSphericalAngles) {
   if (hasSphericalAngles) {
     const Reading& elevation = of(readings, Quantity::Elevation);
     const Reading& azimuth = of(readings, Quantity::Azimuth);
-    if (elevation.known) sample.tilt = static_cast<float>(std::numbers::pi / 2.0 - elevation.value);
-    if (azimuth.known) sample.orientation = wrappedAngle(azimuth.value);
+    if (elevation.known) sample.tilt = tiltOf(elevation.value);
+    if (azimuth.known) sample.orientation = orientationOf(azimuth.value);
     return;
   }
   const Reading& tiltX = of(readings, Quantity::TiltX);
@@ -258,7 +250,7 @@ void setAttitude(Sample& sample, const Readings& readings, bool hasSphericalAngl
   const double alongY = std::tan(tiltY.value);
   sample.tilt = static_cast<float>(std::atan(std::hypot(alongX, alongY)));
   // For an upright pen this is half a turn: atan2(0, -0) is pi.
-  sample.orientation = wrappedAngle(std::atan2(alongX, -alongY));
+  sample.orientation = orientationOf(std::atan2(alongX, -alongY));
 }
 
 }  // namespace

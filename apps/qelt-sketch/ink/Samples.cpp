@@ -2,6 +2,7 @@
 
 #include <array>
 #include <bit>
+#include <cstring>
 #include <stdexcept>
 
 namespace QeltDesktop {
@@ -16,8 +17,17 @@ constexpr struct {
   float Sample::*member;
 } kFloats[] = {{kPressure, &Sample::pressure}, {kTilt, &Sample::tilt}, {kOrientation, &Sample::orientation}};
 
+// std::bit_cast, which the web's C++ library lacks.
+template <typename To, typename From>
+To bitCast(const From& from) {
+  static_assert(sizeof(To) == sizeof(From));
+  To to;
+  std::memcpy(&to, &from, sizeof to);
+  return to;
+}
+
 std::uint32_t bitsOf(float value) {
-  return std::bit_cast<std::uint32_t>(value);
+  return bitCast<std::uint32_t>(value);
 }
 
 // The columns in which a sample differs from what is assumed where nothing was recorded.
@@ -27,7 +37,7 @@ Columns columnsOf(const Sample& sample, std::size_t index) {
   for (const auto& [column, member] : kFloats) {
     if (bitsOf(sample.*member) != bitsOf(plain.*member)) columns |= column;
   }
-  if (std::bit_cast<TimeWords>(sample.time) != std::bit_cast<TimeWords>(usualTime(index))) columns |= kTime;
+  if (bitCast<TimeWords>(sample.time) != bitCast<TimeWords>(usualTime(index))) columns |= kTime;
   return columns;
 }
 
@@ -38,7 +48,7 @@ void writeSample(PackedWords& words, std::size_t at, const Sample& sample, Colum
     if ((columns & column) != 0) words[at++] = bitsOf(sample.*member);
   }
   if ((columns & kTime) != 0) {
-    for (const std::uint32_t word : std::bit_cast<TimeWords>(sample.time)) words[at++] = word;
+    for (const std::uint32_t word : bitCast<TimeWords>(sample.time)) words[at++] = word;
   }
 }
 
@@ -68,13 +78,13 @@ Sample Samples::operator[](std::size_t index) const {
   const PackedWords& words = *mWords;
   std::size_t at = mFirst + index * wordsPerSample(mColumns);
   Sample sample;
-  sample.x = std::bit_cast<float>(words[at++]);
-  sample.y = std::bit_cast<float>(words[at++]);
+  sample.x = bitCast<float>(words[at++]);
+  sample.y = bitCast<float>(words[at++]);
   for (const auto& [column, member] : kFloats) {
-    if ((mColumns & column) != 0) sample.*member = std::bit_cast<float>(words[at++]);
+    if ((mColumns & column) != 0) sample.*member = bitCast<float>(words[at++]);
   }
   sample.time =
-      (mColumns & kTime) != 0 ? std::bit_cast<double>(TimeWords{words[at], words[at + 1]}) : usualTime(index);
+      (mColumns & kTime) != 0 ? bitCast<double>(TimeWords{words[at], words[at + 1]}) : usualTime(index);
   return sample;
 }
 

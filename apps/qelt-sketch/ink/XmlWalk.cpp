@@ -44,6 +44,7 @@ class Walk {
     XML_SetUserData(parser, this);
     XML_SetElementHandler(parser, begins, ends);
     XML_SetCharacterDataHandler(parser, comes);
+    XML_SetProcessingInstructionHandler(parser, instructs);
     // With these two, references to unknown entities come as they are written.
     XML_SetDefaultHandler(parser, comesAsWritten);
     XML_UseForeignDTD(parser, XML_TRUE);
@@ -110,6 +111,11 @@ class Walk {
     walk.visit([&] {
       walk.mVisitor.textComes({walk.offset(), written, std::string_view(characters, size), replaced});
     });
+  }
+
+  static void instructs(void* user, const XML_Char* target, const XML_Char* data) {
+    Walk& walk = of(user);
+    walk.visit([&] { walk.mVisitor.instructionComes({walk.offset(), target, data}); });
   }
 
   // Gets everything else: comments and the like, which are skipped, and references to unknown entities.

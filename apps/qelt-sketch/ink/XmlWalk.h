@@ -46,12 +46,19 @@ struct XmlText {
   bool replaced;           // they stand in the source as a reference, such as "&#39;"
 };
 
+// A processing instruction: "<?target data?>".
+struct XmlInstruction {
+  std::size_t offset;  // in the source
+  std::string_view target, data;
+};
+
 class XmlVisitor {
  public:
   virtual ~XmlVisitor() = default;
   virtual void elementBegins(const XmlElement& element) = 0;
   virtual void elementEnds() = 0;
   virtual void textComes(const XmlText& text) = 0;
+  virtual void instructionComes(const XmlInstruction&) {}
 };
 
 // Walks through a document from its first tag to its last, keeping only the tags that are open. Throws

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <cstddef>
+#include <cstdio>
 #include <cstdlib>
 #include <memory>
 #include <new>
@@ -47,7 +48,7 @@ void paste(Picture& picture, const Picture& part, int x, int y) {
   }
 }
 
-std::string encodePng(const Picture& picture) {
+std::string encodePng(const Picture& picture, const PictureText& text) {
   const std::unique_ptr<spng_ctx, void (*)(spng_ctx*)> encoder(spng_ctx_new(SPNG_CTX_ENCODER),
                                                                &spng_ctx_free);
   if (!encoder) throw std::bad_alloc();
@@ -61,6 +62,20 @@ std::string encodePng(const Picture& picture) {
   header.bit_depth = 8;
   header.color_type = SPNG_COLOR_TYPE_TRUECOLOR_ALPHA;
   check(spng_set_ihdr(encoder.get(), &header));
+  // The encoder reads it while it encodes.
+  std::string carried = text.text, none;
+  spng_text chunk{};
+  if (!carried.empty()) {
+    constexpr std::size_t kWorthCompressing = 4096;
+    std::snprintf(chunk.keyword, sizeof chunk.keyword, "%s", text.keyword);
+    chunk.type = SPNG_ITXT;
+    chunk.text = carried.data();
+    chunk.length = carried.size();
+    chunk.compression_flag = carried.size() > kWorthCompressing ? 1 : 0;
+    chunk.language_tag = none.data();
+    chunk.translated_keyword = none.data();
+    check(spng_set_text(encoder.get(), &chunk, 1));
+  }
   check(spng_encode_image(encoder.get(), picture.rgba.data(), picture.rgba.size(), SPNG_FMT_PNG,
                           SPNG_ENCODE_FINALIZE));
   std::size_t size = 0;

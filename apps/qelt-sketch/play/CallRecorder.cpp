@@ -62,14 +62,8 @@ std::string readableTypeName(const char* mangled) {
 
 }  // namespace
 
-CallRecorder::CallRecorder(RenderQueue& queue, OutputFile& file, Progress& progress, DrawableKind wanted,
-                           int renderingVersion)
-    : mQueue(queue),
-      mWatch(queue),
-      mFile(file),
-      mProgress(progress),
-      mWanted(wanted),
-      mStride(floatsPerVertex(wanted, renderingVersion)) {
+CallRecorder::CallRecorder(RenderQueue& queue, OutputFile& file, Progress& progress, DrawableKind wanted)
+    : mQueue(queue), mWatch(queue), mFile(file), mProgress(progress), mWanted(wanted) {
   mQueue.onAccepted = [this](const Qelt::ITask& task) {
     if (mInCall) mPosted.push_back(&typeNameOf(task));
   };
@@ -102,12 +96,13 @@ void CallRecorder::writeLine(const DrawableCall& call, bool result, const Qelt::
   line += R"(,"rect":)";
   appendFloats(line, {rect.left, rect.top, rect.right, rect.bottom});
   line += R"(,"buffers":[)";
+  const std::string stride = std::to_string(floatsPerVertex(call.drawable, call.renderingVersion));
   bool first = true;
   for (const Batch& batch : mBatches) {
     for (const std::vector<float>& buffer : batch.buffers) {
       line += first ? R"({"stride":)" : R"(,{"stride":)";
       first = false;
-      line += std::to_string(mStride);
+      line += stride;
       line += batch.cached ? R"(,"cached":true,"data":)" : R"(,"cached":false,"data":)";
       appendFloats(line, buffer);
       line += '}';

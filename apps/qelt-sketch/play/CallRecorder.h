@@ -21,8 +21,7 @@ namespace QeltDesktop {
 class CallRecorder final : public PlayObserver {
  public:
   // Queue, file and progress, which counts the strokes, outlive it.
-  CallRecorder(RenderQueue& queue, OutputFile& file, Progress& progress, DrawableKind wanted,
-               int renderingVersion);
+  CallRecorder(RenderQueue& queue, OutputFile& file, Progress& progress, DrawableKind wanted);
   ~CallRecorder() override;
   CallRecorder(const CallRecorder&) = delete;
   CallRecorder& operator=(const CallRecorder&) = delete;
@@ -40,7 +39,6 @@ class CallRecorder final : public PlayObserver {
   OutputFile& mFile;
   Progress& mProgress;
   DrawableKind mWanted;
-  int mStride;  // floats per vertex
   bool mInCall = false;
   std::vector<Batch> mBatches;
   std::vector<const std::string*> mPosted;

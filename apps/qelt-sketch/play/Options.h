@@ -5,6 +5,7 @@
 #include <optional>
 #include <string>
 #include <utility>
+#include <vector>
 
 #include "pen/RenderingVersions.h"
 
@@ -50,20 +51,30 @@ struct Background {
 struct OutlineOptions {
   float size;  // stroke units; any float
   std::uint32_t argb;
+
+  bool operator==(const OutlineOptions&) const = default;
 };
+
+// What holds where neither the command line nor the stroke says anything.
+constexpr int kUsualRenderingVersion = Qelt::kRenderingVersions.back().number;
+constexpr bool kUsualCurve = true;
 
 // What the command line asks for. The defaults stand here alone; the help takes them from here.
 struct Options {
+  // As it was written, to be read once more over what a picture says.
+  std::vector<std::string> commandLine;
+
   Command command = Command::Draw;
   std::optional<std::string> input;   // none: the sample page
   std::string output;                 // "-": standard output
+  bool ink = true;                    // the picture carries the page that it shows
   std::optional<std::string> plugin;  // none: the one built with the program
   bool log = false;                   // show the platform log
 
-  int renderingVersion = Qelt::kRenderingVersions.back().number;  // any number: the pen knows what to do
-  std::optional<float> size;  // none: the brush's, else the pen's own. Any float: the pen checks it
+  std::optional<int> renderingVersion;  // none: the stroke's. Any number: the pen knows what to do
+  std::optional<float> size;            // none: the brush's, else the pen's own. Any float: the pen checks it
   std::optional<std::uint32_t> argb;
-  bool curve = true;
+  std::optional<bool> curve;  // none: the stroke's
 
   Mode mode = Mode::Live;
   int samplesPerMove = 4;     // in live mode, at least 1
@@ -73,7 +84,7 @@ struct Options {
   std::optional<int> points;
   int predict = 0;  // samples; 0 is off
   float opacity = 0.5f;
-  std::optional<OutlineOptions> outline;
+  std::optional<OutlineOptions> outline;  // none: the stroke's
 
   float zoom = 1.0f;    // canvas pixels per stroke unit; finite, above 0
   float rotate = 0.0f;  // degrees clockwise, finite

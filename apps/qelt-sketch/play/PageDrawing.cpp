@@ -138,19 +138,32 @@ class Drawing : public PlayObserver {
 
 }  // namespace
 
-DrawableSet drawablesFor(const Options& options) {
+DrawableSet drawablesFor(const Page& page, const Options& options) {
+  const auto asksForOutline = [&](const Stroke& stroke) {
+    return outlineFor(stroke.brush, options).has_value();
+  };
   return {.stroke = true,
-          .outline = options.outline.has_value(),
+          .outline = std::any_of(page.strokes.begin(), page.strokes.end(), asksForOutline),
           .preview = false,
           .prediction = options.predict > 0 && options.mode == Mode::Live};
 }
 
 float largestPenSize(const PluginLibrary& plugin, RenderQueue& queue, const Page& page,
                      const Options& options) {
-  const PenSession session(plugin, queue, options);
+  const PenSet pens(plugin, queue, page, options);
   float largest = 0.0f;
   for (const Stroke& stroke : page.strokes) {
-    largest = std::fmax(largest, styleFor(stroke.brush, session.ownStyle(), options).size);
+    const PenStyle& own = pens.of(renderingVersionFor(stroke.brush, options)).ownStyle();
+    largest = std::fmax(largest, styleFor(stroke.brush, own, options).size);
+  }
+  return largest;
+}
+
+float largestOutlineSize(const Page& page, const Options& options) {
+  float largest = 0.0f;
+  for (const Stroke& stroke : page.strokes) {
+    const std::optional<OutlineOptions> outline = outlineFor(stroke.brush, options);
+    if (outline) largest = std::fmax(largest, outline->size);
   }
   return largest;
 }
@@ -167,8 +180,8 @@ Picture drawPage(const PluginLibrary& plugin, RenderQueue& queue, const Page& pa
     if (++tries > kMostTries) throw std::runtime_error("the GL context is lost again and again");
     timesBefore = drawing.timesEmptied();
     {
-      PenSession session(plugin, queue, options);
-      PagePlayer(session, page, options, drawing.canvases()).play(drawing);
+      const PenSet pens(plugin, queue, page, options);
+      PagePlayer(pens, page, options, drawing.canvases()).play(drawing);
     }
     layers = drawing.readLayers();
   } while (drawing.timesEmptied() != timesBefore);

@@ -24,15 +24,17 @@ struct DrawableSet {
   bool prediction = false;
 };
 
-// Strokes, and outlines and predictions where the options ask for them.
-DrawableSet drawablesFor(const Options& options);
+// Strokes, outlines where the options or a stroke ask for them, and predictions where the options do.
+DrawableSet drawablesFor(const Page& page, const Options& options);
 
 // The largest pen size on the page, as `styleFor` gives it; sizes that are NaN do not count.
 float largestPenSize(const PluginLibrary& plugin, RenderQueue& queue, const Page& page,
                      const Options& options);
+// The largest outline size on the page, as `outlineFor` gives it; 0 without outlines.
+float largestOutlineSize(const Page& page, const Options& options);
 
-// Plays the page to a new pen and composes the layers on the background. Throws Refusal when the picture is
-// too large to draw or the pen lacks a drawable.
+// Plays the page to new pens and composes the layers on the background. Throws Refusal when the picture is
+// too large to draw or a pen lacks a drawable.
 Picture drawPage(const PluginLibrary& plugin, RenderQueue& queue, const Page& page, const Options& options,
                  const PageLayout& layout, const DrawableSet& drawables, Progress& progress);
 

@@ -41,21 +41,28 @@ void QueueWatch::finish() {
   if (mQueue.droppedTasks() != mDroppedBefore) throw std::runtime_error("a render task failed (see --log)");
 }
 
-PagePlayer::PagePlayer(PenSession& session, const Page& page, const Options& options,
-                       const Canvases& canvases)
-    : mSession(session), mPage(page), mOptions(options) {
+PagePlayer::PagePlayer(const PenSet& pens, const Page& page, const Options& options, const Canvases& canvases)
+    : mPage(page), mOptions(options) {
   using Qelt::Pen;
-  Pen& pen = session.pen();
-  mStroke = drawableOn(canvases.stroke, pen, &Pen::GetStrokeDrawableGL, DrawableKind::Stroke);
-  mOutline = drawableOn(canvases.outline, pen, &Pen::GetOutlineDrawableGL, DrawableKind::Outline);
-  mPreview = drawableOn(canvases.preview, pen, &Pen::GetPreviewDrawableGL, DrawableKind::Preview);
-  mPrediction =
-      drawableOn(canvases.prediction, pen, &Pen::GetPredictionStrokeDrawableGL, DrawableKind::Prediction);
-  if (mOutline != nullptr && options.outline) {
-    mOutline->SetOutlineSize(options.outline->size);
-    mOutline->SetOutlineColor(static_cast<int>(options.outline->argb));
+  for (const auto& [version, session] : pens.sessions()) {
+    Pen& pen = session->pen();
+    Drawables drawables{
+        .renderingVersion = version,
+        .session = session.get(),
+        .stroke = drawableOn(canvases.stroke, pen, &Pen::GetStrokeDrawableGL, DrawableKind::Stroke),
+        .outline = drawableOn(canvases.outline, pen, &Pen::GetOutlineDrawableGL, DrawableKind::Outline),
+        .preview = drawableOn(canvases.preview, pen, &Pen::GetPreviewDrawableGL, DrawableKind::Preview),
+        .prediction = drawableOn(canvases.prediction, pen, &Pen::GetPredictionStrokeDrawableGL,
+                                 DrawableKind::Prediction),
+        .ownOutline = {},
+        .outlineNow = {}};
+    if (drawables.outline != nullptr) {
+      drawables.ownOutline = {drawables.outline->GetOutlineSize(),
+                              static_cast<std::uint32_t>(drawables.outline->GetOutlineColor())};
+    }
+    if (drawables.prediction != nullptr) drawables.prediction->SetOpacity(options.opacity);
+    mDrawables.emplace(version, drawables);
   }
-  if (mPrediction != nullptr) mPrediction->SetOpacity(options.opacity);
   if (options.mode == Mode::Stroke) {
     for (std::size_t i = 0; i < page.strokes.size(); ++i) {
       mStoredStrokes.push_back(storedStroke(page.strokes[i], pointerOf(i)));
@@ -86,7 +93,10 @@ void PagePlayer::play(PlayObserver& observer) {
 }
 
 void PagePlayer::playStroke(std::size_t index, PlayObserver& observer) {
-  mSession.setStyle(styleFor(mPage.strokes[index].brush, mSession.ownStyle(), mOptions));
+  const Brush brush = mPage.strokes[index].brush;
+  mNow = &mDrawables.at(renderingVersionFor(brush, mOptions));
+  mNow->session->setStyle(styleFor(brush, mNow->session->ownStyle(), mOptions));
+  mNow->session->setCurve(curveFor(brush, mOptions));
   if (mOptions.mode == Mode::Stroke) {
     playStored(index, observer);
     return;
@@ -101,16 +111,17 @@ void PagePlayer::playLive(std::size_t index, PlayObserver& observer) {
            [&](LiveEvent& live) {
              const Qelt::MotionEvent& event = live.event;
              const int action = event.GetAction();
-             if (mPrediction != nullptr) observer.predictionEnds();
-             if (mStroke != nullptr) {
-               observer.call({DrawableKind::Stroke, index, "Draw", action},
-                             [&](Qelt::RectF* rect) { return mStroke->Draw(&event, rect); });
+             if (mNow->prediction != nullptr) observer.predictionEnds();
+             if (mNow->stroke != nullptr) {
+               observer.call(call(DrawableKind::Stroke, index, "Draw", action),
+                             [&](Qelt::RectF* rect) { return mNow->stroke->Draw(&event, rect); });
              }
-             if (mPreview != nullptr) {
-               observer.call({DrawableKind::Preview, index, "Draw", action},
-                             [&](Qelt::RectF* rect) { return mPreview->Draw(&event, rect); });
+             if (mNow->preview != nullptr) {
+               observer.call(call(DrawableKind::Preview, index, "Draw", action),
+                             [&](Qelt::RectF* rect) { return mNow->preview->Draw(&event, rect); });
              }
-             if (mPrediction != nullptr && action == Qelt::kActionMove) predict(index, live.sample, observer);
+             if (mNow->prediction != nullptr && action == Qelt::kActionMove)
+               predict(index, live.sample, observer);
            });
 }
 
@@ -118,46 +129,47 @@ void PagePlayer::predict(std::size_t index, std::size_t sample, PlayObserver& ob
   const Samples samples = mPage.strokes[index].samples;
   const Qelt::MotionEvent event =
       predictedEvent(samples[sample - 1], samples[sample], pointerOf(index), mOptions.predict);
-  observer.call({DrawableKind::Prediction, index, "Draw", event.GetAction()},
-                [&](Qelt::RectF* rect) { return mPrediction->Draw(&event, rect); });
+  observer.call(call(DrawableKind::Prediction, index, "Draw", event.GetAction()),
+                [&](Qelt::RectF* rect) { return mNow->prediction->Draw(&event, rect); });
 }
 
 // The stroke as one recorded event. In live mode that is the outline's alone, as it has no live input.
 void PagePlayer::playRecorded(std::size_t index, PlayObserver& observer) {
   const bool live = mOptions.mode == Mode::Live;
-  if (live && mOutline == nullptr) return;
+  const bool outlines = outlinesNow(index);
+  if (live && !outlines) return;
   const Stroke stroke = mPage.strokes[index];
   const auto play = [&](DrawableKind drawable, const char* operation, const auto& draw) {
     // The pen corrects the event that it is given, so every drawable gets its own copy.
     Qelt::MotionEvent event = recordedEvent(stroke, pointerOf(index));
-    observer.call({drawable, index, operation, event.GetAction()},
+    observer.call(call(drawable, index, operation, event.GetAction()),
                   [&](Qelt::RectF* rect) { return draw(&event, rect); });
   };
   using Event = const Qelt::MotionEvent*;
-  if (mOutline != nullptr) {
+  if (outlines) {
     play(DrawableKind::Outline, "DrawOutline",
-         [&](Event event, Qelt::RectF* rect) { return mOutline->DrawOutline(event, rect); });
+         [&](Event event, Qelt::RectF* rect) { return mNow->outline->DrawOutline(event, rect); });
   }
   if (live) return;
-  if (mStroke != nullptr) {
+  if (mNow->stroke != nullptr) {
     play(DrawableKind::Stroke, "RedrawPen",
-         [&](Event event, Qelt::RectF* rect) { return mStroke->RedrawPen(event, rect); });
+         [&](Event event, Qelt::RectF* rect) { return mNow->stroke->RedrawPen(event, rect); });
   }
-  if (mPreview != nullptr) {
+  if (mNow->preview != nullptr) {
     play(DrawableKind::Preview, "RedrawPen",
-         [&](Event event, Qelt::RectF* rect) { return mPreview->RedrawPen(event, rect); });
+         [&](Event event, Qelt::RectF* rect) { return mNow->preview->RedrawPen(event, rect); });
   }
 }
 
 void PagePlayer::playStored(std::size_t index, PlayObserver& observer) {
   const Qelt::ObjectStroke* const stroke = mStoredStrokes[index].get();
-  if (mOutline != nullptr) {
-    observer.call({DrawableKind::Outline, index, "DrawOutline", std::nullopt},
-                  [&](Qelt::RectF* rect) { return mOutline->DrawOutline(stroke, rect); });
+  if (outlinesNow(index)) {
+    observer.call(call(DrawableKind::Outline, index, "DrawOutline", std::nullopt),
+                  [&](Qelt::RectF* rect) { return mNow->outline->DrawOutline(stroke, rect); });
   }
-  if (mStroke != nullptr) {
-    observer.call({DrawableKind::Stroke, index, "RedrawPen", std::nullopt}, [&](Qelt::RectF* rect) {
-      const bool drawn = mStroke->RedrawPen(stroke, rect);
+  if (mNow->stroke != nullptr) {
+    observer.call(call(DrawableKind::Stroke, index, "RedrawPen", std::nullopt), [&](Qelt::RectF* rect) {
+      const bool drawn = mNow->stroke->RedrawPen(stroke, rect);
       // Before the observer waits for the render thread, which takes as much memory again.
       boundCache(index);
       return drawn;
@@ -184,6 +196,25 @@ void PagePlayer::boundCache(std::size_t index) {
     mCachedBytesOf[index] = 0;
   }
   manager->ReleaseStrokeData(handle);
+}
+
+// Whether the stroke has an outline now, which is then set to its size and colour. Where outlines alone are
+// asked for, every stroke has one: without settings, the pen's own.
+bool PagePlayer::outlinesNow(std::size_t index) {
+  if (mNow->outline == nullptr) return false;
+  const std::optional<OutlineOptions> asked = outlineFor(mPage.strokes[index].brush, mOptions);
+  if (!asked && mOptions.drawable != DrawableKind::Outline) return false;
+  if (asked == mNow->outlineNow) return true;
+  mNow->outlineNow = asked;
+  const OutlineOptions outline = asked.value_or(mNow->ownOutline);
+  mNow->outline->SetOutlineSize(outline.size);
+  mNow->outline->SetOutlineColor(static_cast<int>(outline.argb));
+  return true;
+}
+
+DrawableCall PagePlayer::call(DrawableKind drawable, std::size_t index, const char* operation,
+                              std::optional<int> action) const {
+  return {drawable, index, mNow->renderingVersion, operation, action};
 }
 
 Pointer PagePlayer::pointerOf(std::size_t index) const {

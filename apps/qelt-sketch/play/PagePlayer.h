@@ -3,6 +3,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <functional>
+#include <map>
 #include <memory>
 #include <optional>
 #include <vector>
@@ -30,6 +31,7 @@ namespace QeltDesktop {
 struct DrawableCall {
   DrawableKind drawable;
   std::size_t stroke;  // index in the page
+  int renderingVersion;
   const char* operation;
   std::optional<int> action;  // of the event; none when a stored stroke is drawn
 };
@@ -72,11 +74,11 @@ struct Canvases {
 };
 
 // Plays a page to a pen as the options say: every stroke as live events, as one recorded event or as a stored
-// stroke, as often as asked. Main thread. Session, page, options and canvases outlive it.
+// stroke, as often as asked. Main thread. Pens, page, options and canvases outlive it.
 class PagePlayer {
  public:
-  // Throws Refusal when the pen has no drawable for one of the canvases.
-  PagePlayer(PenSession& session, const Page& page, const Options& options, const Canvases& canvases);
+  // Throws Refusal when a pen has no drawable for one of the canvases.
+  PagePlayer(const PenSet& pens, const Page& page, const Options& options, const Canvases& canvases);
   // Drops the cached drawings of the stored strokes.
   ~PagePlayer();
   PagePlayer(const PagePlayer&) = delete;
@@ -93,14 +95,26 @@ class PagePlayer {
   void boundCache(std::size_t index);
   void predict(std::size_t index, std::size_t sample, PlayObserver& observer);
   Pointer pointerOf(std::size_t index) const;
+  bool outlinesNow(std::size_t index);
+  DrawableCall call(DrawableKind drawable, std::size_t index, const char* operation,
+                    std::optional<int> action) const;
 
-  PenSession& mSession;
+  // A pen, and its drawables for the canvases that there are.
+  struct Drawables {
+    int renderingVersion;
+    PenSession* session;
+    Qelt::PenStrokeDrawableGL* stroke;
+    Qelt::PenOutlineDrawableGL* outline;
+    Qelt::PenPreviewDrawableGL* preview;
+    Qelt::IPenPredictionDrawableGL* prediction;
+    OutlineOptions ownOutline;
+    std::optional<OutlineOptions> outlineNow;  // none: the pen's own
+  };
+
   const Page& mPage;
   const Options& mOptions;
-  Qelt::PenStrokeDrawableGL* mStroke = nullptr;
-  Qelt::PenOutlineDrawableGL* mOutline = nullptr;
-  Qelt::PenPreviewDrawableGL* mPreview = nullptr;
-  Qelt::IPenPredictionDrawableGL* mPrediction = nullptr;
+  std::map<int, Drawables> mDrawables;                        // by rendering version
+  Drawables* mNow = nullptr;                                  // those of the stroke that is being played
   std::vector<std::unique_ptr<StoredStroke>> mStoredStrokes;  // one per stroke, in stroke mode; else empty
   std::vector<std::size_t> mCachedBytesOf;                    // of each stored stroke
   std::size_t mCachedBytes = 0;

@@ -25,15 +25,30 @@ PenStyle styleFor(const Brush& brush, const PenStyle& own, const Options& option
   return style;
 }
 
-PenSession::PenSession(const PluginLibrary& plugin, RenderQueue& queue, const Options& options)
+int renderingVersionFor(const Brush& brush, const Options& options) {
+  if (options.renderingVersion) return *options.renderingVersion;
+  return brush.renderingVersion.value_or(kUsualRenderingVersion);
+}
+
+bool curveFor(const Brush& brush, const Options& options) {
+  return options.curve ? *options.curve : brush.curve.value_or(kUsualCurve);
+}
+
+std::optional<OutlineOptions> outlineFor(const Brush& brush, const Options& options) {
+  if (options.outline) return options.outline;
+  if (!brush.outlineSize) return std::nullopt;
+  return OutlineOptions{*brush.outlineSize, brush.outlineArgb.value_or(0xFF000000u)};
+}
+
+PenSession::PenSession(const PluginLibrary& plugin, RenderQueue& queue, int renderingVersion)
     : mQueue(queue), mDataManager(&queue), mPen(plugin.createPen()), mOwnStyle{} {
   if (!mPen) throw Refusal(plugin.path() + ": the plug-in makes no pen");
   mPen->setPenDataManager(&mDataManager);
   mPen->SetScreenResolution(kScreenWidth, kScreenHeight);
-  mPen->setVersion(options.renderingVersion);
+  mPen->setVersion(renderingVersion);
   mOwnStyle = {mPen->GetSize(), static_cast<std::uint32_t>(mPen->GetColor())};
   Qelt::IPenMorphable* const morphable = mPen->GetMorphable();
-  if (morphable != nullptr) morphable->SetCurveEnabled(options.curve);
+  if (morphable != nullptr) morphable->SetCurveEnabled(mCurve);
 }
 
 PenSession::~PenSession() {
@@ -44,6 +59,21 @@ PenSession::~PenSession() {
 void PenSession::setStyle(const PenStyle& style) {
   mPen->SetSize(style.size);
   mPen->SetColor(static_cast<int>(style.argb));
+}
+
+void PenSession::setCurve(bool curve) {
+  if (curve == mCurve) return;
+  mCurve = curve;
+  Qelt::IPenMorphable* const morphable = mPen->GetMorphable();
+  if (morphable != nullptr) morphable->SetCurveEnabled(curve);
+}
+
+PenSet::PenSet(const PluginLibrary& plugin, RenderQueue& queue, const Page& page, const Options& options) {
+  for (const Stroke& stroke : page.strokes) {
+    const int version = renderingVersionFor(stroke.brush, options);
+    std::unique_ptr<PenSession>& session = mSessions[version];
+    if (!session) session = std::make_unique<PenSession>(plugin, queue, version);
+  }
 }
 
 }  // namespace QeltDesktop

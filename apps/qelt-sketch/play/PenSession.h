@@ -1,7 +1,9 @@
 #pragma once
 
 #include <cstdint>
+#include <map>
 #include <memory>
+#include <optional>
 
 #include "desktop/engine/PluginLibrary.h"
 #include "desktop/pencommon/PenDataManager.h"
@@ -23,12 +25,18 @@ struct PenStyle {
 // colour, a transparency, or both.
 PenStyle styleFor(const Brush& brush, const PenStyle& own, const Options& options);
 
+// In the same way: what the command line gives, else the brush, else what is usual. An outline takes a size;
+// its colour is opaque black where the brush has none. No outline unless one of them asks for it.
+int renderingVersionFor(const Brush& brush, const Options& options);
+bool curveFor(const Brush& brush, const Options& options);
+std::optional<OutlineOptions> outlineFor(const Brush& brush, const Options& options);
+
 // One pen of the plug-in, set up as a host does it, and its way to the render thread. Main thread. The queue,
 // and every canvas that one of the pen's drawables was given, outlive it.
 class PenSession {
  public:
   // Throws Refusal when the plug-in makes no pen.
-  PenSession(const PluginLibrary& plugin, RenderQueue& queue, const Options& options);
+  PenSession(const PluginLibrary& plugin, RenderQueue& queue, int renderingVersion);
   // Deletes the pen and waits for its last tasks.
   ~PenSession();
   PenSession(const PenSession&) = delete;
@@ -37,14 +45,30 @@ class PenSession {
   Qelt::Pen& pen() { return *mPen; }
   // The style of a new pen.
   const PenStyle& ownStyle() const { return mOwnStyle; }
-  // Applies to the strokes from now on.
+  // These apply to the strokes from now on.
   void setStyle(const PenStyle& style);
+  void setCurve(bool curve);
 
  private:
   RenderQueue& mQueue;
   PenDataManager mDataManager;
   std::unique_ptr<Qelt::Pen> mPen;
   PenStyle mOwnStyle;
+  bool mCurve = kUsualCurve;
+};
+
+// A pen for each rendering version in which strokes of a page are drawn. Like a session, and as long-lived.
+class PenSet {
+ public:
+  // Throws Refusal when the plug-in makes no pen.
+  PenSet(const PluginLibrary& plugin, RenderQueue& queue, const Page& page, const Options& options);
+
+  const std::map<int, std::unique_ptr<PenSession>>& sessions() const { return mSessions; }
+  // Of the version in which a stroke of the page is drawn.
+  PenSession& of(int renderingVersion) const { return *mSessions.at(renderingVersion); }
+
+ private:
+  std::map<int, std::unique_ptr<PenSession>> mSessions;
 };
 
 }  // namespace QeltDesktop

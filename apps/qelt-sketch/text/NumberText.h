@@ -1,5 +1,6 @@
 #pragma once
 
+#include <functional>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -14,6 +15,14 @@ namespace QeltDesktop {
 std::optional<float> parseFloat(std::string_view text);
 std::optional<double> parseDouble(std::string_view text);
 std::optional<int> parseInt(std::string_view text);
+
+// Appends a finite number as a decimal that reads back as the same number, "-0" too: a short one where there
+// is one, with at most 9 significant digits for a float and 17 for a double.
+void appendNumber(std::string& out, float value);
+void appendNumber(std::string& out, double value);
+// The same where something else is to come of the decimal than `value`: it may be any for which `isRight`
+// holds, given the double nearest to the decimal. If there is none, what is appended reads back as `value`.
+void appendDecimal(std::string& out, double value, const std::function<bool(double)>& isRight);
 
 // A float as JSON: the shortest decimal that reads back as the same float, always with a point or an
 // exponent so that -0.0 survives; "NaN", "Infinity" and "-Infinity" as strings.
