@@ -4,6 +4,9 @@
 add_compile_options(-fwasm-exceptions)
 add_link_options(-fwasm-exceptions)
 
+# Its optimiser is a script that needs Debian's libraries, whichever node runs it.
+set(CMAKE_CXX_LINKER_LAUNCHER ${CMAKE_COMMAND} -E env NODE_PATH=/usr/share/nodejs)
+
 # Emscripten brings no XML parser. Debian's source package of expat, as tools/install-packages --web unpacks it.
 set(QELT_EXPAT_SOURCE "" CACHE PATH "Where expat's source package is unpacked")
 set(expat ${QELT_EXPAT_SOURCE}/expat)

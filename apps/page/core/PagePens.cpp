@@ -54,19 +54,12 @@ Qelt::Matrix3<float> matrixOf(const PageView& view) {
   return matrix;
 }
 
-Options optionsFor(const PageStyle& style) {
-  Options options;
-  options.renderingVersion = style.look;
-  options.curve = style.smooth;
-  return options;
-}
-
 // One pen and its drawable for stored strokes.
 class PagePens::Pen {
  public:
   Pen(const PluginLibrary& plugin, RenderQueue& queue, const PageStyle& style)
       : mCanvas(&queue, nullptr),
-        mSession(plugin, queue, optionsFor(style)),
+        mSession(plugin, queue, style.look),
         mStroke(mSession.pen().GetStrokeDrawableGL()) {
     if (mStroke == nullptr) throw std::bad_alloc();
   }
@@ -74,6 +67,7 @@ class PagePens::Pen {
   void draw(const PageStroke& stroke, const PageCanvas& canvas) {
     const PageStyle& style = stroke.style();
     mSession.setStyle({style.size, style.argb});
+    mSession.setCurve(style.smooth);
     mCanvas.setLayer(canvas.strokes);
     mCanvas.setMatrix(matrixOf(canvas.view));
     if (mStroke->GetCanvas() == nullptr) mStroke->SetCanvas(&mCanvas);
@@ -94,7 +88,7 @@ class PagePens::OutlinePen {
  public:
   OutlinePen(const PluginLibrary& plugin, RenderQueue& queue, const PageStyle& style)
       : mCanvas(&queue, nullptr),
-        mSession(plugin, queue, optionsFor(style)),
+        mSession(plugin, queue, style.look),
         mOutline(mSession.pen().GetOutlineDrawableGL()) {
     if (mOutline == nullptr) throw std::bad_alloc();
   }
@@ -110,6 +104,7 @@ class PagePens::OutlinePen {
     mBefore = 0;
     const PageStyle& style = stroke.style();
     mSession.setStyle({style.size, style.argb});
+    mSession.setCurve(style.smooth);
     mOutline->SetOutlineSize(style.outline->size);
     mOutline->SetOutlineColor(static_cast<int>(style.outline->argb));
     // The canvas has a layer when the drawable is given it, and prepares to draw.
@@ -206,7 +201,8 @@ PenLimits PagePens::limits(int look) {
 void PagePens::drawPreview(const PageStyle& style, CanvasLayer& layer, const PageView& view) {
   PenCanvas canvas(&mQueue, &layer);
   canvas.setMatrix(matrixOf(view));
-  PenSession session(mPlugin, mQueue, optionsFor(style));
+  PenSession session(mPlugin, mQueue, style.look);
+  session.setCurve(style.smooth);
   session.setStyle({style.size, style.argb});
   Qelt::PenPreviewDrawableGL* const preview = session.pen().GetPreviewDrawableGL();
   if (preview == nullptr) throw std::bad_alloc();

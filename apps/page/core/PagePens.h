@@ -34,9 +34,6 @@ class PensByLook {
   std::array<std::array<std::unique_ptr<Pen>, 2>, 8> mPens;
 };
 
-struct Options;
-Options optionsFor(const PageStyle& style);
-
 // Where stored strokes are drawn. Without a layer for outlines none are.
 struct PageCanvas {
   CanvasLayer* strokes = nullptr;

@@ -41,7 +41,7 @@ class WetInk::Pen {
   Pen(const PluginLibrary& plugin, RenderQueue& queue, const PageStyle& style)
       : mInkCanvas(&queue, nullptr),
         mPredictionCanvas(&queue, nullptr),
-        mSession(plugin, queue, optionsFor(style)),
+        mSession(plugin, queue, style.look),
         mStroke(mSession.pen().GetStrokeDrawableGL()) {
     if (mStroke == nullptr) throw std::bad_alloc();
     if (!versionOf(style).predicts) return;
@@ -53,6 +53,7 @@ class WetInk::Pen {
   // Before a call.
   void aim(const PageStyle& style, const PageView& view, CanvasLayer* ink, CanvasLayer* prediction) {
     mSession.setStyle({style.size, style.argb});
+    mSession.setCurve(style.smooth);
     aim(mStroke, mInkCanvas, view, ink);
     aim(mPrediction, mPredictionCanvas, view, prediction);
   }
