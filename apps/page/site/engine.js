@@ -149,6 +149,13 @@ export class Engine {
     this.#call('samples', id);
     return this.#numbers();
   }
+  style(id) {
+    this.#call('style', id);
+    const [look, size, color, smooth, outlineSize, outlineColor, tool] = this.#numbers();
+    return {look, size, color, smooth: smooth === 1,
+            outline: outlineSize > 0 ? {size: outlineSize, color: outlineColor} : null,
+            tool: Object.keys(TOOLS).find((name) => TOOLS[name] === tool)};
+  }
 
   // Storage and files.
   record(id) {

@@ -298,6 +298,17 @@ EMSCRIPTEN_KEEPALIVE int qelt_samples(StrokeId id) {
     return 0;
   });
 }
+// Answers with look, size, colour, smoothing, the outline's size (0 without) and colour, and the tool.
+EMSCRIPTEN_KEEPALIVE int qelt_style(StrokeId id) {
+  return onPage([&](InkPage& page) {
+    const PageStyle& style = page.style(id);
+    const PageOutline outline = style.outline.value_or(PageOutline{});
+    gNumbers = {static_cast<double>(style.look), style.size,   static_cast<double>(style.argb),
+                style.smooth ? 1.0 : 0.0,        outline.size, static_cast<double>(outline.argb),
+                static_cast<double>(style.tool)};
+    return 0;
+  });
+}
 // Answers 1 with left, top, right and bottom; 0 on an empty page.
 EMSCRIPTEN_KEEPALIVE int qelt_bounds() {
   return onPage([](InkPage& page) {
