@@ -14,7 +14,7 @@
 #include "pencommon/PenOutlineDrawableGL.h"
 #include "pencommon/PenPreviewDrawableGL.h"
 #include "pencommon/PenStrokeDrawableGL.h"
-#include "play/Options.h"
+#include "play/PagePlayer.h"
 #include "play/PenSession.h"
 #include "play/SamplePanel.h"
 #include "play/StrokeFeeder.h"
@@ -32,16 +32,17 @@ bool followsZoom(int look) {
   return versionOf(look).floatsPerVertex > Qelt::kRenderingVersions.front().floatsPerVertex;
 }
 
-// Whatever a call throws, what it posted runs before anything else changes.
+// Makes a call and runs what it posted, whatever it throws. Throws as well when something of it was lost.
 template <typename Call>
 void runWith(RenderQueue& queue, const Call& call) {
+  QueueWatch watch(queue);
   try {
     call();
   } catch (...) {
     queue.runPending();
     throw;
   }
-  queue.runPending();
+  watch.finish();
 }
 
 }  // namespace
@@ -54,20 +55,14 @@ Qelt::Matrix3<float> matrixOf(const PageView& view) {
   return matrix;
 }
 
-Options optionsFor(const PageStyle& style) {
-  Options options;
-  options.renderingVersion = style.look;
-  options.curve = style.smooth;
-  return options;
-}
-
 // One pen and its drawable for stored strokes.
 class PagePens::Pen {
  public:
   Pen(const PluginLibrary& plugin, RenderQueue& queue, const PageStyle& style)
       : mCanvas(&queue, nullptr),
-        mSession(plugin, queue, optionsFor(style)),
+        mSession(plugin, queue, style.look),
         mStroke(mSession.pen().GetStrokeDrawableGL()) {
+    mSession.setCurve(style.smooth);
     if (mStroke == nullptr) throw std::bad_alloc();
   }
 
@@ -94,8 +89,9 @@ class PagePens::OutlinePen {
  public:
   OutlinePen(const PluginLibrary& plugin, RenderQueue& queue, const PageStyle& style)
       : mCanvas(&queue, nullptr),
-        mSession(plugin, queue, optionsFor(style)),
+        mSession(plugin, queue, style.look),
         mOutline(mSession.pen().GetOutlineDrawableGL()) {
+    mSession.setCurve(style.smooth);
     if (mOutline == nullptr) throw std::bad_alloc();
   }
 
@@ -206,7 +202,8 @@ PenLimits PagePens::limits(int look) {
 void PagePens::drawPreview(const PageStyle& style, CanvasLayer& layer, const PageView& view) {
   PenCanvas canvas(&mQueue, &layer);
   canvas.setMatrix(matrixOf(view));
-  PenSession session(mPlugin, mQueue, optionsFor(style));
+  PenSession session(mPlugin, mQueue, style.look);
+  session.setCurve(style.smooth);
   session.setStyle({style.size, style.argb});
   Qelt::PenPreviewDrawableGL* const preview = session.pen().GetPreviewDrawableGL();
   if (preview == nullptr) throw std::bad_alloc();

@@ -34,9 +34,6 @@ class PensByLook {
   std::array<std::array<std::unique_ptr<Pen>, 2>, 8> mPens;
 };
 
-struct Options;
-Options optionsFor(const PageStyle& style);
-
 // Where stored strokes are drawn. Without a layer for outlines none are.
 struct PageCanvas {
   CanvasLayer* strokes = nullptr;
@@ -57,8 +54,8 @@ class PagePens {
   PagePens& operator=(const PagePens&) = delete;
 
   // Draws a stroke of the list above what is there, and runs the queue. Returns how many bytes of vertices
-  // went to the GPU. What it throws leaves an incomplete drawing: std::bad_alloc, Refusal where the plug-in
-  // makes no pen.
+  // went to the GPU. What it throws leaves an incomplete drawing: std::bad_alloc, std::runtime_error when a
+  // render task failed, Refusal where the plug-in makes no pen.
   std::size_t draw(StrokeList& strokes, std::size_t index, const PageCanvas& canvas);
   // The same for a stroke that is on no page, without its outline.
   void drawAlone(PageStroke& stroke, const PageCanvas& canvas);

@@ -41,8 +41,9 @@ class WetInk::Pen {
   Pen(const PluginLibrary& plugin, RenderQueue& queue, const PageStyle& style)
       : mInkCanvas(&queue, nullptr),
         mPredictionCanvas(&queue, nullptr),
-        mSession(plugin, queue, optionsFor(style)),
+        mSession(plugin, queue, style.look),
         mStroke(mSession.pen().GetStrokeDrawableGL()) {
+    mSession.setCurve(style.smooth);
     if (mStroke == nullptr) throw std::bad_alloc();
     if (!versionOf(style).predicts) return;
     mPrediction = mSession.pen().GetPredictionStrokeDrawableGL();
