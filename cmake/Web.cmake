@@ -1,8 +1,16 @@
 # What building for a browser takes that other systems bring along.
 
+# The page is one file that is mailed and opened: what draws stays fast, all else is kept small.
+set(CMAKE_POSITION_INDEPENDENT_CODE OFF)
+set(CMAKE_CXX_FLAGS_RELEASE "-Os -DNDEBUG")
+set(CMAKE_C_FLAGS_RELEASE "-Os -DNDEBUG")
+
 # C++ exceptions, as browsers have them themselves.
 add_compile_options(-fwasm-exceptions)
 add_link_options(-fwasm-exceptions)
+
+# Its optimiser is a script that needs Debian's libraries, whichever node runs it.
+set(CMAKE_CXX_LINKER_LAUNCHER ${CMAKE_COMMAND} -E env NODE_PATH=/usr/share/nodejs)
 
 # Emscripten brings no XML parser. Debian's source package of expat, as tools/install-packages --web unpacks it.
 set(QELT_EXPAT_SOURCE "" CACHE PATH "Where expat's source package is unpacked")

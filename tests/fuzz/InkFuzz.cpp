@@ -1,5 +1,5 @@
 // Feeds the ink reader any bytes: it reads a page or refuses it, naming file and line, and keeps what Ink.h
-// says of the pages it reads.
+// says of the pages it reads. What the writer makes of a page reads back; written again it is the same.
 
 #include <sys/mman.h>
 #include <unistd.h>
@@ -11,6 +11,8 @@
 
 #include "FuzzInput.h"
 #include "ink/InkmlReader.h"
+#include "ink/InkmlWriter.h"
+#include "ink/SourceText.h"
 #include "text/Refusal.h"
 
 namespace {
@@ -28,6 +30,15 @@ void check(const Page& page) {
         QeltTests::breakOff("the reader", "a point that is not finite");
     }
   }
+}
+
+void checkWritten(const Page& page) {
+  const std::string once = QeltDesktop::writeInkml(page.strokes);
+  const Page back = QeltDesktop::readInkml(QeltDesktop::SourceText("written", once));
+  check(back);
+  if (back.strokes.size() != page.strokes.size())
+    QeltTests::breakOff("the writer", "a stroke too many or few");
+  if (QeltDesktop::writeInkml(back.strokes) != once) QeltTests::breakOff("the writer", "another page");
 }
 
 // A file of these bytes, for that is where encodings are told apart.
@@ -52,7 +63,9 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   if (size > 65536) return -1;
   const std::string name = fileOf(data, size);
   try {
-    check(QeltDesktop::readInkmlFile(name));
+    const Page page = QeltDesktop::readInkmlFile(name);
+    check(page);
+    checkWritten(page);
   } catch (const QeltDesktop::Refusal& refusal) {
     if (!namesPlace(refusal.what(), name))
       QeltTests::breakOff("the reader", "a refusal without file and line");

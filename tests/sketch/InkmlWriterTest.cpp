@@ -31,6 +31,7 @@ Strokes writtenAndRead(const Strokes& strokes) {
 }
 
 bool sameBits(const Sample& one, const Sample& other) {
+  // To the last bit. NOLINTNEXTLINE(bugprone-suspicious-memory-comparison)
   const auto same = [](auto a, auto b) { return std::memcmp(&a, &b, sizeof a) == 0; };
   return same(one.x, other.x) && same(one.y, other.y) && same(one.pressure, other.pressure) &&
          same(one.tilt, other.tilt) && same(one.orientation, other.orientation) && same(one.time, other.time);

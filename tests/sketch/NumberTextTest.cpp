@@ -1,10 +1,15 @@
 #include "text/NumberText.h"
 
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <bit>
+#include <clocale>
 #include <cmath>
 #include <cstdint>
+#include <cstdio>
+#include <cstdlib>
+#include <filesystem>
 #include <limits>
 #include <nlohmann/json.hpp>
 #include <random>
@@ -35,6 +40,41 @@ TEST(NumberText, JsonIsShortAndReadsBackAsTheSameFloat) {
     const auto read = static_cast<float>(nlohmann::json::parse(json(value)).get<double>());
     ASSERT_EQ(std::bit_cast<std::uint32_t>(read), std::bit_cast<std::uint32_t>(value)) << json(value);
   }
+}
+
+std::string shortest(auto value, std::string text = {}) {
+  appendNumber(text, value);
+  return text;
+}
+
+TEST(NumberText, WritesShortDecimalsInEveryLocale) {
+  const auto expectShort = [] {
+    const std::pair<float, const char*> floats[] = {{0.0f, "0"},         {-0.0f, "-0"},
+                                                    {12.0f, "12"},       {-0.1f, "-0.1"},
+                                                    {0.0125f, "0.0125"}, {16777216.0f, "16777216"},
+                                                    {1e-30f, "1e-30"},   {-3.4028235e38f, "-3.4028235e+38"}};
+    for (const auto& [value, text] : floats) EXPECT_EQ(shortest(value), text);
+    const std::pair<double, const char*> doubles[] = {{0.1, "0.1"},
+                                                      {1000.0 / 240.0, "4.166666666666667"},
+                                                      {1e300, "1e+300"},
+                                                      {1.0 / 3.0, "0.3333333333333333"}};
+    for (const auto& [value, text] : doubles) EXPECT_EQ(shortest(value), text);
+  };
+  expectShort();
+  // The C library's locales are files. Few machines have one with a comma; most can make one.
+  const std::string folder = testing::TempDir() + "qelt-number-locale-" + std::to_string(getpid());
+  const std::string make =
+      "mkdir -p '" + folder + "' && localedef -i de_DE -f ISO-8859-1 '" + folder + "/de_DE' 2> /dev/null";
+  if (std::system(make.c_str()) == 0) setenv("LOCPATH", folder.c_str(), 1);
+  if (std::setlocale(LC_ALL, "de_DE") != nullptr) {
+    char comma[8];
+    std::snprintf(comma, sizeof comma, "%.1f", 0.5);
+    EXPECT_STREQ(comma, "0,5");
+    expectShort();
+  }
+  std::setlocale(LC_ALL, "C");
+  unsetenv("LOCPATH");
+  std::filesystem::remove_all(folder);
 }
 
 TEST(NumberText, FloatsBeyondTheRangeBecomeInfiniteOrZero) {

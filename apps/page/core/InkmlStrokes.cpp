@@ -12,8 +12,13 @@
 namespace QeltDesktop {
 
 PageStyle styleOf(const Stroke& stroke, const PenLimits& own) {
-  const PenStyle asDrawn = styleFor(stroke.brush, {own.size, own.argb}, Options());
+  const Options none;
+  const PenStyle asDrawn = styleFor(stroke.brush, {own.size, own.argb}, none);
   PageStyle style;
+  style.look = renderingVersionFor(stroke.brush, none);
+  style.smooth = curveFor(stroke.brush, none);
+  if (const auto outline = outlineFor(stroke.brush, none))
+    style.outline = PageOutline{outline->size, outline->argb};
   style.size = asDrawn.size;
   style.argb = asDrawn.argb;
   style.look = renderingVersionFor(stroke.brush, Options());

@@ -69,6 +69,7 @@ class PagePens::Pen {
   void draw(const PageStroke& stroke, const PageCanvas& canvas) {
     const PageStyle& style = stroke.style();
     mSession.setStyle({style.size, style.argb});
+    mSession.setCurve(style.smooth);
     mCanvas.setLayer(canvas.strokes);
     mCanvas.setMatrix(matrixOf(canvas.view));
     if (mStroke->GetCanvas() == nullptr) mStroke->SetCanvas(&mCanvas);
@@ -106,6 +107,7 @@ class PagePens::OutlinePen {
     mBefore = 0;
     const PageStyle& style = stroke.style();
     mSession.setStyle({style.size, style.argb});
+    mSession.setCurve(style.smooth);
     mOutline->SetOutlineSize(style.outline->size);
     mOutline->SetOutlineColor(static_cast<int>(style.outline->argb));
     // The canvas has a layer when the drawable is given it, and prepares to draw.

@@ -54,6 +54,7 @@ class WetInk::Pen {
   // Before a call.
   void aim(const PageStyle& style, const PageView& view, CanvasLayer* ink, CanvasLayer* prediction) {
     mSession.setStyle({style.size, style.argb});
+    mSession.setCurve(style.smooth);
     aim(mStroke, mInkCanvas, view, ink);
     aim(mPrediction, mPredictionCanvas, view, prediction);
   }
