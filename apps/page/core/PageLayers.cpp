@@ -1,7 +1,7 @@
 #include "core/PageLayers.h"
 
 #include <cstdint>
-#include <new>
+#include <exception>
 #include <utility>
 
 #include "desktop/base/Log.h"
@@ -186,13 +186,13 @@ std::size_t PageLayers::drawNext(const BeforeDrawing& beforeDrawing) {
   ++mJob->next;
   try {
     return mPens.draw(mStrokes, index, canvasOf(mBack, mView));
-  } catch (const std::bad_alloc&) {
+  } catch (const std::exception&) {
     // What is cached of others is the first thing to do without.
     mPens.cache().dropAll();
     if (std::exchange(mFailed, stroke.id()) != stroke.id()) {
       restart();
     } else {
-      logError("there is no memory to draw a stroke; it is left out");
+      logError("a stroke cannot be drawn, and is left out");
     }
   }
   return 0;

@@ -125,7 +125,7 @@ class PageLayers {
   PageView mFrontView;
   PixelArea mStale;  // of the front, where it fits
   std::optional<Job> mJob;
-  StrokeId mFailed = 0;              // the last stroke that there was no memory to draw
+  StrokeId mFailed = 0;              // the last stroke that could not be drawn
   std::unique_ptr<GpuFence> mFence;  // after the last slice
 };
 
