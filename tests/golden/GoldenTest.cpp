@@ -128,7 +128,7 @@ Trace strokeTrace(int version) {
   options.curve = true;
   options.tool = Qelt::kToolFinger;
   options.source = Qelt::kSourceTouchScreen;
-  traceStroke(trace, options, 1.0f, fingerMoves(version == 8 ? 20.0f : 50.0f));
+  traceStroke(trace, options, 1.0f, fingerMoves(expectedOf(version).shortMove));
   return trace;
 }
 
@@ -196,7 +196,7 @@ std::vector<Sample> wave() {
   return samples;
 }
 
-BoardOptions page(int version = 8) {
+BoardOptions page(int version = kUsualVersion) {
   return {.version = version, .size = 7.0f, .color = 0xFF203040u, .width = 160, .height = 80, .tile = 64};
 }
 
@@ -279,15 +279,15 @@ TEST(PredictionGolden, PictureIsThatOfTheRelease) {
 }
 
 // The grain is fixed to where a stroke begins: here below the first row of tiles, and to the right of the
-// first column, under a view that is zoomed and moved. One picture under the other, of each kind of grain.
+// first column, under a view that is zoomed and moved. One picture under the other, of each kind of grain;
+// of versions that came after the file, one in a file of its own.
 TEST(GrainGolden, PictureBelowTheFirstTilesIsThatOfTheRelease) {
   std::vector<Sample> shading;
   for (int i = 0; i <= 11; ++i) {
     const auto t = static_cast<float>(i);
     shading.push_back({46.37f + 2.9f * t, i % 2 == 0 ? 51.13f : 72.59f, 0.5f, 0.9f, -0.6f});
   }
-  GreyPicture all;
-  const auto draw = [&](auto&& board, const auto& stroke) {
+  const auto draw = [&](GreyPicture& all, auto&& board, const auto& stroke) {
     board.canvas.setMatrix(viewOf(1.5f, 32.0f, 22.0f));
     stroke(board);
     const GreyPicture picture = pictureOf(board);
@@ -303,16 +303,20 @@ TEST(GrainGolden, PictureBelowTheFirstTilesIsThatOfTheRelease) {
     board.stroke(shading);
     // A lone stamp so dense that its alpha is cut off at 1.
     board.settings.color = 0xFF203040u;
-    board.settings.size = board.options.version == 8 ? 4.5f : 12.0f;
+    board.settings.size = expectedOf(board.options.version).denseSize;
     board.stroke({{35.71f, 68.39f, 1.0f}, {35.71f, 68.39f, 1.0f}});
   };
-  for (const int version : {1, 7, 8}) {
+  GreyPicture all;
+  for (const int version : versionsOfRenderDrawables()) {
     BoardOptions ofVersion = options;
     ofVersion.version = version;
-    draw(DrawingBoard(ofVersion), draws);
+    GreyPicture ownFile;
+    draw(version > kUsualVersion ? ownFile : all, DrawingBoard(ofVersion), draws);
+    if (version > kUsualVersion)
+      expectGoldenPicture(ownFile, "grain-picture-v" + std::to_string(version) + ".pgm");
   }
-  draw(PreviewBoard(options), draws);
-  draw(PredictionBoard(options), [&](auto& board) {
+  draw(all, PreviewBoard(options), draws);
+  draw(all, PredictionBoard(options), [&](auto& board) {
     leaveStroke(board.shared);
     board.shared.mStartX = board.shared.mLastStampX = board.shared.mLastX = shading[0].x;
     board.shared.mStartY = board.shared.mLastStampY = board.shared.mLastY = shading[0].y;

@@ -44,15 +44,8 @@ class EveryKind : public testing::TestWithParam<Drawing> {
   }
 };
 
-// The versions that bring something of their own to the render thread, or the only one that there is.
-INSTANTIATE_TEST_SUITE_P(
-    Drawings, EveryKind,
-    testing::Values(Drawing{Kind::Live, 1}, Drawing{Kind::Live, 7}, Drawing{Kind::Live, 8},
-                    Drawing{Kind::Redraw, 1}, Drawing{Kind::Redraw, 8}, Drawing{Kind::Outline, 1},
-                    Drawing{Kind::Outline, 8}, Drawing{Kind::Preview, 8}, Drawing{Kind::Prediction, 8}),
-    [](const auto& test) {
-      return testing::PrintToString(test.param.kind) + "Version" + std::to_string(test.param.version);
-    });
+INSTANTIATE_TEST_SUITE_P(Drawings, EveryKind, testing::ValuesIn(drawings(versionsOfRenderDrawables())),
+                         drawingName);
 
 // --- GL state ---
 

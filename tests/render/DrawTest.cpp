@@ -21,7 +21,6 @@ using QeltDesktop::RenderQueue;
 
 constexpr int kPictureSide = 256;
 
-// The versions that bring something of their own to the render thread: RTV1, RTV2, RTV3.
 class Draw : public testing::TestWithParam<int> {};
 
 // What a drawable that dies in the middle of the stroke handed over is drawn first. The layer holds
@@ -64,8 +63,7 @@ TEST(GrainSize, UnderARotationIsWhatTheDiagonalSpans) {
   EXPECT_NEAR(size.y, 102.451906f, 1e-4f);
 }
 
-INSTANTIATE_TEST_SUITE_P(RenderVersions, Draw, testing::Values(1, 7, 8),
-                         [](const auto& version) { return "Version" + std::to_string(version.param); });
+INSTANTIATE_TEST_SUITE_P(RenderVersions, Draw, testing::ValuesIn(versionsOfRenderDrawables()), versionName);
 
 // Stamps of 100 x 100 units, each texel on pixels of its own: grain, mask, shade, and where a vertex has them
 // the rim and the dimming of thin stamps. `look` is that at zoom 1; a stroke's grain is paper, not screen: it

@@ -60,6 +60,7 @@ std::vector<float> edges(const Qelt::RectF& rect) {
 class Redraw : public testing::TestWithParam<int> {
  protected:
   const int version = GetParam();
+  const ExpectedVersion& expected = expectedOf(version);
 };
 
 // A straight replay leaves the grain where it is. An entry of the cache goes back after the batch when
@@ -122,8 +123,8 @@ TEST_P(Redraw, FromTheCacheGivesBitForBitWhatComputingGaveUntilTheStrokeIsDirty)
   }
 }
 
-// Only version 8 shapes its stamps by the view. Moving it is no zoom.
-TEST_P(Redraw, ComputesAnewAfterAZoomInVersion8Alone) {
+// Moving the view is no zoom.
+TEST_P(Redraw, ComputesAnewAfterAZoomWhereStampsFollowTheView) {
   DrawingBoard board({.version = version});
   StrokeOnPage stroke(board);
   redrawn(board, *stroke);
@@ -131,7 +132,7 @@ TEST_P(Redraw, ComputesAnewAfterAZoomInVersion8Alone) {
   EXPECT_TRUE(redrawn(board, *stroke).cached);
   for (const float zoom : {2.0f, 1.0f}) {
     board.canvas.setMatrix(viewOf(zoom));
-    EXPECT_EQ(redrawn(board, *stroke).cached, version != 8);
+    EXPECT_EQ(redrawn(board, *stroke).cached, !expected.followsView);
     EXPECT_TRUE(redrawn(board, *stroke).cached);
   }
 }
@@ -163,15 +164,14 @@ TEST_P(Redraw, LooksUpTheOriginalOfACopy) {
 // --- Strokes of few points ---
 
 // No segment: the end places the one stamp. The rectangle begins as the point, takes in what the end covered
-// (5 around, more than the stamp's reach but for the wider stamps of versions 4 to 7: 5.5) and grows by 5.
+// (5 around, or the stamp's reach where that is more) and grows by 5.
 TEST_P(Redraw, OfOnePointPlacesOneStamp) {
   for (const bool curve : {true, false}) {
     DrawingBoard board({.version = version, .curve = curve});
     board.redraw(*board.stored({{20.0f, 30.0f, 0.5f}}));
     EXPECT_THAT(board.takeStamps(), ElementsAre(StampNear(20.0f, 30.0f, 0.0f)));
-    const bool wider = version == 4 || version == 6 || version == 7;
-    EXPECT_EQ(board.rect.left, wider ? 9.5f : 10.0f);
-    EXPECT_EQ(board.rect.bottom, wider ? 40.5f : 40.0f);
+    EXPECT_EQ(board.rect.left, 15.0f - expected.tapReach);
+    EXPECT_EQ(board.rect.bottom, 35.0f + expected.tapReach);
     board.redraw(board.recorded({{20.0f, 30.0f, 0.5f}}));
     EXPECT_THAT(board.takeStamps(), ElementsAre(StampNear(20.0f, 30.0f, 0.0f)));
   }
@@ -221,7 +221,7 @@ TEST_P(Redraw, TakesWhateverArraysAreMissing) {
   const std::vector<float> without = floatsOf(bare);
   // No pressure is the version's own.
   std::vector<Sample> samples;
-  for (const Qelt::PointF& at : points) samples.push_back({at.x, at.y, version == 8 ? 0.6f : 0.5f});
+  for (const Qelt::PointF& at : points) samples.push_back({at.x, at.y, expected.unknownPressure});
   // Angles that are not stored are zeros.
   for (const bool hasAngles : {true, false}) EXPECT_EQ(without, floatsOf(*board.stored(samples, hasAngles)));
 
@@ -232,14 +232,13 @@ TEST_P(Redraw, TakesWhateverArraysAreMissing) {
 // --- What goes back into the caller's data ---
 
 TEST_P(Redraw, CapsTiltsInTheEventButNotInTheStoredStroke) {
-  const float cap = version == 5 ? 1.0f : 0.79f;
   DrawingBoard board({.version = version});
   const std::vector<Sample> tilted = {{10.0f, 10.0f, 0.5f, 0.5f}, {50.0f, 10.0f, 0.5f, 1.2f}};
   const MotionEvent event = board.recorded(tilted);
   board.redraw(event);
   EXPECT_EQ(event.GetHistoricalTilt(0), 0.5f);
-  EXPECT_EQ(event.GetHistoricalTilt(1), cap);
-  EXPECT_EQ(event.GetTilt(0), cap);
+  EXPECT_EQ(event.GetHistoricalTilt(1), expected.tiltCap);
+  EXPECT_EQ(event.GetTilt(0), expected.tiltCap);
 
   const auto stroke = board.stored(tilted);
   board.redraw(*stroke);
@@ -254,15 +253,13 @@ TEST_P(Redraw, TakesATouchStylussHistoryAsRecorded) {
       motionEvent(Qelt::kActionUp, {{10.0f, 10.0f, 0.4f}, {110.0f, 10.0f, 0.4f}, {210.0f, 10.0f, 0.4f}},
                   Qelt::kToolStylus, Qelt::kSourceTouchScreen);
   board.redraw(event);
-  // Recorded: 0.16, in version 8 raised to 0.25 and times 15 / 10 / 6. At the end: 0.5 squared, or 0.36 of
-  // version 8.
-  const float recorded = version == 8 ? 0.0625f : 0.16f, end = version == 8 ? 0.09f : 0.25f;
+  const float recorded = expected.alpha[0];
   const std::vector<Stamp> stamps = board.takeStamps();
   for (const Stamp& stamp : stamps) {
     const bool isFirst = stamp.x < 110.0f;
     EXPECT_TRUE(isFirst ? stamp.alpha <= recorded + 1e-5f : stamp.alpha >= recorded - 1e-5f) << stamp;
   }
-  EXPECT_NEAR(stamps.at(stamps.size() - 1).alpha, end, 0.01f);
+  EXPECT_NEAR(stamps.at(stamps.size() - 1).alpha, expected.tapAlpha, 0.01f);
 }
 
 INSTANTIATE_TEST_SUITE_P(Versions, Redraw, testing::ValuesIn(allVersions()), versionName);

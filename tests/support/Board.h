@@ -33,7 +33,7 @@ using Clock = std::int64_t (*)(int number);
 std::int64_t everyFourMilliseconds(int number);
 
 struct BoardOptions {
-  int version = newestVersion();  // rendering version
+  int version = kUsualVersion;  // rendering version
   float size = 10.0f;
   std::uint32_t color = 0xFF202020u;
   bool curve = true;
