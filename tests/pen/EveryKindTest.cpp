@@ -13,6 +13,7 @@
 #include <vector>
 
 #include "desktop/gl/CallTask.h"
+#include "support/AllocationGate.h"
 #include "support/LogCapture.h"
 #include "support/PenBoard.h"
 #include "support/Stamps.h"
@@ -106,73 +107,6 @@ TEST_P(EveryKind, IsDrawnAlikeWhateverGlStateWasLeftBeforeEachTask) {
   ASSERT_NE(clean, Pixels(clean.size())) << "nothing was drawn";
   EXPECT_TRUE(drawn(leaveState) == clean);
   EXPECT_TRUE(drawn(leaveArraysAndUnpacking) == clean);
-}
-
-using State = std::map<std::string, std::vector<GLint>>;
-
-State glState() {
-  State state;
-  const auto look = [&state](const std::string& name, GLenum what) {
-    std::vector<GLint> values(4);
-    glGetIntegerv(what, values.data());
-    std::vector<GLint>& all = state[name];
-    all.insert(all.end(), values.begin(), values.end());
-  };
-  for (const auto& [name, what] : std::initializer_list<std::pair<const char*, GLenum>>{
-           {"depth test", GL_DEPTH_TEST},
-           {"culling", GL_CULL_FACE},
-           {"stencil", GL_STENCIL_TEST},
-           {"colour mask", GL_COLOR_WRITEMASK},
-           {"blending", GL_BLEND},
-           {"blend factors", GL_BLEND_SRC_RGB},
-           {"blend factors", GL_BLEND_DST_RGB},
-           {"blend equation", GL_BLEND_EQUATION_RGB},
-           {"scissor test", GL_SCISSOR_TEST},
-           {"viewport and scissor", GL_SCISSOR_BOX},
-           {"viewport and scissor", GL_VIEWPORT},
-           {"clear colour", GL_COLOR_CLEAR_VALUE},
-           {"discarding", GL_RASTERIZER_DISCARD},
-           {"program", GL_CURRENT_PROGRAM},
-           {"vertex array and buffer", GL_VERTEX_ARRAY_BINDING},
-           {"vertex array and buffer", GL_ARRAY_BUFFER_BINDING},
-           {"framebuffer", GL_FRAMEBUFFER_BINDING},
-           {"unpack state", GL_UNPACK_ROW_LENGTH},
-           {"unpack state", GL_UNPACK_SKIP_ROWS},
-           {"unpack state", GL_UNPACK_SKIP_PIXELS},
-           {"unpack state", GL_PIXEL_UNPACK_BUFFER_BINDING},
-           {"active unit", GL_ACTIVE_TEXTURE}}) {
-    look(name, what);
-  }
-  for (const int unit : {0, 1, 2, 7}) {
-    glActiveTexture(GL_TEXTURE0 + static_cast<GLenum>(unit));
-    look("texture " + std::to_string(unit), GL_TEXTURE_BINDING_2D);
-    look("texture " + std::to_string(unit), GL_SAMPLER_BINDING);
-  }
-  glActiveTexture(static_cast<GLenum>(state["active unit"][0]));
-  return state;
-}
-
-// What is left changed is listed here: what the pen draws with, and what the host sets for a tile. The unit
-// that happened to be active is where textures are filled.
-TEST_P(EveryKind, LeavesNothingChangedButWhatItDrewWith) {
-  PenBoard board(page());
-  State before, after;
-  board.queue.run([&] {
-    leaveState();
-    before = glState();
-  });
-  board.draw(kind, wave());
-  board.queue.finish();
-  board.queue.run([&] { after = glState(); });
-  std::set<std::string> changed;
-  for (const auto& [name, values] : before) {
-    if (after[name] != values) changed.insert(name);
-  }
-  std::set<std::string> expected = {
-      "active unit", "blend factors", "blending",  "clear colour", "colour mask",         "culling",
-      "program",     "texture 0",     "texture 7", "scissor test", "viewport and scissor"};
-  expected.insert(kind == Kind::Outline ? "depth test" : "texture 1");
-  EXPECT_EQ(changed, expected);
 }
 
 // --- The view ---
@@ -331,9 +265,11 @@ int liveNames() {
   return live;
 }
 
-// Zooms, versions, new pens and lost contexts, for thousands of strokes: as many names as at the start.
-TEST(LongSession, KeepsNoGlNames) {
-  const LogCapture log;
+// Zooms, versions, new pens and lost contexts, for thousands of strokes: as many names and blocks as at the
+// start.
+TEST(LongSession, KeepsNeitherGlNamesNorMemory) {
+  LogCapture log;
+  AllocationGate::watch(PenBoard::library().path());
   PenBoard board({.size = 2.0f, .width = 96, .height = 64});
   const auto drawAll = [&](int version) {
     board.pen->setVersion(version);
@@ -348,6 +284,7 @@ TEST(LongSession, KeepsNoGlNames) {
     return names;
   };
   const int early = countNames();
+  const AllocationGate::Counts earlyBlocks = AllocationGate::counts();
   EXPECT_GT(early, 5);
   constexpr int kRounds = QELT_SANITIZED ? 40 : 240;  // ten strokes each
   for (int round = 1; round <= kRounds; ++round) {
@@ -360,6 +297,8 @@ TEST(LongSession, KeepsNoGlNames) {
     if (round % 20 == 5) board.loseAndRestoreContext();  // with all drawables there
   }
   EXPECT_EQ(countNames(), early);
+  EXPECT_EQ(AllocationGate::counts().plugInBlocks, earlyBlocks.plugInBlocks);
+  EXPECT_EQ(AllocationGate::counts().hostBlocks, earlyBlocks.hostBlocks);
 }
 
 }  // namespace

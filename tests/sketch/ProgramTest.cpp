@@ -164,16 +164,6 @@ TEST_F(Program, TracesEveryLiveCall) {
       << posted;
 }
 
-TEST_F(Program, TracesStoredStrokesTwiceAndTheCacheWithThem) {
-  const std::vector<Json> lines = trace("--mode stroke --repeat 2 --rendering-version 3");
-  ASSERT_EQ(lines.size(), 1u + 4u);
-  for (std::size_t i = 1; i < lines.size(); ++i)
-    expectHas(lines[i], {{"op", "RedrawPen"}, {"action", nullptr}, {"stroke", (i - 1) % 2}});
-  const Json &computed = lines[1]["buffers"][0], &fromCache = lines[3]["buffers"][0];
-  expectHas(fromCache, {{"cached", true}, {"data", computed["data"]}});
-  EXPECT_EQ(lines[3]["rect"], lines[1]["rect"]);
-}
-
 // Straight segments place the same stamps however the samples reach the pen.
 TEST_F(Program, HandsOverEverySampleInEveryMode) {
   // Ten points of X, Y and the channels named, after a dot; what has another name is not read.

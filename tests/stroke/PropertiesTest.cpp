@@ -54,7 +54,7 @@ std::vector<float> drawnLive(DrawingBoard& board, const std::vector<Sample>& sam
 }
 
 template <typename Input>
-std::vector<float> redrawn(DrawingBoard& board, const Input& input) {
+std::vector<float> drawnAgain(DrawingBoard& board, const Input& input) {
   board.takeBatches();
   board.redraw(input);
   return board.takeFloats();
@@ -91,8 +91,8 @@ TEST_P(StrokesByLot, AreTheSameLiveRecordedAndStored) {
     SCOPED_TRACE("seed " + std::to_string(seed));
     const std::vector<Sample> samples = strokeByLot(seed);
     std::vector<float> live = drawnLive(board, samples);
-    std::vector<float> recorded = redrawn(board, board.recorded(samples));
-    EXPECT_EQ(recorded, redrawn(board, *board.stored(samples)));
+    std::vector<float> recorded = drawnAgain(board, board.recorded(samples));
+    EXPECT_EQ(recorded, drawnAgain(board, *board.stored(samples)));
     ASSERT_EQ(live.size(), recorded.size());
     // Every finger presses alike.
     const bool looksAtAlpha = options().tool != Qelt::kToolStylus;
@@ -110,14 +110,14 @@ TEST_P(StrokesByLot, DependNeitherOnTheirEventsNorOnWhatWasDrawnBefore) {
       return draw(fresh);
     };
     const auto live = onFresh([&](auto& fresh) { return drawnLive(fresh, samples, 1); });
-    const auto redraw = onFresh([&](auto& fresh) { return redrawn(fresh, fresh.recorded(samples)); });
+    const auto redraw = onFresh([&](auto& fresh) { return drawnAgain(fresh, fresh.recorded(samples)); });
     DrawingBoard used(options());
     used.stroke(other);
-    EXPECT_EQ(redrawn(used, used.recorded(samples)), redraw);
+    EXPECT_EQ(drawnAgain(used, used.recorded(samples)), redraw);
     // In the middle of a live stroke.
     used.down(other.front());
     used.move({other.begin() + 1, other.end()});
-    EXPECT_EQ(redrawn(used, *used.stored(samples)), redraw);
+    EXPECT_EQ(drawnAgain(used, *used.stored(samples)), redraw);
     used.settings.size = 17.0f;
     used.shared.mCurveEnabled = !used.shared.mCurveEnabled;
     used.redraw(used.recorded(other));
@@ -126,7 +126,7 @@ TEST_P(StrokesByLot, DependNeitherOnTheirEventsNorOnWhatWasDrawnBefore) {
     for (const int batch : {2, 3, 7, 1000}) {
       EXPECT_EQ(drawnLive(used, samples, batch), live) << batch << " samples a move";
     }
-    EXPECT_EQ(redrawn(used, *used.stored(samples)), redraw);
+    EXPECT_EQ(drawnAgain(used, *used.stored(samples)), redraw);
   }
 }
 

@@ -8,9 +8,9 @@
 
 #include "base/Error.h"
 #include "engine/MotionEvent.h"
-#include "model/ObjectStroke.h"
 #include "pencommon/PenStrokeDataManager.h"
 #include "support/DrawableBoard.h"
+#include "support/PartialStroke.h"
 
 namespace QeltTests {
 namespace {
@@ -190,38 +190,22 @@ TEST_P(Redraw, OfNothingThinsTheMovesOfTheStrokeUnderWay) {
   EXPECT_THAT(board.takeStamps(), Not(IsEmpty()));
 }
 
-// A stroke that a document has only half of.
-class BareStroke : public Qelt::ObjectStroke {
- public:
-  int GetPointCount() const override { return count; }
-  const Qelt::PointF* GetPoint() const override { return points; }
-  const std::int64_t* GetTimeStamp() const override { return nullptr; }
-  const float* GetPressure() const override { return nullptr; }
-  const float* GetTilt() const override { return nullptr; }
-  const float* GetOrientation() const override { return nullptr; }
-  int GetToolType() const override { return Qelt::kToolStylus; }
-
-  int count = 0;
-  const Qelt::PointF* points = nullptr;
-};
-
 TEST_P(Redraw, TakesWhateverArraysAreMissing) {
   DrawingBoard board({.version = version});
-  const auto floatsOf = [&board](const Qelt::ObjectStroke& stroke) {
-    return redrawn(board, stroke).buffers.front();
-  };
-  BareStroke bare;
+  const auto floatsOf = [&board](const auto& stroke) { return redrawn(board, stroke).buffers.front(); };
+  PartialStroke bare;
   bare.count = 3;
+  bare.missing = 31;
   Error::SetError(0);
   EXPECT_THAT(floatsOf(bare), IsEmpty());  // no points: as if there were none
   EXPECT_EQ(Error::GetError(), 7u);
 
-  const Qelt::PointF points[] = {{10.0f, 10.0f}, {20.0f, 10.0f}, {30.0f, 20.0f}};
-  bare.points = points;
+  bare.missing = 30;
+  bare.points = {{10.0f, 10.0f}, {20.0f, 10.0f}, {30.0f, 20.0f}};
   const std::vector<float> without = floatsOf(bare);
   // No pressure is the version's own.
   std::vector<Sample> samples;
-  for (const Qelt::PointF& at : points) samples.push_back({at.x, at.y, expected.unknownPressure});
+  for (const Qelt::PointF& at : bare.points) samples.push_back({at.x, at.y, expected.unknownPressure});
   // Angles that are not stored are zeros.
   for (const bool hasAngles : {true, false}) EXPECT_EQ(without, floatsOf(*board.stored(samples, hasAngles)));
 

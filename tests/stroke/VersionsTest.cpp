@@ -152,28 +152,6 @@ TEST_P(EachVersion, RampsTheClosingSegmentOfARecordedEvent) {
 
 INSTANTIATE_TEST_SUITE_P(Versions, EachVersion, testing::ValuesIn(allVersions()), versionName);
 
-// The pressure that fingers, mice and a stylus on a touch screen are given shows in a tap's alpha.
-TEST(TouchInputTest, HasTheVersionsOwnPressureAndThinsOutShortMoves) {
-  for (const int version : allVersions()) {
-    for (const int tool : {Qelt::kToolFinger, Qelt::kToolMouse, Qelt::kToolStylus}) {
-      SCOPED_TRACE("version " + std::to_string(version) + ", tool " + std::to_string(tool));
-      DrawingBoard board(
-          {.version = version,
-           .color = 0x50202020u,
-           .tool = tool,
-           .source = tool == Qelt::kToolMouse ? Qelt::kSourceMouse : Qelt::kSourceTouchScreen});
-      const float taken = expectedOf(version).shortMove;
-      board.stroke({{10.0f, 10.0f, 0.9f}, {9.8f + taken, 10.0f, 0.9f}});
-      const std::vector<Stamp> stamps = board.takeStamps();
-      ASSERT_EQ(stamps.size(), 1u);
-      EXPECT_FLOAT_EQ(stamps[0].alpha, expectedOf(version).tapAlpha);
-      board.down({10.0f, 10.0f});
-      board.move({{10.2f + taken, 10.0f}});
-      EXPECT_GT(board.takeStamps().size(), 1u);
-    }
-  }
-}
-
 TEST(LargeCountTest, IsLoggedByTheVersionsThatDoSo) {
   LogCapture log;
   for (const int version : allVersions()) {
