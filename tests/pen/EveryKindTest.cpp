@@ -221,6 +221,30 @@ TEST(CutSegments, AreSaidOnceAStroke) {
   }
 }
 
+// Kept: only preview and prediction note how they are set up; all note their end.
+TEST(RenderDrawables, NoteTheirSetupAndTheirEnd) {
+  LogCapture log;
+  for (const int version : versionsOfRenderDrawables()) {
+    {
+      PenBoard board({.version = version, .width = 16, .height = 16});
+      board.prepareAll();
+    }
+    std::multiset<std::string> noted, expected;
+    for (const LogLine& line : log.take()) {
+      if (line.text.rfind("virtual void", 0) == 0) noted.insert(line.text.substr(0, line.text.find('(')));
+    }
+    const auto expect = [&](const std::string& name, const std::vector<std::string>& operations) {
+      for (const std::string& operation : operations)
+        expected.insert("virtual void Qelt::Pencil2" + name + "::" + operation);
+    };
+    expect("StrokeDrawableRTV" + std::to_string(expectedOf(version).renderDrawable), {"Release"});
+    expect("OutlineDrawableRTV1", {"Release"});
+    expect("PreviewDrawableRT", {"CreatePenCanvas", "Init", "Release"});
+    if (rowOf(version).predicts) expect("PredictionDrawableRT", {"CreatePenCanvas", "Init", "Release"});
+    EXPECT_EQ(noted, expected) << version;
+  }
+}
+
 // --- A pen's life ---
 
 // A new version is a new drawable, which has not seen the pen go down: what is left of the stroke is

@@ -60,7 +60,8 @@ class RenderMessage : public testing::Test {
 };
 
 // By 45 degrees no two corners give the box: (0, 0, 10, 20) has its left at (0, 20), its right at (10, 0),
-// its bottom at (10, 20): -14.142136, 7.0710678 and 21.213203; moved by (100, 50).
+// its bottom at (10, 20): -14.142136, 7.0710678 and 21.213203; moved by (100, 50). The other way round its
+// top is at (10, 0), its right at (10, 20), its bottom at (0, 20).
 TEST_F(RenderMessage, BoxesAllFourCornersOfItsRectangle) {
   constexpr float kHalfRoot = 0.70710678f;
   const float turn[9] = {kHalfRoot, kHalfRoot, 0, -kHalfRoot, kHalfRoot, 0, 100, 50, 1};
@@ -70,6 +71,13 @@ TEST_F(RenderMessage, BoxesAllFourCornersOfItsRectangle) {
   EXPECT_NEAR(box.top, 50.0f, 1e-4f);
   EXPECT_NEAR(box.right, 107.0710678f, 1e-4f);
   EXPECT_NEAR(box.bottom, 71.213203f, 1e-4f);
+  const float back[9] = {kHalfRoot, -kHalfRoot, 0, kHalfRoot, kHalfRoot, 0, 100, 50, 1};
+  canvas.setMatrix(Qelt::Matrix3<float>(back));
+  const RectF other = message({0, 0, 10, 20}).getTransformedRect();
+  EXPECT_NEAR(other.left, 100.0f, 1e-4f);
+  EXPECT_NEAR(other.top, 42.9289322f, 1e-4f);
+  EXPECT_NEAR(other.right, 121.213203f, 1e-4f);
+  EXPECT_NEAR(other.bottom, 64.142136f, 1e-4f);
 }
 
 // A reference bitmap is offered to those who take one.

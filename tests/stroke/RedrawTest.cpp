@@ -31,7 +31,8 @@ const std::vector<Sample> kStroke = {{10.0f, 10.0f, 0.3f},
 
 // A stroke on a page that keeps drawings: it has an entry in the cache.
 struct StrokeOnPage {
-  explicit StrokeOnPage(const DrawingBoard& board) : stroke(board.stored(kStroke)) {
+  explicit StrokeOnPage(const DrawingBoard& board, const std::vector<Sample>& samples = kStroke)
+      : stroke(board.stored(samples)) {
     PenStrokeDataManager::GetInstance()->CreateStrokeData(stroke->GetRuntimeHandle());
   }
   ~StrokeOnPage() { PenStrokeDataManager::GetInstance()->DropStrokeData(stroke->GetRuntimeHandle()); }
@@ -92,6 +93,26 @@ TEST_P(Redraw, PostsInOrder) {
     EXPECT_THAT(board.takePosts(), ElementsAre("SetRedrawState", "SetPenData", "SetStartPoint", "Batch",
                                                "Render", "Unref", "ReleaseStrokeData"));
   }
+}
+
+// Every touch of a finger presses alike, so that live and drawn again are the same to the last pixel, the
+// grain among it.
+TEST_P(Redraw, LooksAsTheLiveStrokeDid) {
+  DrawingBoard board({.version = version,
+                      .tool = Qelt::kToolFinger,
+                      .source = Qelt::kSourceTouchScreen,
+                      .width = 96,
+                      .height = 48});
+  const std::vector<Sample> samples = {{20.3f, 12.6f}, {85.1f, 14.2f}, {22.7f, 30.9f}};
+  board.stroke(samples);
+  const std::vector<std::uint8_t> live = board.pixels();
+  const StrokeOnPage stroke(board, samples);
+  for (const char* const how : {"recorded", "stored", "cached"}) {
+    board.layer->clear();
+    *how == 'r' ? board.redraw(board.recorded(samples)) : board.redraw(*stroke);
+    EXPECT_TRUE(board.pixels() == live) << how;
+  }
+  EXPECT_NE(live, std::vector<std::uint8_t>(live.size())) << "nothing was drawn";
 }
 
 // --- The cache ---
