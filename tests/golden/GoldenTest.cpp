@@ -61,15 +61,8 @@ void traceStroke(Trace& trace, const BoardOptions& options, float zoom, const st
   board.canvas.setMatrix(viewOf(zoom));
   const auto write = [&] {
     for (const Stamp& s : board.takeStamps()) {
-      std::vector<float> numbers = {s.x,
-                                    s.y,
-                                    s.halfWidth,
-                                    s.halfHeight,
-                                    s.alpha,
-                                    s.narrowing,
-                                    static_cast<float>(s.tile),
-                                    s.directionX,
-                                    s.directionY};
+      std::vector<float> numbers{s.x, s.y, s.halfWidth, s.halfHeight, s.alpha};
+      numbers.insert(numbers.end(), {s.narrowing, static_cast<float>(s.tile), s.directionX, s.directionY});
       if (board.stride() == 11) numbers.insert(numbers.end(), {s.innerRadius, s.alphaByWidth});
       trace.push_back(traceLine("stamp", numbers));
     }

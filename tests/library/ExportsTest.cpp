@@ -1,10 +1,9 @@
 #include <gmock/gmock.h>
 #include <stdio.h>
 
-#include <algorithm>
 #include <fstream>
-#include <iterator>
 #include <regex>
+#include <set>
 #include <string>
 #include <vector>
 
@@ -16,15 +15,6 @@ std::vector<std::string> promised() {
   std::vector<std::string> names;
   for (std::string name; std::getline(file, name);) names.push_back(name);
   return names;
-}
-
-std::vector<std::string> without(const std::vector<std::string>& names,
-                                 const std::vector<std::string>& others) {
-  std::vector<std::string> rest;
-  std::copy_if(names.begin(), names.end(), std::back_inserter(rest), [&](const std::string& name) {
-    return std::find(others.begin(), others.end(), name) == others.end();
-  });
-  return rest;
 }
 
 #if defined(__aarch64__)
@@ -49,9 +39,9 @@ std::vector<std::string> linesOf(const std::string& tool) {
 }
 
 TEST(Exports, AreThePromisedNamesAndNothingElse) {
-  const std::vector<std::string> exported = linesOf(QELT_NM " -DCj --defined-only");
-  EXPECT_THAT(without(promised(), exported), testing::IsEmpty()) << "promised, but not there";
-  EXPECT_THAT(without(exported, promised()), testing::IsEmpty()) << "there, but not promised";
+  const std::vector<std::string> lines = linesOf(QELT_NM " -DCj --defined-only");
+  // Of a constructor there are two.
+  EXPECT_THAT(std::set(lines.begin(), lines.end()), testing::UnorderedElementsAreArray(promised()));
 }
 
 TEST(Exports, TheLibraryCarriesItsPlainNameNeedsOnlyTheHostAndTheRuntimeAndRunsNothingAsItIsLoaded) {
@@ -72,10 +62,10 @@ TEST(Exports, TheLibraryCarriesItsPlainNameNeedsOnlyTheHostAndTheRuntimeAndRunsN
   }
   EXPECT_THAT(sonames, testing::ElementsAre("libQeltPencil2.so"));
   if (QELT_SANITIZED) return;  // their runtimes bring libraries of their own
-  EXPECT_THAT(without(needed, {"libQeltBase.so", "libQeltModel.so", "libQeltEngine.so", "libQeltGL.so",
-                               "libQeltGraphics.so", "libQeltPenCommon.so", "liblog.so.0", "libstdc++.so.6",
-                               "libm.so.6", "libgcc_s.so.1", "libc.so.6", "ld-linux-aarch64.so.1"}),
-              testing::IsEmpty());
+  EXPECT_THAT(needed, testing::IsSubsetOf({"libQeltBase.so", "libQeltModel.so", "libQeltEngine.so",
+                                           "libQeltGL.so", "libQeltGraphics.so", "libQeltPenCommon.so",
+                                           "liblog.so.0", "libstdc++.so.6", "libm.so.6", "libgcc_s.so.1",
+                                           "libc.so.6", "ld-linux-aarch64.so.1"}));
 }
 
 }  // namespace

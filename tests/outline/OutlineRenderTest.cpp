@@ -60,7 +60,9 @@ TEST(OutlinePicture, WithoutASizeTheInsideIsErasedToNothing) {
 TEST(OutlinePicture, IsDrawnInAContextThatCameAfterTheDrawable) {
   OutlineBoard board({.version = 4, .size = 30.0f, .width = kSide, .height = kSide});
   board.queue.loseContext();
-  board.queue.finish();  // the drawable is prepared
+  board.drawable.reset(Qelt::createOutlineDrawable(4, &board.shared, &board.data));
+  board.drawable->SetCanvas(&board.canvas);
+  board.queue.finish();
   board.queue.restoreContext();
   board.drawable->SetOutlineSize(6.0f);
   board.outline({{60.0f, 60.0f}});

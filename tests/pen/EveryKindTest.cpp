@@ -6,7 +6,6 @@
 #include <cmath>
 #include <cstddef>
 #include <cstdint>
-#include <limits>
 #include <map>
 #include <set>
 #include <string>
@@ -165,26 +164,6 @@ TEST_P(EveryKind, ChangesNoPixelOutsideTheAreaItAnswers) {
   }
 }
 
-// --- Time ---
-
-TEST_P(EveryKind, DoesNotLookAtTheClock) {
-  const auto drawn = [this](Clock clock) {
-    BoardOptions options = page();
-    options.width = options.height = 0;
-    options.clock = clock;
-    PenBoard board(options);
-    board.draw(kind, wave());
-    return board.takeBuffers();
-  };
-  const auto usual = drawn(everyFourMilliseconds);
-  ASSERT_GT(usual.size(), 1u);
-  using Limits = std::numeric_limits<std::int64_t>;
-  EXPECT_TRUE(drawn([](int) { return std::int64_t{7}; }) == usual) << "equal";
-  EXPECT_TRUE(drawn([](int number) { return std::int64_t{-9} * number; }) == usual) << "backward";
-  EXPECT_TRUE(drawn([](int number) { return number % 2 == 0 ? Limits::min() : Limits::max(); }) == usual)
-      << "extreme";
-}
-
 // --- Logs ---
 
 TEST(CutSegments, AreSaidOnceAStroke) {
@@ -246,36 +225,6 @@ TEST(RenderDrawables, NoteTheirSetupAndTheirEnd) {
 }
 
 // --- A pen's life ---
-
-// A new version is a new drawable, which has not seen the pen go down: what is left of the stroke is
-// ignored, and what was handed over before keeps the layout it has.
-TEST(VersionChange, EndsTheStrokeUnderWay) {
-  const std::vector<Sample> samples = wave();
-  using Buffers = std::vector<std::vector<float>>;
-  std::map<int, Buffers> whole;
-  for (const int version : allVersions()) {
-    PenBoard board({.version = version});
-    board.stroke(samples);
-    whole[version] = board.takeBuffers();
-    for (const std::vector<float>& floats : whole[version]) stampsOf(floats, strideOf(version));
-  }
-  for (const int from : allVersions()) {
-    for (const int to : allVersions()) {
-      if (to == from) continue;
-      SCOPED_TRACE("from " + std::to_string(from) + " to " + std::to_string(to));
-      PenBoard board({.version = from});
-      board.down(samples[0]);
-      board.move({samples[1], samples[2], samples[3], samples[4]});
-      board.pen->setVersion(to);
-      EXPECT_FALSE(board.move({samples[5], samples[6]}));
-      EXPECT_FALSE(board.up(samples[7]));
-      EXPECT_EQ(board.rect.right, 0.0f);
-      EXPECT_TRUE(board.takeBuffers() == (Buffers{whole[from][0], whole[from][1], {}, {}}));
-      board.stroke(samples);
-      EXPECT_TRUE(board.takeBuffers() == whole[to]);
-    }
-  }
-}
 
 // GL names that are alive, of whatever sort.
 int liveNames() {

@@ -5,7 +5,6 @@
 
 #include <cmath>
 #include <functional>
-#include <string>
 #include <utility>
 #include <vector>
 

@@ -2,7 +2,6 @@
 
 #include <cmath>
 #include <cstddef>
-#include <memory>
 #include <string>
 #include <utility>
 #include <vector>

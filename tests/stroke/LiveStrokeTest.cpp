@@ -7,7 +7,6 @@
 
 #include "engine/MotionEvent.h"
 #include "support/DrawableBoard.h"
-#include "support/LogCapture.h"
 
 namespace QeltTests {
 namespace {

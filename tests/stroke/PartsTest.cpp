@@ -3,11 +3,9 @@
 #include <array>
 #include <bit>
 #include <cmath>
-#include <cstddef>
 #include <cstdint>
 #include <limits>
 #include <random>
-#include <vector>
 
 #include "base/RectF.h"
 #include "graphics/SmPath.h"

@@ -7,7 +7,6 @@
 #include <tuple>
 #include <vector>
 
-#include "engine/MotionEvent.h"
 #include "support/DrawableBoard.h"
 #include "support/Stamps.h"
 #include "support/Versions.h"
@@ -98,35 +97,6 @@ TEST_P(StrokesByLot, AreTheSameLiveRecordedAndStored) {
     const bool looksAtAlpha = options().tool != Qelt::kToolStylus;
     for (std::size_t i = 4; i < live.size() && !looksAtAlpha; i += stride) live[i] = recorded[i] = 0.0f;
     EXPECT_EQ(live, recorded);
-  }
-}
-
-TEST_P(StrokesByLot, DependNeitherOnTheirEventsNorOnWhatWasDrawnBefore) {
-  for (unsigned seed = 1; seed <= kStrokes; ++seed) {
-    SCOPED_TRACE("seed " + std::to_string(seed));
-    const std::vector<Sample> samples = strokeByLot(seed), other = strokeByLot(seed + 100);
-    const auto onFresh = [&](auto draw) {
-      DrawingBoard fresh(options());
-      return draw(fresh);
-    };
-    const auto live = onFresh([&](auto& fresh) { return drawnLive(fresh, samples, 1); });
-    const auto redraw = onFresh([&](auto& fresh) { return drawnAgain(fresh, fresh.recorded(samples)); });
-    DrawingBoard used(options());
-    used.stroke(other);
-    EXPECT_EQ(drawnAgain(used, used.recorded(samples)), redraw);
-    // In the middle of a live stroke.
-    used.down(other.front());
-    used.move({other.begin() + 1, other.end()});
-    EXPECT_EQ(drawnAgain(used, *used.stored(samples)), redraw);
-    used.settings.size = 17.0f;
-    used.shared.mCurveEnabled = !used.shared.mCurveEnabled;
-    used.redraw(used.recorded(other));
-    used.settings.size = 6.0f;
-    used.shared.mCurveEnabled = !used.shared.mCurveEnabled;
-    for (const int batch : {2, 3, 7, 1000}) {
-      EXPECT_EQ(drawnLive(used, samples, batch), live) << batch << " samples a move";
-    }
-    EXPECT_EQ(drawnAgain(used, *used.stored(samples)), redraw);
   }
 }
 
