@@ -10,6 +10,7 @@
 #include <cstdint>
 #include <map>
 #include <string>
+#include <tuple>
 #include <vector>
 
 #include "golden/Golden.h"
@@ -232,20 +233,9 @@ TEST(PreviewGolden, PictureIsThatOfTheRelease) {
   expectGoldenPicture(pictureOf(board), "preview-picture.pgm");
 }
 
-// What a live stroke might have left.
 void leaveStroke(Qelt::Pencil2Data& shared) {
-  shared.mStartX = 12.13f;
-  shared.mStartY = 20.39f;
-  shared.mLastStampX = 20.37f;
-  shared.mLastStampY = 40.61f;
-  shared.mLastX = 24.71f;
-  shared.mLastY = 44.29f;
-  shared.mLastWidth = 9.0f;
-  shared.mLastAlpha = 0.6f;
-  shared.mLastOrientation = 0.7f;
-  shared.mStampCount = 7;
-  shared.mTiltBlend = 0.2f;
-  shared.mHasLastStroke = true;
+  QeltTests::leaveStroke(shared, {12.13f, 20.39f}, {20.37f, 40.61f}, {24.71f, 44.29f});
+  std::tie(shared.mLastWidth, shared.mLastOrientation, shared.mTiltBlend) = std::tuple(9.0f, 0.7f, 0.2f);
 }
 
 const std::vector<Sample> kAhead = {{40.13f, 52.77f}, {71.59f, 44.31f}, {105.23f, 20.87f}, {139.61f, 33.93f}};
@@ -316,8 +306,8 @@ TEST_P(GrainGolden, PictureBelowTheFirstTilesIsThatOfTheRelease) {
   draw(all, PreviewBoard(options), draws);
   draw(all, PredictionBoard(options), [&](auto& board) {
     leaveStroke(board.shared);
-    board.shared.mStartX = board.shared.mLastStampX = board.shared.mLastX = shading[0].x;
-    board.shared.mStartY = board.shared.mLastStampY = board.shared.mLastY = shading[0].y;
+    const Qelt::PointF first{shading[0].x, shading[0].y};
+    QeltTests::leaveStroke(board.shared, first, first, first);
     board.move(shading);
   });
   expectGoldenPicture(all, file + ".pgm");

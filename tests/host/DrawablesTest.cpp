@@ -73,16 +73,6 @@ TEST(Drawables, OfACanvasWithoutALayerPrepareNothingAndOutliveWhatIsQueued) {
   }
 }
 
-TEST(Drawables, DeleteAPartnerWithoutAnyQueueAtOnce) {
-  PenDataManager queueless(nullptr);
-  for (PenDataManager* const manager : {&queueless, static_cast<PenDataManager*>(nullptr)}) {
-    Notes notes;
-    { const PlainGL drawable(manager, new NotingRT(notes)); }
-    EXPECT_THAT(notes, ElementsAre("gone"));
-    const PlainGL alone(manager, nullptr);
-  }
-}
-
 // Refusals may come at any post; whatever was taken runs first, and the partner is released if it was
 // prepared and gone exactly once.
 TEST(Drawables, PrepareAndReleaseTheirPartnerThroughAQueueThatMayRefuse) {

@@ -3,6 +3,7 @@
 #include <cmath>
 #include <cstddef>
 #include <string>
+#include <tuple>
 #include <utility>
 #include <vector>
 
@@ -26,20 +27,9 @@ using testing::SizeIs;
 
 using PredictionBoard = DrawableBoard<Pencil2PredictionDrawableGL>;
 
-// What a live stroke might have left.
 void leaveStrokeAlongX(Qelt::Pencil2Data& shared) {
-  shared.mStartX = 3.3f;
-  shared.mStartY = 2.7f;
-  shared.mLastStampX = 10.0f;
-  shared.mLastStampY = 0.0f;
-  shared.mLastX = 20.0f;
-  shared.mLastY = 0.0f;
-  shared.mLastWidth = 4.0f;
-  shared.mLastAlpha = 0.6f;
-  shared.mLastOrientation = 0.0f;
-  shared.mStampCount = 7;
-  shared.mTiltBlend = 0.25f;
-  shared.mHasLastStroke = true;
+  leaveStroke(shared, {3.3f, 2.7f}, {10.0f, 0.0f}, {20.0f, 0.0f});
+  std::tie(shared.mLastWidth, shared.mLastOrientation, shared.mTiltBlend) = std::tuple(4.0f, 0.0f, 0.25f);
 }
 
 TEST(Prediction, GoesOnFromTheLastStampWithItsLooks) {

@@ -1,7 +1,5 @@
 #include <gmock/gmock.h>
 
-#include "math/Matrix4.h"
-#include "render/RenderDrawables.h"
 #include "render/StampVertices.h"
 
 namespace Qelt {
@@ -40,18 +38,6 @@ TEST(AntialiasedQuadTest, AddsHalfADevicePixelAndWidensThinStampsAndDimsThem) {
     EXPECT_FLOAT_EQ(quad.innerRadius, innerRadius);
     EXPECT_FLOAT_EQ(quad.alphaByWidth, alphaByWidth);
   }
-}
-
-// Kept: the grain's size is what the diagonal of a 150-unit square spans in x and in y, which a rotation
-// makes unequal. By 30 degrees: (cos - sin) * 150 / 2 and (sin + cos) * 150 / 2.
-TEST(GrainSize, UnderARotationIsWhatTheDiagonalSpans) {
-  Matrix4<float> turned;
-  turned[0] = turned[5] = 0.8660254f;
-  turned[1] = 0.5f;
-  turned[4] = -0.5f;
-  const Vector2<float> size = Pencil2StrokeDrawableRTV3::grainSize(turned);
-  EXPECT_NEAR(size.x, 27.451906f, 1e-4f);
-  EXPECT_NEAR(size.y, 102.451906f, 1e-4f);
 }
 
 }  // namespace

@@ -53,28 +53,6 @@ TEST_P(LiveStroke, FollowsTheTableOfStates) {
   }
 }
 
-TEST_P(LiveStroke, PostsInOrderWhateverTheActionDid) {
-  const auto rectAndBatch = ElementsAre("SetRect", "Batch", "Render", "DeleteBatch");
-  for (const bool curve : {true, false}) {
-    SCOPED_TRACE(curve ? "curve" : "straight");
-    DrawingBoard board({.version = version, .curve = curve});
-    // Ignored: the rectangle and the (empty) batch are handed over all the same.
-    board.move({{20.0f, 10.0f}});
-    EXPECT_THAT(board.takePosts(), rectAndBatch);
-    EXPECT_THAT(board.takeBuffers(), ElementsAre(IsEmpty()));
-
-    board.down({10.0f, 10.0f});
-    std::vector<std::string> posts = {"SetStartPoint", "SetPenData", "SetRect",
-                                      "Batch",         "Render",     "DeleteBatch"};
-    if (!curve) posts.erase(posts.begin());
-    EXPECT_EQ(board.takePosts(), posts);
-    board.move({{30.0f, 10.0f}, {50.0f, 10.0f}});
-    EXPECT_THAT(board.takePosts(), rectAndBatch);
-    board.up({60.0f, 10.0f});
-    EXPECT_THAT(board.takePosts(), rectAndBatch);
-  }
-}
-
 // Nothing but short moves: the stroke ends as a tap where it began. Its alpha shows the pressure, which
 // fingers, mice and a stylus on a touch screen are given. Of those even longer moves are short.
 TEST_P(LiveStroke, EndsAsATapWhenEveryMoveWasDropped) {

@@ -45,20 +45,6 @@ std::vector<Sample> strokeByLot(unsigned seed) {
   return samples;
 }
 
-// Bit for bit, float by float.
-std::vector<float> drawnLive(DrawingBoard& board, const std::vector<Sample>& samples, int batch = 4) {
-  board.takeBatches();
-  board.stroke(samples, batch);
-  return board.takeFloats();
-}
-
-template <typename Input>
-std::vector<float> drawnAgain(DrawingBoard& board, const Input& input) {
-  board.takeBatches();
-  board.redraw(input);
-  return board.takeFloats();
-}
-
 struct Hand {
   int tool, source;
   const char* name;
@@ -89,9 +75,12 @@ TEST_P(StrokesByLot, AreTheSameLiveRecordedAndStored) {
   for (unsigned seed = 1; seed <= kStrokes; ++seed) {
     SCOPED_TRACE("seed " + std::to_string(seed));
     const std::vector<Sample> samples = strokeByLot(seed);
-    std::vector<float> live = drawnLive(board, samples);
-    std::vector<float> recorded = drawnAgain(board, board.recorded(samples));
-    EXPECT_EQ(recorded, drawnAgain(board, *board.stored(samples)));
+    board.stroke(samples);
+    std::vector<float> live = board.takeFloats();
+    board.redraw(board.recorded(samples));
+    std::vector<float> recorded = board.takeFloats();
+    board.redraw(*board.stored(samples));
+    EXPECT_EQ(recorded, board.takeFloats());
     ASSERT_EQ(live.size(), recorded.size());
     // Every finger presses alike.
     const bool looksAtAlpha = options().tool != Qelt::kToolStylus;
