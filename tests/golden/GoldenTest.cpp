@@ -233,8 +233,8 @@ TEST(PreviewGolden, PictureIsThatOfTheRelease) {
   expectGoldenPicture(pictureOf(board), "preview-picture.pgm");
 }
 
-void leaveStroke(Qelt::Pencil2Data& shared) {
-  QeltTests::leaveStroke(shared, {12.13f, 20.39f}, {20.37f, 40.61f}, {24.71f, 44.29f});
+void leaveStrokeOfGolden(Qelt::Pencil2Data& shared) {
+  leaveStroke(shared, {12.13f, 20.39f}, {20.37f, 40.61f}, {24.71f, 44.29f});
   std::tie(shared.mLastWidth, shared.mLastOrientation, shared.mTiltBlend) = std::tuple(9.0f, 0.7f, 0.2f);
 }
 
@@ -243,7 +243,7 @@ const std::vector<Sample> kAhead = {{40.13f, 52.77f}, {71.59f, 44.31f}, {105.23f
 Trace predictionTrace() {
   Trace trace;
   PredictionBoard board;
-  leaveStroke(board.shared);
+  leaveStrokeOfGolden(board.shared);
   board.move(kAhead);
   traceCall(trace, board);
   return trace;
@@ -252,7 +252,7 @@ Trace predictionTrace() {
 TEST(PredictionGolden, PictureIsThatOfTheRelease) {
   PredictionBoard board(page());
   board.drawable->SetOpacity(0.8f);
-  leaveStroke(board.shared);
+  leaveStrokeOfGolden(board.shared);
   board.move(kAhead);
   expectGoldenPicture(pictureOf(board), "prediction-picture.pgm");
 }
@@ -305,9 +305,9 @@ TEST_P(GrainGolden, PictureBelowTheFirstTilesIsThatOfTheRelease) {
   }
   draw(all, PreviewBoard(options), draws);
   draw(all, PredictionBoard(options), [&](auto& board) {
-    leaveStroke(board.shared);
+    leaveStrokeOfGolden(board.shared);
     const Qelt::PointF first{shading[0].x, shading[0].y};
-    QeltTests::leaveStroke(board.shared, first, first, first);
+    leaveStroke(board.shared, first, first, first);
     board.move(shading);
   });
   expectGoldenPicture(all, file + ".pgm");

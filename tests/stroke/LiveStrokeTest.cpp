@@ -13,7 +13,6 @@ namespace {
 
 using Qelt::MotionEvent;
 using testing::ElementsAre;
-using testing::IsEmpty;
 
 class LiveStroke : public testing::TestWithParam<int> {
  protected:
