@@ -40,8 +40,10 @@ struct ExpectedVersion {
   float alpha[4] = {0.16f, 0.25f, 0.36f, 0.64f}, alphaDivisor = 1.0f;
   float tapAlpha = 0.25f;  // at `unknownPressure`
   float tapReach = 5.0f;   // of the rectangle of an upright tap, around its point, before it is grown
-  //   From stamp to stamp, stroke units; 0 where stamps divide each segment evenly.
+  //   From stamp to stamp, stroke units; 0 where stamps divide each segment evenly. Where it follows the size, it
+  //   is taken as the pen goes down, and a stroke begun at no size stays empty.
   float spacing = 0.0f;
+  bool spacingFollowsSize = false;
   //   Stamps of the three segments, of lengths 4.2, 4.1 and 3.0 (straight) and 4.2, 8.3 and 7.8 (curve); of
   //   the closing segment of a stored stroke, which has no length; and of a recorded event, 8.4.
   //   Versions 1 and 2: trunc(40 / 10) = 4 and a quarter of the length: 5.05, 5.025, 4.75; 5.05, 6.075, 5.95;
