@@ -40,8 +40,8 @@ struct ExpectedVersion {
   float alpha[4] = {0.16f, 0.25f, 0.36f, 0.64f}, alphaDivisor = 1.0f;
   float tapAlpha = 0.25f;  // at `unknownPressure`
   float tapReach = 5.0f;   // of the rectangle of an upright tap, around its point, before it is grown
-  //   From stamp to stamp, stroke units; 0 where stamps divide each segment evenly. Where it follows the size, it
-  //   is taken as the pen goes down, and a stroke begun at no size stays empty.
+  //   From stamp to stamp, stroke units; 0 where stamps divide each segment evenly. Where it follows the
+  //   size, it is taken as the pen goes down, and a stroke begun at no size stays empty.
   float spacing = 0.0f;
   bool spacingFollowsSize = false;
   //   Stamps of the three segments, of lengths 4.2, 4.1 and 3.0 (straight) and 4.2, 8.3 and 7.8 (curve); of
