@@ -355,23 +355,4 @@ TEST_P(Layer, ABatchThatThereIsNoMemoryForIsLoggedOnceAndNotDrawn) {
   EXPECT_EQ(layer.readPixels(), Pixels(8 * 8 * 4));
 }
 
-TEST(LayerQueues, TwoQueuesOnOneThreadKeepTheirContextsApart) {
-  QeltTests::LogCapture log;
-  RenderQueue one(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
-  CanvasLayer first(one, 16, 16);
-  RenderQueue two(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
-  CanvasLayer second(two, 16, 16);
-  one.run([&] {
-    Painter painter(kWindowShader);
-    painter.setQuad(0, 0, 16, 16);
-    EXPECT_EQ(second.readPixels(), Pixels(16 * 16 * 4));  // inside the other's task
-    painter.draw(*first.GetBitmap());
-    EXPECT_TRUE(log.take().empty());
-    two.run([&] { painter.draw(*second.GetBitmap()); });
-    EXPECT_EQ(log.take().size(), 1u) << "the program is not this context's";
-  });
-  EXPECT_EQ(pixelAt(first.readPixels(), 16, 5, 6)[0], 5);
-  EXPECT_EQ(second.readPixels(), Pixels(16 * 16 * 4));
-}
-
 }  // namespace

@@ -2,8 +2,8 @@
 
 #include <cmath>
 #include <cstddef>
-#include <memory>
 #include <string>
+#include <tuple>
 #include <utility>
 #include <vector>
 
@@ -27,20 +27,9 @@ using testing::SizeIs;
 
 using PredictionBoard = DrawableBoard<Pencil2PredictionDrawableGL>;
 
-// What a live stroke might have left.
 void leaveStrokeAlongX(Qelt::Pencil2Data& shared) {
-  shared.mStartX = 3.3f;
-  shared.mStartY = 2.7f;
-  shared.mLastStampX = 10.0f;
-  shared.mLastStampY = 0.0f;
-  shared.mLastX = 20.0f;
-  shared.mLastY = 0.0f;
-  shared.mLastWidth = 4.0f;
-  shared.mLastAlpha = 0.6f;
-  shared.mLastOrientation = 0.0f;
-  shared.mStampCount = 7;
-  shared.mTiltBlend = 0.25f;
-  shared.mHasLastStroke = true;
+  leaveStroke(shared, {3.3f, 2.7f}, {10.0f, 0.0f}, {20.0f, 0.0f});
+  std::tie(shared.mLastWidth, shared.mLastOrientation, shared.mTiltBlend) = std::tuple(4.0f, 0.0f, 0.25f);
 }
 
 TEST(Prediction, GoesOnFromTheLastStampWithItsLooks) {
@@ -150,7 +139,8 @@ TEST_F(PredictionGetter, AnswersForVersionEightAlone) {
   mPen.setVersion(8);
   Qelt::IPenPredictionDrawableGL* const made = mPen.GetPredictionStrokeDrawableGL();
   ASSERT_NE(made, nullptr);
-  for (const auto& [version, stroke] : {std::pair(7, 7), std::pair(6, 6), std::pair(9, 1)}) {
+  for (const auto& [version, stroke] :
+       {std::pair(7, 7), std::pair(6, 6), std::pair(newestVersion() + 1, 1)}) {
     mPen.setVersion(version);
     LogCapture log;
     EXPECT_EQ(mPen.GetPredictionStrokeDrawableGL(), nullptr);
