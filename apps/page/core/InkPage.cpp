@@ -539,6 +539,20 @@ StrokeId InkPage::addRecord(std::span<const std::uint8_t> bytes) {
   return ++page.lastId;
 }
 
+void InkPage::setShown(StrokeId id, bool isShown) {
+  Parts& page = *mParts;
+  page.refuseIfBusy();
+  page.isErasing = false;
+  const std::size_t index = page.indexOf(id);
+  if (page.strokes[index].isShown == isShown) return;
+  const std::vector<PixelArea> areas = page.layers.areasOf(index);
+  page.history.dropAllBackups();
+  page.strokes.show(index, isShown);
+  page.layers.redraw(index, areas);
+  if (page.strokes.shown() == 0) page.layers.showNothing();
+  if (page.wet.isHolding()) page.wet.redraw(page.strokes);
+}
+
 std::vector<std::uint8_t> InkPage::record(StrokeId id) const {
   const PageStroke& stroke = mParts->strokes[mParts->indexOf(id)];
   return writeRecord(stroke.style(), stroke.samples());

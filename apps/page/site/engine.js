@@ -149,6 +149,11 @@ export class Engine {
     this.#call('samples', id);
     return this.#numbers();
   }
+  /** As another window on the same page did: no step of the history. */
+  setShown(shown, hidden) {
+    for (const id of shown) this.#call('set_shown', id, 1);
+    for (const id of hidden) this.#call('set_shown', id, 0);
+  }
   style(id) {
     this.#call('style', id);
     const [look, size, color, smooth, outlineSize, outlineColor, tool] = this.#numbers();

@@ -298,6 +298,9 @@ EMSCRIPTEN_KEEPALIVE int qelt_samples(StrokeId id) {
     return 0;
   });
 }
+EMSCRIPTEN_KEEPALIVE int qelt_set_shown(StrokeId id, int isShown) {
+  return onPage([&](InkPage& page) { return page.setShown(id, isShown != 0), 0; });
+}
 // Answers with look, size, colour, smoothing, the outline's size (0 without) and colour, and the tool.
 EMSCRIPTEN_KEEPALIVE int qelt_style(StrokeId id) {
   return onPage([&](InkPage& page) {
