@@ -72,11 +72,11 @@ class ProgramState final : public GlResource {
   bool use() {
     if (mProgram == 0 && mMayBuildAgain && isLive() && !mReleased) remake();
     if (mProgram == 0 || !isLive()) {
-      if (GlDevice* const drawing = GlDevice::live(); drawing != nullptr) drawing->useProgram(0);
+      if (GlDevice* const drawing = GlDevice::live(); drawing != nullptr) drawing->state().useProgram(0);
       noteForeignContext();
       return false;
     }
-    device()->useProgram(mProgram);
+    device()->state().useProgram(mProgram);
     return true;
   }
 
@@ -92,7 +92,7 @@ class ProgramState final : public GlResource {
   void destroy() {
     mReleased = true;
     if (mProgram != 0 && isLive()) {
-      device()->forgetProgram(mProgram);
+      if (device()->state().program() == mProgram) device()->state().useProgram(0);
       gl(glDeleteProgram)(mProgram);
     }
     mProgram = 0;
