@@ -4,12 +4,10 @@
 #include <link.h>
 
 #include <algorithm>
-#include <cmath>
 #include <cstddef>
 #include <cstdint>
 #include <cstdio>
 #include <filesystem>
-#include <numbers>
 #include <optional>
 #include <span>
 #include <string>
@@ -31,6 +29,7 @@
 #include "play/PageLayout.h"
 #include "play/PagePlayer.h"
 #include "play/PenSession.h"
+#include "play/SamplePanel.h"
 #include "play/StrokeFeeder.h"
 #include "text/NumberText.h"
 #include "text/Refusal.h"
@@ -142,32 +141,6 @@ void trace(const Options& options) {
     player.play(recorder);
   }
   file.commit();
-}
-
-// The panel of `preview`, in stroke units, each of which is one pixel.
-constexpr float kPanelWidth = 480.0f;
-constexpr float kPanelHeight = 160.0f;
-
-// A lying S that swells: pressed harder and leant further towards its middle.
-Page samplePanel() {
-  constexpr int kSamples = 160;
-  constexpr double kInset = 50.0, kSwing = 42.0;        // stroke units
-  constexpr double kLightest = 0.15, kHeaviest = 0.75;  // pressure
-  constexpr double kMostTilt = 0.55;                    // radians
-  Page page{.name = "the sample stroke", .strokes = {}};
-  for (int i = 0; i < kSamples; ++i) {
-    const double along = static_cast<double>(i) / (kSamples - 1);
-    const double swell = std::pow(std::sin(along * std::numbers::pi), 2.0);
-    Sample sample;
-    sample.x = static_cast<float>(kInset + along * (kPanelWidth - 2.0 * kInset));
-    sample.y = static_cast<float>(kPanelHeight / 2.0 - kSwing * std::sin(along * 2.0 * std::numbers::pi));
-    sample.pressure = static_cast<float>(kLightest + (kHeaviest - kLightest) * swell);
-    sample.tilt = static_cast<float>(kMostTilt * swell);
-    sample.time = i * 1000.0 / 240.0;
-    page.strokes.addSample(sample);
-  }
-  page.strokes.finishStroke(kNoNumber, std::nullopt);
-  return page;
 }
 
 void preview(const Options& asked) {

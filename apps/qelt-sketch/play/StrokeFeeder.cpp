@@ -10,11 +10,6 @@
 namespace QeltDesktop {
 namespace {
 
-std::int64_t wholeMilliseconds(double time) {
-  constexpr double kFarAway = 9.0e18;  // fits into 64 bits
-  return std::llround(std::clamp(time, -kFarAway, kFarAway));
-}
-
 Qelt::PointerCoords coordsOf(const Sample& sample) {
   return {.x = sample.x,
           .y = sample.y,
@@ -41,6 +36,16 @@ Qelt::MotionEvent eventOf(const SampleList& samples, std::size_t first, std::siz
 }
 
 }  // namespace
+
+std::int64_t wholeMilliseconds(double time) {
+  constexpr double kFarAway = 9.0e18;  // fits into 64 bits
+  return std::llround(std::clamp(time, -kFarAway, kFarAway));
+}
+
+Qelt::MotionEvent eventOf(std::span<const Sample> samples, double downTime, int action,
+                          const Pointer& pointer) {
+  return eventOf(samples, 0, samples.size(), downTime, action, pointer);
+}
 
 Pointer pointerFor(const Stroke& stroke, std::optional<int> tool, std::optional<int> source) {
   Pointer pointer{};
@@ -103,7 +108,7 @@ Qelt::MotionEvent predictedEvent(const Sample& previous, const Sample& last, con
     sample.time = last.time + k * (last.time - previous.time);
     samples.push_back(sample);
   }
-  return eventOf(samples, 0, samples.size(), last.time, Qelt::kActionMove, pointer);
+  return eventOf(samples, last.time, Qelt::kActionMove, pointer);
 }
 
 }  // namespace QeltDesktop

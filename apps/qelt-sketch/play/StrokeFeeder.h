@@ -1,9 +1,11 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <functional>
 #include <memory>
 #include <optional>
+#include <span>
 
 #include "desktop/model/StoredStroke.h"
 #include "engine/MotionEvent.h"
@@ -22,6 +24,13 @@ Pointer pointerFor(const Stroke& stroke, std::optional<int> tool, std::optional<
 
 // Drops all but the first `points` samples of the page's last stroke.
 void cutLastStroke(Page& page, int points);
+
+// A time as events and stored strokes have it, rounded; one that is too large counts as the largest.
+std::int64_t wholeMilliseconds(double time);
+
+// One event of at least one sample: the last is the current one, the others are history.
+Qelt::MotionEvent eventOf(std::span<const Sample> samples, double downTime, int action,
+                          const Pointer& pointer);
 
 // One event of a stroke that is being drawn.
 struct LiveEvent {

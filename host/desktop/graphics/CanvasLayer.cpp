@@ -57,6 +57,20 @@ void CanvasLayer::clear() {
   mQueue.run([this] { mBitmap->clear(0.0f, 0.0f, 0.0f, 0.0f); });
 }
 
+void CanvasLayer::clear(const Qelt::Rect& area) {
+  const int left = std::max(area.left, 0), right = std::min(area.right, mWidth);
+  const int top = std::max(area.top, 0), bottom = std::min(area.bottom, mHeight);
+  if (left >= right || top >= bottom) return;
+  mQueue.run([&] { mBitmap->clear(left, top, right - left, bottom - top); });
+}
+
+void CanvasLayer::copyFrom(CanvasLayer& source, const Qelt::Rect& area) {
+  const int left = std::max(area.left, 0), right = std::min({area.right, mWidth, source.mWidth});
+  const int top = std::max(area.top, 0), bottom = std::min({area.bottom, mHeight, source.mHeight});
+  if (left >= right || top >= bottom) return;
+  mQueue.run([&] { mBitmap->copyFrom(*source.mBitmap, left, top, left, top, right - left, bottom - top); });
+}
+
 int CanvasLayer::timesEmptied() const {
   return mBitmap->timesEmptied();
 }

@@ -6,6 +6,7 @@
 #include <vector>
 
 #include "base/HostApi.h"
+#include "base/RectF.h"
 #include "graphics/ISPPenCanvas.h"
 
 namespace QeltDesktop {
@@ -40,6 +41,11 @@ class QELT_HOST_API CanvasLayer : public Qelt::ISPLayer {
   int height() const { return mHeight; }
   // Makes every pixel transparent, after everything posted so far.
   void clear();
+  // The same for the pixels of an area; what of it lies outside the layer is left out.
+  void clear(const Qelt::Rect& area);
+  // Copies the pixels of an area from another layer of the queue, after everything posted so far. What of it
+  // lies outside of either layer is left out.
+  void copyFrom(CanvasLayer& source, const Qelt::Rect& area);
   // How often the layer has come back empty after a context loss. Any thread.
   int timesEmptied() const;
   // width x height x 4 bytes, red first, premultiplied, first row = top, after everything posted so far.
@@ -47,6 +53,8 @@ class QELT_HOST_API CanvasLayer : public Qelt::ISPLayer {
   std::vector<std::uint8_t> readPixels();
 
  private:
+  friend class LayerBackup;
+
   RenderQueue& mQueue;
   int mWidth;
   int mHeight;

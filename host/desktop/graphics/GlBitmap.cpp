@@ -133,6 +133,20 @@ void GlBitmap::clear(float red, float green, float blue, float alpha) {
   endRender();
 }
 
+void GlBitmap::clear(int x, int y, int width, int height) {
+  if (!beginRender(x, y, width, height)) return;
+  gl(glClearColor)(0.0f, 0.0f, 0.0f, 0.0f);
+  gl(glClear)(GL_COLOR_BUFFER_BIT);
+  endRender();
+}
+
+void GlBitmap::copyFrom(GlBitmap& source, int fromX, int fromY, int x, int y, int width, int height) {
+  if (!isLive() || !source.bindFramebuffer()) return;
+  bindTexture();
+  gl(glCopyTexSubImage2D)(GL_TEXTURE_2D, 0, x, y, fromX, fromY, width, height);
+  gl(glBindFramebuffer)(GL_FRAMEBUFFER, 0);
+}
+
 std::vector<std::uint8_t> GlBitmap::readPixels() {
   std::vector<std::uint8_t> pixels;
   if (!bindFramebuffer()) return pixels;

@@ -78,6 +78,11 @@ class QELT_HOST_API GlBitmap final : public Qelt::ISPBitmap, public GlResource {
   bool beginRender(int x, int y, int width, int height);
   void endRender();
   void clear(float red, float green, float blue, float alpha);
+  // Makes the rectangle of that size at (x, y) transparent.
+  void clear(int x, int y, int width, int height);
+  // Copies a rectangle of that size, from (fromX, fromY) of another bitmap of the same context to (x, y).
+  // Both hold it whole.
+  void copyFrom(GlBitmap& source, int fromX, int fromY, int x, int y, int width, int height);
   // width x height x 4 bytes, first row first; empty without a context.
   std::vector<std::uint8_t> readPixels();
 

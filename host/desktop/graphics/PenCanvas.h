@@ -19,6 +19,8 @@ class QELT_HOST_API PenCanvas : public Qelt::ISPPenCanvas {
 
   // Stroke units to canvas pixels, column-major; the identity at first.
   void setMatrix(const Qelt::Matrix3<float>& matrix);
+  // The layer that is drawn into from now on, or none. Nothing posted through the canvas may still wait.
+  void setLayer(CanvasLayer* layer) { mLayer = layer; }
   CanvasLayer* layer() const { return mLayer; }
   Qelt::IGLMsgQueue* queue() const { return mQueue; }
 
