@@ -74,6 +74,15 @@ void GlState::useProgram(GLuint program) {
   if (changes(mProgram, program)) gl(glUseProgram)(program);
 }
 
+GLuint GlState::program() {
+  if (!mProgram) {
+    GLint current = 0;
+    gl(glGetIntegerv)(GL_CURRENT_PROGRAM, &current);
+    mProgram = static_cast<GLuint>(current);
+  }
+  return *mProgram;
+}
+
 void GlState::bindTexture(int unit, GLuint texture) {
   if (mTextures[static_cast<std::size_t>(unit)] == texture) return;
   if (changes(mUnit, unit)) gl(glActiveTexture)(GL_TEXTURE0 + static_cast<GLenum>(unit));
@@ -86,7 +95,8 @@ void GlState::bindTexture(GLuint texture) {
     gl(glActiveTexture)(GL_TEXTURE0);
     mUnit = 0;
   }
-  if (changes(mTextures[static_cast<std::size_t>(*mUnit)], texture)) gl(glBindTexture)(GL_TEXTURE_2D, texture);
+  if (changes(mTextures[static_cast<std::size_t>(*mUnit)], texture))
+    gl(glBindTexture)(GL_TEXTURE_2D, texture);
 }
 
 void GlState::bindVertexArray(GLuint array) {

@@ -11,10 +11,10 @@
 
 namespace QeltDesktop {
 
-// What is known of a context's state, so that GL is told only what does not hold yet: a call costs more than a
-// comparison, and in a browser much more. All of the host sets state through here. Whoever calls GL itself on the
-// render thread does so in `RenderQueue::run`, after which nothing counts as known; or calls `forget`. Render
-// thread, with the context current.
+// What is known of a context's state, so that GL is told only what does not hold yet: a call costs more than
+// a comparison, and in a browser much more. All of the host sets state through here. Whoever calls GL itself
+// on the render thread does so in `RenderQueue::run`, after which nothing counts as known; or calls `forget`.
+// Render thread, with the context current.
 class QELT_HOST_API GlState {
  public:
   // From here on nothing is known: the context is new, or somebody else has used it.
@@ -26,12 +26,13 @@ class QELT_HOST_API GlState {
   Qelt::Vector4<int> viewport();
   void setScissor(GLint x, GLint y, GLsizei width, GLsizei height);
   void setEnabled(GLenum capability, bool enabled);
-  void setBlendFactors(GLenum sourceColor, GLenum destinationColor, GLenum sourceAlpha, GLenum destinationAlpha);
+  void setBlendFactors(GLenum sourceColor, GLenum destinationColor, GLenum sourceAlpha,
+                       GLenum destinationAlpha);
   // Every channel can be drawn into.
   void openColorMask();
   void useProgram(GLuint program);
-  // 0 when none is current, or none is known to be.
-  GLuint program() const { return mProgram.value_or(0); }
+  // 0 when none is current.
+  GLuint program();
   // A GL_TEXTURE_2D, on a unit or on whichever is active.
   void bindTexture(int unit, GLuint texture);
   void bindTexture(GLuint texture);
