@@ -13,6 +13,7 @@
 #include <vector>
 
 #include "desktop/gl/CallTask.h"
+#include "desktop/gl/GlDevice.h"
 #include "support/LogCapture.h"
 #include "support/PenBoard.h"
 #include "support/Stamps.h"
@@ -102,7 +103,10 @@ TEST_P(EveryKind, IsDrawnAlikeWhateverGlStateWasLeftBeforeEachTask) {
     board.queue.accept = [&](const Qelt::ITask&) {
       if (spread == nullptr || spreads) return true;
       spreads = true;  // its own post comes here too
-      QeltDesktop::postCall(board.queue, spread);
+      QeltDesktop::postCall(board.queue, [spread] {
+        spread();
+        QeltDesktop::GlDevice::live()->state().forget();
+      });
       spreads = false;
       return true;
     };
