@@ -1,11 +1,12 @@
 #include <gmock/gmock.h>
-#include <stdio.h>
 
 #include <fstream>
 #include <regex>
 #include <set>
 #include <string>
 #include <vector>
+
+#include "support/Command.h"
 
 namespace {
 
@@ -25,17 +26,7 @@ constexpr bool kIsArm = false;
 
 // What a tool for ELF files prints of the library.
 std::vector<std::string> linesOf(const std::string& tool) {
-  std::vector<std::string> lines(1);
-  FILE* const output = popen(("LC_ALL=C " + tool + " " QELT_PLUGIN_PATH).c_str(), "r");
-  for (int byte; (byte = fgetc(output)) != EOF;) {
-    if (byte != '\n')
-      lines.back() += static_cast<char>(byte);
-    else
-      lines.emplace_back();
-  }
-  EXPECT_EQ(pclose(output), 0) << tool;
-  lines.pop_back();
-  return lines;
+  return QeltTests::linesOf(tool + " " QELT_PLUGIN_PATH);
 }
 
 TEST(Exports, AreThePromisedNamesAndNothingElse) {

@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "desktop/gl/CallTask.h"
+#include "desktop/gl/GlDevice.h"
 #include "support/AllocationGate.h"
 #include "support/LogCapture.h"
 #include "support/PenBoard.h"
@@ -95,7 +96,10 @@ TEST_P(EveryKind, IsDrawnAlikeWhateverGlStateWasLeftBeforeEachTask) {
     board.queue.accept = [&](const Qelt::ITask&) {
       if (spread == nullptr || spreads) return true;
       spreads = true;  // its own post comes here too
-      QeltDesktop::postCall(board.queue, spread);
+      QeltDesktop::postCall(board.queue, [spread] {
+        spread();
+        QeltDesktop::GlDevice::live()->state().forget();
+      });
       spreads = false;
       return true;
     };
