@@ -293,7 +293,7 @@ Definitions::Definitions(const SourceText& source) : mSource(source) {
 }
 
 const char* Definitions::keptText(std::string_view text) {
-  constexpr std::size_t kFirst = 1 << 10, kLargest = 1 << 16;
+  constexpr std::size_t kFirst = 1 << 10, kLargest = 1 << 20;
   const std::size_t size = text.size() + 1;
   if (mTexts.empty() || mTexts.back().capacity() - mTexts.back().size() < size) {
     const std::size_t usual = mTexts.empty() ? kFirst : std::min(2 * mTexts.back().capacity(), kLargest);
