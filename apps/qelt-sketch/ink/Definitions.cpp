@@ -237,8 +237,10 @@ class Definitions::Collector final : public XmlVisitor {
     ContextEntry& entry = mAll.mContexts[context];
     if (mAll.partOf(entry, part)) return;
     const std::uint32_t added = numberAfter(mAll.mContextParts.size());
-    mAll.mContextParts.push_back(
-        {.part = part, .number = static_cast<std::uint32_t>(number), .before = entry.part});
+    ContextPart& made = mAll.mContextParts.emplace_back();
+    made.part = part;
+    made.number = number;
+    made.before = entry.part;
     entry.part = added;
   }
 
