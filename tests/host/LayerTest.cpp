@@ -13,8 +13,10 @@
 #include <vector>
 
 #include "desktop/gl/GlVertexObject.h"
+#include "desktop/gl/GpuFence.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/graphics/CanvasLayer.h"
+#include "desktop/graphics/LayerBackup.h"
 #include "gl/GraphicsFactory.h"
 #include "gl/GraphicsObject.h"
 #include "gl/ManagedObject.h"
@@ -289,6 +291,53 @@ TEST_P(Layer, TheHostShapeFillsItsSquareInTheNextContextToo) {
     EXPECT_EQ(Qelt::SPGraphicsFactory::CreateCanvas(nullptr, layer.GetBitmap(), 0), nullptr);
     Qelt::SPGraphicsFactory::ReleaseCanvas(nullptr);
   });
+}
+
+TEST_P(Layer, AreasAreCopiedClearedAndExchanged) {
+  CanvasLayer painted(queue, 40, 30, 16), other(queue, 32, 32);
+  queue.run([&] {
+    Painter painter(kWindowShader);
+    painter.setQuad(0, 0, 40, 30);
+    painter.draw(*painted.GetBitmap());
+  });
+  const Pixels before = painted.readPixels();
+  // Where the window shader painted, red is the column. Areas end at the layers' edges.
+  other.copyFrom(painted, {-5, 10, 100, 100});
+  EXPECT_EQ(pixelAt(other.readPixels(), 32, 31, 29)[0], 31);
+  EXPECT_EQ(pixelAt(other.readPixels(), 32, 31, 9)[3], 0);
+  EXPECT_EQ(pixelAt(other.readPixels(), 32, 0, 30)[3], 0);
+  other.copyFrom(painted, {50, 0, 60, 5});
+
+  QeltDesktop::LayerBackup backup(queue, painted, {7, 3, 20, 25});
+  EXPECT_EQ(backup.bytes(), 4u * 13 * 22);
+  painted.clear({0, 0, 18, 1000});
+  const Pixels after = painted.readPixels();
+  EXPECT_EQ(pixelAt(after, 40, 17, 29)[3], 0);
+  EXPECT_EQ(pixelAt(after, 40, 18, 0)[0], 18);
+  backup.swapWith(painted);
+  EXPECT_EQ(pixelAt(painted.readPixels(), 40, 7, 3)[0], 7);
+  EXPECT_EQ(pixelAt(painted.readPixels(), 40, 6, 3)[3], 0);
+  backup.swapWith(painted);
+  EXPECT_EQ(painted.readPixels(), after);
+  painted.clear({9, 9, 9, 20});
+  EXPECT_EQ(painted.readPixels(), after) << "an area without pixels";
+  EXPECT_NE(after, before);
+
+  std::unique_ptr<QeltDesktop::GpuFence> fence;
+  queue.run([&] {
+    fence = std::make_unique<QeltDesktop::GpuFence>();
+    EXPECT_TRUE(fence->hasPassed()) << "nothing to wait for";
+    fence->set();
+  });
+  painted.readPixels();  // which waits for the GPU
+  queue.run([&] { EXPECT_TRUE(fence->hasPassed()); });
+  queue.run([&] { fence->set(); });
+  queue.loseContext();
+  queue.run([&] { EXPECT_TRUE(fence->hasPassed()) << "it went with the context"; });
+  queue.restoreContext();
+  backup.swapWith(painted);
+  EXPECT_EQ(pixelAt(painted.readPixels(), 40, 7, 3)[3], 0) << "and so did the pixels";
+  queue.run([&] { fence.reset(); });
 }
 
 TEST_P(Layer, ShadersThatAreBrokenOrMisusedAreLoggedAndAnswerNull) {
