@@ -6,7 +6,6 @@
 #include <cmath>
 #include <cstddef>
 #include <cstdint>
-#include <map>
 #include <set>
 #include <string>
 #include <vector>
@@ -16,7 +15,6 @@
 #include "support/AllocationGate.h"
 #include "support/LogCapture.h"
 #include "support/PenBoard.h"
-#include "support/Stamps.h"
 
 namespace QeltTests {
 namespace {

@@ -92,14 +92,6 @@ TEST(Prediction, BeforeTheFirstStampStartsFromTheStrokeBefore) {
   EXPECT_THAT(board.takeStamps().at(0), StampNear(10.0f, 0.0f, 1.01f));
 }
 
-TEST(Prediction, TheRimFollowsTheView) {
-  PredictionBoard board;
-  board.canvas.setMatrix(viewOf(2.0f));
-  leaveStrokeAlongX(board.shared);
-  board.move({{30.0f, 0.0f}});
-  EXPECT_NEAR(board.takeStamps().at(0).halfWidth, 2.25f, 1e-5f);  // half a pixel is a quarter of a unit
-}
-
 TEST(Prediction, StartsNowhereFromARecordOutOfBounds) {
   PredictionBoard board;
   const MotionEvent event = motionEvent(Qelt::kActionMove, {{30.0f, 0.0f}});

@@ -8,7 +8,6 @@
 #include <vector>
 
 #include "support/DrawableBoard.h"
-#include "support/Stamps.h"
 #include "support/Versions.h"
 
 // What holds for every stroke, seen on strokes drawn by lot.
@@ -54,8 +53,6 @@ constexpr Hand kHands[] = {{Qelt::kToolStylus, Qelt::kSourceStylus, "Stylus"},
                            {Qelt::kToolFinger, Qelt::kSourceTouchScreen, "Finger"},
                            {Qelt::kToolMouse, Qelt::kSourceMouse, "Mouse"}};
 
-constexpr unsigned kStrokes = 12;
-
 class StrokesByLot : public testing::TestWithParam<std::tuple<int, bool, Hand>> {
  protected:
   BoardOptions options() const {
@@ -72,7 +69,7 @@ class StrokesByLot : public testing::TestWithParam<std::tuple<int, bool, Hand>> 
 TEST_P(StrokesByLot, AreTheSameLiveRecordedAndStored) {
   const auto stride = static_cast<std::size_t>(strideOf(options().version));
   DrawingBoard board(options());
-  for (unsigned seed = 1; seed <= kStrokes; ++seed) {
+  for (unsigned seed = 1; seed <= 12; ++seed) {
     SCOPED_TRACE("seed " + std::to_string(seed));
     const std::vector<Sample> samples = strokeByLot(seed);
     board.stroke(samples);
