@@ -35,14 +35,36 @@ window.compare = (one, other) => {
   if (one.width !== other.width || one.height !== other.height) {
     throw new Error(`${one.width} x ${one.height} pixels against ${other.width} x ${other.height}`);
   }
-  const result = {bytes: one.data.length, differing: 0, most: 0, inked: 0};
+  // Sums over the bytes: `darkness` of the ink, `lighter` what the first picture has less of it, `apart` what has
+  // another place.
+  const result = {bytes: one.data.length, differing: 0, most: 0, inked: 0, darkness: 0, lighter: 0, apart: 0};
   for (let i = 0; i < one.data.length; ++i) {
     const apart = Math.abs(one.data[i] - other.data[i]);
     if (apart) ++result.differing;
     result.most = Math.max(result.most, apart);
+    result.apart += apart;
     if (one.data[i] !== 255) ++result.inked;
+    result.darkness += 255 - other.data[i];
+    result.lighter += one.data[i] - other.data[i];
   }
   return result;
+};
+
+window.differing = (one, other) => compare(one, other).differing;
+
+/** The browser takes the context away, and gives it back. */
+window.loseContext = async () => {
+  const handle = canvas.getContext('webgl2').getExtension('WEBGL_lose_context');
+  const event = (name) => new Promise((resolve) => canvas.addEventListener(name, resolve, {once: true}));
+  const lost = event('webglcontextlost');
+  handle.loseContext();
+  await lost;
+  return async () => {
+    const restored = event('webglcontextrestored');
+    // One in the same turn as the loss would come too early.
+    setTimeout(() => handle.restoreContext());
+    await restored;
+  };
 };
 
 /** Pixels of an opaque PNG in base64. */
