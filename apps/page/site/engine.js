@@ -79,6 +79,7 @@ export class Engine {
     return address;
   }
   #rows(rows, more = []) {
+    if (rows.length % VALUES || more.length % VALUES) throw new EngineError('A sample has six values.');
     const address = this.#room((rows.length + more.length) * 8);
     this.#module.HEAPF64.set(rows, address / 8);
     this.#module.HEAPF64.set(more, address / 8 + rows.length);
@@ -97,9 +98,9 @@ export class Engine {
 
   // The window.
   resize(width, height) {
+    this.#call('resize', width, height);
     if (this.#canvas.width !== width) this.#canvas.width = width;
     if (this.#canvas.height !== height) this.#canvas.height = height;
-    this.#call('resize', width, height);
   }
   /** Device pixel = zoom * unit + (x, y). What there is shows at once, moved; `work` then draws it sharp. */
   setView({zoom, x, y}) {

@@ -122,7 +122,7 @@ PageStyle styleOf(int look, double size, std::uint32_t argb, int smooth, double 
                   std::uint32_t outlineArgb, int tool) {
   PageStyle style{
       .look = look, .size = static_cast<float>(size), .argb = argb, .smooth = smooth != 0, .tool = tool};
-  if (outlineSize > 0.0) style.outline = PageOutline{static_cast<float>(outlineSize), outlineArgb};
+  if (outlineSize != 0.0) style.outline = PageOutline{static_cast<float>(outlineSize), outlineArgb};
   return style;
 }
 
