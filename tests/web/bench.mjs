@@ -7,7 +7,7 @@ import {mkdirSync, readFileSync, statSync, writeFileSync} from 'node:fs';
 import {createServer} from 'node:http';
 import {loadavg} from 'node:os';
 import {join} from 'node:path';
-import {Tab, bareEnginePage, files, openBrowser, scratch} from './browser.mjs';
+import {Tab, bareEnginePage, files, openBrowser, scratch} from './engine-page.mjs';
 
 const renderer = process.argv[2] ?? 'llvmpipe';
 const most = Number(process.argv[3] ?? 10_000);

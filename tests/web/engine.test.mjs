@@ -4,7 +4,7 @@ import assert from 'node:assert/strict';
 import {readFileSync} from 'node:fs';
 import {join} from 'node:path';
 import {after, before, describe, test} from 'node:test';
-import {RENDERERS, Tab, bareEnginePage, drawnPicture, files, openBrowser, scratch} from './browser.mjs';
+import {RENDERERS, Tab, bareEnginePage, drawnPicture, files, openBrowser, scratch} from './engine-page.mjs';
 
 const folder = scratch();
 const address = bareEnginePage(folder);
