@@ -131,7 +131,8 @@ void PageLayers::showNothing() {
 }
 
 PageBackup PageLayers::backUp(RenderQueue& queue, Pair& pair, const PixelArea& area) {
-  PageBackup backup{area, std::make_unique<LayerBackup>(queue, *pair.strokes, area), nullptr};
+  PageBackup backup{.area = area, .strokes = nullptr, .outlines = nullptr};
+  backup.strokes = std::make_unique<LayerBackup>(queue, *pair.strokes, area);
   if (pair.outlines != nullptr) {
     backup.outlines = std::make_unique<LayerBackup>(queue, *pair.outlines, area);
   }
