@@ -1,5 +1,10 @@
 # What building for a browser takes that other systems bring along.
 
+# The page is one file that is mailed and opened: what draws stays fast, all else is kept small.
+set(CMAKE_POSITION_INDEPENDENT_CODE OFF)
+set(CMAKE_CXX_FLAGS_RELEASE "-Os -DNDEBUG")
+set(CMAKE_C_FLAGS_RELEASE "-Os -DNDEBUG")
+
 # C++ exceptions, as browsers have them themselves.
 add_compile_options(-fwasm-exceptions)
 add_link_options(-fwasm-exceptions)

@@ -4,8 +4,6 @@
 
 #include <dlfcn.h>
 
-#include <memory>
-
 #include "gl/GraphicsFactory.h"
 #include "gl/GraphicsObject.h"
 #include "gl/OpenGLShaderProgram.h"

@@ -27,6 +27,7 @@ struct Surroundings {
   int mostSleep;  // of the render thread after each action, microseconds
   int mostAhead;  // actions the main thread is ahead, at the most
   int hosts = 1;
+  bool oneQueue = false;  // of all hosts, as of a page and a settings dialog with a pen each
 };
 
 class Soak : public testing::TestWithParam<Surroundings> {};
@@ -35,6 +36,7 @@ INSTANTIATE_TEST_SUITE_P(
     testing::Values(Surroundings{"ARenderThreadThatKeepsUp", RenderQueue::GL::None, 0, 4},
                     Surroundings{"ARenderThreadThatFallsBehind", RenderQueue::GL::None, 2000, 60},
                     Surroundings{"TwoHostsInOneProcess", RenderQueue::GL::None, 300, 20, 2},
+                    Surroundings{"TwoPensThroughOneQueue", RenderQueue::GL::None, 300, 20, 2, true},
                     Surroundings{"APictureAndALostContext", RenderQueue::GL::Context, 200, 12}),
     [](const auto& test) { return std::string(test.param.name); });
 
@@ -60,12 +62,7 @@ void act(PenBoard& board, const std::function<int(int)>& below) {
 TEST_P(Soak, LetsNothingOut) {
   const char* const asked = std::getenv("QELT_SOAK_SECONDS");
   const std::chrono::duration<double> time(asked != nullptr ? std::strtod(asked, nullptr) : 1.5);
-  const auto soak = [time](const Surroundings& around, unsigned seed) {
-    RenderQueue queue(RenderQueue::Mode::Thread, around.gl);
-    std::unique_ptr<QeltDesktop::CanvasLayer> layer;
-    if (around.gl == RenderQueue::GL::Context)
-      layer = std::make_unique<QeltDesktop::CanvasLayer>(queue, 96, 64, 64);
-    PenBoard board({.size = 4.0f}, queue, layer.get());
+  const auto soak = [time](const Surroundings& around, PenBoard& board, unsigned seed) {
     std::mt19937 random(seed);
     const auto below = [&random](int bound) {
       return static_cast<int>(random() % static_cast<unsigned>(bound));
@@ -76,7 +73,7 @@ TEST_P(Soak, LetsNothingOut) {
       act(board, below);
       if (around.mostSleep > 0) {
         const std::chrono::microseconds sleep(below(around.mostSleep));
-        QeltDesktop::postCall(queue, [sleep] { std::this_thread::sleep_for(sleep); });
+        QeltDesktop::postCall(board.queue, [sleep] { std::this_thread::sleep_for(sleep); });
       }
       if (++ahead > below(around.mostAhead)) {
         board.finish();
@@ -85,9 +82,19 @@ TEST_P(Soak, LetsNothingOut) {
     }
   };
   LogCapture log;
+  std::vector<std::unique_ptr<RenderQueue>> queues;
+  std::unique_ptr<QeltDesktop::CanvasLayer> layer;
+  std::vector<std::unique_ptr<PenBoard>> boards;
   std::vector<std::thread> hosts;
-  for (int host = 0; host < GetParam().hosts; ++host)
-    hosts.emplace_back(soak, GetParam(), 7u + static_cast<unsigned>(host));
+  for (int host = 0; host < GetParam().hosts; ++host) {
+    if (queues.empty() || !GetParam().oneQueue)
+      queues.push_back(std::make_unique<RenderQueue>(RenderQueue::Mode::Thread, GetParam().gl));
+    RenderQueue& queue = *queues.back();
+    if (GetParam().gl == RenderQueue::GL::Context)
+      layer = std::make_unique<QeltDesktop::CanvasLayer>(queue, 96, 64, 64);
+    boards.push_back(std::make_unique<PenBoard>(BoardOptions{.size = 4.0f}, queue, layer.get()));
+    hosts.emplace_back(soak, GetParam(), std::ref(*boards.back()), 7u + static_cast<unsigned>(host));
+  }
   for (std::thread& host : hosts) host.join();
   for (const LogLine& line : log.take()) EXPECT_EQ(line.text.find("threw"), std::string::npos) << line.text;
 }

@@ -4,6 +4,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cmath>
 #include <functional>
 #include <limits>
@@ -120,7 +121,10 @@ std::string nameOf(const testing::TestParamInfo<Scenario>& test) {
 bool isSwept(const Scenario& scenario, int version) {
   if (version == newestVersion()) return true;
   if (!scenario.everyVersion) return false;
-  if (scenario.picture) return version == 1 || version == 7;  // with the newest all render drawables
+  if (scenario.picture) {
+    const std::vector<int> own = versionsOfRenderDrawables();
+    return std::count(own.begin(), own.end(), version) > 0;
+  }
   return !QELT_SANITIZED || version == 1 || version == 5;
 }
 
@@ -304,15 +308,8 @@ TEST_P(HostSweep, FailingCalls) {
 // --- The GL context's ---
 
 class ContextLoss : public testing::TestWithParam<Drawing> {};
-INSTANTIATE_TEST_SUITE_P(Strokes, ContextLoss,
-                         testing::Values(Drawing{Kind::Live, 1}, Drawing{Kind::Live, 7},
-                                         Drawing{Kind::Live, 8}, Drawing{Kind::Redraw, 8},
-                                         Drawing{Kind::Outline, 8}, Drawing{Kind::Preview, 8},
-                                         Drawing{Kind::Prediction, 8}),
-                         [](const auto& test) {
-                           return testing::PrintToString(test.param.kind) + "Version" +
-                                  std::to_string(test.param.version);
-                         });
+INSTANTIATE_TEST_SUITE_P(Drawings, ContextLoss, testing::ValuesIn(drawings(versionsOfRenderDrawables())),
+                         drawingName);
 
 // The context goes and comes back, at once or later, between any two tasks of the render thread: the layer
 // comes back empty, and from there on it is drawn into as into one that was cleared there.

@@ -37,6 +37,7 @@
 #include "pencommon/PenStrokeDrawableGL.h"
 #include "support/BatchCheck.h"
 #include "support/FaultyCanvas.h"
+#include "support/PartialStroke.h"
 
 namespace QeltTests {
 namespace {
@@ -59,31 +60,6 @@ const QeltDesktop::PluginLibrary& library() {
   static const QeltDesktop::PluginLibrary loaded(QELT_PLUGIN_PATH);
   return loaded;
 }
-
-// A stored stroke, any of whose arrays may be missing.
-class Stroke final : public Qelt::ObjectStroke {
- public:
-  int GetPointCount() const override { return count; }
-  const Qelt::PointF* GetPoint() const override { return unlessMissing(1, points); }
-  const std::int64_t* GetTimeStamp() const override { return unlessMissing(2, times); }
-  const float* GetPressure() const override { return unlessMissing(4, pressures); }
-  const float* GetTilt() const override { return unlessMissing(8, tilts); }
-  const float* GetOrientation() const override { return unlessMissing(16, orientations); }
-  int GetToolType() const override { return tool; }
-
-  int count = 0;  // may be below 0, never more than there are points
-  int missing = 0;
-  int tool = 0;
-  std::vector<Qelt::PointF> points;
-  std::vector<std::int64_t> times;
-  std::vector<float> pressures, tilts, orientations;
-
- private:
-  template <typename Value>
-  const Value* unlessMissing(int bit, const std::vector<Value>& values) const {
-    return (missing & bit) != 0 ? nullptr : values.data();
-  }
-};
 
 // A host that does what its input says, in any order: two pens, three canvases whose views differ and whose
 // layers come and go, a few stored strokes, one queue that may refuse, calls that fail, a context that is
@@ -380,14 +356,14 @@ class PenWorld {
     return made;
   }
 
-  Stroke& stroke() {
+  PartialStroke& stroke() {
     const int choice = input.byte();
     if (!mStrokes.empty() && (choice % 2 == 1 || mStrokes.size() == kMostStrokes)) {
-      Stroke& known = *mStrokes[static_cast<std::size_t>(choice / 2) % mStrokes.size()];
+      PartialStroke& known = *mStrokes[static_cast<std::size_t>(choice / 2) % mStrokes.size()];
       if (choice % 8 == 7) known.SetRedrawingCacheDirtyFlag();
       return known;
     }
-    auto made = std::make_unique<Stroke>();
+    auto made = std::make_unique<PartialStroke>();
     const int points = input.pick(6);
     for (int i = 0; i < points; ++i) {
       made->points.push_back({coordinate(), coordinate()});
@@ -441,7 +417,7 @@ class PenWorld {
   QeltDesktop::PenCanvas mBlank;  // has no layer at all
   QeltDesktop::PenDataManager mData, mQueueless;
   std::unique_ptr<Qelt::Pen> mPens[2];
-  std::vector<std::unique_ptr<Stroke>> mStrokes;
+  std::vector<std::unique_ptr<PartialStroke>> mStrokes;
   std::map<int, const std::type_info*> mDrawnBy;  // of what handles stand for, the drawable
   std::uint32_t mRefusals = 0;                    // one bit a post, the lowest next
   int mFarPoints = 0;                             // still allowed

@@ -1,8 +1,6 @@
 #include <gmock/gmock.h>
 
-#include <array>
 #include <chrono>
-#include <cmath>
 #include <future>
 #include <memory>
 #include <string>
@@ -16,7 +14,6 @@
 #include "desktop/pencommon/PenDataManager.h"
 #include "gl/IGLMsgQueue.h"
 #include "gl/ITask.h"
-#include "pencommon/Pen.h"
 #include "pencommon/PenDrawableGL.h"
 #include "pencommon/PenStrokeDrawableRT.h"
 #include "support/LogCapture.h"
@@ -73,16 +70,6 @@ TEST(Drawables, OfACanvasWithoutALayerPrepareNothingAndOutliveWhatIsQueued) {
     EXPECT_THAT(notes, ElementsAre()) << "work for the partner may still be queued";
     queue.finish();
     EXPECT_THAT(notes, ElementsAre("gone"));
-  }
-}
-
-TEST(Drawables, DeleteAPartnerWithoutAnyQueueAtOnce) {
-  PenDataManager queueless(nullptr);
-  for (PenDataManager* const manager : {&queueless, static_cast<PenDataManager*>(nullptr)}) {
-    Notes notes;
-    { const PlainGL drawable(manager, new NotingRT(notes)); }
-    EXPECT_THAT(notes, ElementsAre("gone"));
-    const PlainGL alone(manager, nullptr);
   }
 }
 
@@ -169,15 +156,6 @@ TEST(Drawables, ARenderDrawableOutlivesItsWorkHoweverItsQueueEnds) {
   std::thread([&] { drawable.reset(); }).join();  // may post, and not wait
   queue.finish();
   EXPECT_THAT(notes, ElementsAre("drawn", "drawn on"));
-}
-
-TEST(PenBase, AStrokesRectIsItsPointsGrownByTheSize) {
-  Qelt::Pen pen;
-  Qelt::PointF points[] = {{NAN, 5}, {10, 20}, {4, 30}, {INFINITY, 0}};
-  const Qelt::RectF rect = pen.GetStrokeRect(points, nullptr, nullptr, 4, 2.0f, true, nullptr);
-  EXPECT_THAT((std::array{rect.left, rect.top, rect.right, rect.bottom}), ElementsAre(2, 18, 12, 32));
-  EXPECT_EQ(pen.GetStrokeRect(nullptr, nullptr, nullptr, 4, 2.0f, true, nullptr).right, 0.0f);
-  EXPECT_EQ(pen.GetStrokeRect(points, nullptr, nullptr, 1, 2.0f, true, nullptr).right, 0.0f);
 }
 
 }  // namespace

@@ -13,8 +13,10 @@
 #include <vector>
 
 #include "desktop/gl/GlVertexObject.h"
+#include "desktop/gl/GpuFence.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/graphics/CanvasLayer.h"
+#include "desktop/graphics/LayerBackup.h"
 #include "gl/GraphicsFactory.h"
 #include "gl/GraphicsObject.h"
 #include "gl/ManagedObject.h"
@@ -291,6 +293,53 @@ TEST_P(Layer, TheHostShapeFillsItsSquareInTheNextContextToo) {
   });
 }
 
+TEST_P(Layer, AreasAreCopiedClearedAndExchanged) {
+  CanvasLayer painted(queue, 40, 30, 16), other(queue, 32, 32);
+  queue.run([&] {
+    Painter painter(kWindowShader);
+    painter.setQuad(0, 0, 40, 30);
+    painter.draw(*painted.GetBitmap());
+  });
+  const Pixels before = painted.readPixels();
+  // Where the window shader painted, red is the column. Areas end at the layers' edges.
+  other.copyFrom(painted, {-5, 10, 100, 100});
+  EXPECT_EQ(pixelAt(other.readPixels(), 32, 31, 29)[0], 31);
+  EXPECT_EQ(pixelAt(other.readPixels(), 32, 31, 9)[3], 0);
+  EXPECT_EQ(pixelAt(other.readPixels(), 32, 0, 30)[3], 0);
+  other.copyFrom(painted, {50, 0, 60, 5});
+
+  QeltDesktop::LayerBackup backup(queue, painted, {7, 3, 20, 25});
+  EXPECT_EQ(backup.bytes(), 4u * 13 * 22);
+  painted.clear({0, 0, 18, 1000});
+  const Pixels after = painted.readPixels();
+  EXPECT_EQ(pixelAt(after, 40, 17, 29)[3], 0);
+  EXPECT_EQ(pixelAt(after, 40, 18, 0)[0], 18);
+  backup.swapWith(painted);
+  EXPECT_EQ(pixelAt(painted.readPixels(), 40, 7, 3)[0], 7);
+  EXPECT_EQ(pixelAt(painted.readPixels(), 40, 6, 3)[3], 0);
+  backup.swapWith(painted);
+  EXPECT_EQ(painted.readPixels(), after);
+  painted.clear({9, 9, 9, 20});
+  EXPECT_EQ(painted.readPixels(), after) << "an area without pixels";
+  EXPECT_NE(after, before);
+
+  std::unique_ptr<QeltDesktop::GpuFence> fence;
+  queue.run([&] {
+    fence = std::make_unique<QeltDesktop::GpuFence>();
+    EXPECT_TRUE(fence->hasPassed()) << "nothing to wait for";
+    fence->set();
+  });
+  painted.readPixels();  // which waits for the GPU
+  queue.run([&] { EXPECT_TRUE(fence->hasPassed()); });
+  queue.run([&] { fence->set(); });
+  queue.loseContext();
+  queue.run([&] { EXPECT_TRUE(fence->hasPassed()) << "it went with the context"; });
+  queue.restoreContext();
+  backup.swapWith(painted);
+  EXPECT_EQ(pixelAt(painted.readPixels(), 40, 7, 3)[3], 0) << "and so did the pixels";
+  queue.run([&] { fence.reset(); });
+}
+
 TEST_P(Layer, ShadersThatAreBrokenOrMisusedAreLoggedAndAnswerNull) {
   queue.run([&] {
     EXPECT_EQ(Qelt::GraphicsFactory::createOpenGLShaderProgram("nonsense", kWindowShader, nullptr), nullptr);
@@ -353,25 +402,6 @@ TEST_P(Layer, ABatchThatThereIsNoMemoryForIsLoggedOnceAndNotDrawn) {
   });
   expectOneLine("no memory to draw a batch of 2147483647 vertices");
   EXPECT_EQ(layer.readPixels(), Pixels(8 * 8 * 4));
-}
-
-TEST(LayerQueues, TwoQueuesOnOneThreadKeepTheirContextsApart) {
-  QeltTests::LogCapture log;
-  RenderQueue one(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
-  CanvasLayer first(one, 16, 16);
-  RenderQueue two(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
-  CanvasLayer second(two, 16, 16);
-  one.run([&] {
-    Painter painter(kWindowShader);
-    painter.setQuad(0, 0, 16, 16);
-    EXPECT_EQ(second.readPixels(), Pixels(16 * 16 * 4));  // inside the other's task
-    painter.draw(*first.GetBitmap());
-    EXPECT_TRUE(log.take().empty());
-    two.run([&] { painter.draw(*second.GetBitmap()); });
-    EXPECT_EQ(log.take().size(), 1u) << "the program is not this context's";
-  });
-  EXPECT_EQ(pixelAt(first.readPixels(), 16, 5, 6)[0], 5);
-  EXPECT_EQ(second.readPixels(), Pixels(16 * 16 * 4));
 }
 
 }  // namespace

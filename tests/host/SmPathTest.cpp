@@ -114,25 +114,6 @@ TEST(SmPath, FollowsAnyQuadraticWithinTheTolerancesThatFloatsAllow) {
   }
 }
 
-TEST(SmPath, TangentsPointAlongTheWayThereAndBack) {
-  SmPath path;
-  // y = 0; x runs 0, up to 25 at t = 1/2, back to 0.
-  build(path, {0, 0, 50, 0, 0, 0});
-  EXPECT_FLOAT_EQ(path.getLength(), 50.0f);
-  for (const auto& [distance, x, direction] : {std::array{0.0f, 0.0f, 1.0f},
-                                               {10.0f, 10.0f, 1.0f},
-                                               {24.0f, 24.0f, 1.0f},
-                                               {25.0f, 25.0f, 1.0f},
-                                               {26.0f, 24.0f, -1.0f},
-                                               {50.0f, 0.0f, -1.0f}}) {
-    SmPoint at, along;
-    ASSERT_TRUE(path.getPosTan(distance, &at, &along));
-    EXPECT_NEAR(at.x, x, 1e-4f);
-    EXPECT_EQ(at.y, 0.0f);
-    EXPECT_FLOAT_EQ(along.x, direction);
-  }
-}
-
 TEST(SmPath, QueriesInAnyOrderAnswerTheSame) {
   SmPath path;
   path.moveTo(0, 0);

@@ -1,11 +1,8 @@
 #include <gtest/gtest.h>
 
-#include <cmath>
 #include <vector>
 
 #include "base/RefCount.h"
-#include "desktop/graphics/PenCanvas.h"
-#include "math/Matrix3.h"
 #include "pencommon/PenStrokeDataManager.h"
 
 namespace {
@@ -45,27 +42,6 @@ TEST(StrokeDataManager, ADroppedEntryGoesWithItsLastUseAndOneMadeAnewMeanwhileIs
     manager.ReleaseStrokeData(kHandle);
   }
   manager.DropStrokeData(kHandle);
-}
-
-// That is the canvas that a pen asked for its matrix last, not the one that was made or moved last.
-TEST(StrokeDataManager, PointsRecordTheScaleOfTheViewThatTheyWereStoredIn) {
-  QeltDesktop::PenCanvas canvas(nullptr, nullptr);
-  Qelt::Matrix3<float> zoom;
-  zoom.setScale(4.0f, 2.0f);
-  canvas.setMatrix(zoom);
-  canvas.GetMatrix();
-  QeltDesktop::PenCanvas other(nullptr, nullptr);
-  other.setMatrix(Qelt::Matrix3<float>());
-  PenStrokeData data;
-  PenStrokePointData* const points = pointsOf({1});
-  EXPECT_TRUE(data.SetPointData(points));
-  EXPECT_TRUE(points->hasSameInverseScale({0.25f, 0.5f}));
-  EXPECT_FALSE(points->hasSameInverseScale({0.5f, 0.5f}));
-  EXPECT_FALSE(points->hasSameInverseScale({0.25f, 0.25f}));
-  // Of a view that squeezes everything into a point.
-  EXPECT_FALSE(points->hasSameInverseScale({INFINITY, INFINITY}));
-  points->Unref();
-  PenStrokeDataManager::GetInstance()->SetInverseScale({1.0f, 1.0f});
 }
 
 }  // namespace

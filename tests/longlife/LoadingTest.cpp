@@ -5,18 +5,15 @@
 #include <gtest/gtest.h>
 #include <unistd.h>
 
-#include <cstddef>
 #include <cstdint>
 #include <filesystem>
 #include <memory>
 #include <stdexcept>
 #include <string>
-#include <utility>
 #include <vector>
 
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/graphics/CanvasLayer.h"
-#include "desktop/pencommon/BatchObserver.h"
 #include "pencommon/Pen.h"
 #include "support/AllocationGate.h"
 #include "support/LogCapture.h"
@@ -77,8 +74,6 @@ class Copy {
   const std::string path;
 };
 
-using Batches = std::vector<std::vector<float>>;
-
 TEST(Loading, AThousandTimesLeavesNothingBehind) {
   constexpr int kTimes = QELT_SANITIZED ? 100 : 1000;
   LogCapture log;
@@ -96,31 +91,6 @@ TEST(Loading, AThousandTimesLeavesNothingBehind) {
   EXPECT_EQ(AllocationGate::counts().allBlocks, early);
 }
 
-TEST(Loading, TwoCopiesDrawInTurnsAsOneDoesAlone) {
-  LogCapture log;
-  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
-  const Copy copy;
-  const Loaded one(QELT_PLUGIN_PATH), other(copy.path);
-  ASSERT_NE(one.symbol("versionTable"), other.symbol("versionTable")) << "the same library twice";
-  Batches batches;
-  Desk left(one, queue, nullptr), right(other, queue, nullptr);
-  QeltDesktop::setBatchObserver([&](const QeltDesktop::Batch& batch) {
-    batches.insert(batches.end(), batch.buffers.begin(), batch.buffers.end());
-  });
-  left.stroke();
-  const Batches alone = std::exchange(batches, {});
-  ASSERT_GT(alone.size(), 3u);
-  // Before each call of the one the other draws its stroke.
-  left.beforeCall = [&](auto&) {
-    const Batches ofLeft = std::exchange(batches, {});
-    right.stroke();
-    EXPECT_EQ(std::exchange(batches, ofLeft), alone);
-  };
-  left.stroke();
-  EXPECT_EQ(batches, alone);
-  QeltDesktop::setBatchObserver(nullptr);
-}
-
 TEST(Loading, ACopyDrawsOnWithTheShadersThatAnotherBroughtAndNoneStays) {
   LogCapture log;
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
@@ -128,6 +98,7 @@ TEST(Loading, ACopyDrawsOnWithTheShadersThatAnotherBroughtAndNoneStays) {
   const Copy copy;
   auto one = std::make_unique<Loaded>(QELT_PLUGIN_PATH), other = std::make_unique<Loaded>(copy.path);
   auto left = std::make_unique<Desk>(*one, queue, &layer);
+  ASSERT_NE(one->symbol("versionTable"), other->symbol("versionTable")) << "the same library twice";
   // The registry knows shaders by their class: this desk's are the left one's.
   auto right = std::make_unique<Desk>(*other, queue, &layer);
   left->prepareAll();

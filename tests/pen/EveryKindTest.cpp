@@ -6,16 +6,15 @@
 #include <cmath>
 #include <cstddef>
 #include <cstdint>
-#include <limits>
-#include <map>
 #include <set>
 #include <string>
 #include <vector>
 
 #include "desktop/gl/CallTask.h"
+#include "desktop/gl/GlDevice.h"
+#include "support/AllocationGate.h"
 #include "support/LogCapture.h"
 #include "support/PenBoard.h"
-#include "support/Stamps.h"
 
 namespace QeltTests {
 namespace {
@@ -44,15 +43,8 @@ class EveryKind : public testing::TestWithParam<Drawing> {
   }
 };
 
-// The versions that bring something of their own to the render thread, or the only one that there is.
-INSTANTIATE_TEST_SUITE_P(
-    Drawings, EveryKind,
-    testing::Values(Drawing{Kind::Live, 1}, Drawing{Kind::Live, 7}, Drawing{Kind::Live, 8},
-                    Drawing{Kind::Redraw, 1}, Drawing{Kind::Redraw, 8}, Drawing{Kind::Outline, 1},
-                    Drawing{Kind::Outline, 8}, Drawing{Kind::Preview, 8}, Drawing{Kind::Prediction, 8}),
-    [](const auto& test) {
-      return testing::PrintToString(test.param.kind) + "Version" + std::to_string(test.param.version);
-    });
+INSTANTIATE_TEST_SUITE_P(Drawings, EveryKind, testing::ValuesIn(drawings(versionsOfRenderDrawables())),
+                         drawingName);
 
 // --- GL state ---
 
@@ -102,7 +94,10 @@ TEST_P(EveryKind, IsDrawnAlikeWhateverGlStateWasLeftBeforeEachTask) {
     board.queue.accept = [&](const Qelt::ITask&) {
       if (spread == nullptr || spreads) return true;
       spreads = true;  // its own post comes here too
-      QeltDesktop::postCall(board.queue, spread);
+      QeltDesktop::postCall(board.queue, [spread] {
+        spread();
+        QeltDesktop::GlDevice::live()->state().forget();
+      });
       spreads = false;
       return true;
     };
@@ -113,73 +108,6 @@ TEST_P(EveryKind, IsDrawnAlikeWhateverGlStateWasLeftBeforeEachTask) {
   ASSERT_NE(clean, Pixels(clean.size())) << "nothing was drawn";
   EXPECT_TRUE(drawn(leaveState) == clean);
   EXPECT_TRUE(drawn(leaveArraysAndUnpacking) == clean);
-}
-
-using State = std::map<std::string, std::vector<GLint>>;
-
-State glState() {
-  State state;
-  const auto look = [&state](const std::string& name, GLenum what) {
-    std::vector<GLint> values(4);
-    glGetIntegerv(what, values.data());
-    std::vector<GLint>& all = state[name];
-    all.insert(all.end(), values.begin(), values.end());
-  };
-  for (const auto& [name, what] : std::initializer_list<std::pair<const char*, GLenum>>{
-           {"depth test", GL_DEPTH_TEST},
-           {"culling", GL_CULL_FACE},
-           {"stencil", GL_STENCIL_TEST},
-           {"colour mask", GL_COLOR_WRITEMASK},
-           {"blending", GL_BLEND},
-           {"blend factors", GL_BLEND_SRC_RGB},
-           {"blend factors", GL_BLEND_DST_RGB},
-           {"blend equation", GL_BLEND_EQUATION_RGB},
-           {"scissor test", GL_SCISSOR_TEST},
-           {"viewport and scissor", GL_SCISSOR_BOX},
-           {"viewport and scissor", GL_VIEWPORT},
-           {"clear colour", GL_COLOR_CLEAR_VALUE},
-           {"discarding", GL_RASTERIZER_DISCARD},
-           {"program", GL_CURRENT_PROGRAM},
-           {"vertex array and buffer", GL_VERTEX_ARRAY_BINDING},
-           {"vertex array and buffer", GL_ARRAY_BUFFER_BINDING},
-           {"framebuffer", GL_FRAMEBUFFER_BINDING},
-           {"unpack state", GL_UNPACK_ROW_LENGTH},
-           {"unpack state", GL_UNPACK_SKIP_ROWS},
-           {"unpack state", GL_UNPACK_SKIP_PIXELS},
-           {"unpack state", GL_PIXEL_UNPACK_BUFFER_BINDING},
-           {"active unit", GL_ACTIVE_TEXTURE}}) {
-    look(name, what);
-  }
-  for (const int unit : {0, 1, 2, 7}) {
-    glActiveTexture(GL_TEXTURE0 + static_cast<GLenum>(unit));
-    look("texture " + std::to_string(unit), GL_TEXTURE_BINDING_2D);
-    look("texture " + std::to_string(unit), GL_SAMPLER_BINDING);
-  }
-  glActiveTexture(static_cast<GLenum>(state["active unit"][0]));
-  return state;
-}
-
-// What is left changed is listed here: what the pen draws with, and what the host sets for a tile. The unit
-// that happened to be active is where textures are filled.
-TEST_P(EveryKind, LeavesNothingChangedButWhatItDrewWith) {
-  PenBoard board(page());
-  State before, after;
-  board.queue.run([&] {
-    leaveState();
-    before = glState();
-  });
-  board.draw(kind, wave());
-  board.queue.finish();
-  board.queue.run([&] { after = glState(); });
-  std::set<std::string> changed;
-  for (const auto& [name, values] : before) {
-    if (after[name] != values) changed.insert(name);
-  }
-  std::set<std::string> expected = {
-      "active unit", "blend factors", "blending",  "clear colour", "colour mask",         "culling",
-      "program",     "texture 0",     "texture 7", "scissor test", "viewport and scissor"};
-  expected.insert(kind == Kind::Outline ? "depth test" : "texture 1");
-  EXPECT_EQ(changed, expected);
 }
 
 // --- The view ---
@@ -238,26 +166,6 @@ TEST_P(EveryKind, ChangesNoPixelOutsideTheAreaItAnswers) {
   }
 }
 
-// --- Time ---
-
-TEST_P(EveryKind, DoesNotLookAtTheClock) {
-  const auto drawn = [this](Clock clock) {
-    BoardOptions options = page();
-    options.width = options.height = 0;
-    options.clock = clock;
-    PenBoard board(options);
-    board.draw(kind, wave());
-    return board.takeBuffers();
-  };
-  const auto usual = drawn(everyFourMilliseconds);
-  ASSERT_GT(usual.size(), 1u);
-  using Limits = std::numeric_limits<std::int64_t>;
-  EXPECT_TRUE(drawn([](int) { return std::int64_t{7}; }) == usual) << "equal";
-  EXPECT_TRUE(drawn([](int number) { return std::int64_t{-9} * number; }) == usual) << "backward";
-  EXPECT_TRUE(drawn([](int number) { return number % 2 == 0 ? Limits::min() : Limits::max(); }) == usual)
-      << "extreme";
-}
-
 // --- Logs ---
 
 TEST(CutSegments, AreSaidOnceAStroke) {
@@ -294,37 +202,31 @@ TEST(CutSegments, AreSaidOnceAStroke) {
   }
 }
 
-// --- A pen's life ---
-
-// A new version is a new drawable, which has not seen the pen go down: what is left of the stroke is
-// ignored, and what was handed over before keeps the layout it has.
-TEST(VersionChange, EndsTheStrokeUnderWay) {
-  const std::vector<Sample> samples = wave();
-  using Buffers = std::vector<std::vector<float>>;
-  std::map<int, Buffers> whole;
-  for (const int version : allVersions()) {
-    PenBoard board({.version = version});
-    board.stroke(samples);
-    whole[version] = board.takeBuffers();
-    for (const std::vector<float>& floats : whole[version]) stampsOf(floats, strideOf(version));
-  }
-  for (const int from : allVersions()) {
-    for (const int to : allVersions()) {
-      if (to == from) continue;
-      SCOPED_TRACE("from " + std::to_string(from) + " to " + std::to_string(to));
-      PenBoard board({.version = from});
-      board.down(samples[0]);
-      board.move({samples[1], samples[2], samples[3], samples[4]});
-      board.pen->setVersion(to);
-      EXPECT_FALSE(board.move({samples[5], samples[6]}));
-      EXPECT_FALSE(board.up(samples[7]));
-      EXPECT_EQ(board.rect.right, 0.0f);
-      EXPECT_TRUE(board.takeBuffers() == (Buffers{whole[from][0], whole[from][1], {}, {}}));
-      board.stroke(samples);
-      EXPECT_TRUE(board.takeBuffers() == whole[to]);
+// Kept: only preview and prediction note how they are set up; all note their end.
+TEST(RenderDrawables, NoteTheirSetupAndTheirEnd) {
+  LogCapture log;
+  for (const int version : versionsOfRenderDrawables()) {
+    {
+      PenBoard board({.version = version, .width = 16, .height = 16});
+      board.prepareAll();
     }
+    std::multiset<std::string> noted, expected;
+    for (const LogLine& line : log.take()) {
+      if (line.text.rfind("virtual void", 0) == 0) noted.insert(line.text.substr(0, line.text.find('(')));
+    }
+    const auto expect = [&](const std::string& name, const std::vector<std::string>& operations) {
+      for (const std::string& operation : operations)
+        expected.insert("virtual void Qelt::Pencil2" + name + "::" + operation);
+    };
+    expect("StrokeDrawableRTV" + std::to_string(expectedOf(version).renderDrawable), {"Release"});
+    expect("OutlineDrawableRTV1", {"Release"});
+    expect("PreviewDrawableRT", {"CreatePenCanvas", "Init", "Release"});
+    if (rowOf(version).predicts) expect("PredictionDrawableRT", {"CreatePenCanvas", "Init", "Release"});
+    EXPECT_EQ(noted, expected) << version;
   }
 }
+
+// --- A pen's life ---
 
 // GL names that are alive, of whatever sort.
 int liveNames() {
@@ -338,9 +240,11 @@ int liveNames() {
   return live;
 }
 
-// Zooms, versions, new pens and lost contexts, for thousands of strokes: as many names as at the start.
-TEST(LongSession, KeepsNoGlNames) {
-  const LogCapture log;
+// Zooms, versions, new pens and lost contexts, for thousands of strokes: as many names and blocks as at the
+// start.
+TEST(LongSession, KeepsNeitherGlNamesNorMemory) {
+  LogCapture log;
+  AllocationGate::watch(PenBoard::library().path());
   PenBoard board({.size = 2.0f, .width = 96, .height = 64});
   const auto drawAll = [&](int version) {
     board.pen->setVersion(version);
@@ -355,6 +259,7 @@ TEST(LongSession, KeepsNoGlNames) {
     return names;
   };
   const int early = countNames();
+  const AllocationGate::Counts earlyBlocks = AllocationGate::counts();
   EXPECT_GT(early, 5);
   constexpr int kRounds = QELT_SANITIZED ? 40 : 240;  // ten strokes each
   for (int round = 1; round <= kRounds; ++round) {
@@ -367,6 +272,8 @@ TEST(LongSession, KeepsNoGlNames) {
     if (round % 20 == 5) board.loseAndRestoreContext();  // with all drawables there
   }
   EXPECT_EQ(countNames(), early);
+  EXPECT_EQ(AllocationGate::counts().plugInBlocks, earlyBlocks.plugInBlocks);
+  EXPECT_EQ(AllocationGate::counts().hostBlocks, earlyBlocks.hostBlocks);
 }
 
 }  // namespace

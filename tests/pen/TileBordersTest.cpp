@@ -138,8 +138,8 @@ TEST(TileBorders, CutNothingThatTheRectanglesReach) {
                              {Kind::Prediction, 8, 4.0f, true, 4.0f}};
   for (const bool curve : {true, false}) {
     for (const int version : allVersions()) {
-      cases.push_back({Kind::Live, version, version == 8 ? 12.0f : 9.0f, curve});
-      cases.push_back({Kind::Redraw, version, version == 8 ? 20.0f : 9.0f, curve});
+      cases.push_back({Kind::Live, version, expectedOf(version).widestLive, curve});
+      cases.push_back({Kind::Redraw, version, expectedOf(version).widestRedraw, curve});
     }
     cases.push_back({Kind::Preview, 8, 9.0f, curve});
   }

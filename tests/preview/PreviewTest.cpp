@@ -1,7 +1,6 @@
 #include <gmock/gmock.h>
 
 #include <cmath>
-#include <cstddef>
 #include <string>
 #include <vector>
 

@@ -2,6 +2,7 @@
 
 #include <gmock/gmock.h>
 #include <malloc.h>
+#include <sys/resource.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -318,34 +319,25 @@ TEST(InkmlReader, TakesNoLongerForATraceOfALargePage) {
   EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(15));
 }
 
-// Bytes, from /proc/self/status.
-double memory(const std::string& line) {
-  std::ifstream status("/proc/self/status");
-  for (std::string word; status >> word;) {
-    double kilobytes = 0.0;
-    if (word == line && status >> kilobytes) return kilobytes * 1024.0;
-  }
-  return 0.0;
+// The most memory that a copy of this process holds while it reads a file, or nothing, in bytes.
+double peakOf(const std::string& path) {
+  malloc_trim(0);  // what others gave back does not count
+  const pid_t child = fork();
+  if (child == 0) _exit(path.empty() || !readInkmlFile(path).strokes.empty() ? 0 : 1);
+  int status = 0;
+  rusage usage{};
+  wait4(child, &status, 0, &usage);
+  EXPECT_EQ(status, 0) << path;
+  return static_cast<double>(usage.ru_maxrss) * 1024.0;
 }
 
 // How far reading a file takes the process beyond what it held before, as a multiple of the file.
 double growthOf(const std::string& text) {
   const std::string path = testing::TempDir() + "qelt-growth-" + std::to_string(getpid());
   std::ofstream(path, std::ios::binary) << text;
-  const pid_t child = fork();
-  if (child == 0) {
-    // Neither memory that others gave back nor their peak counts.
-    malloc_trim(0);
-    std::ofstream("/proc/self/clear_refs") << 5;
-    const double before = memory("VmRSS:");
-    const Page page = readInkmlFile(path);
-    const double growth = (memory("VmHWM:") - before) / static_cast<double>(text.size());
-    _exit(page.strokes.empty() ? 255 : static_cast<int>(growth * 10.0));
-  }
-  int status = 0;
-  waitpid(child, &status, 0);
+  const double growth = (peakOf(path) - peakOf("")) / static_cast<double>(text.size());
   std::remove(path.c_str());
-  return WIFEXITED(status) ? WEXITSTATUS(status) / 10.0 : -1.0;
+  return growth;
 }
 
 TEST(InkmlReader, HoldsNoMoreThanThreeTimesItsFile) {

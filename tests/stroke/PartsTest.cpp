@@ -3,15 +3,16 @@
 #include <array>
 #include <bit>
 #include <cmath>
-#include <cstddef>
 #include <cstdint>
 #include <limits>
 #include <random>
-#include <vector>
 
 #include "base/RectF.h"
+#include "graphics/SmPath.h"
+#include "stroke/input/MoveFilter.h"
 #include "stroke/input/PenAttitude.h"
 #include "stroke/placing/StampRun.h"
+#include "stroke/placing/StampWalk.h"
 
 namespace Qelt {
 namespace {
@@ -67,6 +68,32 @@ TEST(DirtyBoxTest, LeavesOutEdgesThatAreNaN) {
       EXPECT_THAT((std::array{rect.left, rect.top, rect.right, rect.bottom}),
                   ElementsAre(-2.0f, -2.0f, 11.0f, 11.0f));
     }
+  }
+}
+
+TEST(DistanceTest, IsTakenInDoublesWhereSquaresDoNotFit) {
+  EXPECT_FLOAT_EQ(distanceBetween({-2e19f, 0.0f}, {2e19f, 0.0f}), 4e19f);
+  EXPECT_FLOAT_EQ(distanceBetween({0.0f, -2e19f}, {0.0f, 2e19f}), 4e19f);
+}
+
+// So far out that the next float is further away than the next stamp.
+TEST(StampWalkTest, EndsWhereItCannotGoOn) {
+  SmPath path;
+  path.moveTo(0.0f, 0.0f);
+  path.lineTo(2e8f, 0.0f);
+  path.resetPath(0);
+  struct Place {
+    void operator()(const SmPoint&) { ++placed; }
+    void passOver(float) { ++passed; }
+    int placed = 0, passed = 0;
+  };
+  for (const int most : {0, 9}) {
+    Place place;
+    const WalkResult walk = walkSpaced(path, 1e8f, 0.4f, 2e8f, most, place);
+    EXPECT_EQ(walk.stamps, 1);
+    EXPECT_TRUE(walk.cutShort);
+    EXPECT_EQ(walk.carry, 0.4f);
+    EXPECT_EQ(most == 0 ? place.passed : place.placed, 1);
   }
 }
 

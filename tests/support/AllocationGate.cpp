@@ -40,11 +40,16 @@ struct Code {
 constexpr const char* kHostNames[] = {"libQeltPlatform.so", "libQeltBase.so", "libQeltModel.so",
                                       "libQeltEngine.so",   "libQeltGL.so",   "libQeltGraphics.so",
                                       "libQeltPenCommon.so"};
-Code plugIn, standardLibrary, hosts[std::size(kHostNames)];
+Code plugIn, standardLibrary, program, hosts[std::size(kHostNames)];
 std::atomic<long> blocks{0}, ownBlocks{0}, hostsBlocks{0}, ownAllocations{0}, deletionsOfNothing{0},
     thrown{0};
 std::atomic<long> askedSince{0}, failFrom{0}, failTo{0};  // failing: from <= number <= to
-std::atomic<bool> everyones{false};                       // are numbered, not the plug-in's alone
+std::atomic<QeltTests::AllocationGate::Whose> whoseAre{
+    QeltTests::AllocationGate::Whose::PlugIns};  // numbered
+
+bool countsProgram() {
+  return whoseAre.load(std::memory_order_relaxed) == QeltTests::AllocationGate::Whose::AndPrograms;
+}
 
 Owner ownerOf(std::uintptr_t caller) {
   if (plugIn.holds(caller)) return Owner::PlugIn;
@@ -67,7 +72,7 @@ bool asksForOneOfUs() {
         found.inLibrary = found.inLibrary || isLibrary;
         // Before the library stands what is in this file.
         if (isLibrary || !found.inLibrary) return _URC_NO_REASON;
-        found.isOurs = ownerOf(at) != Owner::Other;
+        found.isOurs = ownerOf(at) != Owner::Other || (countsProgram() && program.holds(at));
         return _URC_END_OF_STACK;
       },
       &search);
@@ -76,8 +81,11 @@ bool asksForOneOfUs() {
 
 // Whether this is one of the allocations that are numbered for failing.
 bool isNumbered(Owner owner, std::uintptr_t caller) {
-  if (!everyones.load(std::memory_order_relaxed)) return owner == Owner::PlugIn;
+  if (whoseAre.load(std::memory_order_relaxed) == QeltTests::AllocationGate::Whose::PlugIns) {
+    return owner == Owner::PlugIn;
+  }
   if (!QeltTests::PlugInCall::isUnderWay() || failFrom.load() == INT64_MAX) return false;
+  if (countsProgram() && program.holds(caller)) return true;
   return owner != Owner::Other || (standardLibrary.holds(caller) && asksForOneOfUs());
 }
 
@@ -129,6 +137,7 @@ int note(dl_phdr_info* info, std::size_t, void* plugInPath) {
   const std::string_view path = info->dlpi_name != nullptr ? info->dlpi_name : "";
   const std::string_view name = path.substr(path.rfind('/') + 1);
   Code* code = path == static_cast<const char*>(plugInPath) ? &plugIn : nullptr;
+  if (path.empty() && program.end == 0) code = &program;  // it comes first
   if (name.substr(0, 13) == "libstdc++.so.") code = &standardLibrary;
   for (std::size_t i = 0; i < std::size(hosts); ++i) {
     if (name == kHostNames[i]) code = &hosts[i];
@@ -158,7 +167,7 @@ void AllocationGate::watch(const std::string& libraryPath) {
 }
 
 void AllocationGate::fail(long number, bool andAllAfter, Whose whose) {
-  everyones = whose == Whose::Everyones;
+  whoseAre = whose;
   askedSince = 0;
   failTo = andAllAfter ? INT64_MAX : number;
   failFrom = number;

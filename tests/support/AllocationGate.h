@@ -25,7 +25,8 @@ class PlugInCall {
 // Any thread may allocate; the rest is for one. Programs that look at allocations link qelt_allocation_gate.
 class AllocationGate {
  public:
-  enum class Whose { PlugIns, Everyones };  // every one of plug-in and host, not of a driver
+  // Everyones: every one of plug-in and host, not of a driver; AndPrograms: of the program itself as well.
+  enum class Whose { PlugIns, Everyones, AndPrograms };
 
   // From here on the code of the loaded library of this path is watched. Throws std::runtime_error when no
   // such library is loaded.

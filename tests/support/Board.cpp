@@ -64,7 +64,7 @@ bool Board::send(const MotionEvent& event) {
 }
 
 MotionEvent Board::eventOf(int action, const std::vector<Sample>& samples) const {
-  return motionEvent(action, samples, options.tool, options.source, options.clock);
+  return motionEvent(action, samples, options.tool, options.source);
 }
 
 void Board::stroke(const std::vector<Sample>& samples, int batch) {
@@ -86,7 +86,7 @@ std::unique_ptr<StoredStroke> Board::stored(const std::vector<Sample>& samples, 
   auto stroke = std::make_unique<StoredStroke>(options.tool, hasAngles);
   int number = 0;
   for (const Sample& s : samples) {
-    stroke->addPoint({s.x, s.y}, options.clock(++number), s.pressure, s.tilt, s.orientation);
+    stroke->addPoint({s.x, s.y}, 4 * ++number, s.pressure, s.tilt, s.orientation);
   }
   return stroke;
 }
@@ -115,21 +115,17 @@ std::vector<std::string> Board::takePosts() {
   return std::exchange(mPosts, {});
 }
 
-std::int64_t everyFourMilliseconds(int number) {
-  return 4 * number;
-}
-
-MotionEvent motionEvent(int action, const std::vector<Sample>& samples, int tool, int source, Clock clock) {
+MotionEvent motionEvent(int action, const std::vector<Sample>& samples, int tool, int source) {
   const auto coordsOf = [](const Sample& s) {
     return Qelt::PointerCoords{s.x, s.y, s.pressure, s.tilt, s.orientation};
   };
   const Qelt::PointerProperties pointer{0, tool};
   int number = 0;
   Qelt::PointerCoords coords = coordsOf(samples.front());
-  MotionEvent event(clock(0), clock(++number), action, 1, &pointer, &coords, 0, source, 0);
+  MotionEvent event(0, 4 * ++number, action, 1, &pointer, &coords, 0, source, 0);
   for (std::size_t i = 1; i < samples.size(); ++i) {
     coords = coordsOf(samples[i]);
-    event.AddBatch(clock(++number), &coords);
+    event.AddBatch(4 * ++number, &coords);
   }
   return event;
 }

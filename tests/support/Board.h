@@ -28,12 +28,8 @@ struct Sample {
   float orientation = 0.0f;
 };
 
-// When the sample of a number was taken, milliseconds; number 0 is when the pen went down.
-using Clock = std::int64_t (*)(int number);
-std::int64_t everyFourMilliseconds(int number);
-
 struct BoardOptions {
-  int version = newestVersion();  // rendering version
+  int version = kUsualVersion;  // rendering version
   float size = 10.0f;
   std::uint32_t color = 0xFF202020u;
   bool curve = true;
@@ -44,12 +40,11 @@ struct BoardOptions {
   int tile = 512;
   // A render thread; without, tasks run on the test's own, when something is asked for.
   bool thread = false;
-  Clock clock = everyFourMilliseconds;
 };
 
 // One event; the last sample is the current one, those before it are its history.
 Qelt::MotionEvent motionEvent(int action, const std::vector<Sample>& samples, int tool = Qelt::kToolStylus,
-                              int source = Qelt::kSourceStylus, Clock clock = everyFourMilliseconds);
+                              int source = Qelt::kSourceStylus);
 
 // What a task does, in a word, told by its type: "SetStartPoint", "SetPenData", "SetRedrawState", "SetRect",
 // "Batch" (SendDataToGPU or SetCacheBuffer), "Render", "DeleteBatch", "Unref", "ReleaseStrokeData",

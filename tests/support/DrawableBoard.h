@@ -2,6 +2,7 @@
 
 #include <cstddef>
 #include <memory>
+#include <tuple>
 #include <type_traits>
 #include <vector>
 
@@ -95,6 +96,17 @@ class DrawableBoard : public Board {
  private:
   static constexpr bool kOutlines = std::is_same_v<Drawable, Qelt::Pencil2OutlineDrawableGL>;
 };
+
+// What a live stroke might leave for the prediction: where it began, its last stamp, its last point.
+inline void leaveStroke(Qelt::Pencil2Data& shared, Qelt::PointF start, Qelt::PointF stamp,
+                        Qelt::PointF last) {
+  std::tie(shared.mStartX, shared.mStartY) = std::tie(start.x, start.y);
+  std::tie(shared.mLastStampX, shared.mLastStampY) = std::tie(stamp.x, stamp.y);
+  std::tie(shared.mLastX, shared.mLastY) = std::tie(last.x, last.y);
+  shared.mLastAlpha = 0.6f;
+  shared.mStampCount = 7;
+  shared.mHasLastStroke = true;
+}
 
 using OutlineBoard = DrawableBoard<Qelt::Pencil2OutlineDrawableGL>;
 using DrawingBoard = DrawableBoard<Qelt::Pencil2StrokeDrawableGL>;

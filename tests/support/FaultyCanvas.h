@@ -1,9 +1,7 @@
 #pragma once
 
 #include <climits>
-#include <cstddef>
 #include <stdexcept>
-#include <vector>
 
 #include "desktop/graphics/CanvasLayer.h"
 #include "desktop/graphics/PenCanvas.h"
@@ -42,37 +40,34 @@ class HostFaults {
   static inline long sAsked = 0, sFrom = LONG_MAX, sTo = 0;
 };
 
-// One of a row of square tiles that nothing is drawn into.
+// A tile that nothing is drawn into, and a layer of it: enough for a render message to run through its batch.
 class FakeTile : public Qelt::ISPSubBitmap {
  public:
-  explicit FakeTile(int left, int side = 64) : mX(left), mSide(side) {}
-  int GetX() const override { return mX; }
+  int GetX() const override { return 0; }
   int GetY() const override { return 0; }
-  int GetWidth() const override { return mSide; }
-  int GetHeight() const override { return mSide; }
+  int GetWidth() const override { return 4096; }
+  int GetHeight() const override { return 4096; }
   const Qelt::Matrix4<float>& GetProjection() const override { return mProjection; }
   void BeginRender(int) override {}
   void EndRender(int) override {}
 
  private:
-  int mX, mSide;
   Qelt::Matrix4<float> mProjection;
 };
 
-// Enough for a render message to run through its batch.
 class FakeLayer : public Qelt::ISPLayer, public Qelt::ISPBitmap {
  public:
-  explicit FakeLayer(const FakeTile& first = FakeTile(0)) : tiles{first} {}
   Qelt::ISPBitmap* GetBitmap() override { return this; }
   int GetWidth() const override { return 0; }
   int GetHeight() const override { return 0; }
   Qelt::ISPTexture* GetTexture() override { return nullptr; }
   void SetDebugName(const char*) override {}
   void SetPixels(const void*, int, int) override {}
-  int GetTileCount() const override { return static_cast<int>(tiles.size()); }
-  Qelt::ISPSubBitmap* GetSubBitmap(int index) override { return &tiles[static_cast<std::size_t>(index)]; }
+  int GetTileCount() const override { return 1; }
+  Qelt::ISPSubBitmap* GetSubBitmap(int) override { return &mTile; }
 
-  std::vector<FakeTile> tiles;
+ private:
+  FakeTile mTile;
 };
 
 // What a canvas has to draw into. Boundless tiles say that each is the whole page, so that every rectangle
@@ -154,7 +149,7 @@ class FaultyCanvas final : public QeltDesktop::PenCanvas {
     Tile tile;
   };
 
-  FakeLayer mBlindLayer{FakeTile(0, 4096)};
+  FakeLayer mBlindLayer;
   Layer mLayer;
   int mOpen = 0;
 };

@@ -2,6 +2,7 @@
 
 #include <cmath>
 #include <new>
+#include <set>
 #include <stdexcept>
 #include <utility>
 
@@ -18,6 +19,22 @@ using QeltDesktop::StoredStroke;
 std::ostream& operator<<(std::ostream& out, Kind kind) {
   static constexpr const char* kNames[] = {"Live", "Redraw", "Outline", "Preview", "Prediction"};
   return out << kNames[static_cast<std::size_t>(kind)];
+}
+
+std::vector<Drawing> drawings(const std::vector<int>& versions) {
+  std::vector<Drawing> all{{Kind::Preview, kUsualVersion}};
+  std::set<int> outlines;
+  for (const int version : versions) {
+    all.push_back({Kind::Live, version});
+    all.push_back({Kind::Redraw, version});
+    if (outlines.insert(rowOf(version).outlineVersion).second) all.push_back({Kind::Outline, version});
+    if (rowOf(version).predicts) all.push_back({Kind::Prediction, version});
+  }
+  return all;
+}
+
+std::string drawingName(const testing::TestParamInfo<Drawing>& test) {
+  return testing::PrintToString(test.param.kind) + "Version" + std::to_string(test.param.version);
 }
 
 void expectAlike(const Drawn& drawn, const Drawn& expected) {

@@ -30,6 +30,10 @@ struct Drawing {
   Kind kind;
   int version;
 };
+// Every kind in each of the versions that bring a drawable of that kind; of the preview, which has no
+// version, one.
+std::vector<Drawing> drawings(const std::vector<int>& versions);
+std::string drawingName(const testing::TestParamInfo<Drawing>& test);
 
 // What a pen made of the same input: compared between a pen that went through a fault and a fresh one.
 struct Drawn {

@@ -36,12 +36,4 @@ MATCHER_P3(StampNear, x, y, tolerance,
   return dx * dx + dy * dy <= static_cast<float>(tolerance) * static_cast<float>(tolerance);
 }
 
-// A batch of `count` stamps with `stride` floats a vertex.
-MATCHER_P2(BatchOf, count, stride,
-           std::string(negation ? "isn't" : "is") + " a batch of " + testing::PrintToString(count) +
-               " stamps") {
-  *result_listener << "which has " << arg.size() << " floats";
-  return arg.size() == static_cast<std::size_t>(count) * 6 * static_cast<std::size_t>(stride);
-}
-
 }  // namespace QeltTests

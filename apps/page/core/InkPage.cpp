@@ -71,8 +71,9 @@ struct InkPage::Parts {
         wet(plugin, queue, pens, width, height, PageView{}),
         history(memory.mostBackupBytes) {}
 
-  StrokeList& activeStrokes() { return replay != nullptr ? replay->strokes : strokes; }
-  PageLayers& activeLayers() { return replay != nullptr ? replay->layers : layers; }
+  // The replay's, while there is one.
+  StrokeList& activeStrokes();
+  PageLayers& activeLayers();
 
   void refuseIfBusy() const;
   void dropUndone();
@@ -107,6 +108,16 @@ InkPage::InkPage(const PluginLibrary& plugin, RenderQueue& queue, int width, int
     : mParts(std::make_unique<Parts>(plugin, queue, width, height, memory)) {}
 
 InkPage::~InkPage() = default;
+
+StrokeList& InkPage::Parts::activeStrokes() {
+  if (replay != nullptr) return replay->strokes;
+  return strokes;
+}
+
+PageLayers& InkPage::Parts::activeLayers() {
+  if (replay != nullptr) return replay->layers;
+  return layers;
+}
 
 // --- The window ---
 
@@ -409,7 +420,8 @@ std::size_t InkPage::erase(float x0, float y0, float x1, float y1, float radius)
   if (!page.isErasing) {
     Step erasure{.isAddition = false, .strokes = {}, .backups = {}};
     page.dropUndone();
-    page.history.add(std::move(erasure)).isBacked = page.layers.frontFits() && !page.isLost;
+    erasure.isBacked = page.layers.frontFits() && !page.isLost;
+    page.history.add(std::move(erasure));
     page.staleBefore = page.layers.stale();
     page.isErasing = true;
   }
@@ -537,6 +549,20 @@ StrokeId InkPage::addRecord(std::span<const std::uint8_t> bytes) {
   page.history.dropAllBackups();
   page.layers.redraw(page.strokes.size() - 1, areas);
   return ++page.lastId;
+}
+
+void InkPage::setShown(StrokeId id, bool isShown) {
+  Parts& page = *mParts;
+  page.refuseIfBusy();
+  page.isErasing = false;
+  const std::size_t index = page.indexOf(id);
+  if (page.strokes[index].isShown == isShown) return;
+  const std::vector<PixelArea> areas = page.layers.areasOf(index);
+  page.history.dropAllBackups();
+  page.strokes.show(index, isShown);
+  page.layers.redraw(index, areas);
+  if (page.strokes.shown() == 0) page.layers.showNothing();
+  if (page.wet.isHolding()) page.wet.redraw(page.strokes);
 }
 
 std::vector<std::uint8_t> InkPage::record(StrokeId id) const {

@@ -21,6 +21,10 @@ PageStyle styleOf(const Stroke& stroke, const PenLimits& own) {
     style.outline = PageOutline{outline->size, outline->argb};
   style.size = asDrawn.size;
   style.argb = asDrawn.argb;
+  style.look = renderingVersionFor(stroke.brush, Options());
+  style.smooth = curveFor(stroke.brush, Options());
+  if (const auto outline = outlineFor(stroke.brush, Options()))
+    style.outline = {outline->size, outline->argb};
   const int tool = stroke.tool.value_or(Qelt::kToolStylus);
   // A pen draws every other tool as it draws a stylus.
   style.tool = tool == Qelt::kToolFinger || tool == Qelt::kToolMouse ? tool : Qelt::kToolStylus;

@@ -1,7 +1,8 @@
 #include "core/PageLayers.h"
 
+#include <algorithm>
 #include <cstdint>
-#include <new>
+#include <exception>
 #include <utility>
 
 #include "desktop/base/Log.h"
@@ -13,8 +14,10 @@ namespace QeltDesktop {
 namespace {
 
 // How many bytes of vertices a slice hands to the GPU, which on some machines is ten times as slow as the
-// thread that feeds it. A single stroke may exceed it.
-constexpr std::size_t kMostSliceBytes = std::size_t{4} << 20;
+// thread that feeds it: as many as it draws in the time below. A single stroke may exceed them.
+constexpr std::size_t kLeastSliceBytes = std::size_t{128} << 10;
+constexpr std::size_t kMostSliceBytes = std::size_t{8} << 20;
+constexpr std::chrono::milliseconds kLongestOnGpu{8};
 // How many strokes outside the view are passed over before the clock is looked at.
 constexpr std::size_t kMostPassedOver = 1000;
 
@@ -128,7 +131,8 @@ void PageLayers::showNothing() {
 }
 
 PageBackup PageLayers::backUp(RenderQueue& queue, Pair& pair, const PixelArea& area) {
-  PageBackup backup{area, std::make_unique<LayerBackup>(queue, *pair.strokes, area), nullptr};
+  PageBackup backup{.area = area, .strokes = nullptr, .outlines = nullptr};
+  backup.strokes = std::make_unique<LayerBackup>(queue, *pair.strokes, area);
   if (pair.outlines != nullptr) {
     backup.outlines = std::make_unique<LayerBackup>(queue, *pair.outlines, area);
   }
@@ -146,9 +150,7 @@ void PageLayers::swap(PageBackup& backup) {
 
 bool PageLayers::work(Clock::time_point deadline, const BeforeDrawing& beforeDrawing) {
   if (!isBusy()) return false;
-  bool hasPassed = true;
-  mQueue.run([&] { hasPassed = mFence->hasPassed(); });
-  if (!hasPassed) return true;
+  if (!isGpuDone()) return true;
   if (!mJob) begin();
   std::size_t bytes = 0, passedOver = 0;
   while (mJob && mJob->next < mStrokes.size()) {
@@ -159,11 +161,26 @@ bool PageLayers::work(Clock::time_point deadline, const BeforeDrawing& beforeDra
       ++mJob->next;
       if (++passedOver % kMostPassedOver != 0) continue;
     }
-    if (Clock::now() >= deadline || bytes > kMostSliceBytes) break;
+    if (Clock::now() >= deadline || bytes > mSliceBytes) break;
   }
   if (mJob && mJob->next == mStrokes.size()) finish();
   mQueue.run([&] { mFence->set(); });
+  mSliceEnd = Clock::now();
+  mWasSlow = false;
   return isBusy();
+}
+
+// Slices grow while the GPU keeps up with them, and shrink where it was found to take too long.
+bool PageLayers::isGpuDone() {
+  bool hasPassed = true;
+  mQueue.run([&] { hasPassed = mFence->hasPassed(); });
+  if (!hasPassed) {
+    mWasSlow = mWasSlow || Clock::now() - mSliceEnd > kLongestOnGpu;
+    return false;
+  }
+  mSliceBytes = std::clamp(mWasSlow ? mSliceBytes / 2 : mSliceBytes + mSliceBytes / 4, kLeastSliceBytes,
+                           kMostSliceBytes);
+  return true;
 }
 
 void PageLayers::begin() {
@@ -186,13 +203,13 @@ std::size_t PageLayers::drawNext(const BeforeDrawing& beforeDrawing) {
   ++mJob->next;
   try {
     return mPens.draw(mStrokes, index, canvasOf(mBack, mView));
-  } catch (const std::bad_alloc&) {
+  } catch (const std::exception&) {
     // What is cached of others is the first thing to do without.
     mPens.cache().dropAll();
     if (std::exchange(mFailed, stroke.id()) != stroke.id()) {
       restart();
     } else {
-      logError("there is no memory to draw a stroke; it is left out");
+      logError("a stroke cannot be drawn, and is left out");
     }
   }
   return 0;

@@ -112,6 +112,7 @@ class PageLayers {
   std::unique_ptr<CanvasLayer> newLayer(int width, int height);
   static PageBackup backUp(RenderQueue& queue, Pair& pair, const PixelArea& area);
   PageCanvas canvasOf(const Pair& pair, const PageView& view) const;
+  bool isGpuDone();
   void begin();
   std::size_t drawNext(const BeforeDrawing& beforeDrawing);
   void finish();
@@ -125,8 +126,11 @@ class PageLayers {
   PageView mFrontView;
   PixelArea mStale;  // of the front, where it fits
   std::optional<Job> mJob;
-  StrokeId mFailed = 0;              // the last stroke that there was no memory to draw
+  StrokeId mFailed = 0;              // the last stroke that could not be drawn
   std::unique_ptr<GpuFence> mFence;  // after the last slice
+  Clock::time_point mSliceEnd;
+  bool mWasSlow = false;  // the GPU took too long over it
+  std::size_t mSliceBytes = std::size_t{256} << 10;
 };
 
 }  // namespace QeltDesktop

@@ -14,7 +14,7 @@
 #include "pencommon/PenOutlineDrawableGL.h"
 #include "pencommon/PenPreviewDrawableGL.h"
 #include "pencommon/PenStrokeDrawableGL.h"
-#include "play/Options.h"
+#include "play/PagePlayer.h"
 #include "play/PenSession.h"
 #include "play/SamplePanel.h"
 #include "play/StrokeFeeder.h"
@@ -32,16 +32,17 @@ bool followsZoom(int look) {
   return versionOf(look).floatsPerVertex > Qelt::kRenderingVersions.front().floatsPerVertex;
 }
 
-// Whatever a call throws, what it posted runs before anything else changes.
+// Makes a call and runs what it posted, whatever it throws. Throws as well when something of it was lost.
 template <typename Call>
 void runWith(RenderQueue& queue, const Call& call) {
+  QueueWatch watch(queue);
   try {
     call();
   } catch (...) {
     queue.runPending();
     throw;
   }
-  queue.runPending();
+  watch.finish();
 }
 
 }  // namespace
@@ -61,6 +62,7 @@ class PagePens::Pen {
       : mCanvas(&queue, nullptr),
         mSession(plugin, queue, style.look),
         mStroke(mSession.pen().GetStrokeDrawableGL()) {
+    mSession.setCurve(style.smooth);
     if (mStroke == nullptr) throw std::bad_alloc();
   }
 
@@ -90,6 +92,7 @@ class PagePens::OutlinePen {
       : mCanvas(&queue, nullptr),
         mSession(plugin, queue, style.look),
         mOutline(mSession.pen().GetOutlineDrawableGL()) {
+    mSession.setCurve(style.smooth);
     if (mOutline == nullptr) throw std::bad_alloc();
   }
 

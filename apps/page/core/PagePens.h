@@ -54,8 +54,8 @@ class PagePens {
   PagePens& operator=(const PagePens&) = delete;
 
   // Draws a stroke of the list above what is there, and runs the queue. Returns how many bytes of vertices
-  // went to the GPU. What it throws leaves an incomplete drawing: std::bad_alloc, Refusal where the plug-in
-  // makes no pen.
+  // went to the GPU. What it throws leaves an incomplete drawing: std::bad_alloc, std::runtime_error when a
+  // render task failed, Refusal where the plug-in makes no pen.
   std::size_t draw(StrokeList& strokes, std::size_t index, const PageCanvas& canvas);
   // The same for a stroke that is on no page, without its outline.
   void drawAlone(PageStroke& stroke, const PageCanvas& canvas);

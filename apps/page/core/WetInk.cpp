@@ -43,6 +43,7 @@ class WetInk::Pen {
         mPredictionCanvas(&queue, nullptr),
         mSession(plugin, queue, style.look),
         mStroke(mSession.pen().GetStrokeDrawableGL()) {
+    mSession.setCurve(style.smooth);
     if (mStroke == nullptr) throw std::bad_alloc();
     if (!versionOf(style).predicts) return;
     mPrediction = mSession.pen().GetPredictionStrokeDrawableGL();

@@ -79,6 +79,7 @@ export class Engine {
     return address;
   }
   #rows(rows, more = []) {
+    if (rows.length % VALUES || more.length % VALUES) throw new EngineError('A sample has six values.');
     const address = this.#room((rows.length + more.length) * 8);
     this.#module.HEAPF64.set(rows, address / 8);
     this.#module.HEAPF64.set(more, address / 8 + rows.length);
@@ -97,9 +98,9 @@ export class Engine {
 
   // The window.
   resize(width, height) {
+    this.#call('resize', width, height);
     if (this.#canvas.width !== width) this.#canvas.width = width;
     if (this.#canvas.height !== height) this.#canvas.height = height;
-    this.#call('resize', width, height);
   }
   /** Device pixel = zoom * unit + (x, y). What there is shows at once, moved; `work` then draws it sharp. */
   setView({zoom, x, y}) {
@@ -148,6 +149,18 @@ export class Engine {
   samples(id) {
     this.#call('samples', id);
     return this.#numbers();
+  }
+  /** As another window on the same page did: no step of the history. */
+  setShown(shown, hidden) {
+    for (const id of shown) this.#call('set_shown', id, 1);
+    for (const id of hidden) this.#call('set_shown', id, 0);
+  }
+  style(id) {
+    this.#call('style', id);
+    const [look, size, color, smooth, outlineSize, outlineColor, tool] = this.#numbers();
+    return {look, size, color, smooth: smooth === 1,
+            outline: outlineSize > 0 ? {size: outlineSize, color: outlineColor} : null,
+            tool: Object.keys(TOOLS).find((name) => TOOLS[name] === tool)};
   }
 
   // Storage and files.

@@ -122,7 +122,7 @@ PageStyle styleOf(int look, double size, std::uint32_t argb, int smooth, double 
                   std::uint32_t outlineArgb, int tool) {
   PageStyle style{
       .look = look, .size = static_cast<float>(size), .argb = argb, .smooth = smooth != 0, .tool = tool};
-  if (outlineSize > 0.0) style.outline = PageOutline{static_cast<float>(outlineSize), outlineArgb};
+  if (outlineSize != 0.0) style.outline = PageOutline{static_cast<float>(outlineSize), outlineArgb};
   return style;
 }
 
@@ -295,6 +295,20 @@ EMSCRIPTEN_KEEPALIVE int qelt_strokes() {
 EMSCRIPTEN_KEEPALIVE int qelt_samples(StrokeId id) {
   return onPage([&](InkPage& page) {
     for (const Sample& sample : page.samples(id)) tell(sample);
+    return 0;
+  });
+}
+EMSCRIPTEN_KEEPALIVE int qelt_set_shown(StrokeId id, int isShown) {
+  return onPage([&](InkPage& page) { return page.setShown(id, isShown != 0), 0; });
+}
+// Answers with look, size, colour, smoothing, the outline's size (0 without) and colour, and the tool.
+EMSCRIPTEN_KEEPALIVE int qelt_style(StrokeId id) {
+  return onPage([&](InkPage& page) {
+    const PageStyle& style = page.style(id);
+    const PageOutline outline = style.outline.value_or(PageOutline{});
+    gNumbers = {static_cast<double>(style.look), style.size,   static_cast<double>(style.argb),
+                style.smooth ? 1.0 : 0.0,        outline.size, static_cast<double>(outline.argb),
+                static_cast<double>(style.tool)};
     return 0;
   });
 }

@@ -237,8 +237,10 @@ class Definitions::Collector final : public XmlVisitor {
     ContextEntry& entry = mAll.mContexts[context];
     if (mAll.partOf(entry, part)) return;
     const std::uint32_t added = numberAfter(mAll.mContextParts.size());
-    mAll.mContextParts.push_back(
-        {.part = part, .number = static_cast<std::uint32_t>(number), .before = entry.part});
+    ContextPart& made = mAll.mContextParts.emplace_back();
+    made.part = part;
+    made.number = number;
+    made.before = entry.part;
     entry.part = added;
   }
 
@@ -293,7 +295,7 @@ Definitions::Definitions(const SourceText& source) : mSource(source) {
 }
 
 const char* Definitions::keptText(std::string_view text) {
-  constexpr std::size_t kFirst = 1 << 10, kLargest = 1 << 16;
+  constexpr std::size_t kFirst = 1 << 10, kLargest = 1 << 20;
   const std::size_t size = text.size() + 1;
   if (mTexts.empty() || mTexts.back().capacity() - mTexts.back().size() < size) {
     const std::size_t usual = mTexts.empty() ? kFirst : std::min(2 * mTexts.back().capacity(), kLargest);

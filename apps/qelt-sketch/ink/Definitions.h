@@ -84,12 +84,13 @@ class Definitions {
     Found brush, format;
   };
   // What a context refers to, or the first definition of a kind in it.
-  enum class Part : std::uint8_t { BrushRef, FormatRef, SourceRef, Base, OwnBrush, OwnFormat, OwnSource };
+  enum class Part : std::uint64_t { BrushRef, FormatRef, SourceRef, Base, OwnBrush, OwnFormat, OwnSource };
   struct ContextPart {
-    Part part;
-    std::uint32_t number;
-    std::uint32_t before;  // the context's part before this one
+    Part part : 4;
+    std::uint64_t number : 30;
+    std::uint64_t before : 30;  // the context's part before this one
   };
+  static_assert(sizeof(ContextPart) == 8);
   // A reference as it is written, kept for later.
   struct KeptReference {
     std::size_t offset;

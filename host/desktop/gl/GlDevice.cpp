@@ -79,7 +79,7 @@ void GlDevice::clearCurrent() {
 void GlDevice::lose() noexcept {
   if (isLost()) return;
   mContext.reset();
-  mProgram = 0;
+  mState.forget();
   {
     const std::lock_guard guard(mLock);
     for (GlResource* resource : mResources) resource->forget();
@@ -99,16 +99,6 @@ void GlDevice::restore() {
     for (GlResource* resource : mResources) resource->remake();
   }
   ManagedObjects::restore(this);
-}
-
-void GlDevice::useProgram(GLuint program) {
-  if (program == mProgram) return;
-  gl(glUseProgram)(program);
-  mProgram = program;
-}
-
-void GlDevice::forgetProgram(GLuint program) {
-  if (program == mProgram) useProgram(0);
 }
 
 void GlDevice::readLimits() {

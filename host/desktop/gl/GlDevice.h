@@ -8,6 +8,7 @@
 #include <vector>
 
 #include "base/HostApi.h"
+#include "desktop/gl/GlState.h"
 #include "desktop/platform/Platform.h"
 
 namespace QeltDesktop {
@@ -43,7 +44,7 @@ class QELT_HOST_API GlResource {
   GlDevice* mDevice;
 };
 
-// A GL context, the resources that have been made in it, and a little of its state. Render thread.
+// A GL context, the resources that have been made in it, and what is known of its state. Render thread.
 class QELT_HOST_API GlDevice {
  public:
   // Makes a context and leaves it current. Throws std::runtime_error when there is none to be had.
@@ -72,11 +73,8 @@ class QELT_HOST_API GlDevice {
   // has changed then.
   void restore();
 
-  // Makes a program the current one, without asking GL when it is so already.
-  void useProgram(GLuint program);
-  void forgetProgram(GLuint program);
-  // Whether a program is current; without one GL draws nothing of use.
-  bool hasProgram() const { return mProgram != 0; }
+  // The context's state, which nobody sets past it.
+  GlState& state() { return mState; }
   // The longest sides that a texture may have, and that can be drawn into at once.
   int maxTextureSize() const { return mMaxTextureSize; }
   int maxViewportSize() const { return mMaxViewportSize; }
@@ -91,7 +89,7 @@ class QELT_HOST_API GlDevice {
   std::unique_ptr<GlContext> mContext;  // null while it is lost
   std::mutex mLock;                     // guards mResources
   std::vector<GlResource*> mResources;
-  GLuint mProgram = 0;  // the current one
+  GlState mState;
   int mMaxTextureSize = 0;
   int mMaxViewportSize = 0;
   std::string mDescription;

@@ -1,6 +1,9 @@
 #include <algorithm>
 #include <array>
 #include <atomic>
+#include <cstddef>
+#include <cstdint>
+#include <cstring>
 #include <iterator>
 #include <memory>
 #include <new>
@@ -48,6 +51,9 @@ struct Uniform {
   std::string name;
   GLint location;
   Qelt::BindingType type;
+  // What GL has, bit for bit: it is told only what differs. Nothing before the first value.
+  std::array<std::uint32_t, 16> value{};
+  bool isSet = false;
 };
 
 // The program itself, shared with its bindings, which may be given back after it. It keeps the shaders'
@@ -72,11 +78,11 @@ class ProgramState final : public GlResource {
   bool use() {
     if (mProgram == 0 && mMayBuildAgain && isLive() && !mReleased) remake();
     if (mProgram == 0 || !isLive()) {
-      if (GlDevice* const drawing = GlDevice::live(); drawing != nullptr) drawing->useProgram(0);
+      if (GlDevice* const drawing = GlDevice::live(); drawing != nullptr) drawing->state().useProgram(0);
       noteForeignContext();
       return false;
     }
-    device()->useProgram(mProgram);
+    device()->state().useProgram(mProgram);
     return true;
   }
 
@@ -88,11 +94,19 @@ class ProgramState final : public GlResource {
   }
 
   const Uniform& uniform(int index) const { return mUniforms[static_cast<std::size_t>(index)]; }
+  // Notes the value of `bytes` bytes; false when GL has it already.
+  bool changes(int index, const void* value, std::size_t bytes) {
+    Uniform& uniform = mUniforms[static_cast<std::size_t>(index)];
+    if (uniform.isSet && std::memcmp(uniform.value.data(), value, bytes) == 0) return false;
+    std::memcpy(uniform.value.data(), value, bytes);
+    uniform.isSet = true;
+    return true;
+  }
 
   void destroy() {
     mReleased = true;
     if (mProgram != 0 && isLive()) {
-      device()->forgetProgram(mProgram);
+      if (device()->state().program() == mProgram) device()->state().useProgram(0);
       gl(glDeleteProgram)(mProgram);
     }
     mProgram = 0;
@@ -165,7 +179,10 @@ class ProgramState final : public GlResource {
 
   // Indices stay what they were the first time: bindings keep them across contexts.
   void readUniforms() {
-    for (Uniform& known : mUniforms) known.location = -1;
+    for (Uniform& known : mUniforms) {
+      known.location = -1;
+      known.isSet = false;
+    }
     GLint count = 0;
     gl(glGetProgramiv)(mProgram, GL_ACTIVE_UNIFORMS, &count);
     for (GLint i = 0; i < count; ++i) {
@@ -178,7 +195,7 @@ class ProgramState final : public GlResource {
       if (known >= 0) {
         mUniforms[static_cast<std::size_t>(known)].location = location;
       } else {
-        mUniforms.push_back({name, location, bindingTypeOf(type)});
+        mUniforms.push_back({.name = name, .location = location, .type = bindingTypeOf(type)});
       }
     }
   }
@@ -200,25 +217,32 @@ class GlUniform final : public Qelt::IParameterBinding {
   Qelt::BindingType getType() const override { return mProgram->uniform(mIndex).type; }
 
   void set(const Qelt::Matrix4<float>& value) override {
-    if (ready(Qelt::kBindingMatrix4)) gl(glUniformMatrix4fv)(location(), 1, GL_FALSE, value.data());
+    if (isNew(Qelt::kBindingMatrix4, value.data(), 16)) {
+      gl(glUniformMatrix4fv)(location(), 1, GL_FALSE, value.data());
+    }
   }
   void set(const Qelt::Vector2<float>& value) override {
-    if (ready(Qelt::kBindingVector2)) gl(glUniform2f)(location(), value.x, value.y);
+    if (isNew(Qelt::kBindingVector2, &value.x, 2)) gl(glUniform2f)(location(), value.x, value.y);
   }
   void set(const Qelt::Vector4<float>& value) override {
-    if (ready(Qelt::kBindingVector4)) gl(glUniform4f)(location(), value.x, value.y, value.z, value.w);
+    if (isNew(Qelt::kBindingVector4, &value.x, 4)) {
+      gl(glUniform4f)(location(), value.x, value.y, value.z, value.w);
+    }
   }
   void set(float value) override {
-    if (ready(Qelt::kBindingFloat)) gl(glUniform1f)(location(), value);
+    if (isNew(Qelt::kBindingFloat, &value, 1)) gl(glUniform1f)(location(), value);
   }
   void set(int value) override {
-    if (ready(Qelt::kBindingInt)) gl(glUniform1i)(location(), value);
+    if (isNew(Qelt::kBindingInt, &value, 1)) gl(glUniform1i)(location(), value);
   }
   void release() override { delete this; }
 
  private:
-  // A value of another type is dropped rather than handed to GL.
-  bool ready(Qelt::BindingType type) const { return getType() == type && mProgram->use(); }
+  // Makes the program current and notes the value, of so many numbers. A value of another type is dropped
+  // rather than handed to GL.
+  bool isNew(Qelt::BindingType type, const void* value, std::size_t numbers) {
+    return getType() == type && mProgram->use() && mProgram->changes(mIndex, value, 4 * numbers);
+  }
   GLint location() const { return mProgram->uniform(mIndex).location; }
 
   std::shared_ptr<ProgramState> mProgram;

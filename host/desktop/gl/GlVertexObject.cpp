@@ -91,36 +91,35 @@ bool GlVertexObject::upload(Buffer& buffer, const void* data, int vertices) {
   std::size_t done = 0;
   for (const Slice& slice : buffer.slices) {
     const std::size_t size = std::min(count - done, most) * strideBytes();
-    glBindBuffer(GL_ARRAY_BUFFER, slice.store);
+    device()->state().bindArrayBuffer(slice.store);
     // A new store for each batch, because the GPU may still be drawing from the last one.
-    glBufferData(GL_ARRAY_BUFFER, static_cast<GLsizeiptr>(size), nullptr, GL_DYNAMIC_DRAW);
-    bool good = !asks || takeGlErrors();
-    if (good && size > 0) {
-      glBufferSubData(GL_ARRAY_BUFFER, 0, static_cast<GLsizeiptr>(size), bytes + done * strideBytes());
-      good = !asks || takeGlErrors();
+    const void* const from = size > 0 ? bytes + done * strideBytes() : nullptr;
+    glBufferData(GL_ARRAY_BUFFER, static_cast<GLsizeiptr>(size), asks ? nullptr : from, GL_STREAM_DRAW);
+    if (asks) {
+      // Drivers fill a store that they could not make.
+      if (!takeGlErrors()) return false;
+      glBufferSubData(GL_ARRAY_BUFFER, 0, static_cast<GLsizeiptr>(size), from);
+      if (!takeGlErrors()) return false;
     }
-    glBindBuffer(GL_ARRAY_BUFFER, 0);
-    if (!good) return false;
     done += most;
   }
   return buffer.slices.size() == 1 || hasRoomForDriver();
 }
 
 void GlVertexObject::draw(int first, int count, bool, int instances) {
-  if (!isLive() || !device()->hasProgram()) return;
+  if (!isLive() || device()->state().program() == 0) return;
   for (const Buffer& buffer : mBuffers) {
     const int begin = std::clamp(first, 0, buffer.vertices);
     int left = count < 0 ? buffer.vertices - begin : std::min(count, buffer.vertices - begin);
     int from = begin % mSliceVertices;
     for (auto slice = static_cast<std::size_t>(begin / mSliceVertices); left > 0; ++slice) {
       const int drawn = std::min(left, mSliceVertices - from);
-      gl(glBindVertexArray)(buffer.slices[slice].array);
+      device()->state().bindVertexArray(buffer.slices[slice].array);
       if (instances > 0) {
         gl(glDrawArraysInstanced)(mPrimitive, from, drawn, instances);
       } else {
         gl(glDrawArrays)(mPrimitive, from, drawn);
       }
-      gl(glBindVertexArray)(0);
       left -= drawn;
       from = 0;
     }
@@ -167,15 +166,16 @@ void GlVertexObject::unlinkLarge() {
 void GlVertexObject::empty(Buffer& buffer) {
   buffer.vertices = 0;
   setSliceCount(buffer, 1);
-  glBindBuffer(GL_ARRAY_BUFFER, buffer.slices.front().store);
-  glBufferData(GL_ARRAY_BUFFER, 0, nullptr, GL_DYNAMIC_DRAW);
-  glBindBuffer(GL_ARRAY_BUFFER, 0);
+  device()->state().bindArrayBuffer(buffer.slices.front().store);
+  glBufferData(GL_ARRAY_BUFFER, 0, nullptr, GL_STREAM_DRAW);
 }
 
 bool GlVertexObject::setSliceCount(Buffer& buffer, std::size_t count) {
   std::vector<Slice>& slices = buffer.slices;
   while (slices.size() > count) {
+    device()->state().forgetVertexArray(slices.back().array);
     gl(glDeleteVertexArrays)(1, &slices.back().array);
+    device()->state().forgetArrayBuffer(slices.back().store);
     gl(glDeleteBuffers)(1, &slices.back().store);
     slices.pop_back();
   }
@@ -208,8 +208,8 @@ std::size_t GlVertexObject::strideBytes() const {
 void GlVertexObject::makeNames(Slice& slice) {
   gl(glGenVertexArrays)(1, &slice.array);
   gl(glGenBuffers)(1, &slice.store);
-  gl(glBindVertexArray)(slice.array);
-  gl(glBindBuffer)(GL_ARRAY_BUFFER, slice.store);
+  device()->state().bindVertexArray(slice.array);
+  device()->state().bindArrayBuffer(slice.store);
   std::size_t offset = 0;
   for (int i = 0; i < mLayout.getAttributeCount(); ++i) {
     const auto location = static_cast<GLuint>(i);
@@ -220,8 +220,6 @@ void GlVertexObject::makeNames(Slice& slice) {
                               reinterpret_cast<const void*>(offset));  // NOLINT(performance-no-int-to-ptr)
     offset += static_cast<std::size_t>(mLayout.getComponents(i)) * sizeof(float);
   }
-  gl(glBindVertexArray)(0);
-  gl(glBindBuffer)(GL_ARRAY_BUFFER, 0);
 }
 
 }  // namespace QeltDesktop

@@ -9,29 +9,31 @@ using QeltDesktop::gl;
 
 namespace {
 
-bool hasContext() {
-  return QeltDesktop::GlDevice::live() != nullptr;
+// Null without a context.
+QeltDesktop::GlState* liveState() {
+  QeltDesktop::GlDevice* const device = QeltDesktop::GlDevice::live();
+  return device != nullptr ? &device->state() : nullptr;
 }
 
 }  // namespace
 
 void OpenGLRenderer::enableState(unsigned int capability) {
-  if (hasContext()) gl(glEnable)(capability);
+  if (QeltDesktop::GlState* const state = liveState()) state->setEnabled(capability, true);
 }
 
 void OpenGLRenderer::disableState(unsigned int capability) {
-  if (hasContext()) gl(glDisable)(capability);
+  if (QeltDesktop::GlState* const state = liveState()) state->setEnabled(capability, false);
 }
 
 void OpenGLRenderer::setBlendFuncFactors(unsigned int sourceColor, unsigned int destinationColor,
                                          unsigned int sourceAlpha, unsigned int destinationAlpha) {
-  if (hasContext()) gl(glBlendFuncSeparate)(sourceColor, destinationColor, sourceAlpha, destinationAlpha);
+  QeltDesktop::GlState* const state = liveState();
+  if (state != nullptr) state->setBlendFactors(sourceColor, destinationColor, sourceAlpha, destinationAlpha);
 }
 
 Vector4<int> OpenGLRenderer::getViewport() {
-  GLint values[4] = {};
-  if (hasContext()) gl(glGetIntegerv)(GL_VIEWPORT, values);
-  return {values[0], values[1], values[2], values[3]};
+  QeltDesktop::GlState* const state = liveState();
+  return state != nullptr ? state->viewport() : Vector4<int>{};
 }
 
 void OpenGLRenderer::discardFramebuffer(int attachments) {
@@ -41,7 +43,7 @@ void OpenGLRenderer::discardFramebuffer(int attachments) {
   GLsizei count = 0;
   if ((attachments & kDepthBit) != 0) names[count++] = GL_DEPTH_ATTACHMENT;
   if ((attachments & kStencilBit) != 0) names[count++] = GL_STENCIL_ATTACHMENT;
-  if (count > 0 && hasContext()) gl(glInvalidateFramebuffer)(GL_FRAMEBUFFER, count, names);
+  if (count > 0 && liveState() != nullptr) gl(glInvalidateFramebuffer)(GL_FRAMEBUFFER, count, names);
 }
 
 }  // namespace Qelt

@@ -55,6 +55,11 @@ bool runAndDelete(Qelt::ITask* task) noexcept {
   return ran;
 }
 
+// A call may have used GL in its own way.
+void noteForeignUse() {
+  if (GlDevice* const device = GlDevice::live(); device != nullptr) device->state().forget();
+}
+
 // A call that somebody waits for. It lies in the memory of whoever waits, so that it can be posted when there
 // is no other memory left.
 class WaitedCall final : public Qelt::ITask {
@@ -66,6 +71,7 @@ class WaitedCall final : public Qelt::ITask {
     } catch (...) {
       mThrown = std::current_exception();
     }
+    noteForeignUse();
   }
 
   static void* operator new(std::size_t, void* place) noexcept { return place; }
@@ -273,6 +279,7 @@ bool RenderQueue::run(const std::function<void()>& call) {
   }
   if (inside) {
     call();
+    noteForeignUse();
     return true;
   }
   // Before the call is in the queue: it may throw, and the call goes with this frame.

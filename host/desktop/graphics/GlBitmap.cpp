@@ -42,8 +42,7 @@ void GlTexture::SetParameter(unsigned int glName, int glValue) {
 void GlTexture::Bind(int textureUnit) {
   constexpr int kUnits = 16;  // what every OpenGL ES 3.0 offers a fragment shader
   if (textureUnit < 0 || textureUnit >= kUnits || !mBitmap.isLive()) return;
-  gl(glActiveTexture)(GL_TEXTURE0 + static_cast<GLenum>(textureUnit));
-  mBitmap.bindTexture();
+  mBitmap.device()->state().bindTexture(textureUnit, mBitmap.mTexture);
 }
 
 GlTile::GlTile(GlBitmap& bitmap, int x, int y, int width, int height)
@@ -59,9 +58,8 @@ void GlTile::BeginRender(int) {
   mBitmap.beginRender(mX, mY, mWidth, mHeight);
 }
 
-void GlTile::EndRender(int) {
-  mBitmap.endRender();
-}
+// The next to draw makes its own target the render target.
+void GlTile::EndRender(int) {}
 
 GlBitmap::GlBitmap(int width, int height, int tileSize)
     : mWidth(width), mHeight(height), mTextureInterface(*this) {
@@ -81,7 +79,9 @@ GlBitmap::GlBitmap(int width, int height, int tileSize)
 
 GlBitmap::~GlBitmap() {
   if (!isLive()) return;
+  device()->state().forgetFramebuffer(mFramebuffer);
   gl(glDeleteFramebuffers)(1, &mFramebuffer);
+  device()->state().forgetTexture(mTexture);
   gl(glDeleteTextures)(1, &mTexture);
 }
 
@@ -103,48 +103,37 @@ Qelt::ISPSubBitmap* GlBitmap::GetSubBitmap(int index) {
 }
 
 bool GlBitmap::isRenderable() {
-  const bool complete =
-      bindFramebuffer() && gl(glCheckFramebufferStatus)(GL_FRAMEBUFFER) == GL_FRAMEBUFFER_COMPLETE;
-  if (isLive()) gl(glBindFramebuffer)(GL_FRAMEBUFFER, 0);
-  return complete;
+  return bindFramebuffer() && gl(glCheckFramebufferStatus)(GL_FRAMEBUFFER) == GL_FRAMEBUFFER_COMPLETE;
 }
 
 bool GlBitmap::beginRender(int x, int y, int width, int height) {
   if (!bindFramebuffer()) return false;
-  gl(glViewport)(x, y, width, height);
-  gl(glScissor)(x, y, width, height);
-  gl(glEnable)(GL_SCISSOR_TEST);
+  GlState& state = device()->state();
+  state.setViewport(x, y, width, height);
+  state.setScissor(x, y, width, height);
+  state.setEnabled(GL_SCISSOR_TEST, true);
   // Pens set blending and what they draw with; whatever else could keep colour out is seen to here.
-  gl(glDisable)(GL_CULL_FACE);
-  gl(glColorMask)(GL_TRUE, GL_TRUE, GL_TRUE, GL_TRUE);
+  state.setEnabled(GL_CULL_FACE, false);
+  state.openColorMask();
   return true;
-}
-
-void GlBitmap::endRender() {
-  if (!isLive()) return;
-  gl(glDisable)(GL_SCISSOR_TEST);
-  gl(glBindFramebuffer)(GL_FRAMEBUFFER, 0);
 }
 
 void GlBitmap::clear(float red, float green, float blue, float alpha) {
   if (!beginRender(0, 0, mWidth, mHeight)) return;
   gl(glClearColor)(red, green, blue, alpha);
   gl(glClear)(GL_COLOR_BUFFER_BIT);
-  endRender();
 }
 
 void GlBitmap::clear(int x, int y, int width, int height) {
   if (!beginRender(x, y, width, height)) return;
   gl(glClearColor)(0.0f, 0.0f, 0.0f, 0.0f);
   gl(glClear)(GL_COLOR_BUFFER_BIT);
-  endRender();
 }
 
 void GlBitmap::copyFrom(GlBitmap& source, int fromX, int fromY, int x, int y, int width, int height) {
   if (!isLive() || !source.bindFramebuffer()) return;
   bindTexture();
   gl(glCopyTexSubImage2D)(GL_TEXTURE_2D, 0, x, y, fromX, fromY, width, height);
-  gl(glBindFramebuffer)(GL_FRAMEBUFFER, 0);
 }
 
 std::vector<std::uint8_t> GlBitmap::readPixels() {
@@ -157,7 +146,6 @@ std::vector<std::uint8_t> GlBitmap::readPixels() {
     gl(glPixelStorei)(packing, 0);
   }
   gl(glReadPixels)(0, 0, mWidth, mHeight, GL_RGBA, GL_UNSIGNED_BYTE, pixels.data());
-  gl(glBindFramebuffer)(GL_FRAMEBUFFER, 0);
   return pixels;
 }
 
@@ -194,7 +182,7 @@ bool GlBitmap::bindFramebuffer() {
   if (!isLive()) return false;
   const bool isNew = mFramebuffer == 0;
   if (isNew) gl(glGenFramebuffers)(1, &mFramebuffer);
-  gl(glBindFramebuffer)(GL_FRAMEBUFFER, mFramebuffer);
+  device()->state().bindFramebuffer(mFramebuffer);
   if (isNew) {
     gl(glFramebufferTexture2D)(GL_FRAMEBUFFER, GL_COLOR_ATTACHMENT0, GL_TEXTURE_2D, mTexture, 0);
   }
@@ -202,7 +190,7 @@ bool GlBitmap::bindFramebuffer() {
 }
 
 void GlBitmap::bindTexture() {
-  gl(glBindTexture)(GL_TEXTURE_2D, mTexture);
+  device()->state().bindTexture(mTexture);
 }
 
 void GlBitmap::setParameter(GLenum name, GLint value) {
@@ -211,6 +199,7 @@ void GlBitmap::setParameter(GLenum name, GLint value) {
   if (known == mParameters.end()) {
     mParameters.emplace_back(name, value);
   } else {
+    if (known->second == value) return;
     known->second = value;
   }
   if (!isLive()) return;

@@ -76,7 +76,6 @@ class QELT_HOST_API GlBitmap final : public Qelt::ISPBitmap, public GlResource {
   bool isRenderable();
   // Makes a rectangle the render target: framebuffer, viewport and scissor. False without a context.
   bool beginRender(int x, int y, int width, int height);
-  void endRender();
   void clear(float red, float green, float blue, float alpha);
   // Makes the rectangle of that size at (x, y) transparent.
   void clear(int x, int y, int width, int height);

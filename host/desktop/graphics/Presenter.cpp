@@ -77,8 +77,9 @@ void Presenter::release() {
 }
 
 void Presenter::make() {
-  if (GlDevice::live() == nullptr) throw std::runtime_error("nothing can be shown without OpenGL");
-  gl(glBindFramebuffer)(GL_FRAMEBUFFER, 0);
+  GlDevice* const device = GlDevice::live();
+  if (device == nullptr) throw std::runtime_error("nothing can be shown without OpenGL");
+  device->state().bindFramebuffer(0);
   if (gl(glCheckFramebufferStatus)(GL_FRAMEBUFFER) != GL_FRAMEBUFFER_COMPLETE) {
     throw std::runtime_error("nothing can be shown, because the OpenGL context has no surface");
   }
@@ -122,15 +123,17 @@ void Presenter::present(std::span<const ShownLayer> layers,
 
 void Presenter::draw(std::span<const ShownLayer> layers,
                      const std::optional<std::array<std::uint8_t, 3>>& paper, int width, int height) {
-  if (GlDevice::live() == nullptr) return;
-  gl(glBindFramebuffer)(GL_FRAMEBUFFER, 0);
-  gl(glViewport)(0, 0, width, height);
+  GlDevice* const device = GlDevice::live();
+  if (device == nullptr) return;
+  GlState& state = device->state();
+  state.bindFramebuffer(0);
+  state.setViewport(0, 0, width, height);
   for (const GLenum off : {GL_BLEND, GL_SCISSOR_TEST, GL_CULL_FACE, GL_DEPTH_TEST, GL_STENCIL_TEST}) {
-    gl(glDisable)(off);
+    state.setEnabled(off, false);
   }
-  gl(glColorMask)(GL_TRUE, GL_TRUE, GL_TRUE, GL_TRUE);
+  state.openColorMask();
   mProgram->activate();
-  if (!GlDevice::live()->hasProgram()) return;
+  if (state.program() == 0) return;
   const auto share = [&paper](std::size_t i) { return static_cast<float>((*paper)[i]) / 255.0f; };
   mPaper->set(paper ? Qelt::Vector4<float>{share(0), share(1), share(2), 1.0f} : Qelt::Vector4<float>{});
   mHeight->set(static_cast<float>(height));
@@ -151,7 +154,7 @@ void Presenter::draw(std::span<const ShownLayer> layers,
                                          1.0f / (shown.scale * static_cast<float>(shown.layer->width())),
                                          1.0f / (shown.scale * static_cast<float>(shown.layer->height()))});
   }
-  gl(glBindVertexArray)(0);
+  state.bindVertexArray(0);
   gl(glDrawArrays)(GL_TRIANGLES, 0, 3);
 }
 
