@@ -30,7 +30,7 @@ export async function openPage(browser, {size = [800, 600], hash = '', prepare =
   const page = await context.newPage();
   page.errors = [];
   page.on('pageerror', (error) => page.errors.push(String(error)));
-  page.on('console', (message) => message.type() === 'error' && page.errors.push(message.text()));
+  page.on('console', (message) => message.type() === 'error' && page.errors.push(message.text().slice(0, 400)));
   if (prepare) await page.addInitScript(prepare);
   await page.goto(pageUrl + hash);
   await page.waitForSelector('html[data-ready]', {timeout: 30_000});

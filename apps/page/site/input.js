@@ -66,6 +66,7 @@ const ERASER_END = 32;  // among PointerEvent.buttons
  * @typedef {object} Hand what input acts on
  * @property {() => boolean} erasing         the eraser is the tool
  * @property {() => boolean} fingerDraws
+ * @property {(tool: string) => boolean} dismisses   closes what is open; true when that was all the tool wanted
  * @property {() => void} penSeen            called with every pen that comes down
  * @property {(tool: string, sample: Sample) => void} begin
  * @property {(rows: number[], expected: number[]) => void} move
@@ -194,7 +195,7 @@ export class Input {
   /** @param {PointerEvent} event */
   #begin(event) {
     const sample = sampleOf(event, this.#hand.toUnits);
-    if (!sample) return false;
+    if (!sample || this.#hand.dismisses(event.pointerType)) return false;
     const tool = ['pen', 'touch', 'mouse'].includes(event.pointerType) ? event.pointerType : 'pen';
     const erases = this.#hand.erasing() || event.button === 5 || (event.buttons & ERASER_END) !== 0;
     this.#stroke = {id: event.pointerId, tool, erases, at: sample, x: event.clientX, y: event.clientY,
@@ -218,6 +219,9 @@ export class Input {
       this.#moveGrip(event, pointer);
       return false;
     }
+    // A finger that draws may yet become one of two that hold the page.
+    pointer.x = finite(event.clientX, pointer.x);
+    pointer.y = finite(event.clientY, pointer.y);
     const stroke = this.#stroke;
     if (stroke?.id !== event.pointerId) return false;
     const together = event.getCoalescedEvents?.() ?? [];

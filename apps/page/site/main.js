@@ -104,11 +104,12 @@ async function start() {
     penSeen: () => {
       if (settings.get('penSeen')) return;
       settings.set({penSeen: true, finger: false});
-      say('A pen was found: fingers now move the page. “View and page” can change that.');
+      say('The pen draws; fingers now move the page.');
     },
+    // A finger that taps beside an open panel wants to be rid of it, and leaves no dot.
+    dismisses: (kind) => ui.close() && kind === 'touch',
     begin: (kind, sample) => {
       tool = kind;
-      ui.close();
       ui.showHint(false);
       engine.begin(settings.style(kind), sample);
       frames.now();
@@ -127,7 +128,6 @@ async function start() {
       refreshSoon();
     },
     erase: (from, to) => {
-      ui.close();
       if (engine.erase(from[0], from[1], to[0], to[1], ERASER_REACH[tool] / view.scale) > 0) {
         frames.ask();
         frames.work();
@@ -188,7 +188,7 @@ async function start() {
     thinner: {label: 'Thinner', keys: ['['], run: () => settings.set({size: settings.get('size') / 1.2})},
     thicker: {label: 'Thicker', keys: [']'], run: () => settings.set({size: settings.get('size') * 1.2})},
     ...Object.fromEntries([1, 2, 3, 4, 5, 6, 7, 8].map((look) => [`look${look}`, {
-      label: `Look ${look}`, keys: [String(look)], run: () => settings.set({look}),
+      label: `Look ${look}`, family: 'Look', keys: [String(look)], run: () => settings.set({look}),
     }])),
     measure: {label: 'Measurements', keys: ['t'], run: () => settings.set({measure: !settings.get('measure')})},
   }, guard);

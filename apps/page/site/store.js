@@ -114,7 +114,7 @@ export class Store {
       this.page = await free();
       const store = database.transaction(STROKES).objectStore(STROKES);
       const [keys, values] = await Promise.all([answered(store.getAllKeys(all(this.page))), answered(store.getAll(all(this.page)))]);
-      this.#order = keys.length > 0 ? keys[keys.length - 1][1] : 0;
+      this.#order = keys.reduce((highest, [, order]) => (order > highest ? order : highest), 0);
       return keys.map((key, i) => ({key, bytes: values[i]}));
     } catch (error) {
       const known = this.#database;
@@ -169,8 +169,9 @@ export class Store {
       clearTimeout(this.#timer);
       this.#timer = setTimeout(() => this.#write([...this.#wanted.values()]), RETRY);
     };
+    let transaction = null;
     try {
-      const transaction = this.#database.transaction(STROKES, 'readwrite');
+      transaction = this.#database.transaction(STROKES, 'readwrite');
       const store = transaction.objectStore(STROKES);
       transaction.onabort = () => failed(transaction.error);
       transaction.oncomplete = () => {
@@ -186,6 +187,15 @@ export class Store {
       for (const {key, bytes} of entries) bytes ? store.put(bytes, key) : store.delete(key);
       transaction.commit?.();
     } catch (error) {
+      // All of it or nothing; what became of the part is not asked any more.
+      if (transaction) {
+        transaction.oncomplete = transaction.onabort = null;
+        try {
+          transaction.abort();
+        } catch {
+          // It is over already.
+        }
+      }
       failed(error);
     }
   }

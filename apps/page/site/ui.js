@@ -41,6 +41,7 @@ const keyText = (key) => key.replace('Arrow', '').split(' ').map((part) => (part
  * @typedef {object} Command
  * @property {string} label
  * @property {string[]} [keys] as keyOf calls them
+ * @property {string} [family] what the help panel says of this and others alike
  * @property {() => unknown} run
  * @property {() => boolean} [can]
  */
@@ -103,11 +104,18 @@ export class Ui {
       this.run(id);
     });
     const list = $('keys');
-    for (const {label, keys = []} of Object.values(this.#commands)) {
-      if (keys.length === 0) continue;
-      list.append(make('dt', {}, ...keys.slice(0, 2).flatMap((key, i) => [i > 0 ? ' ' : '', make('kbd', {textContent: keyText(key)})])),
+    const shown = new Map();  // what several keys do alike takes one line
+    for (const {label, keys = [], family = label} of Object.values(this.#commands)) {
+      if (keys.length > 0) shown.set(family, [...(shown.get(family) ?? []), ...keys]);
+    }
+    for (const [label, keys] of shown) {
+      list.append(make('dt', {}, ...keys.flatMap((key) => [make('kbd', {textContent: keyText(key)}), ' '])),
                   make('dd', {textContent: label}));
     }
+    // The paper shows that it has the focus only to those who walk with the keyboard.
+    const keys = (are) => () => document.body.classList.toggle('keys', are);
+    window.addEventListener('keydown', (event) => event.key === 'Tab' && keys(true)());
+    window.addEventListener('pointerdown', keys(false), {capture: true});
   }
 
   run(id) {
@@ -143,15 +151,18 @@ export class Ui {
   /** Told of every panel that opens. */
   opened = (_id) => {};
 
-  /** Closes what is open; the keyboard goes back to where it came from. */
+  /** Closes what is open, if anything; the keyboard goes back to where it came from. */
   close() {
+    let wasOpen = false;
     for (const panel of document.querySelectorAll('.panel:not([hidden])')) {
       const had = panel.contains(document.activeElement);
       /** @type {HTMLElement} */ (panel).hidden = true;
+      wasOpen = true;
       const opener = /** @type {HTMLElement | null} */ (document.querySelector(`[aria-controls=${panel.id}]`));
       if (had) (opener ?? $('paper')).focus({preventScroll: true});
     }
     this.#showExpanded();
+    return wasOpen;
   }
   #showExpanded() {
     for (const button of document.querySelectorAll('[aria-controls]')) {
@@ -293,8 +304,8 @@ export class Ui {
   showPages(pages, current, go) {
     $('pages').replaceChildren(...pages.map(({page, count, last}) => {
       const isHere = page === current;
-      const when = new Date(last).toLocaleString(undefined, {dateStyle: 'medium', timeStyle: 'short'});
-      const button = make('button', {type: 'button'}, make('span', {textContent: isHere ? `Page ${page} (this one)` : `Page ${page}`}),
+      const when = new Date(last).toLocaleString(undefined, {dateStyle: 'short', timeStyle: 'short'});
+      const button = make('button', {type: 'button'}, make('span', {textContent: `Page ${page}`}), ' ',
                           make('small', {textContent: `${count} ${count === 1 ? 'stroke' : 'strokes'}, ${when}`}));
       if (isHere) button.setAttribute('aria-current', 'page');
       button.addEventListener('click', () => (isHere ? this.close() : go(page)));
