@@ -97,7 +97,6 @@ async function start() {
     });
   };
 
-  let tool = 'pen';
   const input = new Input(canvas, {
     erasing: () => settings.get('eraser'),
     fingerDraws: () => settings.get('finger'),
@@ -107,11 +106,10 @@ async function start() {
       say('The pen draws; fingers now move the page.');
     },
     // A finger that taps beside an open panel wants to be rid of it, and leaves no dot.
-    dismisses: (kind) => ui.close() && kind === 'touch',
-    begin: (kind, sample) => {
-      tool = kind;
+    dismisses: (tool) => ui.close() && tool === 'touch',
+    begin: (tool, sample) => {
       ui.showHint(false);
-      engine.begin(settings.style(kind), sample);
+      engine.begin(settings.style(tool), sample);
       frames.now();
     },
     move: (rows, expected) => {
@@ -127,7 +125,7 @@ async function start() {
       frames.ask();
       refreshSoon();
     },
-    erase: (from, to) => {
+    erase: (tool, from, to) => {
       if (engine.erase(from[0], from[1], to[0], to[1], ERASER_REACH[tool] / view.scale) > 0) {
         frames.ask();
         frames.work();

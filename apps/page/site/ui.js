@@ -23,7 +23,8 @@ function make(tag, properties = {}, ...children) {
 /** One sentence, as people write it. */
 export const sentence = (text) => {
   const trimmed = String(text).trim();
-  const first = /^[a-z]+ /.test(trimmed) ? trimmed[0].toUpperCase() + trimmed.slice(1) : trimmed;
+  // What begins with the name of a file is left as it is.
+  const first = /^[a-z]+ [^:]*$/.test(trimmed) ? trimmed[0].toUpperCase() + trimmed.slice(1) : trimmed;
   return /[.!?]$/.test(first) ? first : `${first}.`;
 };
 
