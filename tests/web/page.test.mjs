@@ -73,7 +73,8 @@ for (const renderer of Object.keys(RENDERERS)) {
 
     test('a replay draws the page again, stops at a key, and leaves it as it was', async (t) => {
       const page = await opened(t);
-      for (const y of [100, 200]) await page.hand.stroke(wave(150, y, 300, 60));
+      page.hand.pace = 0.1;
+      for (const y of [100, 200]) await page.hand.stroke(wave(150, y, 300, 20));
       const was = await paper(page);
       await page.keyboard.press('r');
       await page.waitForTimeout(120);
@@ -171,11 +172,10 @@ describe('tools', () => {
     const page = await opened(t);
     await page.keyboard.press('t');
     await page.hand.stroke(wave(100, 100, 300));
-    await page.waitForFunction(() => /Event to draw, median \/ 99th\d/.test(document.getElementById('meter').textContent));
+    await page.waitForFunction(() => /Event to draw, median \/ 99th\d.*Strokes1/.test(document.getElementById('meter').textContent));
     const figures = await page.$$eval('#meter dd', (all) => all.map((one) => one.textContent));
     const [median, high] = figures[0].match(/[\d.]+/g).map(Number);
     assert.ok(median > 0 && high >= median, figures[0]);
-    assert.equal(figures[4], '1');
   });
 
   for (const [width, height] of [[320, 568], [360, 740], [740, 360], [1440, 900]]) {

@@ -100,6 +100,7 @@ export class Ui {
       const isControl = target.matches('input, select, button');
       const isOwn = target.matches('button') ? key === 'Space' || key === 'Enter' : isControl && !key.startsWith('Ctrl ') && key !== 'Escape';
       const id = byKey.get(key);
+      if (key === 'Ctrl c' && !getSelection()?.isCollapsed) return;  // text of the help
       if (isOwn || !id || (event.repeat && ['pencil', 'eraser', 'files', 'more', 'help'].includes(id))) return;
       event.preventDefault();
       this.run(id);
@@ -303,11 +304,11 @@ export class Ui {
   }
 
   showPages(pages, current, go) {
-    $('pages').replaceChildren(...pages.map(({page, count, last}) => {
+    $('pages').replaceChildren(...pages.map(({page, count, last, taken}) => {
       const isHere = page === current;
       const when = new Date(last).toLocaleString(undefined, {dateStyle: 'short', timeStyle: 'short'});
-      const button = make('button', {type: 'button'}, make('span', {textContent: `Page ${page}`}), ' ',
-                          make('small', {textContent: `${count} ${count === 1 ? 'stroke' : 'strokes'}, ${when}`}));
+      const button = make('button', {type: 'button', disabled: taken}, make('span', {textContent: `Page ${page}`}), ' ',
+                          make('small', {textContent: taken ? 'open in another tab' : `${count} ${count === 1 ? 'stroke' : 'strokes'}, ${when}`}));
       if (isHere) button.setAttribute('aria-current', 'page');
       button.addEventListener('click', () => (isHere ? this.close() : go(page)));
       return make('li', {}, button);
