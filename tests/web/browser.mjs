@@ -1,26 +1,19 @@
 // What the tests share: the packed page in headless Chromium, opened from a file as a double click would, and a hand.
 
 import {existsSync, mkdirSync} from 'node:fs';
-import {dirname, join} from 'node:path';
-import {fileURLToPath, pathToFileURL} from 'node:url';
+import {pathToFileURL} from 'node:url';
 import {chromium} from 'playwright-core';
+import {files, RENDERERS} from './engine-page.mjs';
 
-const top = join(dirname(fileURLToPath(import.meta.url)), '../..');
-export const outFolder = join(top, 'out/web');
+export {RENDERERS};
+export const outFolder = files.out;
 mkdirSync(outFolder, {recursive: true});
-/** The page that is tested: $QELT_PAGE, or what ./sketch web built. */
-export const pageFile = process.env.QELT_PAGE ?? join(top, 'out/pencil.html');
-if (!existsSync(pageFile)) throw new Error(`${pageFile} is missing: run ./sketch web`);
-const pageUrl = pathToFileURL(pageFile).href;
-
-/** The renderers that Chromium offers without a graphics card. */
-export const RENDERERS = {
-  swiftshader: ['--use-gl=angle', '--use-angle=swiftshader', '--enable-unsafe-swiftshader'],
-  llvmpipe: ['--use-gl=angle', '--use-angle=gl-egl', '--ignore-gpu-blocklist'],
-};
+if (!existsSync(files.page)) throw new Error(`${files.page} is not built; ./sketch web builds it.`);
+export const pageUrl = pathToFileURL(files.page).href;
 
 export const launch = (renderer = 'swiftshader', more = []) => chromium.launch({
-  executablePath: process.env.QELT_CHROMIUM ?? '/usr/bin/chromium', headless: true, args: [...RENDERERS[renderer], ...more],
+  executablePath: process.env.QELT_CHROMIUM ?? '/usr/bin/chromium', headless: true,
+  env: {...process.env, EGL_PLATFORM: 'surfaceless'}, args: [...RENDERERS[renderer], ...more],
 });
 
 /** A page of its own with nothing stored, ready to draw; what it logs as an error ends up in `errors`. */

@@ -1,10 +1,12 @@
 // Ink and pictures on their way in and out.
 
 import assert from 'node:assert/strict';
-import {readFileSync} from 'node:fs';
+import {readFileSync, writeFileSync} from 'node:fs';
+import {join} from 'node:path';
 import {after, before, describe, test} from 'node:test';
 import {deflateSync, inflateSync} from 'node:zlib';
 import {crc32, inkOfPng, writePng} from '../../apps/page/site/png.js';
+import {scratch, sketch} from './engine-page.mjs';
 import {launch, messages, openPage, paper, strokes, wave} from './browser.mjs';
 
 const INK = '<ink xmlns="http://www.w3.org/2003/InkML"><trace>10 10, 200 40, 400 300</trace></ink>';
@@ -81,7 +83,7 @@ describe('a PNG file', () => {
 
 describe('the page', () => {
   let browser;
-  before(async () => { browser = await launch(); });
+  before(async () => { browser = await launch('llvmpipe'); });
   after(() => browser.close());
   const opened = async (t, options) => {
     const page = await openPage(browser, options);
@@ -149,7 +151,18 @@ describe('the page', () => {
     assert.deepEqual(page.errors, []);
   });
 
-  test('saves ink and pictures that open again as the same strokes', async (t) => {
+  /** Whether two PNG files hold the same pixels. */
+  const alike = (page, ...pictures) => page.evaluate(async (all) => {
+    const [one, other] = await Promise.all(all.map(async (base64) => {
+      const image = await createImageBitmap(new Blob([Uint8Array.from(atob(base64), (letter) => letter.charCodeAt(0))]));
+      const paint = new OffscreenCanvas(image.width, image.height).getContext('2d');
+      paint.drawImage(image, 0, 0);
+      return [image.width, image.height, ...paint.getImageData(0, 0, image.width, image.height).data];
+    }));
+    return one.length > 100 && one.length === other.length && one.every((value, i) => value === other[i]);
+  }, pictures.map((bytes) => Buffer.from(bytes).toString('base64')));
+
+  test('saves ink and pictures that open again as the same strokes, and that qelt-sketch draws alike', async (t) => {
     const page = await opened(t);
     await page.evaluate(() => window.qeltPage.settings.set({outline: true, outlineSize: 3.5, paper: '#fbf5e6', opacity: 60, smooth: false}));
     await page.hand.stroke(wave(100, 100, 300, 40, (share) => ({tiltX: Math.round(60 * share)})));
@@ -159,8 +172,12 @@ describe('the page', () => {
     const inkml = await saved(page, /^Save ink/), image = await saved(page, /^Save picture/);
     assert.match(inkml.name, /^pencil-\d{4}-\d\d-\d\d-\d{4}\.inkml$/);
     const carried = new TextDecoder().decode(await inkOfPng(image.bytes, image.name));
-    assert.equal(carried, `${inkml.bytes}<?qelt-sketch --mode stroke --zoom 2 --background '#FBF5E6'?>\n`);
-    for (const {name, bytes} of [inkml, image]) {
+    assert.equal(carried, `${inkml.bytes}<?qelt-sketch --mode stroke --zoom 2 --background #FBF5E6?>\n`);
+    const folder = scratch(), [from, to] = ['saved.png', 'drawn.png'].map((name) => join(folder, name));
+    writeFileSync(from, image.bytes);
+    sketch('draw', from, '-o', to);
+    assert.ok(await alike(page, image.bytes, readFileSync(to)));
+    for (const {name, bytes} of [inkml, image, {name: 'drawn.png', bytes: readFileSync(to)}]) {
       await page.keyboard.press('Control+Backspace');
       await hand(page, 'drop', [[name, '', [...bytes]]]);
       await told(page, `${name}: 2 strokes opened.`);

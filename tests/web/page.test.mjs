@@ -2,7 +2,7 @@
 
 import assert from 'node:assert/strict';
 import {after, before, describe, test} from 'node:test';
-import {launch, messages, openPage, outFolder, pageFile, paper, RENDERERS, settled, strokes, wave} from './browser.mjs';
+import {launch, messages, openPage, outFolder, pageUrl, paper, RENDERERS, settled, strokes, wave} from './browser.mjs';
 import {timeline} from '../../apps/page/site/replay.js';
 
 for (const renderer of Object.keys(RENDERERS)) {
@@ -215,7 +215,7 @@ test('a browser without WebGL 2 gets one clear sentence', async (t) => {
   const browser = await launch('swiftshader', ['--disable-3d-apis']);
   t.after(() => browser.close());
   const page = await browser.newPage();
-  await page.goto(`file://${pageFile}`);
+  await page.goto(pageUrl);
   await page.waitForSelector('#sorry');
   assert.equal((await page.textContent('body')).trim(), 'This browser cannot draw here: it offers no WebGL 2.');
 });

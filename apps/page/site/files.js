@@ -24,7 +24,7 @@ function save(blob, ending) {
 /** The picture of the page, with its ink and what qelt-sketch needs to draw it alike. */
 async function pictureOf(engine, {zoom, transparent, paper}) {
   const picture = engine.picture({zoom, transparent});
-  const background = transparent ? ' --background transparent' : paper === '#ffffff' ? '' : ` --background '${paper.toUpperCase()}'`;
+  const background = transparent ? ' --background transparent' : paper === '#ffffff' ? '' : ` --background ${paper.toUpperCase()}`;
   return writePng(picture, `${engine.inkml()}<?qelt-sketch --mode stroke --zoom ${zoom}${background}?>\n`);
 }
 

@@ -60,6 +60,7 @@ function expectedAfter(event) {
 
 // A finger's stroke is given up for a second finger that lands so early.
 const EARLY = {milliseconds: 300, pixels: 24};
+const SILENT = 20_000;  // milliseconds; another pointer then ends the stroke of one that was never heard of again
 const ERASER_END = 32;  // among PointerEvent.buttons
 
 /**
@@ -85,7 +86,7 @@ export class Input {
   /** @type {Hand} */ #hand;
   /** The pointers that are down, and where. @type {Map<number, {type: string, x: number, y: number}>} */
   #down = new Map();
-  /** @type {null | {id: number, tool: string, erases: boolean, at: number[], x: number, y: number, time: number, way: number}} */
+  /** @type {null | {id: number, tool: string, erases: boolean, at: number[], x: number, y: number, time: number, way: number, heard: number}} */
   #stroke = null;
   /** The pointers that hold the page. @type {number[]} */
   #grip = [];
@@ -154,7 +155,7 @@ export class Input {
     this.#canvas.focus({preventScroll: true});
     const {pointerId: id, pointerType: type, clientX: x, clientY: y} = event;
     if (!Number.isFinite(x) || !Number.isFinite(y)) return false;
-    if (this.#stroke?.id === id) this.finish();  // its end never came
+    this.#forgetBefore(event);
     this.#down.set(id, {type, x, y});
     try {
       this.#canvas.setPointerCapture(id);
@@ -177,7 +178,8 @@ export class Input {
         return false;
       }
     }
-    if (type === 'pen') this.#grip = [];  // what lay on the page before was a palm
+    if (type !== 'touch') this.#grip = [];  // what lay on the page before was a palm
+    if (type === 'mouse' && event.button > 2) return false;  // the buttons at its side
     const moves = this.#space || event.button === 1 || event.button === 2 ||
       (type === 'touch' && !this.#hand.fingerDraws());
     if (this.#grip.length > 0) {
@@ -192,6 +194,20 @@ export class Input {
     return this.#begin(event);
   }
 
+  /** Lets go of pointers whose end never came, as this one tells. @param {PointerEvent} event */
+  #forgetBefore({pointerId, pointerType, isPrimary}) {
+    for (const [id, {type}] of this.#down) {
+      // While the first finger was still down, this one could not be the first.
+      if (id !== pointerId && !(isPrimary && type === pointerType)) continue;
+      if (this.#stroke?.id === id) this.finish();
+      this.#letGo(id);
+    }
+    if (this.#stroke && performance.now() - this.#stroke.heard > SILENT) {
+      this.#letGo(this.#stroke.id);
+      this.finish();
+    }
+  }
+
   /** @param {PointerEvent} event */
   #begin(event) {
     const sample = sampleOf(event, this.#hand.toUnits);
@@ -199,7 +215,7 @@ export class Input {
     const tool = ['pen', 'touch', 'mouse'].includes(event.pointerType) ? event.pointerType : 'pen';
     const erases = this.#hand.erasing() || event.button === 5 || (event.buttons & ERASER_END) !== 0;
     this.#stroke = {id: event.pointerId, tool, erases, at: sample, x: event.clientX, y: event.clientY,
-                    time: event.timeStamp, way: 0};
+                    time: event.timeStamp, way: 0, heard: performance.now()};
     this.#showDrawing();
     const begun = this.#hand.guard(() => {
       if (erases) this.#hand.erase(tool, sample, sample);
@@ -226,6 +242,7 @@ export class Input {
     if (stroke?.id !== event.pointerId) return false;
     const together = event.getCoalescedEvents?.() ?? [];
     const rows = rowsOf(together.length > 0 ? together : [event], this.#hand.toUnits);
+    stroke.heard = performance.now();
     if (rows.length === 0) return false;
     stroke.way = Math.max(stroke.way, finite(Math.hypot(event.clientX - stroke.x, event.clientY - stroke.y), 0));
     return this.#hand.guard(() => {

@@ -44,7 +44,7 @@ async function start() {
 
   /** Does something that may fail, at once or later; what is wrong is told, and the page goes on. */
   const failed = (error) => {
-    if (error?.name !== 'EngineError' && !(error instanceof Error)) console.error(error);
+    if (!(error instanceof Error) || error instanceof TypeError || error instanceof ReferenceError) console.error(error);
     say(error?.message ?? error, true);
   };
   const guard = (task) => {

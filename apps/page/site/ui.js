@@ -286,7 +286,10 @@ export class Ui {
   say(text, isBad = false) {
     const message = sentence(text);
     const box = $('messages');
-    for (const old of [...box.children]) if (!old.classList.contains('bad') || old.firstChild.textContent === message) old.remove();
+    for (const old of [...box.children]) {
+      if (old.classList.contains('bad') && old.firstChild.textContent === message) return;
+      if (!old.classList.contains('bad')) old.remove();
+    }
     while (box.childElementCount > 2) box.firstChild.remove();
     const note = make('p', {className: isBad ? 'bad' : ''}, make('span', {textContent: message}));
     const close = make('button', {type: 'button', ariaLabel: 'Close message', innerHTML: '<svg><use href="#i-close"/></svg>'});
