@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <cstdint>
 #include <functional>
 #include <limits>
 #include <map>
@@ -386,6 +387,34 @@ TEST(ContextSweep, LostForAWhile) {
         queue.restoreContext();
         return posts >= number;
       });
+}
+
+// What the host could not make for a drawable it makes in the next context, with nobody asking again; unless
+// it threw, or lied about a uniform.
+TEST(ContextSweep, OutlinesDrawInTheContextAfterOneInWhichCallsFailed) {
+  LogCapture log;
+  int healed = 0;
+  bool failed = true;
+  for (long number = 1; failed; ++number) {
+    PenBoard board({.size = 6.0f, .width = 96, .height = 64});
+    auto* const outline = board.pen->GetOutlineDrawableGL();
+    outline->SetOutlineSize(6.0f);
+    outline->SetCanvas(&board.canvas);
+    HostFaults::fail(number, false);
+    board.finish();
+    failed = HostFaults::open() >= number;
+    const std::vector<LogLine> lines = log.take();
+    if (std::any_of(lines.begin(), lines.end(),
+                    [](const LogLine& line) { return line.text.find("threw") != std::string::npos; }))
+      continue;
+    board.loseAndRestoreContext();
+    const Qelt::MotionEvent event = board.recorded(PenBoard::usualStroke());
+    outline->DrawOutline(&event, &board.rect);
+    const std::vector<std::uint8_t> pixels = board.pixels();
+    EXPECT_GT(std::count(pixels.begin(), pixels.end(), 255), 100) << "call " << number;
+    healed += failed ? 1 : 0;
+  }
+  EXPECT_GT(healed, 4);
 }
 
 // --- What the host may change ---

@@ -56,19 +56,6 @@ TEST(OutlinePicture, WithoutASizeTheInsideIsErasedToNothing) {
   }
 }
 
-// What could not be made without a context is made when there is one, with nobody asking for it again.
-TEST(OutlinePicture, IsDrawnInAContextThatCameAfterTheDrawable) {
-  OutlineBoard board({.version = 4, .size = 30.0f, .width = kSide, .height = kSide});
-  board.queue.loseContext();
-  board.drawable.reset(Qelt::createOutlineDrawable(4, &board.shared, &board.data));
-  board.drawable->SetCanvas(&board.canvas);
-  board.queue.finish();
-  board.queue.restoreContext();
-  board.drawable->SetOutlineSize(6.0f);
-  board.outline({{60.0f, 60.0f}});
-  EXPECT_THAT(board.pixels(), testing::Contains(255)) << "nothing was drawn";
-}
-
 // Kept: of both streams it says 1.
 TEST(Outline, NotesWhatItDoes) {
   LogCapture log;

@@ -1,10 +1,8 @@
 #include <gmock/gmock.h>
 
-#include <cmath>
 #include <string>
 #include <vector>
 
-#include "engine/MotionEvent.h"
 #include "preview/Pencil2PreviewDrawableGL.h"
 #include "support/DrawableBoard.h"
 #include "support/LogCapture.h"
@@ -12,7 +10,6 @@
 namespace QeltTests {
 namespace {
 
-using Qelt::MotionEvent;
 using Qelt::Pencil2PreviewDrawableGL;
 using testing::ElementsAre;
 using testing::IsEmpty;
@@ -77,17 +74,6 @@ TEST(Preview, FingersTakeShortMovesEveryOtherTime) {
   EXPECT_THAT(board.takeStamps(), SizeIs(40));
   board.move({{130.4f, 0.0f}});
   EXPECT_THAT(board.takeStamps(), SizeIs(40));
-}
-
-TEST(Preview, AStylusOnATouchScreenHasItsPressureReplacedInTheEvent) {
-  Panel board(panel(10.0f, true, Qelt::kSourceTouchScreen));
-  board.down({0.0f, 0.0f, 0.9f});
-  const MotionEvent move = motionEvent(Qelt::kActionMove, {{60.0f, 0.0f, 0.9f}, {120.0f, 0.0f, NAN, 1.3f}},
-                                       Qelt::kToolStylus, Qelt::kSourceTouchScreen);
-  EXPECT_TRUE(board.send(move));
-  EXPECT_EQ(move.GetHistoricalPressure(0), 0.5f);
-  EXPECT_EQ(move.GetPressure(0), 0.5f);
-  EXPECT_EQ(move.GetTilt(0), 1.0f);  // capped at 1, not at the strokes' 0.79
 }
 
 // Kept: a straight replay posts no start point, a straight stroke does.

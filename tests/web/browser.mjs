@@ -38,8 +38,9 @@ export async function openPage(browser, {size = [800, 600], hash = '', prepare =
   return page;
 }
 
-/** Dispatches trusted pointer events through the DevTools protocol, 4 ms apart by their own clock. */
+/** Dispatches trusted pointer events through the DevTools protocol, evenly apart by their own clock. */
 export class Hand {
+  pace = 0.004;  // seconds
   #page;
   #cdp;
   #seconds = null;
@@ -51,7 +52,7 @@ export class Hand {
 
   async #time() {
     this.#seconds ??= await this.#page.evaluate(() => (performance.timeOrigin + performance.now()) / 1000);
-    return (this.#seconds += 0.004);
+    return (this.#seconds += this.pace);
   }
   async mouse(type, x, y, more = {}) {
     const isDown = type !== 'mouseReleased';

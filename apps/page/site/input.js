@@ -72,7 +72,7 @@ const ERASER_END = 32;  // among PointerEvent.buttons
  * @property {(rows: number[], expected: number[]) => void} move
  * @property {(sample: Sample) => void} end
  * @property {() => void} cancel
- * @property {(from: number[], to: number[]) => void} erase
+ * @property {(tool: string, from: number[], to: number[]) => void} erase
  * @property {(keep: boolean) => void} eraseEnd
  * @property {(before: number[][], after: number[][]) => void} grip   fingers that hold the page, before and after
  * @property {(x: number, y: number) => [number, number]} toUnits
@@ -202,7 +202,7 @@ export class Input {
                     time: event.timeStamp, way: 0};
     this.#showDrawing();
     const begun = this.#hand.guard(() => {
-      if (erases) this.#hand.erase(sample, sample);
+      if (erases) this.#hand.erase(tool, sample, sample);
       else this.#hand.begin(tool, sample);
     });
     if (!begun) this.cancel();
@@ -231,7 +231,7 @@ export class Input {
     return this.#hand.guard(() => {
       if (stroke.erases) {
         for (const row of rows) {
-          this.#hand.erase(stroke.at, row);
+          this.#hand.erase(stroke.tool, stroke.at, row);
           stroke.at = row;
         }
       } else {
@@ -260,7 +260,7 @@ export class Input {
     if (sample) {
       // A lifted pen reports no pressure and sometimes no tilt; its place and time count.
       const [, , pressure, tilt, orientation] = stroke.at;
-      if (stroke.erases) this.#hand.guard(() => this.#hand.erase(stroke.at, sample));
+      if (stroke.erases) this.#hand.guard(() => this.#hand.erase(stroke.tool, stroke.at, sample));
       stroke.at = [sample[0], sample[1], pressure, tilt, orientation, sample[5]];
     }
     this.finish();

@@ -38,8 +38,8 @@ async function start() {
   const say = (text, isBad = false) => (ui ? ui.say(text, isBad) : early.push([text, isBad]));
   let engine = null;
   const store = new Store((id) => engine.record(id), say);
-  const wanted = /^#page=([1-9]\d{0,8})$/.exec(location.hash);
-  const stored = store.open(wanted ? Number(wanted[1]) : null);
+  const wanted = /^#page=(new|[1-9]\d{0,8})$/.exec(location.hash)?.[1] ?? null;
+  const stored = store.open(wanted === null || wanted === 'new' ? wanted : Number(wanted));
   engine = await openEngine(canvas);
 
   /** Does something that may fail, at once or later; what is wrong is told, and the page goes on. */
@@ -97,7 +97,6 @@ async function start() {
     });
   };
 
-  let tool = 'pen';
   const input = new Input(canvas, {
     erasing: () => settings.get('eraser'),
     fingerDraws: () => settings.get('finger'),
@@ -107,11 +106,10 @@ async function start() {
       say('The pen draws; fingers now move the page.');
     },
     // A finger that taps beside an open panel wants to be rid of it, and leaves no dot.
-    dismisses: (kind) => ui.close() && kind === 'touch',
-    begin: (kind, sample) => {
-      tool = kind;
+    dismisses: (tool) => ui.close() && tool === 'touch',
+    begin: (tool, sample) => {
       ui.showHint(false);
-      engine.begin(settings.style(kind), sample);
+      engine.begin(settings.style(tool), sample);
       frames.now();
     },
     move: (rows, expected) => {
@@ -127,7 +125,7 @@ async function start() {
       frames.ask();
       refreshSoon();
     },
-    erase: (from, to) => {
+    erase: (tool, from, to) => {
       if (engine.erase(from[0], from[1], to[0], to[1], ERASER_REACH[tool] / view.scale) > 0) {
         frames.ask();
         frames.work();
@@ -157,10 +155,9 @@ async function start() {
   }, () => ({zoom: settings.get('pictureZoom'), transparent: settings.get('transparent'), paper: settings.get('paper')}));
   const chooser = /** @type {HTMLInputElement} */ (document.getElementById('file'));
 
-  const goTo = (page) => {
-    location.hash = `page=${page}`;
-    location.reload();
-  };
+  // The address says which page it is; another address is another page.
+  const goTo = (page) => { location.hash = `page=${page}`; };
+  window.addEventListener('hashchange', () => location.reload());
   const still = () => !input.drawing && !replay.running;
   const hasInk = () => still() && engine.stats().strokes > 0;
   const step = (dx, dy) => () => view.pan(dx * view.width / 8, dy * view.height / 8);
@@ -175,7 +172,7 @@ async function start() {
     savePicture: {label: 'Save picture', keys: ['Ctrl Shift s'], can: hasInk, run: () => files.savePicture()},
     copyPicture: {label: 'Copy picture', keys: ['Ctrl c'], can: hasInk,
                   run: () => files.copyPicture().then(() => say('The picture is on the clipboard.'))},
-    newPage: {label: 'New page', can: still, run: async () => goTo(Math.max(store.page, ...(await store.pages()).map(({page}) => page)) + 1)},
+    newPage: {label: 'New page', can: still, run: () => goTo('new')},
     fit: {label: 'Show the whole page', keys: ['f'], run: () => view.fit(engine.bounds())},
     actualSize: {label: 'Actual size', keys: ['0'], run: () => view.zoom(1 / view.scale)},
     zoomIn: {label: 'Zoom in', keys: ['+', '='], run: () => view.zoom(Math.SQRT2)},

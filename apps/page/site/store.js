@@ -29,18 +29,26 @@ function openDatabase() {
   });
 }
 
-/** Keeps the page for this tab until it is closed, however that happens; false when another tab has it. */
-function keepPage(page, patience) {
+const lockOf = (page) => `${DATABASE}-${page}`;
+
+/**
+ * Keeps the page for this tab until it is closed, however that happens; false when another tab has it, and still has
+ * it after `patience` milliseconds.
+ */
+async function keepPage(page, patience = 0) {
   // Without locks two tabs may show one page. Their strokes still have keys of their own, and are both there next time.
-  if (!navigator.locks) return Promise.resolve(true);
-  return new Promise((resolve) => {
-    const waiting = new AbortController();
-    setTimeout(() => waiting.abort(), patience);
-    navigator.locks.request(`${DATABASE}-${page}`, {signal: waiting.signal}, () => {
-      resolve(true);
-      return new Promise(() => {});
+  if (!navigator.locks) return true;
+  const ask = (options) => new Promise((resolve) => {
+    navigator.locks.request(lockOf(page), options, (lock) => {
+      resolve(lock !== null);
+      return lock && new Promise(() => {});
     }).catch((error) => resolve(error?.name !== 'AbortError'));
   });
+  if (await ask({ifAvailable: true})) return true;
+  if (patience === 0) return false;
+  const waiting = new AbortController();
+  setTimeout(() => waiting.abort(), patience);
+  return ask({signal: waiting.signal});
 }
 
 /** Every page that has strokes, the last drawn on first. */
@@ -87,7 +95,7 @@ export class Store {
   /**
    * Opens the page that is wanted, or else the one last drawn on that no other tab has, or else an empty one. Answers
    * with its strokes, the lowest first. Where there is no storage it says so, and answers with none.
-   * @param {number | null} wanted
+   * @param {number | 'new' | null} wanted
    * @returns {Promise<{key: number[], bytes: Uint8Array}[]>}
    */
   async open(wanted) {
@@ -102,13 +110,16 @@ export class Store {
       database.onclose = () => { this.#database = null; this.#refused('it was closed'); };
       const pages = await pagesIn(database);
       const free = async () => {
-        // A tab that is just reloading may need a moment to let go of its page.
-        if (wanted !== null && await keepPage(wanted, 700)) return wanted;
+        if (typeof wanted === 'number') {
+          // A tab that is just reloading may need a moment to let go of its page.
+          if (await keepPage(wanted, 700)) return wanted;
+          this.#tell(`Page ${wanted} is open in another tab; this is a new page.`, false);
+        }
         if (wanted === null) {
-          for (const {page} of pages) if (await keepPage(page, 150)) return page;
+          for (const {page} of pages) if (await keepPage(page)) return page;
         }
         let next = Math.max(0, ...pages.map(({page}) => page)) + 1;
-        while (!(await keepPage(next, 150))) ++next;
+        while (!(await keepPage(next))) ++next;
         return next;
       };
       this.page = await free();
@@ -203,7 +214,11 @@ export class Store {
   /** Whether closing the tab would lose something. */
   get owes() { return this.#fails || (!this.#database && this.#keys.size > 0); }
 
+  /** Every page with strokes, the last drawn on first, and whether another tab has it. */
   async pages() {
-    return this.#database ? pagesIn(this.#database) : [];
+    if (!this.#database) return [];
+    const [pages, locks] = await Promise.all([pagesIn(this.#database), navigator.locks?.query()]);
+    const held = new Set(locks?.held?.map(({name}) => name));
+    return pages.map((one) => ({...one, taken: one.page !== this.page && held.has(lockOf(one.page))}));
   }
 }

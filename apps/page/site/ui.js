@@ -23,7 +23,8 @@ function make(tag, properties = {}, ...children) {
 /** One sentence, as people write it. */
 export const sentence = (text) => {
   const trimmed = String(text).trim();
-  const first = /^[a-z]+ /.test(trimmed) ? trimmed[0].toUpperCase() + trimmed.slice(1) : trimmed;
+  // What begins with the name of a file is left as it is.
+  const first = /^[a-z]+ [^:]*$/.test(trimmed) ? trimmed[0].toUpperCase() + trimmed.slice(1) : trimmed;
   return /[.!?]$/.test(first) ? first : `${first}.`;
 };
 
@@ -99,6 +100,7 @@ export class Ui {
       const isControl = target.matches('input, select, button');
       const isOwn = target.matches('button') ? key === 'Space' || key === 'Enter' : isControl && !key.startsWith('Ctrl ') && key !== 'Escape';
       const id = byKey.get(key);
+      if (key === 'Ctrl c' && !getSelection()?.isCollapsed) return;  // text of the help
       if (isOwn || !id || (event.repeat && ['pencil', 'eraser', 'files', 'more', 'help'].includes(id))) return;
       event.preventDefault();
       this.run(id);
@@ -302,11 +304,11 @@ export class Ui {
   }
 
   showPages(pages, current, go) {
-    $('pages').replaceChildren(...pages.map(({page, count, last}) => {
+    $('pages').replaceChildren(...pages.map(({page, count, last, taken}) => {
       const isHere = page === current;
       const when = new Date(last).toLocaleString(undefined, {dateStyle: 'short', timeStyle: 'short'});
-      const button = make('button', {type: 'button'}, make('span', {textContent: `Page ${page}`}), ' ',
-                          make('small', {textContent: `${count} ${count === 1 ? 'stroke' : 'strokes'}, ${when}`}));
+      const button = make('button', {type: 'button', disabled: taken}, make('span', {textContent: `Page ${page}`}), ' ',
+                          make('small', {textContent: taken ? 'open in another tab' : `${count} ${count === 1 ? 'stroke' : 'strokes'}, ${when}`}));
       if (isHere) button.setAttribute('aria-current', 'page');
       button.addEventListener('click', () => (isHere ? this.close() : go(page)));
       return make('li', {}, button);
