@@ -181,7 +181,9 @@ describe('tools', () => {
   for (const [width, height] of [[320, 568], [360, 740], [740, 360], [1440, 900]]) {
     for (const colorScheme of ['light', 'dark']) {
       test(`fit a window of ${width} by ${height}, ${colorScheme}`, async (t) => {
-        const page = await opened(t, {size: [width, height], colorScheme, hasTouch: width < 1000});
+        const deviceScaleFactor = width < 1000 ? 2 : 1;
+        const page = await opened(t, {size: [width, height], colorScheme, hasTouch: width < 1000, deviceScaleFactor});
+        assert.equal(await page.evaluate(() => document.getElementById('paper').width), width * deviceScaleFactor);
         for (let i = 0; i < 4; ++i) {
           await page.hand.stroke(wave(width * 0.25, 60 + height / 7 * i, width * 0.6, 30, (share) => ({tiltX: Math.round(12 * i * share)})));
         }

@@ -209,10 +209,13 @@ async function start() {
     frames.now();  // a canvas of a new size is blank until it is drawn on
   });
   const watch = new ResizeObserver(([entry]) => {
-    const box = entry.devicePixelContentBoxSize?.[0];
-    const css = entry.contentRect;
-    const now = devicePixelRatio || 1;
-    resize(Math.max(1, box?.inlineSize ?? Math.round(css.width * now)), Math.max(1, box?.blockSize ?? Math.round(css.height * now)));
+    const exact = entry.devicePixelContentBoxSize?.[0];
+    const pixels = (css, box) => {
+      const about = css * (devicePixelRatio || 1);
+      // The exact size is how the browser rounded. Where a device is only emulated it is something else.
+      return Math.max(1, Math.abs(box - about) < 1 ? box : Math.round(about));
+    };
+    resize(pixels(entry.contentRect.width, exact?.inlineSize), pixels(entry.contentRect.height, exact?.blockSize));
   });
   canvas.addEventListener('webglcontextlost', (event) => {
     event.preventDefault();  // so that it is given back
