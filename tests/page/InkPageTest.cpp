@@ -126,6 +126,36 @@ INSTANTIATE_TEST_SUITE_P(Looks, PageOfLook,
                                   (one.param.hasOutline ? "Outlined" : "");
                          });
 
+// What a pen remembers of a stroke must not reach into one of another look, on the page or in the program.
+TEST_F(PageOf, MixedLooksAreAsTheProgramDrawsThem) {
+  InkPage page(plugin(), mQueue, kWidth, kHeight);
+  QeltDesktop::Page ink;
+  int number = 0;
+  for (const std::vector<Sample>& samples : severalLines()) {
+    PageStyle style;
+    style.look = number % 3 == 0 ? 4 : 8;
+    style.smooth = number++ % 2 == 0;
+    style.size = 3.0f;
+    style.outline = {2.0f, 0xFF00A0FFu};
+    drawWhole(page, style, samples);
+    ink.strokes.add(samples, {.width = style.size,
+                              .rgb = 0u,
+                              .transparency = std::uint8_t{0},
+                              .renderingVersion = style.look,
+                              .curve = style.smooth,
+                              .outlineSize = style.outline->size,
+                              .outlineArgb = style.outline->argb});
+  }
+  QeltDesktop::Options options;
+  options.mode = QeltDesktop::Mode::Stroke;
+  options.background.transparent = true;
+  QeltDesktop::Progress progress("drawing stroke", 1);
+  const auto expected = QeltDesktop::drawPage(plugin(), mQueue, ink, options,
+                                              QeltDesktop::layOut({0, 0, kWidth, kHeight}, 1.0f, 0.0f),
+                                              drawablesFor(ink, options), progress);
+  EXPECT_EQ(differing(page.windowPicture(), {expected.width, expected.height, expected.rgba}), 0u);
+}
+
 TEST_F(PageOf, PreviewIsTheProgramsSampleStroke) {
   InkPage page(plugin(), mQueue, 64, 64);
   PageStyle style;

@@ -376,6 +376,7 @@ TEST_F(Program, DrawsEachStrokeWithItsOwnSettingsUnlessAskedOtherwise) {
   const std::string size = setting("outlineSize", "3"), color = setting("outlineColor", "#FF00FF00");
   write("plain.inkml", threeStrokes("", "", ""));
   write("own.inkml", threeStrokes(setting("renderingVersion", "3"), setting("curve", "false"), size + color));
+  write("kinds.inkml", threeStrokes(setting("renderingVersion", "3"), setting("curve", "false"), ""));
   // The calls of one stroke.
   const auto calls = [&](const std::string& ink, const std::string& options, int stroke) {
     std::string found;
@@ -392,7 +393,7 @@ TEST_F(Program, DrawsEachStrokeWithItsOwnSettingsUnlessAskedOtherwise) {
     for (int stroke = 0; stroke < 3; ++stroke)
       EXPECT_EQ(calls("own.inkml", asked + " --curve", stroke), calls("plain.inkml", asked, stroke)) << mode;
     const std::string outlines = mode + " --drawable outline", green = " --outline 3,#FF00FF00";
-    EXPECT_EQ(calls("own.inkml", outlines, 2), calls("plain.inkml", outlines + green, 2));
+    EXPECT_EQ(calls("own.inkml", outlines, 2), calls("kinds.inkml", outlines + green, 2));
     EXPECT_EQ(calls("own.inkml", outlines, 0), calls("plain.inkml", outlines + " --rendering-version 3", 0));
   }
   expectHas(trace("", "own.inkml")[0], {{"renderingVersion", 3}, {"curve", true}});

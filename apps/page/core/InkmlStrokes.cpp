@@ -14,17 +14,13 @@ namespace QeltDesktop {
 PageStyle styleOf(const Stroke& stroke, const PenLimits& own) {
   const Options none;
   const PenStyle asDrawn = styleFor(stroke.brush, {own.size, own.argb}, none);
+  const PenKind kind = penKindFor(stroke.brush, none);
   PageStyle style;
-  style.look = renderingVersionFor(stroke.brush, none);
-  style.smooth = curveFor(stroke.brush, none);
-  if (const auto outline = outlineFor(stroke.brush, none))
-    style.outline = PageOutline{outline->size, outline->argb};
   style.size = asDrawn.size;
   style.argb = asDrawn.argb;
-  style.look = renderingVersionFor(stroke.brush, Options());
-  style.smooth = curveFor(stroke.brush, Options());
-  if (const auto outline = outlineFor(stroke.brush, Options()))
-    style.outline = {outline->size, outline->argb};
+  style.look = kind.renderingVersion;
+  style.smooth = kind.curve;
+  if (const auto outline = outlineFor(stroke.brush, none)) style.outline = {outline->size, outline->argb};
   const int tool = stroke.tool.value_or(Qelt::kToolStylus);
   // A pen draws every other tool as it draws a stylus.
   style.tool = tool == Qelt::kToolFinger || tool == Qelt::kToolMouse ? tool : Qelt::kToolStylus;

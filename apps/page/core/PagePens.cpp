@@ -60,16 +60,14 @@ class PagePens::Pen {
  public:
   Pen(const PluginLibrary& plugin, RenderQueue& queue, const PageStyle& style)
       : mCanvas(&queue, nullptr),
-        mSession(plugin, queue, style.look),
+        mSession(plugin, queue, {style.look, style.smooth}),
         mStroke(mSession.pen().GetStrokeDrawableGL()) {
-    mSession.setCurve(style.smooth);
     if (mStroke == nullptr) throw std::bad_alloc();
   }
 
   void draw(const PageStroke& stroke, const PageCanvas& canvas) {
     const PageStyle& style = stroke.style();
     mSession.setStyle({style.size, style.argb});
-    mSession.setCurve(style.smooth);
     mCanvas.setLayer(canvas.strokes);
     mCanvas.setMatrix(matrixOf(canvas.view));
     if (mStroke->GetCanvas() == nullptr) mStroke->SetCanvas(&mCanvas);
@@ -90,9 +88,8 @@ class PagePens::OutlinePen {
  public:
   OutlinePen(const PluginLibrary& plugin, RenderQueue& queue, const PageStyle& style)
       : mCanvas(&queue, nullptr),
-        mSession(plugin, queue, style.look),
+        mSession(plugin, queue, {style.look, style.smooth}),
         mOutline(mSession.pen().GetOutlineDrawableGL()) {
-    mSession.setCurve(style.smooth);
     if (mOutline == nullptr) throw std::bad_alloc();
   }
 
@@ -107,7 +104,6 @@ class PagePens::OutlinePen {
     mBefore = 0;
     const PageStyle& style = stroke.style();
     mSession.setStyle({style.size, style.argb});
-    mSession.setCurve(style.smooth);
     mOutline->SetOutlineSize(style.outline->size);
     mOutline->SetOutlineColor(static_cast<int>(style.outline->argb));
     // The canvas has a layer when the drawable is given it, and prepares to draw.
@@ -204,8 +200,7 @@ PenLimits PagePens::limits(int look) {
 void PagePens::drawPreview(const PageStyle& style, CanvasLayer& layer, const PageView& view) {
   PenCanvas canvas(&mQueue, &layer);
   canvas.setMatrix(matrixOf(view));
-  PenSession session(mPlugin, mQueue, style.look);
-  session.setCurve(style.smooth);
+  PenSession session(mPlugin, mQueue, {style.look, style.smooth});
   session.setStyle({style.size, style.argb});
   Qelt::PenPreviewDrawableGL* const preview = session.pen().GetPreviewDrawableGL();
   if (preview == nullptr) throw std::bad_alloc();

@@ -41,9 +41,8 @@ class WetInk::Pen {
   Pen(const PluginLibrary& plugin, RenderQueue& queue, const PageStyle& style)
       : mInkCanvas(&queue, nullptr),
         mPredictionCanvas(&queue, nullptr),
-        mSession(plugin, queue, style.look),
+        mSession(plugin, queue, {style.look, style.smooth}),
         mStroke(mSession.pen().GetStrokeDrawableGL()) {
-    mSession.setCurve(style.smooth);
     if (mStroke == nullptr) throw std::bad_alloc();
     if (!versionOf(style).predicts) return;
     mPrediction = mSession.pen().GetPredictionStrokeDrawableGL();
@@ -54,7 +53,6 @@ class WetInk::Pen {
   // Before a call.
   void aim(const PageStyle& style, const PageView& view, CanvasLayer* ink, CanvasLayer* prediction) {
     mSession.setStyle({style.size, style.argb});
-    mSession.setCurve(style.smooth);
     aim(mStroke, mInkCanvas, view, ink);
     aim(mPrediction, mPredictionCanvas, view, prediction);
   }

@@ -123,14 +123,14 @@ void draw(const Options& asked) {
 // It tells how the first stroke is drawn.
 std::string traceHeader(const PenSet& pens, const Page& page, const Options& options) {
   const Brush brush = page.strokes.front().brush;
-  const int version = renderingVersionFor(brush, options);
-  const PenStyle style = styleFor(brush, pens.of(version).ownStyle(), options);
-  std::string line = R"({"kind":"header","renderingVersion":)" + std::to_string(version);
+  const PenKind kind = penKindFor(brush, options);
+  const PenStyle style = styleFor(brush, pens.of(kind).ownStyle(), options);
+  std::string line = R"({"kind":"header","renderingVersion":)" + std::to_string(kind.renderingVersion);
   line += R"(,"size":)";
   appendJson(line, style.size);
   line += R"(,"color":")" + formatArgb(style.argb);
   line += R"(","curve":)";
-  line += curveFor(brush, options) ? "true" : "false";
+  line += kind.curve ? "true" : "false";
   line += R"(,"mode":")";
   line += nameOf(options.mode);
   line += R"(","drawable":")";
@@ -280,7 +280,7 @@ void info(const Options& options) {
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
   std::printf("GL renderer  %s\n", queue.rendererName().c_str());
 
-  PenSession session(plugin, queue, kUsualRenderingVersion);
+  PenSession session(plugin, queue, {kUsualRenderingVersion, kUsualCurve});
   const PenStyle& style = session.ownStyle();
   std::printf("pen size     %g to %g, a new pen has %g\n", static_cast<double>(session.pen().GetMinSize()),
               static_cast<double>(session.pen().GetMaxSize()), static_cast<double>(style.size));

@@ -153,7 +153,7 @@ float largestPenSize(const PluginLibrary& plugin, RenderQueue& queue, const Page
   const PenSet pens(plugin, queue, page, options);
   float largest = 0.0f;
   for (const Stroke& stroke : page.strokes) {
-    const PenStyle& own = pens.of(renderingVersionFor(stroke.brush, options)).ownStyle();
+    const PenStyle& own = pens.of(penKindFor(stroke.brush, options)).ownStyle();
     largest = std::fmax(largest, styleFor(stroke.brush, own, options).size);
   }
   return largest;

@@ -44,10 +44,10 @@ void QueueWatch::finish() {
 PagePlayer::PagePlayer(const PenSet& pens, const Page& page, const Options& options, const Canvases& canvases)
     : mPage(page), mOptions(options) {
   using Qelt::Pen;
-  for (const auto& [version, session] : pens.sessions()) {
+  for (const auto& [kind, session] : pens.sessions()) {
     Pen& pen = session->pen();
     Drawables drawables{
-        .renderingVersion = version,
+        .renderingVersion = kind.renderingVersion,
         .session = session.get(),
         .stroke = drawableOn(canvases.stroke, pen, &Pen::GetStrokeDrawableGL, DrawableKind::Stroke),
         .outline = drawableOn(canvases.outline, pen, &Pen::GetOutlineDrawableGL, DrawableKind::Outline),
@@ -61,7 +61,7 @@ PagePlayer::PagePlayer(const PenSet& pens, const Page& page, const Options& opti
                               static_cast<std::uint32_t>(drawables.outline->GetOutlineColor())};
     }
     if (drawables.prediction != nullptr) drawables.prediction->SetOpacity(options.opacity);
-    mDrawables.emplace(version, drawables);
+    mDrawables.emplace(kind, drawables);
   }
   if (options.mode == Mode::Stroke) {
     for (std::size_t i = 0; i < page.strokes.size(); ++i) {
@@ -94,9 +94,8 @@ void PagePlayer::play(PlayObserver& observer) {
 
 void PagePlayer::playStroke(std::size_t index, PlayObserver& observer) {
   const Brush brush = mPage.strokes[index].brush;
-  mNow = &mDrawables.at(renderingVersionFor(brush, mOptions));
+  mNow = &mDrawables.at(penKindFor(brush, mOptions));
   mNow->session->setStyle(styleFor(brush, mNow->session->ownStyle(), mOptions));
-  mNow->session->setCurve(curveFor(brush, mOptions));
   if (mOptions.mode == Mode::Stroke) {
     playStored(index, observer);
     return;

@@ -113,7 +113,7 @@ class PagePlayer {
 
   const Page& mPage;
   const Options& mOptions;
-  std::map<int, Drawables> mDrawables;                        // by rendering version
+  std::map<PenKind, Drawables> mDrawables;
   Drawables* mNow = nullptr;                                  // those of the stroke that is being played
   std::vector<std::unique_ptr<StoredStroke>> mStoredStrokes;  // one per stroke, in stroke mode; else empty
   std::vector<std::size_t> mCachedBytesOf;                    // of each stored stroke

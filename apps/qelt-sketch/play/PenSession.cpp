@@ -40,15 +40,19 @@ std::optional<OutlineOptions> outlineFor(const Brush& brush, const Options& opti
   return OutlineOptions{*brush.outlineSize, brush.outlineArgb.value_or(0xFF000000u)};
 }
 
-PenSession::PenSession(const PluginLibrary& plugin, RenderQueue& queue, int renderingVersion)
+PenKind penKindFor(const Brush& brush, const Options& options) {
+  return {renderingVersionFor(brush, options), curveFor(brush, options)};
+}
+
+PenSession::PenSession(const PluginLibrary& plugin, RenderQueue& queue, const PenKind& kind)
     : mQueue(queue), mDataManager(&queue), mPen(plugin.createPen()), mOwnStyle{} {
   if (!mPen) throw Refusal(plugin.path() + ": the plug-in makes no pen");
   mPen->setPenDataManager(&mDataManager);
   mPen->SetScreenResolution(kScreenWidth, kScreenHeight);
-  mPen->setVersion(renderingVersion);
+  mPen->setVersion(kind.renderingVersion);
   mOwnStyle = {mPen->GetSize(), static_cast<std::uint32_t>(mPen->GetColor())};
   Qelt::IPenMorphable* const morphable = mPen->GetMorphable();
-  if (morphable != nullptr) morphable->SetCurveEnabled(mCurve);
+  if (morphable != nullptr) morphable->SetCurveEnabled(kind.curve);
 }
 
 PenSession::~PenSession() {
@@ -61,18 +65,11 @@ void PenSession::setStyle(const PenStyle& style) {
   mPen->SetColor(static_cast<int>(style.argb));
 }
 
-void PenSession::setCurve(bool curve) {
-  if (curve == mCurve) return;
-  mCurve = curve;
-  Qelt::IPenMorphable* const morphable = mPen->GetMorphable();
-  if (morphable != nullptr) morphable->SetCurveEnabled(curve);
-}
-
 PenSet::PenSet(const PluginLibrary& plugin, RenderQueue& queue, const Page& page, const Options& options) {
   for (const Stroke& stroke : page.strokes) {
-    const int version = renderingVersionFor(stroke.brush, options);
-    std::unique_ptr<PenSession>& session = mSessions[version];
-    if (!session) session = std::make_unique<PenSession>(plugin, queue, version);
+    const PenKind kind = penKindFor(stroke.brush, options);
+    std::unique_ptr<PenSession>& session = mSessions[kind];
+    if (!session) session = std::make_unique<PenSession>(plugin, queue, kind);
   }
 }
 

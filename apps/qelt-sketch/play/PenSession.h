@@ -1,5 +1,6 @@
 #pragma once
 
+#include <compare>
 #include <cstdint>
 #include <map>
 #include <memory>
@@ -31,12 +32,22 @@ int renderingVersionFor(const Brush& brush, const Options& options);
 bool curveFor(const Brush& brush, const Options& options);
 std::optional<OutlineOptions> outlineFor(const Brush& brush, const Options& options);
 
+// What a pen is made for. Strokes of different kinds are drawn by different pens, since what a pen remembers
+// of one stroke reaches into the next: its grain, and the width that an outline begins with.
+struct PenKind {
+  int renderingVersion;  // any number: the pen knows what to do
+  bool curve;            // smooth segments
+
+  auto operator<=>(const PenKind&) const = default;
+};
+PenKind penKindFor(const Brush& brush, const Options& options);
+
 // One pen of the plug-in, set up as a host does it, and its way to the render thread. Main thread. The queue,
 // and every canvas that one of the pen's drawables was given, outlive it.
 class PenSession {
  public:
   // Throws Refusal when the plug-in makes no pen.
-  PenSession(const PluginLibrary& plugin, RenderQueue& queue, int renderingVersion);
+  PenSession(const PluginLibrary& plugin, RenderQueue& queue, const PenKind& kind);
   // Deletes the pen and waits for its last tasks.
   ~PenSession();
   PenSession(const PenSession&) = delete;
@@ -45,30 +56,28 @@ class PenSession {
   Qelt::Pen& pen() { return *mPen; }
   // The style of a new pen.
   const PenStyle& ownStyle() const { return mOwnStyle; }
-  // These apply to the strokes from now on.
+  // Applies to the strokes from now on.
   void setStyle(const PenStyle& style);
-  void setCurve(bool curve);
 
  private:
   RenderQueue& mQueue;
   PenDataManager mDataManager;
   std::unique_ptr<Qelt::Pen> mPen;
   PenStyle mOwnStyle;
-  bool mCurve = kUsualCurve;
 };
 
-// A pen for each rendering version in which strokes of a page are drawn. Like a session, and as long-lived.
+// A pen for each kind of which a page has strokes. Like a session, and as long-lived.
 class PenSet {
  public:
   // Throws Refusal when the plug-in makes no pen.
   PenSet(const PluginLibrary& plugin, RenderQueue& queue, const Page& page, const Options& options);
 
-  const std::map<int, std::unique_ptr<PenSession>>& sessions() const { return mSessions; }
-  // Of the version in which a stroke of the page is drawn.
-  PenSession& of(int renderingVersion) const { return *mSessions.at(renderingVersion); }
+  const std::map<PenKind, std::unique_ptr<PenSession>>& sessions() const { return mSessions; }
+  // Of a stroke of the page.
+  PenSession& of(const PenKind& kind) const { return *mSessions.at(kind); }
 
  private:
-  std::map<int, std::unique_ptr<PenSession>> mSessions;
+  std::map<PenKind, std::unique_ptr<PenSession>> mSessions;
 };
 
 }  // namespace QeltDesktop
