@@ -158,8 +158,10 @@ async function start() {
   // The address says which page it is; another address is another page.
   const goTo = (page) => { location.hash = `page=${page}`; };
   window.addEventListener('hashchange', () => location.reload());
+  let isLost = false;  // the context, for a moment; strokes are taken, but nothing else can be drawn
   const still = () => !input.drawing && !replay.running;
   const hasInk = () => still() && engine.stats().strokes > 0;
+  const canDraw = () => !isLost && hasInk();
   const step = (dx, dy) => () => view.pan(dx * view.width / 8, dy * view.height / 8);
   ui = new Ui(settings, engine, {
     undo: {label: 'Undo', keys: ['Ctrl z', 'u'], can: () => still() && engine.canUndo, run: () => changed(engine.undo())},
@@ -169,8 +171,8 @@ async function start() {
     // The browser's own paste brings files; it needs no leave to read the clipboard.
     paste: {label: 'Paste', can: still, run: () => files.paste()},
     saveInk: {label: 'Save ink', keys: ['Ctrl s'], can: hasInk, run: () => files.saveInk()},
-    savePicture: {label: 'Save picture', keys: ['Ctrl Shift s'], can: hasInk, run: () => files.savePicture()},
-    copyPicture: {label: 'Copy picture', keys: ['Ctrl c'], can: hasInk,
+    savePicture: {label: 'Save picture', keys: ['Ctrl Shift s'], can: canDraw, run: () => files.savePicture()},
+    copyPicture: {label: 'Copy picture', keys: ['Ctrl c'], can: canDraw,
                   run: () => files.copyPicture().then(() => say('The picture is on the clipboard.'))},
     newPage: {label: 'New page', can: still, run: () => goTo('new')},
     fit: {label: 'Show the whole page', keys: ['f'], run: () => view.fit(engine.bounds())},
@@ -181,14 +183,14 @@ async function start() {
     right: {label: 'Move the page', keys: ['ArrowRight'], run: step(-1, 0)},
     up: {label: 'Move the page', keys: ['ArrowUp'], run: step(0, 1)},
     down: {label: 'Move the page', keys: ['ArrowDown'], run: step(0, -1)},
-    replay: {label: 'Replay', keys: ['r'], can: hasInk, run: () => replay.start()},
+    replay: {label: 'Replay', keys: ['r'], can: canDraw, run: () => replay.start()},
     thinner: {label: 'Thinner', keys: ['['], run: () => settings.set({size: settings.get('size') / 1.2})},
     thicker: {label: 'Thicker', keys: [']'], run: () => settings.set({size: settings.get('size') * 1.2})},
     ...Object.fromEntries([1, 2, 3, 4, 5, 6, 7, 8].map((look) => [`look${look}`, {
       label: `Look ${look}`, family: 'Look', keys: [String(look)], run: () => settings.set({look}),
     }])),
     measure: {label: 'Measurements', keys: ['t'], run: () => settings.set({measure: !settings.get('measure')})},
-  }, guard);
+  }, guard, () => !isLost);
   for (const [text, isBad] of early) ui.say(text, isBad);
   ui.opened = (id) => {
     if (id !== 'files') return;
@@ -219,12 +221,14 @@ async function start() {
   });
   canvas.addEventListener('webglcontextlost', (event) => {
     event.preventDefault();  // so that it is given back
+    isLost = true;
     guard(() => engine.contextLost());
   });
   canvas.addEventListener('webglcontextrestored', () => {
-    guard(() => engine.contextRestored());
+    isLost = !guard(() => engine.contextRestored());
     frames.ask();
     frames.work();
+    ui.refresh();
   });
 
   // The page as it was left.

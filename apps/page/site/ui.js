@@ -52,10 +52,12 @@ export class Ui {
   #engine;
   /** @type {Record<string, Command>} */ #commands;
   #guard;
+  #canDraw;
   #previewAsked = false;
 
-  /** @param {import('#page/settings.js').Settings} settings */
-  constructor(settings, engine, commands, guard) {
+  /** @param {import('#page/settings.js').Settings} settings @param {() => boolean} canDraw false while the context is lost */
+  constructor(settings, engine, commands, guard, canDraw) {
+    this.#canDraw = canDraw;
     this.#settings = settings;
     this.#engine = engine;
     this.#commands = {
@@ -271,7 +273,7 @@ export class Ui {
       const canvas = $('preview');
       const ratio = devicePixelRatio || 1;
       const width = Math.round(canvas.clientWidth * ratio), height = Math.round(canvas.clientHeight * ratio);
-      if (width < 1 || height < 1) return;
+      if (width < 1 || height < 1 || !this.#canDraw()) return;
       this.#guard(() => {
         const {data} = this.#engine.preview(width, height, this.#settings.style('pen'));
         Object.assign(canvas, {width, height});
