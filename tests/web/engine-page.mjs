@@ -6,6 +6,7 @@ import {existsSync, mkdirSync, mkdtempSync, readFileSync, rmSync, writeFileSync}
 import {tmpdir} from 'node:os';
 import {dirname, join} from 'node:path';
 import {fileURLToPath, pathToFileURL} from 'node:url';
+import {gzipSync} from 'node:zlib';
 import {chromium} from 'playwright-core';
 
 const top = join(dirname(fileURLToPath(import.meta.url)), '..', '..');
@@ -104,9 +105,11 @@ export class Tab {
 export function bareEnginePage(folder) {
   if (!existsSync(files.engine)) throw new Error(`${files.engine} is not built; ./sketch web builds it.`);
   const module = readFileSync(files.engineModule, 'utf8').replaceAll(/^export /gm, '');
+  const code = gzipSync(readFileSync(files.engine.replace(/js$/, 'wasm'))).toString('base64');
   const path = join(folder, 'engine.html');
   writeFileSync(path, `<!doctype html><meta charset="utf-8"><link rel="icon" href="data:,">
 <style>body { margin: 0 } canvas { display: block }</style><canvas id="ink" width="900" height="600"></canvas>
+<script type="application/octet-stream" id="qelt-wasm">${code}</script>
 <script>${readFileSync(files.engine, 'utf8')}</script>
 <script type="module">
 ${module}

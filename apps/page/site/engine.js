@@ -12,18 +12,25 @@ export class EngineError extends Error {
 const TOOLS = {touch: 1, pen: 2, mouse: 3};
 const VALUES = 6;  // of a sample: x, y, pressure, tilt, orientation, milliseconds
 
+// The page carries the compiled code gzipped, in base64: a third of what it takes as it is.
+async function compiledCode() {
+  const packed = Uint8Array.from(atob(document.getElementById('qelt-wasm').textContent), (byte) => byte.charCodeAt(0));
+  return new Response(new Blob([packed]).stream().pipeThrough(new DecompressionStream('gzip'))).arrayBuffer();
+}
+
 /**
  * Makes the canvas's WebGL 2 context and the engine that draws with it.
  * `makeModule` is what Emscripten wrote.
  */
 export async function openEngine(canvas, makeModule = globalThis.createQelt) {
+  const code = compiledCode();
   // Made here, as the compiled code cannot ask for a desynchronized one; it then gets this one.
   const gl = canvas.getContext('webgl2', {
     alpha: true, antialias: false, depth: false, stencil: false, premultipliedAlpha: true,
     preserveDrawingBuffer: false, desynchronized: true,
   });
   if (!gl) throw new EngineError('This browser cannot draw here: it offers no WebGL 2.');
-  const module = await makeModule({canvas});
+  const module = await makeModule({canvas, wasmBinary: await code});
   return new Engine(module, canvas, gl);
 }
 
