@@ -23,14 +23,14 @@ using testing::ElementsAre;
 using testing::IsEmpty;
 using testing::Not;
 
-const std::vector<Sample> kStroke = {{10.0f, 10.0f, 0.3f},
-                                     {18.0f, 11.0f, 0.5f, 0.3f, 0.2f},
-                                     {26.0f, 11.5f, 0.9f, 0.77f, 0.4f},
-                                     {30.0f, 19.0f, 0.4f, 0.2f, 0.1f}};
+const std::vector<Sample> kRecordedStroke = {{10.0f, 10.0f, 0.3f},
+                                             {18.0f, 11.0f, 0.5f, 0.3f, 0.2f},
+                                             {26.0f, 11.5f, 0.9f, 0.77f, 0.4f},
+                                             {30.0f, 19.0f, 0.4f, 0.2f, 0.1f}};
 
 // A stroke on a page that keeps drawings: it has an entry in the cache.
 struct StrokeOnPage {
-  explicit StrokeOnPage(const DrawingBoard& board, const std::vector<Sample>& samples = kStroke)
+  explicit StrokeOnPage(const DrawingBoard& board, const std::vector<Sample>& samples = kRecordedStroke)
       : stroke(board.stored(samples)) {
     PenStrokeDataManager::GetInstance()->CreateStrokeData(stroke->GetRuntimeHandle());
   }
@@ -70,13 +70,13 @@ TEST_P(Redraw, PostsInOrder) {
   for (const bool curve : {true, false}) {
     SCOPED_TRACE(curve ? "curve" : "straight");
     DrawingBoard board({.version = version, .curve = curve});
-    EXPECT_TRUE(board.redraw(board.recorded(kStroke)));
+    EXPECT_TRUE(board.redraw(board.recorded(kRecordedStroke)));
     std::vector<std::string> posts = {"SetRedrawState", "SetPenData", "SetStartPoint", "SetRect",
                                       "Batch",          "Render",     "DeleteBatch"};
     if (!curve) posts.erase(posts.begin() + 2);
     EXPECT_EQ(board.takePosts(), posts);
 
-    const auto withoutEntry = board.stored(kStroke);
+    const auto withoutEntry = board.stored(kRecordedStroke);
     EXPECT_TRUE(board.redraw(*withoutEntry));
     if (curve) posts.push_back("ReleaseStrokeData");
     EXPECT_EQ(board.takePosts(), posts);
@@ -158,7 +158,7 @@ TEST_P(Redraw, LooksUpTheOriginalOfACopy) {
   StrokeOnPage original(board);
   const Batch drawn = redrawn(board, *original);
 
-  const auto copy = board.stored(kStroke);
+  const auto copy = board.stored(kRecordedStroke);
   copy->SetOriginalRuntimeHandle(original->GetRuntimeHandle());
   copy->ClearRedrawingCacheDirtyFlag();
   const Batch hit = redrawn(board, *copy);

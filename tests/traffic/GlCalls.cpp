@@ -39,16 +39,18 @@ const std::set<std::string>& countedGlCalls() {
 
 }  // namespace QeltTests
 
+// clang-format off
+// NOLINTBEGIN(readability-inconsistent-declaration-parameter-name, bugprone-macro-parentheses)
 // The program's functions come before the library's of the same name, for the host's libraries as well.
-#define COUNTED(Result, name, parameters, arguments)                                                 \
-  [[maybe_unused]] static void* const listed_##name = QeltTests::list(#name);                         \
-  extern "C" __attribute__((visibility("default"))) Result GL_APIENTRY name parameters {                                          \
-    static auto* const next = reinterpret_cast<Result(GL_APIENTRY*) parameters>(dlsym(RTLD_NEXT, #name)); \
-    QeltTests::note(#name);                                                                           \
-    return next arguments;                                                                            \
+#define COUNTED(Result, name, parameters, arguments)                                         \
+  [[maybe_unused]] static void* const listed_##name = QeltTests::list(#name);                \
+  extern "C" __attribute__((visibility("default"))) Result GL_APIENTRY name parameters {     \
+    using Function = Result(GL_APIENTRY*) parameters;                                        \
+    static const auto next = reinterpret_cast<Function>(dlsym(RTLD_NEXT, #name));            \
+    QeltTests::note(#name);                                                                  \
+    return next arguments;                                                                   \
   }
 
-// clang-format off
 COUNTED(void, glActiveTexture, (GLenum a), (a))
 COUNTED(void, glAttachShader, (GLuint a, GLuint b), (a, b))
 COUNTED(void, glBindBuffer, (GLenum a, GLuint b), (a, b))
@@ -113,4 +115,5 @@ COUNTED(void, glUniformMatrix4fv, (GLint a, GLsizei b, GLboolean c, const GLfloa
 COUNTED(void, glUseProgram, (GLuint a), (a))
 COUNTED(void, glVertexAttribPointer, (GLuint a, GLint b, GLenum c, GLboolean d, GLsizei e, const void * f), (a, b, c, d, e, f))
 COUNTED(void, glViewport, (GLint a, GLint b, GLsizei c, GLsizei d), (a, b, c, d))
+// NOLINTEND(readability-inconsistent-declaration-parameter-name, bugprone-macro-parentheses)
 // clang-format on

@@ -99,8 +99,8 @@ class InkPage {
   // Adds a stroke from its bytes (`PageRecord.h`), as no step of the history. Throws Refusal when they are
   // not a stroke's.
   StrokeId addRecord(std::span<const std::uint8_t> bytes);
-  // Shows or hides a stroke as another window on the same page did, as no step of the history. Refused while a
-  // stroke or a replay is under way, and where the page has no such stroke.
+  // Shows or hides a stroke as another window on the same page did, as no step of the history. Refused while
+  // a stroke or a replay is under way, and where the page has no such stroke.
   void setShown(StrokeId id, bool isShown);
   // The next four throw Refusal where the page has no such stroke. Strokes that are hidden, but may come back
   // by undo or redo, are the page's too.

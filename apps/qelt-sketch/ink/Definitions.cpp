@@ -303,8 +303,8 @@ const char* Definitions::keptText(std::string_view text) {
   }
   std::vector<char>& block = mTexts.back();
   const std::size_t at = block.size();
-  block.insert(block.end(), text.begin(), text.end());
-  block.push_back('\0');
+  block.resize(at + size);
+  text.copy(block.data() + at, text.size());  // the rest is 0 already
   return block.data() + at;
 }
 

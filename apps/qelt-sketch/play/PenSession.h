@@ -1,10 +1,10 @@
 #pragma once
 
-#include <compare>
 #include <cstdint>
 #include <map>
 #include <memory>
 #include <optional>
+#include <utility>
 
 #include "desktop/engine/PluginLibrary.h"
 #include "desktop/pencommon/PenDataManager.h"
@@ -38,7 +38,9 @@ struct PenKind {
   int renderingVersion;  // any number: the pen knows what to do
   bool curve;            // smooth segments
 
-  auto operator<=>(const PenKind&) const = default;
+  bool operator<(const PenKind& other) const {
+    return std::pair(renderingVersion, curve) < std::pair(other.renderingVersion, other.curve);
+  }
 };
 PenKind penKindFor(const Brush& brush, const Options& options);
 
