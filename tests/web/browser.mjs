@@ -31,6 +31,13 @@ export async function openPage(browser, {size = [800, 600], hash = '', prepare =
   return page;
 }
 
+/** The same for one test, after which it is closed. */
+export async function openFor(t, browser, options) {
+  const page = await openPage(browser, options);
+  t.after(() => page.context().close());
+  return page;
+}
+
 /** Dispatches trusted pointer events through the DevTools protocol, evenly apart by their own clock. */
 export class Hand {
   pace = 0.004;  // seconds

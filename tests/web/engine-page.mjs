@@ -1,5 +1,4 @@
-// Debian's Chromium, headless, driven through playwright-core; pens, fingers and mice come in through the DevTools
-// protocol, so that they reach the page as the platform's own events.
+// Debian's Chromium, headless, driven through playwright-core, and the engine alone on a bare page in it.
 
 import {execFileSync} from 'node:child_process';
 import {existsSync, mkdirSync, mkdtempSync, readFileSync, rmSync, writeFileSync} from 'node:fs';
@@ -47,9 +46,9 @@ export async function openBrowser(renderer, {profile = scratch(), width = 1000, 
   return context;
 }
 
-/** A tab, the errors that its scripts made, and hands that draw in it. */
+/** A tab, and the errors that its scripts made. */
 export class Tab {
-  static async open(context, address, prepare = undefined) {
+  static async open(context, address) {
     const tab = new Tab();
     tab.page = await context.newPage();
     tab.errors = [];
@@ -57,8 +56,6 @@ export class Tab {
     tab.page.on('console', (message) => {
       if (message.type() === 'error') tab.errors.push(message.text());
     });
-    tab.cdp = await context.newCDPSession(tab.page);
-    if (prepare) await tab.page.addInitScript(prepare);
     await tab.page.goto(address.includes('://') ? address : pathToFileURL(address).href);
     return tab;
   }
@@ -67,37 +64,6 @@ export class Tab {
   async screenshot(name) {
     mkdirSync(files.out, {recursive: true});
     await this.page.screenshot({path: join(files.out, `${name}.png`)});
-  }
-
-  #mouse(type, sample, rest) {
-    const {x, y, pressure = 0.5, tiltX = 0, tiltY = 0, twist = 0, time} = sample;
-    return this.cdp.send('Input.dispatchMouseEvent', {
-      type, x, y, tiltX, tiltY, twist, force: rest.buttons ? pressure : 0, button: 'left', clickCount: 1,
-      ...(time === undefined ? {} : {timestamp: time / 1000}), ...rest,
-    });
-  }
-  down(sample, pointerType = 'pen') { return this.#mouse('mousePressed', sample, {pointerType, buttons: 1}); }
-  move(sample, pointerType = 'pen') { return this.#mouse('mouseMoved', sample, {pointerType, buttons: 1}); }
-  up(sample, pointerType = 'pen') { return this.#mouse('mouseReleased', sample, {pointerType, buttons: 0}); }
-  hover(sample, pointerType = 'pen') {
-    return this.#mouse('mouseMoved', sample, {pointerType, buttons: 0, button: 'none'});
-  }
-  /** A whole stroke. `together`: the moves are sent without waiting for the page, which then gets them coalesced. */
-  async stroke(samples, {pointerType = 'pen', together = false} = {}) {
-    await this.down(samples[0], pointerType);
-    const moves = [];
-    for (const sample of samples.slice(1)) {
-      moves.push(this.move(sample, pointerType));
-      if (!together) await moves.at(-1);
-    }
-    await Promise.all(moves);
-    await this.up(samples.at(-1), pointerType);
-  }
-  /** `type`: touchStart, touchMove, touchEnd or touchCancel; `fingers`: those down after it, [{id, x, y}]. */
-  touch(type, fingers = []) {
-    return this.cdp.send('Input.dispatchTouchEvent', {
-      type, touchPoints: fingers.map(({id, x, y, force = 0.5}) => ({id, x, y, force})),
-    });
   }
 }
 

@@ -6,7 +6,7 @@ import {join} from 'node:path';
 import {after, before, describe, test} from 'node:test';
 import {deflateSync, inflateSync} from 'node:zlib';
 import {crc32, inkOfPng, writePng} from '../../apps/page/site/png.js';
-import {launch, messages, openPage, paper, strokes, wave} from './browser.mjs';
+import {launch, messages, openFor, paper, strokes, wave} from './browser.mjs';
 import {scratch, sketch} from './engine-page.mjs';
 
 const INK = '<ink xmlns="http://www.w3.org/2003/InkML"><trace>10 10, 200 40, 400 300</trace></ink>';
@@ -85,11 +85,7 @@ describe('the page', () => {
   let browser;
   before(async () => { browser = await launch('llvmpipe'); });
   after(() => browser.close());
-  const opened = async (t, options) => {
-    const page = await openPage(browser, options);
-    t.after(() => page.context().close());
-    return page;
-  };
+  const opened = (t, options) => openFor(t, browser, options);
   /** Drops or pastes files, each [name, type, bytes], or text. */
   const hand = (page, type, what) => page.evaluate(([kind, given]) => {
     const transfer = new DataTransfer();

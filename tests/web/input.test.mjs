@@ -2,7 +2,7 @@
 
 import assert from 'node:assert/strict';
 import {after, before, describe, test} from 'node:test';
-import {launch, openPage, paper, RENDERERS, settled, strokes, wave} from './browser.mjs';
+import {launch, openFor, paper, RENDERERS, settled, strokes, wave} from './browser.mjs';
 
 const samples = (page, index = -1) => page.evaluate((at) => {
   const {engine} = window.qeltPage;
@@ -26,11 +26,8 @@ for (const renderer of Object.keys(RENDERERS)) {
     before(async () => { browser = await launch(renderer); });
     after(() => browser.close());
     const opened = async (t, options) => {
-      const page = await openPage(browser, options);
-      t.after(async () => {
-        assert.deepEqual(page.errors, []);
-        await page.context().close();
-      });
+      const page = await openFor(t, browser, options);
+      t.after(() => assert.deepEqual(page.errors, []));
       return page;
     };
 

@@ -2,7 +2,7 @@
 
 import assert from 'node:assert/strict';
 import {after, before, describe, test} from 'node:test';
-import {launch, openPage, outFolder, pageUrl, paper, RENDERERS, settled, strokes, wave} from './browser.mjs';
+import {launch, openFor, outFolder, pageUrl, paper, RENDERERS, settled, strokes, wave} from './browser.mjs';
 import {timeline} from '../../apps/page/site/replay.js';
 
 for (const renderer of Object.keys(RENDERERS)) {
@@ -10,11 +10,7 @@ for (const renderer of Object.keys(RENDERERS)) {
     let browser;
     before(async () => { browser = await launch(renderer); });
     after(() => browser.close());
-    const opened = async (t, options) => {
-      const page = await openPage(browser, options);
-      t.after(() => page.context().close());
-      return page;
-    };
+    const opened = (t, options) => openFor(t, browser, options);
     const context = (page, call) => page.evaluate((what) => {
       window.lose ??= document.getElementById('paper').getContext('webgl2').getExtension('WEBGL_lose_context');
       window.lose[what]();
@@ -107,11 +103,7 @@ describe('tools', () => {
   let browser;
   before(async () => { browser = await launch(); });
   after(() => browser.close());
-  const opened = async (t, options) => {
-    const page = await openPage(browser, options);
-    t.after(() => page.context().close());
-    return page;
-  };
+  const opened = (t, options) => openFor(t, browser, options);
 
   test('are all within reach of the keyboard, and have names', async (t) => {
     const page = await opened(t);

@@ -2,7 +2,7 @@
 
 import assert from 'node:assert/strict';
 import {after, before, describe, test} from 'node:test';
-import {launch, messages, openPage, paper, settled, stored, strokes, wave} from './browser.mjs';
+import {launch, messages, openFor, openPage, paper, settled, stored, strokes, wave} from './browser.mjs';
 
 let browser;
 before(async () => { browser = await launch(); });
@@ -10,11 +10,7 @@ after(() => browser.close());
 
 const another = (page, options = {}) => openPage(browser, {context: page.context(), ...options});
 const draw = (page, y, kind = 'pen') => page.hand.stroke(wave(150, y, 300), kind);
-const opened = async (t, options) => {
-  const page = await openPage(browser, options);
-  t.after(() => page.context().close());
-  return page;
-};
+const opened = (t, options) => openFor(t, browser, options);
 const reload = async (page) => {
   await page.reload();
   await page.waitForSelector('html[data-ready]');

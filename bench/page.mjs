@@ -3,13 +3,13 @@
 // Where others use the machine, most of a long time is the wait for a processor. So beside the time that passed there
 // stands the processor time of the page's main thread, as Linux counts it, a third of a millisecond of asking included.
 //
-//   node bench.mjs [swiftshader|llvmpipe] [strokes, default 10000]
+//   node bench/page.mjs [swiftshader|llvmpipe] [strokes, default 10000]
 
 import {mkdirSync, readFileSync, readdirSync, statSync, writeFileSync} from 'node:fs';
 import {createServer} from 'node:http';
 import {loadavg} from 'node:os';
 import {join} from 'node:path';
-import {Tab, bareEnginePage, files, openBrowser, scratch} from './engine-page.mjs';
+import {Tab, bareEnginePage, files, openBrowser, scratch} from '../tests/web/engine-page.mjs';
 
 const renderer = process.argv[2] ?? 'llvmpipe';
 const most = Number(process.argv[3] ?? 10_000);
