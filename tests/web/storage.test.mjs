@@ -97,9 +97,10 @@ describe('a page', () => {
     await reload(two);
     assert.deepEqual([await strokes(one), await strokes(two)], [1, 2]);
 
-    // The list shows both, and leads to a page that no other tab has.
-    await two.close();
+    // The list shows both, follows what other tabs do, and leads to a page that no other tab has.
     await one.getByRole('button', {name: 'Files and pages'}).click();
+    assert.ok(await one.getByRole('button', {name: 'Page 2 open in another tab'}).isDisabled());
+    await two.close();
     await one.getByRole('button', {name: /^Page 2 2 strokes/}).click();
     await one.waitForFunction(() => window.qeltPage?.store.page === 2 && 'ready' in document.documentElement.dataset);
     assert.equal(await strokes(one), 2);
