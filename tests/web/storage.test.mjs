@@ -3,6 +3,7 @@
 import assert from 'node:assert/strict';
 import {after, before, describe, test} from 'node:test';
 import {launch, messages, openFor, openPage, paper, settled, stored, strokes, wave} from './browser.mjs';
+import {openBrowser, processesOf, scratch} from './engine-page.mjs';
 
 let browser;
 before(async () => { browser = await launch(); });
@@ -57,6 +58,23 @@ describe('a page', () => {
     (await page.context().newCDPSession(page)).send('Page.crash').catch(() => {});
     await killed;
     const next = await another(page);
+    assert.equal(await strokes(next), 3);
+    assert.deepEqual(await messages(next), []);
+  });
+
+  test('loses at most the stroke under the pen when the whole browser is killed', async (t) => {
+    const profile = scratch();
+    const open = async () => openPage(null, {context: await openBrowser('swiftshader', {profile})});
+    const page = await open();
+    for (const y of [100, 200, 300]) await draw(page, y);
+    assert.equal(await stored(page), 3);
+    await page.hand.pen('mousePressed', 100, 400);
+    await page.hand.pen('mouseMoved', 300, 400);
+    const closed = page.context().waitForEvent('close');
+    for (const {pid} of processesOf(profile)) process.kill(pid, 'SIGKILL');
+    await closed;
+    const next = await open();
+    t.after(() => next.context().close());
     assert.equal(await strokes(next), 3);
     assert.deepEqual(await messages(next), []);
   });
