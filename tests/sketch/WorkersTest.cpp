@@ -1,0 +1,85 @@
+#include "commands/Workers.h"
+
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <csignal>
+#include <cstddef>
+#include <functional>
+#include <map>
+#include <string>
+
+#include "text/Refusal.h"
+
+namespace QeltDesktop {
+namespace {
+
+// How jobs 0 to `jobs` - 1 ended, each once: "" when done.
+std::map<std::size_t, std::string> ends(std::size_t jobs, std::size_t workers,
+                                        const std::function<Job()>& make) {
+  std::map<std::size_t, std::string> all;
+  doInWorkers(jobs, workers, make, [&](const JobEnd& end) {
+    EXPECT_TRUE(all.emplace(end.index, end.refusal.value_or("")).second) << end.index;
+  });
+  EXPECT_EQ(all.size(), jobs);
+  return all;
+}
+
+TEST(Workers, DoEachJobOnceWhateverOthersDo) {
+  for (const std::size_t workers : {1u, 3u, 40u}) {
+    auto all = ends(20, workers, [] {
+      return [](std::size_t index) {
+        if (index % 5 == 1) throw Refusal("page " + std::to_string(index) + std::string(100'000, '.'));
+        if (index == 7 || index == 19) std::raise(SIGKILL);
+        if (index == 8) throw 8;
+        if (index == 9) _exit(3);
+      };
+    });
+    for (const auto& [index, text] : all) {
+      const std::string wanted = index % 5 == 1 ? "page " + std::to_string(index) + "..."
+                                 : index == 7 || index == 19
+                                     ? "the process that drew it ended with signal Killed"
+                                 : index == 8 ? "stopped by an exception of unknown type"
+                                 : index == 9 ? "the process that drew it ended with exit status 3"
+                                              : "";
+      EXPECT_EQ(text.substr(0, wanted.empty() ? 1 : wanted.size()), wanted) << index;
+    }
+  }
+}
+
+TEST(Workers, ThatCannotBeginEndTheRun) {
+  const auto refusal = [](const std::function<Job()>& make) {
+    try {
+      ends(5, 2, make);
+    } catch (const Refusal& refused) {
+      return std::string(refused.what());
+    }
+    return std::string("not refused");
+  };
+  EXPECT_EQ(refusal([]() -> Job { throw Refusal("no such plug-in"); }), "no such plug-in");
+  EXPECT_EQ(refusal([]() -> Job { _exit(4); }), "a process to draw in ended with exit status 4");
+}
+
+// They must not draw on when nobody collects what they draw.
+TEST(Workers, EndWithTheProcessThatAsks) {
+  int pipe[2];
+  ASSERT_EQ(::pipe(pipe), 0);
+  const pid_t asking = fork();
+  if (asking == 0) {
+    close(pipe[0]);
+    doInWorkers(
+        1000, 3, [] { return [](std::size_t) { usleep(1000); }; },
+        [](const JobEnd& end) {
+          if (end.index == 20) std::raise(SIGKILL);
+        });
+    _exit(0);
+  }
+  close(pipe[1]);
+  char none = 0;
+  // The end of the pipe comes when the last of them has closed it.
+  EXPECT_EQ(::read(pipe[0], &none, 1), 0);
+  close(pipe[0]);
+}
+
+}  // namespace
+}  // namespace QeltDesktop
