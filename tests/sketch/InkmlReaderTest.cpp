@@ -311,7 +311,7 @@ TEST(InkmlReader, CountsEachTraceByTheInkSourceOfItsContext) {
     <trace contextRef="#both">1 1</trace><trace contextRef="#heir">1 1</trace><trace contextRef="#source">1 1</trace>
     <trace contextRef="#borrowed">1 1</trace><traceGroup contextRef="#own"><trace>1 1</trace>
     <trace contextRef="#plain">1 1</trace></traceGroup></ink>)");
-  const float x[] = {19.2f, 9.6f, 96, 9.6f, 9.6f, 9.6f, 9.6f, 9.6f, 19.2f};
+  const float x[] = {19.2f, 9.6f, 96, 9.6f, 9.6f, 9.6f, 19.2f, 9.6f, 19.2f};
   ASSERT_EQ(page.strokes.size(), std::size(x));
   for (std::size_t i = 0; i < std::size(x); ++i) {
     EXPECT_EQ(page.strokes[i].samples.at(0).x, x[i]) << i;
@@ -328,24 +328,24 @@ TEST(InkmlReader, TellsInkmlFromOtherNamespaces) {
     return found;
   };
   const std::vector<float> both{1, 2};
-  for (const std::string& page :
-       {"<a:ink xmlns:a='" + ink + "'><a:trace>1 0</a:trace><b:trace xmlns:b='" + ink +
-            "'>2 0</b:trace></a:ink>",
-        "<ink xmlns='" + ink +
-            "' xmlns:a='urn:a'><a:trace>9 0</a:trace><trace>1 0</trace><trace>2 0</trace></ink>",
-        // Bound to another name inside, and back outside.
-        "<a:ink xmlns:a='" + ink +
-            "'><a:trace>1 0</a:trace><x xmlns:a='urn:a'><a:brush/></x><a:trace>2 0</a:trace></a:ink>",
-        "<ink><trace>1 0</trace><math xmlns='urn:math'><trace>9 0</trace><trace/></math><trace>2 "
-        "0</trace></ink>",
-        // No namespace, one that is bound to nothing, and one with another name.
-        std::string("<ink><trace>1 0</trace><a:trace>2 0</a:trace></ink>"),
-        std::string("<a:ink><a:trace>1 0</a:trace><trace>2 0</trace></a:ink>"),
-        "<ink xmlns='urn:own'><trace>1 0</trace><a:trace xmlns:a='" + ink + "'>2 0</a:trace></ink>",
-        "<ink xmlns='" + ink +
-            "' xmlns:a='urn:a'><trace a:type='penUp' a:brushRef='#b' xmlns:type='penUp'>1<a:b>7</a:b> 0"
-            "</trace><trace>2 0</trace></ink>"})
-    EXPECT_EQ(x(page), both) << page;
+  const std::vector<std::string> pages{
+      "<a:ink xmlns:a='" + ink + "'><a:trace>1 0</a:trace><b:trace xmlns:b='" + ink +
+          "'>2 0</b:trace></a:ink>",
+      "<ink xmlns='" + ink +
+          "' xmlns:a='urn:a'><a:trace>9 0</a:trace><trace>1 0</trace><trace>2 0</trace></ink>",
+      // Bound to another name inside, and back outside.
+      "<a:ink xmlns:a='" + ink +
+          "'><a:trace>1 0</a:trace><x xmlns:a='urn:a'><a:brush/></x><a:trace>2 0</a:trace></a:ink>",
+      "<ink><trace>1 0</trace><math xmlns='urn:math'><trace>9 0</trace><trace/></math><trace>2 "
+      "0</trace></ink>",
+      // No namespace, one that is bound to nothing, and one with another name.
+      std::string("<ink><trace>1 0</trace><a:trace>2 0</a:trace></ink>"),
+      std::string("<a:ink><a:trace>1 0</a:trace><trace>2 0</trace></a:ink>"),
+      "<ink xmlns='urn:own'><trace>1 0</trace><a:trace xmlns:a='" + ink + "'>2 0</a:trace></ink>",
+      "<ink xmlns='" + ink +
+          "' xmlns:a='urn:a'><trace a:type='penUp' a:brushRef='#b' xmlns:type='penUp'>1<a:b>7</a:b> 0"
+          "</trace><trace>2 0</trace></ink>"};
+  for (const std::string& page : pages) EXPECT_EQ(x(page), both) << page;
   EXPECT_TRUE(refusalOf("<ink xmlns:a='urn:a'>\n<a:x>\n</a:x><trace>x</trace></ink>")
                   .starts_with("page.inkml:3: not a"));
 }

@@ -448,8 +448,12 @@ bool Definitions::ignoresPressure(std::uint32_t brushText) const {
 
 const TraceFormat& Definitions::format(std::optional<std::size_t> format, std::optional<std::size_t> source) {
   const std::uint32_t asked = format ? static_cast<std::uint32_t>(*format) : kNoNumber;
-  std::uint32_t counting = format ? mFormatSources[asked] : kNoNumber;
-  if (counting == kNoNumber && source) counting = static_cast<std::uint32_t>(*source);
+  std::uint32_t counting = kNoNumber;
+  if (source) {
+    counting = static_cast<std::uint32_t>(*source);
+  } else if (format) {
+    counting = mFormatSources[asked];
+  }
   if (!mApplied.channels.empty() && mAppliedFormat == asked && mAppliedSource == counting) return mApplied;
   mApplied = asked == kNoNumber ? plainFormat() : mFormats[asked];
   mAppliedFormat = asked;
