@@ -16,6 +16,7 @@
 #include "engine/MotionEvent.h"
 #include "ink/Definitions.h"
 #include "play/PageDrawing.h"
+#include "play/PageFit.h"
 #include "text/NumberText.h"
 #include "text/Refusal.h"
 
@@ -41,18 +42,22 @@ class OptionGroup {
 
   // The target holds a Value, or an optional one.
   template <typename Value, typename Target>
-  void add(const char* name, Target& target, const Form<Value>& form, const std::string& help) {
-    mApp.add_option_function<std::string>(
-            name,
-            [&target, form, name](const std::string& text) {
-              const std::optional<Value> value = form.parse(text);
-              if (!value) throw CLI::ValidationError(name, "expects " + form.wanted + ", not '" + text + "'");
-              target = *value;
-            },
-            help)
-        ->type_name(form.shape);
+  CLI::Option* add(const char* name, Target& target, const Form<Value>& form, const std::string& help) {
     if (const std::optional<Value> value = target)
       mWritten += ' ' + std::string(name) + '=' + form.print(*value);
+    return addUnwritten<Value>(name, target, form, help);
+  }
+
+  // An option whose value is not written.
+  template <typename Value, typename Target>
+  CLI::Option* addUnwritten(const char* name, Target& target, const Form<Value>& form,
+                            const std::string& help) {
+    const auto read = [&target, form, name](const std::string& text) {
+      const std::optional<Value> value = form.parse(text);
+      if (!value) throw CLI::ValidationError(name, "expects " + form.wanted + ", not '" + text + "'");
+      target = *value;
+    };
+    return mApp.add_option_function<std::string>(name, read, help)->type_name(form.shape);
   }
 
   // Two flags for one choice.
@@ -122,6 +127,15 @@ std::optional<PageSize> pageSize(const std::string& text) {
   return PageSize{*width, *height};
 }
 
+std::optional<PixelSize> pixelSize(const std::string& text) {
+  const std::size_t cross = text.find('x');
+  if (cross == std::string::npos) return std::nullopt;
+  const std::optional<int> width = count(text.substr(0, cross));
+  const std::optional<int> height = count(text.substr(cross + 1));
+  if (!width || !height) return std::nullopt;
+  return PixelSize{*width, *height};
+}
+
 std::optional<OutlineOptions> outline(const std::string& text) {
   const std::size_t comma = text.find(',');
   if (comma == std::string::npos) return std::nullopt;
@@ -173,6 +187,9 @@ std::string printColor(const std::uint32_t& argb) {
 std::string printPage(const PageSize& page) {
   return printFloat(page.width) + 'x' + printFloat(page.height);
 }
+std::string printPixels(const PixelSize& size) {
+  return printInt(size.width) + 'x' + printInt(size.height);
+}
 std::string printOutline(const OutlineOptions& outline) {
   return printFloat(outline.size) + ',' + formatArgb(outline.argb);
 }
@@ -191,6 +208,7 @@ const Form<float> kDegrees{"DEG", "a number of degrees", finiteFloat, printFloat
 const Form<float> kShare{"O", "a number from 0 to 1", share, printFloat};
 const Form<std::uint32_t> kColor{"'#AARRGGBB'", "a colour as #AARRGGBB", argbColor, printColor};
 const Form<PageSize> kPage{"WxH", "WxH, two numbers above 0", pageSize, printPage};
+const Form<PixelSize> kPixels{"WxH", "WxH, two whole numbers from 1", pixelSize, printPixels};
 const Form<Background> kBackground{"white|transparent|'#RRGGBB'", "white, transparent or #RRGGBB", background,
                                    printBackground};
 const Form<OutlineOptions> kOutline{"SIZE,'#AARRGGBB'", "SIZE,#AARRGGBB", outline, printOutline};
@@ -245,6 +263,18 @@ void addFeeding(OptionGroup& group, Options& options) {
                                                  std::to_string(Qelt::kSourceMouse) + " mouse"));
 }
 
+// One of the two, where a picture was drawn with one and the command line says the other too.
+void addZoom(OptionGroup& group, Options& options) {
+  const std::string help = withDefault("canvas pixels a stroke unit", printFloat(kDefaults.zoom));
+  CLI::Option* const zoom = options.fit ? group.addUnwritten<float>("--zoom", options.zoom, kZoom, help)
+                                        : group.add<float>("--zoom", options.zoom, kZoom, help);
+  zoom->each([&options](const std::string&) { options.fit.reset(); });
+  group
+      .add<PixelSize>("--fit", options.fit, kPixels,
+                      "the largest zoom at which the page fits into so many pixels")
+      ->excludes(zoom);
+}
+
 void addDrawing(OptionGroup& group, Options& options) {
   group.add<int>("--rendering-version", options.renderingVersion, kInteger,
                  "of the pen (default: the stroke's, else " + printInt(kUsualRenderingVersion) + ")");
@@ -252,8 +282,7 @@ void addDrawing(OptionGroup& group, Options& options) {
   addFeeding(group, options);
   group.add<int>("--repeat", options.repeat, kCount,
                  "draw the page N times, each onto a cleared layer; in stroke mode from the cache");
-  group.add<float>("--zoom", options.zoom, kZoom,
-                   withDefault("canvas pixels a stroke unit", printFloat(kDefaults.zoom)));
+  addZoom(group, options);
   group.add<float>("--rotate", options.rotate, kDegrees,
                    withDefault("turn clockwise about the page's centre", printFloat(kDefaults.rotate)));
   group.add<PageSize>("--page", options.page, kPage,
@@ -342,6 +371,10 @@ std::variant<Options, UsageEnd> parseOver(Options options, bool pictureIsRead) {
   OptionGroup shown(*sheet);
   addPen(shown, options);
   addFeeding(shown, options);
+  shown.add<PixelSize>(
+      "--fit", options.fit, kPixels,
+      "the largest zoom at which the page fits into so many pixels (default: at most 1, within " +
+          printPixels(kUsualCell) + ")");
 
   CLI::App* const info =
       app.add_subcommand("info", "show plug-in path, GL renderer, version table and pen limits");

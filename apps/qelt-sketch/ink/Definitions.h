@@ -44,8 +44,8 @@ class Definitions {
   // The tool that a group's own annotation names, if any; throws Refusal for an unknown tool. Only for groups
   // that are drawn: those that lie in nothing but groups.
   std::optional<int> toolOfGroup(std::size_t group) const;
-  // A format as the ink source counts that is given, else the one that it stands in. Without a format, the one
-  // that traces have by default. Valid until the next call.
+  // A format as the ink source counts that is given, else the one that it stands in. Without a format, the
+  // one that traces have by default. Valid until the next call.
   const TraceFormat& format(std::optional<std::size_t> format, std::optional<std::size_t> source);
 
   // The number that a reference leads to; none without the attribute, and for the defaults that every
