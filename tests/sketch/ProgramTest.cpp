@@ -620,6 +620,113 @@ TEST_F(Program, FindsPlugInsInItsFolderAndItsLibrariesFromWhereItStands) {
   EXPECT_NE(contentsOf(QELT_PLUGIN_PATH).find("$ORIGIN/../host/desktop"), std::string::npos);
 }
 
+TEST_F(Program, ReadsStandardInput) {
+  write("bad.inkml", "<ink>\n<trace>1 2, 3 four</trace>\n</ink>");
+  write("-", "no ink");
+  draw("draw ink.inkml --predict 3");
+  const struct {
+    std::string commands, out, err;
+    int status;
+  } cases[] = {
+      {"$sketch draw - -o a.png <ink.inkml; $sketch draw ink.inkml -o b.png; cmp a.png b.png", "", "", 0},
+      {"cat drawn.png | $sketch draw - -o a.png && cmp a.png drawn.png", "", "", 0},
+      {"cat ink.inkml | $sketch trace - -o a; $sketch trace ink.inkml -o b; cmp a b", "", "", 0},
+      {"$sketch sheet - -o a.png <ink.inkml; $sketch sheet ink.inkml -o b.png; cmp a.png b.png", "", "", 0},
+      {"$sketch trace - -o no <bad.inkml", "", "standard input:2: not a number: four\n", 1},
+      {"$sketch trace - -o no <&-", "", "standard input: cannot be read: Bad file descriptor\n", 1},
+      {"$sketch trace - -o no <.", "", "standard input: cannot be read: Is a directory\n", 1},
+      {"$sketch trace ./- -o no", "", "./-:1: not XML: syntax error\n", 1},
+      {"$sketch trace - -o bad.inkml <bad.inkml", "", "standard input:2: not a number: four\n", 1},
+      {"$sketch trace - -o ink.inkml <ink.inkml", "",
+       "ink.inkml: cannot be written: it is the page to read\n", 1},
+      // What the command line leaves out may stand in the picture.
+      {"$sketch trace - -o - --drawable prediction <drawn.png | wc -l", "4\n", "", 0},
+      {"$sketch trace - -o no --drawable prediction <ink.inkml", "",
+       "--drawable prediction: needs --mode live and --predict K\nRun with --help for more information.\n",
+       2}};
+  for (const auto& [commands, out, err, status] : cases) {
+    const Ran ran = sh(commands);
+    EXPECT_EQ(ran.status, status) << commands;
+    EXPECT_EQ(ran.out, out) << commands;
+    // A driver may speak where something is drawn.
+    EXPECT_TRUE(ran.err == err || (err.empty() && status == 0)) << commands << "\n" << ran.err;
+  }
+  EXPECT_FALSE(holds("no") || holdsUnfinished());
+}
+
+// The long names of all options, with the command in front of those that belong to one.
+std::vector<std::string> optionsIn(const std::string& help, const std::string& command) {
+  std::vector<std::string> names;
+  const std::regex option(R"(^ +(?:-\w,)?--([a-z-]+))");
+  std::istringstream lines(help);
+  std::smatch found;
+  for (std::string line; std::getline(lines, line);)
+    if (std::regex_search(line, found, option)) names.push_back(command + "--" + found[1].str());
+  return names;
+}
+
+TEST_F(Program, DocumentsItselfFromItsOptions) {
+  EXPECT_TRUE(std::regex_match(run("--version").out, std::regex(R"(qelt-sketch \d+\.\d+\.\d+\n)")));
+  std::vector<std::string> options = optionsIn(run("--help").out, "");
+  EXPECT_EQ(options.size(), 4u);
+  for (const std::string command : {"draw", "trace", "preview", "sheet", "info"}) {
+    const std::vector<std::string> more = optionsIn(run(command + " --help").out, command);
+    EXPECT_GE(more.size(), 2u) << command;
+    options.insert(options.end(), more.begin(), more.end());
+  }
+  const std::string manual = run("--man").out;
+  const std::string bash = run("--completion bash").out, zsh = run("--completion zsh").out;
+  for (const std::string& option : options) {
+    const std::size_t dashes = option.find("--");
+    const std::string command = option.substr(0, dashes), name = option.substr(dashes);
+    const std::string escaped = std::regex_replace(name, std::regex("-"), "\\-");
+    EXPECT_NE(manual.find("\\fB" + escaped + "\\fR", command.empty() ? 0 : manual.find(".SS " + command)),
+              std::string::npos)
+        << option;
+    const std::string listed = (command.empty() ? "''" : command) + ") options='";
+    const std::size_t line = bash.find("\n      " + listed);
+    ASSERT_NE(line, std::string::npos) << option;
+    const std::string here = bash.substr(line + 1, bash.find('\n', line + 1) - line) + " ";
+    EXPECT_TRUE(std::regex_search(here, std::regex("[ ']" + name + "[ ']"))) << option;
+    EXPECT_NE(zsh.find(name, command.empty() ? 0 : zsh.find(" " + command + ") _arguments")),
+              std::string::npos)
+        << option;
+  }
+  write("manual", manual);
+  write("completion", zsh);
+  // Where the checkers are installed, they have nothing to say.
+  const Ran checked =
+      sh("! command -v groff >/dev/null || groff -man -Tutf8 -ww -z manual; "
+         "! command -v zsh >/dev/null || zsh -n completion");
+  EXPECT_EQ(checked.out + checked.err, "");
+  for (const char* const part : {"EXIT STATUS", "cannot be read: REASON", "default 4"})
+    EXPECT_NE(manual.find(part), std::string::npos) << part;
+}
+
+TEST_F(Program, IsCompletedByBash) {
+  write("completion", run("--completion bash").out);
+  const std::pair<std::string, std::string> cases[] = {{"tr", "trace"},
+                                                       {"--ver", "--version"},
+                                                       {"--completion ''", "bash zsh"},
+                                                       {"draw --mo", "--mode"},
+                                                       {"draw --mode ''", "live event stroke"},
+                                                       {"draw ink.inkml --mode = l", "live"},
+                                                       {"trace --mode =", "live event stroke"},
+                                                       {"trace --background t", "transparent"},
+                                                       {"draw ink", "ink.inkml"},
+                                                       {"draw -o ink", "ink.inkml"},
+                                                       {"draw --zoom ''", ""},
+                                                       {"info ink", ""},
+                                                       {"preview --fit", ""},
+                                                       {"sheet --fi", "--fit"}};
+  for (const auto& [words, wanted] : cases) {
+    write("complete", ". ./completion; COMP_WORDS=(qelt-sketch " + words +
+                          "); COMP_CWORD=$((${#COMP_WORDS[@]} - 1)); _qelt_sketch; echo \"${COMPREPLY[*]}\"");
+    const Ran ran = sh("bash complete");
+    EXPECT_EQ(ran.out, wanted + "\n") << words << "\n" << ran.err;
+  }
+}
+
 TEST_F(Program, TellsWrongUsageFromHelp) {
   const auto expectWrong = [&](const std::string& before, const std::string& list) {
     std::istringstream each(list);
@@ -629,7 +736,7 @@ TEST_F(Program, TellsWrongUsageFromHelp) {
       EXPECT_TRUE(ran.out.empty() && !ran.err.empty()) << arguments;
     }
   };
-  expectWrong("", "; paint -o a.png; draw; draw a.inkml b.inkml -o a.png; info -o a.txt");
+  expectWrong("", "; paint -o a.png; draw; draw a.inkml b.inkml -o a.png; info -o a.txt; --completion fish");
   expectWrong("trace -o - --drawable ", "line; prediction; preview --mode stroke");
   expectWrong("draw -o a.png ",
               "--sise 3; --size; --size big; --size 3 --size 4; --color red; --color '#FFFFFF'; --mode slow; "

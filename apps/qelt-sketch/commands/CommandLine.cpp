@@ -12,6 +12,8 @@
 
 #include <CLI/CLI.hpp>
 
+#include "commands/Completion.h"
+#include "commands/Manual.h"
 #include "commands/PageInput.h"
 #include "engine/MotionEvent.h"
 #include "ink/Definitions.h"
@@ -213,6 +215,9 @@ const Form<Background> kBackground{"white|transparent|'#RRGGBB'", "white, transp
                                    printBackground};
 const Form<OutlineOptions> kOutline{"SIZE,'#AARRGGBB'", "SIZE,#AARRGGBB", outline, printOutline};
 
+// What --version tells, and the manual page.
+const std::string kVersion = "qelt-sketch " QELT_VERSION;
+
 // What the help tells as defaults.
 const Options kDefaults;
 
@@ -223,8 +228,9 @@ std::string withDefault(const std::string& help, const std::string& value) {
 // Option by option, in the order the help shows them.
 
 void addInput(CLI::App& app, Options& options) {
-  app.add_option("INPUT", options.input,
-                 "page of W3C InkML, or a picture that draw made (default: the sample page)")
+  app.add_option(
+         "INPUT", options.input,
+         "page of W3C InkML, or a picture that draw made; - is standard input (default: the sample page)")
       ->type_name("");
 }
 
@@ -276,8 +282,9 @@ void addZoom(OptionGroup& group, Options& options) {
 }
 
 void addDrawing(OptionGroup& group, Options& options) {
-  group.add<int>("--rendering-version", options.renderingVersion, kInteger,
-                 "of the pen (default: the stroke's, else " + printInt(kUsualRenderingVersion) + ")");
+  group.add<int>(
+      "--rendering-version", options.renderingVersion, kInteger,
+      "rendering version of the pen (default: the stroke's, else " + printInt(kUsualRenderingVersion) + ")");
   addPen(group, options);
   addFeeding(group, options);
   group.add<int>("--repeat", options.repeat, kCount,
@@ -288,14 +295,14 @@ void addDrawing(OptionGroup& group, Options& options) {
   group.add<PageSize>("--page", options.page, kPage,
                       "page in stroke units, from (0, 0) (default: the file's extent plus a margin)");
   group.add<Background>("--background", options.background, kBackground,
-                        "default " + printBackground(kDefaults.background));
+                        withDefault("what lies under the ink", printBackground(kDefaults.background)));
   group.add<OutlineOptions>("--outline", options.outline, kOutline,
                             "draw every stroke's outline under the strokes (default: those of the file)");
   group.add<int>(
       "--predict", options.predict, kPredictionCount,
       "live: K predicted samples, at most " + std::to_string(kMostPredicted) + ", after every move event");
   group.add<float>("--opacity", options.opacity, kShare,
-                   withDefault("of the prediction, 0 to 1", printFloat(kDefaults.opacity)));
+                   withDefault("opacity of the prediction, 0 to 1", printFloat(kDefaults.opacity)));
   group.add<int>("--points", options.points, kCount,
                  "stop after the first N points of the last trace, the pen still down");
 }
@@ -335,12 +342,15 @@ void readInstruction(const std::string& instruction, Options& options, Command c
   app.parse(std::move(words));
 }
 
-// Reads the command line; where it says nothing, the options stay as they are.
-std::variant<Options, UsageEnd> parseOver(Options options, bool pictureIsRead) {
-  std::vector<const char*> argv;
-  for (const std::string& word : options.commandLine) argv.push_back(word.c_str());
-  const int argc = static_cast<int>(argv.size());
-  CLI::App app("Draws recorded ink with the pencil plug-in.", "qelt-sketch");
+// A command of the program, with its options.
+struct CommandEntry {
+  CLI::App* app;
+  Command command;
+};
+
+// All of the program's options, read into `options`; the help, the manual page and the completion tell what
+// is here.
+std::vector<CommandEntry> addCommands(CLI::App& app, Options& options) {
   app.require_subcommand(1);
 
   CLI::App* const draw = app.add_subcommand("draw", "draw the page as a PNG picture");
@@ -373,19 +383,59 @@ std::variant<Options, UsageEnd> parseOver(Options options, bool pictureIsRead) {
   addFeeding(shown, options);
   shown.add<PixelSize>(
       "--fit", options.fit, kPixels,
-      "the largest zoom at which the page fits into so many pixels (default: at most 1, within " +
+      "of each drawing: the largest zoom at which the page fits into so many pixels (default: "
+      "at most 1, within " +
           printPixels(kUsualCell) + ")");
 
   CLI::App* const info =
       app.add_subcommand("info", "show plug-in path, GL renderer, version table and pen limits");
 
-  const std::pair<CLI::App*, Command> commands[] = {{draw, Command::Draw},
-                                                    {trace, Command::Trace},
-                                                    {preview, Command::Preview},
-                                                    {sheet, Command::Sheet},
-                                                    {info, Command::Info}};
-  for (const auto& [command, value] : commands) addPlugin(*command, options);
+  const std::vector<CommandEntry> commands{{draw, Command::Draw},
+                                           {trace, Command::Trace},
+                                           {preview, Command::Preview},
+                                           {sheet, Command::Sheet},
+                                           {info, Command::Info}};
+  for (const CommandEntry& entry : commands) addPlugin(*entry.app, options);
   for (CLI::App* const command : {draw, trace, sheet}) command->footer(limits());
+  return commands;
+}
+
+// A text that was asked for instead of a command.
+class AskedText : public CLI::Success {
+ public:
+  explicit AskedText(const std::string& text) : CLI::Success("AskedText", text, CLI::ExitCodes::Success) {}
+};
+
+// What the program tells about itself without a command.
+void addTexts(CLI::App& app) {
+  app.add_flag_callback(
+      "--version", [] { throw AskedText(kVersion + "\n"); }, "show the program's version");
+  app.add_flag_callback(
+      "--man", [&app] { throw AskedText(manualPage(app, kVersion)); }, "print the manual page, for man -l");
+  static constexpr std::array<std::pair<const char*, std::string (*)(const CLI::App&)>, 2> kShells{
+      {{"bash", bashCompletion}, {"zsh", zshCompletion}}};
+  const auto form = oneOf(kShells);
+  app.add_option_function<std::string>(
+         "--completion",
+         [&app, form](const std::string& shell) {
+           const auto script = form.parse(shell);
+           if (!script)
+             throw CLI::ValidationError("--completion", "expects " + form.wanted + ", not '" + shell + "'");
+           throw AskedText((*script)(app));
+         },
+         "print a script by which the shell completes the program's command line")
+      ->type_name(form.shape);
+  app.footer(exitStatuses());
+}
+
+// Reads the command line; where it says nothing, the options stay as they are.
+std::variant<Options, UsageEnd> parseOver(Options options, bool pictureIsRead) {
+  std::vector<const char*> argv;
+  for (const std::string& word : options.commandLine) argv.push_back(word.c_str());
+  const int argc = static_cast<int>(argv.size());
+  CLI::App app("Draws recorded ink with the pencil plug-in.", "qelt-sketch");
+  addTexts(app);
+  const std::vector<CommandEntry> commands = addCommands(app, options);
 
   try {
     app.parse(argc, argv.data());
@@ -396,8 +446,10 @@ std::variant<Options, UsageEnd> parseOver(Options options, bool pictureIsRead) {
       checkTogether(options);
     } catch (const CLI::ValidationError&) {
       // What is missing may be in the picture.
-      if (pictureIsRead || !options.input || !isPng(*options.input)) throw;
+      if (pictureIsRead || !options.input || !maybePng(*options.input)) throw;
     }
+  } catch (const AskedText& text) {
+    return UsageEnd{text.what(), 0};
   } catch (const CLI::RequiredError& error) {
     if (!app.get_subcommands().empty() || argc < 2) return usageEnd(app, error);
     return UsageEnd{"no command '" + oneLine(argv[1]) + "'; see qelt-sketch --help\n", 2};
@@ -438,6 +490,11 @@ Options withInstruction(const Options& asked, const std::string& name, const std
   if (const auto* const usage = std::get_if<UsageEnd>(&merged))
     throw Refusal(name + ": as the picture was drawn, " + usage->text.substr(0, usage->text.find('\n')));
   return std::get<Options>(std::move(merged));
+}
+
+void checkWithoutInstruction(const Options& asked) {
+  const std::variant<Options, UsageEnd> parsed = parseOver(asked, true);
+  if (const auto* const usage = std::get_if<UsageEnd>(&parsed)) throw WrongUsage(*usage);
 }
 
 }  // namespace QeltDesktop

@@ -92,8 +92,17 @@ std::size_t strokesToPlay(const Page& page, const Options& options) {
 // The page, with the options that the picture was drawn with where it is one.
 Page readPage(Options& options) {
   PageInput input = readPageInput(inputPath(options));
-  if (input.drawnWith) options = withInstruction(options, input.page.name, *input.drawnWith);
+  if (input.drawnWith) {
+    options = withInstruction(options, input.page.name, *input.drawnWith);
+  } else {
+    checkWithoutInstruction(options);
+  }
   return std::move(input.page);
+}
+
+// The file that holds the page, which must not be written over.
+std::string inputFile(const Page& page, const Options& options) {
+  return options.input == kStandardInput ? "/dev/stdin" : page.name;
 }
 
 // What a picture of the page carries, so that it can be drawn again from nothing else.
@@ -115,7 +124,7 @@ PictureText inkOf(const Page& page, Options options) {
 void draw(const Options& asked) {
   Options options = asked;
   Page page = readPage(options);
-  OutputFile file(options.output, page.name);
+  OutputFile file(options.output, inputFile(page, options));
   const PictureText ink = options.ink ? inkOf(page, options) : PictureText{};
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
@@ -163,7 +172,7 @@ Canvases canvasesFor(DrawableKind wanted, PenCanvas& canvas) {
 void trace(const Options& asked) {
   Options options = asked;
   Page page = readPage(options);
-  OutputFile file(options.output, page.name);
+  OutputFile file(options.output, inputFile(page, options));
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
   Progress progress("tracing stroke", strokesToPlay(page, options));
@@ -216,7 +225,7 @@ void sheet(const Options& asked) {
 
   Options options = asked;
   Page page = readPage(options);
-  OutputFile file(options.output, page.name);
+  OutputFile file(options.output, inputFile(page, options));
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
 
