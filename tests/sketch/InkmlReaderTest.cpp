@@ -353,18 +353,18 @@ TEST(InkmlReader, TellsInkmlFromOtherNamespaces) {
 TEST(InkmlReader, PassesOverWhatItDoesNotDraw) {
   const Page page =
       read(R"(<ink><definitions><traceFormat><channel name="X"><mapping type="identity"/></channel>
-      <channel name="B" type="boolean"/><channel name="Y"/><channel name="H" units="furlong"/>
-      <intermittentChannels><channel name="S" type="boolean"/></intermittentChannels></traceFormat>
+      <channel name="F" type="boolean"/><channel name="Y"/><channel name="H" units="furlong"/>
+      <intermittentChannels><channel name="OE" units="furlong"/></intermittentChannels></traceFormat>
       <canvas/><mapping/><timestamp xml:id="t"/><trace xml:id="kept">7 T 7 7</trace></definitions>
     <annotationXML type="truth"><math><mi>x</mi><trace>no</trace></math></annotationXML>
     <traceView traceDataRef="#kept"><traceView from="1"/><annotation type="tool">quill</annotation></traceView>
     <news><item/>more</news>
     <traceGroup><annotationXML/><traceView/><trace id="0">1 T 2 3<annotationXML><a/>5</annotationXML>, 4 F <news>8</news>
-    5 6 T</trace></traceGroup></ink>)");
+    5 6 30</trace></traceGroup></ink>)");
   ASSERT_EQ(page.strokes.size(), 1u);
   ASSERT_EQ(page.strokes[0].samples.size(), 2u);
-  EXPECT_EQ(page.strokes[0].samples[1].x, 4.0f);
-  EXPECT_EQ(page.strokes[0].samples[1].y, 5.0f);
+  const Sample last = page.strokes[0].samples[1];
+  EXPECT_EQ(valuesOf(last), (std::vector<double>{4, 5, 1, 0, 0, 1000.0 / 240.0}));
 }
 
 TEST(InkmlReader, ReadsFilesOfUtf16AndRefusesWhatIsNoFile) {

@@ -68,15 +68,21 @@ bool hasUnits(Quantity quantity) {
 
 class ChannelReader {
  public:
-  ChannelReader(const SourceText& source, const ChannelText& text) : mSource(source), mText(text) {}
+  ChannelReader(const SourceText& source, const ChannelText& text, bool intermittent)
+      : mSource(source), mText(text), mIntermittent(intermittent) {}
 
   Channel read() {
     if (mText.name.empty()) throw malformed("channel without a name", "");
     mChannel.quantity = quantityNamed(mText.name);
     mChannel.boolean = mText.type == "boolean";
+    // A switch, or what is known at some points only, says nothing of how a stroke is drawn; but no stroke is
+    // drawn without places.
+    if (isPlace(mChannel.quantity)) {
+      if (mChannel.boolean) throw malformed("channel " + mText.name + " cannot be", "boolean");
+    } else if (mChannel.boolean || mIntermittent) {
+      mChannel.quantity = Quantity::Ignored;
+    }
     const Quantity quantity = mChannel.quantity;
-    if (mChannel.boolean && quantity != Quantity::Ignored)
-      throw malformed("channel " + mText.name + " cannot be", "boolean");
     if (hasUnits(quantity)) readUnit();
     if (isPlace(quantity) && mText.orientation == "-ve") mChannel.unit = -mChannel.unit;
     if (isAngle(quantity)) readRange();
@@ -124,6 +130,7 @@ class ChannelReader {
 
   const SourceText& mSource;
   const ChannelText& mText;
+  bool mIntermittent;
   Channel mChannel;
 };
 
@@ -154,17 +161,17 @@ TraceFormat traceFormatOf(const SourceText& source, std::size_t offset,
   TraceFormat format;
   format.channels.reserve(regular.size() + intermittent.size());
   std::set<std::string> names;
-  const auto take = [&](const std::vector<ChannelText>& channels) {
+  const auto take = [&](const std::vector<ChannelText>& channels, bool areIntermittent) {
     for (const ChannelText& channel : channels) {
-      format.channels.push_back(ChannelReader(source, channel).read());
+      format.channels.push_back(ChannelReader(source, channel, areIntermittent).read());
       if (!names.insert(channel.name).second) {
         throw source.refusalAt(channel.offset, "channel named twice", channel.name);
       }
     }
   };
-  take(regular);
+  take(regular, false);
   format.regularCount = format.channels.size();
-  take(intermittent);
+  take(intermittent, true);
   for (const auto& [quantity, name] : {std::pair{Quantity::X, "X"}, std::pair{Quantity::Y, "Y"}}) {
     if (!format.has(quantity)) throw source.refusalAt(offset, "traceFormat without channel", name);
   }
