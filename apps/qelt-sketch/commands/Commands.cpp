@@ -14,6 +14,7 @@
 #include <system_error>
 
 #include "commands/CommandLine.h"
+#include "commands/Compare.h"
 #include "commands/PageInput.h"
 #include "desktop/engine/PluginLibrary.h"
 #include "desktop/gl/RenderQueue.h"
@@ -329,21 +330,29 @@ void info(const Options& options) {
 
 }  // namespace
 
-void runCommand(const Options& options) {
+int runCommand(const Options& options) {
   // Without --log, standard error holds only the line that says what could not be done.
   if (!options.log) silenceLog();
   switch (options.command) {
     case Command::Draw:
-      return draw(options);
+      draw(options);
+      break;
     case Command::Trace:
-      return trace(options);
+      trace(options);
+      break;
     case Command::Preview:
-      return preview(options);
+      preview(options);
+      break;
     case Command::Sheet:
-      return sheet(options);
+      sheet(options);
+      break;
     case Command::Info:
-      return info(options);
+      info(options);
+      break;
+    case Command::Compare:
+      return compare(options.compare);
   }
+  return 0;
 }
 
 }  // namespace QeltDesktop
