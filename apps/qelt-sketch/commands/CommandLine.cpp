@@ -319,6 +319,8 @@ std::variant<Options, UsageEnd> parseOver(Options options, bool pictureIsRead) {
   addOutput(*draw, options, "picture to write");
   draw->add_flag_callback(
       "--no-ink", [&options] { options.ink = false; }, "a picture without the page and the options in it");
+  draw->add_flag("--timings", options.timings,
+                 "tell where the time went, and the most memory, on standard error");
   OptionGroup drawn(*draw);
   addDrawing(drawn, options);
 

@@ -15,7 +15,7 @@ class WorkInFlight {
 
  private:
   // Vertices between two points to wait for; up to twice as many are in flight, and those of one task more.
-  static constexpr std::size_t kMostBytes = std::size_t{2} << 20;
+  static constexpr std::size_t kMostBytes = std::size_t{1} << 19;
 
   std::size_t mBytes = 0;  // since the newest point
   GpuFence mPoints[2];
