@@ -7,6 +7,7 @@
 #include <cmath>
 #include <cstdint>
 #include <optional>
+#include <span>
 #include <stdexcept>
 #include <vector>
 
@@ -47,6 +48,40 @@ TEST(Compose, LayersMeetPremultipliedAndWithoutABackgroundComeOutStraight) {
   // 64 of 128 is half: 0.50196 * 255 = 127.5 within float, so 127 or 128; red 128 of 128 is full.
   expectNear(composeLayers({{128, 64, 0, 128}}, std::nullopt), {255, 127, 0, 128});
   EXPECT_EQ(composeLayers({{0, 0, 0, 0}}, std::nullopt), (Pixels{0, 0, 0, 0}));
+}
+
+// Every strength of ink, alone among bare pixels and beside others, by the definition.
+TEST(Compose, RoundsEveryStrengthToTheNearest) {
+  Pixels layer;
+  for (int alpha = 0; alpha < 256; ++alpha) {
+    for (int color = 0; color <= alpha; ++color) {
+      const auto c = static_cast<std::uint8_t>(color), a = static_cast<std::uint8_t>(alpha);
+      layer.insert(layer.end(), {c, 0, a, a});
+      // Long and short stretches without ink in between, of odd lengths.
+      if (color % 23 == 0) layer.resize(layer.size() + static_cast<std::size_t>(color % 41) * 4);
+    }
+  }
+  constexpr std::array<std::uint8_t, 3> kPaper{200, 3, 90};
+  const Pixels onPaper = composeLayers({layer}, kPaper), straight = composeLayers({layer}, std::nullopt);
+  for (std::size_t at = 0; at < layer.size(); at += 4) {
+    const auto share = [&](std::size_t i) { return static_cast<float>(layer[at + i]) / 255.0f; };
+    const float alpha = share(3), kept = 1.0f - alpha;
+    for (std::size_t i = 0; i < 3; ++i) {
+      const float paper = static_cast<float>(kPaper[i]) / 255.0f;
+      EXPECT_EQ(onPaper[at + i], std::lround(std::min(share(i) + kept * paper, 1.0f) * 255.0f)) << at;
+      EXPECT_EQ(straight[at + i], alpha > 0.0f ? std::lround(share(i) / alpha * 255.0f) : 0) << at;
+    }
+    EXPECT_EQ(onPaper[at + 3], 255);
+    EXPECT_EQ(straight[at + 3], layer[at + 3]);
+  }
+  // In place, and in parts.
+  Pixels inPlace = layer;
+  const std::span<std::uint8_t> all(inPlace);
+  for (const std::span<std::uint8_t> part : {all.first(1000), all.subspan(1000)}) {
+    const std::span<const std::uint8_t> below(part);
+    composeLayers(std::span(&below, 1), kPaper, part);
+  }
+  EXPECT_EQ(inPlace, onPaper);
 }
 
 // What is shown is what is written to files; here on a surface off screen.

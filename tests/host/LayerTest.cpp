@@ -301,6 +301,13 @@ TEST_P(Layer, AreasAreCopiedClearedAndExchanged) {
     painter.draw(*painted.GetBitmap());
   });
   const Pixels before = painted.readPixels();
+  Pixels rows(40 * 4 * 7);
+  painted.readRows(11, rows);
+  EXPECT_EQ(rows, Pixels(before.begin() + 40 * 4 * 11, before.begin() + 40 * 4 * 18));
+  for (const auto& [top, size] : {std::pair(24, 40 * 4 * 7), {-1, 40 * 4}, {31, 0}, {0, 40 * 4 + 4}}) {
+    rows.resize(static_cast<std::size_t>(size));
+    EXPECT_THROW(painted.readRows(top, rows), std::invalid_argument) << top << ", " << size;
+  }
   // Where the window shader painted, red is the column. Areas end at the layers' edges.
   other.copyFrom(painted, {-5, 10, 100, 100});
   EXPECT_EQ(pixelAt(other.readPixels(), 32, 31, 29)[0], 31);

@@ -17,6 +17,7 @@
 
 #include "output/Picture.h"
 #include "output/PngReader.h"
+#include "output/PngWriter.h"
 #include "text/Refusal.h"
 
 namespace QeltDesktop {

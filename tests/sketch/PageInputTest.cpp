@@ -16,6 +16,7 @@
 
 #include "commands/CommandLine.h"
 #include "output/Picture.h"
+#include "output/PngWriter.h"
 #include "play/Options.h"
 #include "text/Refusal.h"
 

@@ -61,7 +61,7 @@ TEST(PageDrawing, IsOnlySoFarAheadOfTheRenderThread) {
   setBatchObserver({});
   EXPECT_EQ(writtenBytes() - before, drawn);
   EXPECT_GT(drawn, 32'000'000u);
-  EXPECT_LT(mostWaiting, 20'000'000u);
+  EXPECT_LT(mostWaiting, 6'000'000u);
 }
 
 TEST(PageDrawing, OfWhichSomethingWasLostIsNoPicture) {

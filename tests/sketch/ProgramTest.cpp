@@ -14,6 +14,7 @@
 #include <filesystem>
 #include <fstream>
 #include <iterator>
+#include <map>
 #include <memory>
 #include <nlohmann/json.hpp>
 #include <regex>
@@ -420,6 +421,51 @@ TEST_F(Program, DrawsPredictionsWholeAcrossTheBordersOfTiles) {
   }
   EXPECT_GT(apart.darker(255, 312, 66, 316, 86), 20);
   EXPECT_LE(differing, 2);
+}
+
+// Seconds of each stage and MiB of memory, by what a run with --timings tells last on standard error.
+TEST_F(Program, TellsWhereTimeWentAndTakesNoMoreMemoryForMoreWork) {
+  const auto told = [&](const std::string& arguments) {
+    const Ran ran = run("draw -o drawn.png --timings " + arguments);
+    EXPECT_EQ(ran.status, 0) << ran.err;
+    std::map<std::string, double> figures;
+    std::string order;
+    const std::regex form("(\\w+) +(\\d+\\.\\d+) (s|MiB)\n");
+    for (std::sregex_iterator line(ran.err.begin(), ran.err.end(), form), none; line != none; ++line) {
+      order += (*line)[1].str() + ' ';
+      figures[(*line)[1]] = std::stod((*line)[2]);
+    }
+    EXPECT_EQ(order, "read geometry GL compose encode whole memory ");
+    const double stages =
+        figures["read"] + figures["geometry"] + figures["GL"] + figures["compose"] + figures["encode"];
+    EXPECT_LE(stages, figures["whole"] + 0.005);
+    EXPECT_GT(stages, figures["whole"] / 2);
+    return figures["memory"];
+  };
+  EXPECT_EQ(run("draw ink.inkml -o drawn.png").err.find("whole"), std::string::npos);
+  const double small = told("ink.inkml --page 120x60");
+  // Sanitizers keep what is freed, and an emulator what it translates.
+  if (QELT_SANITIZED || !std::string(QELT_EMULATOR).empty()) return;
+  // MiB: a layer, and what bands, rows and threads take besides. The driver's own share is in all of them.
+  constexpr double kLayer = 2048.0 * 2048 * 4 / (1 << 20), kBesides = 8;
+  const std::string large = "ink.inkml --page 2048x2048 ";
+  EXPECT_GT(told(large), small + kLayer);
+  EXPECT_LT(told(large + "--predict 3"), small + kLayer + kBesides);
+  const std::string outlined = " --outline 2,#FF00FF00 --repeat 2 ";
+  EXPECT_LT(told(large + outlined), told("ink.inkml --page 120x60" + outlined) + 2 * kLayer + kBesides);
+
+  // 24 MB of vertices a pass.
+  std::string strokes;
+  for (int i = 0; i < 90; i += 3) {
+    const auto point = [](int x, int y) { return std::to_string(x) + ' ' + std::to_string(y); };
+    strokes += "<trace>" + point(0, i) + ',' + point(600, i + 1) + ',' + point(0, i + 2) + "</trace>";
+  }
+  write("strokes.inkml", "<ink>" + strokes + "</ink>");
+  for (const std::string mode : {"live", "stroke"}) {
+    const double once = told("strokes.inkml --size 3 --mode " + mode);
+    EXPECT_LT(once, small + 3 * kBesides) << mode;
+    EXPECT_LT(told("strokes.inkml --size 3 --repeat 4 --mode " + mode), once + kBesides + 4) << mode;
+  }
 }
 
 // Strokes of one shape under one another; each may have settings of its own.

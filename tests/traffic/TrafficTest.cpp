@@ -5,11 +5,13 @@
 
 #include <algorithm>
 #include <cstddef>
+#include <cstdint>
 #include <functional>
 #include <set>
 #include <string>
 #include <vector>
 
+#include "desktop/pencommon/BatchObserver.h"
 #include "support/Command.h"
 #include "support/PenBoard.h"
 #include "traffic/GlCalls.h"
@@ -112,6 +114,31 @@ TEST_F(Traffic, OfAnotherLayerAndAnotherUser) {
   EXPECT_EQ(std::count(calls.begin(), calls.end(), "glBindFramebuffer"), 1) << testing::PrintToString(calls);
   EXPECT_LE(calls.size(), 20u) << testing::PrintToString(calls);
   EXPECT_EQ(callsOf([&] { board.move({{38, 30}, {40, 32}}); }), kOneTile);
+}
+
+// The GPU is waited for in time, however much is drawn at once: what it has not drawn takes memory. The
+// browser forbids such waits, so a host without a thread makes none.
+TEST(TrafficOfALongStroke, StaysNearTheGpu) {
+  for (const bool thread : {true, false}) {
+    PenBoard board({.width = kTile, .height = kTile, .tile = kTile, .thread = thread});
+    board.queue.finish();
+    takeGlCalls();
+    constexpr int kMoves = 40, kFar = 2000;
+    const std::uint64_t before = QeltDesktop::writtenBytes();
+    board.down({0, 0});
+    for (int i = 1; i <= kMoves; ++i) board.move({{i % 2 == 0 ? 0.0f : float{kFar}, static_cast<float>(i)}});
+    board.queue.finish();
+    const auto megabytes = static_cast<int>((QeltDesktop::writtenBytes() - before) >> 20);
+    EXPECT_GT(megabytes, 20);
+    const Calls calls = takeGlCalls();
+    const auto count = [&](const char* name) {
+      return static_cast<int>(std::count(calls.begin(), calls.end(), name));
+    };
+    // A batch here is one megabyte and more: three reach the next point.
+    EXPECT_GE(count("glFenceSync"), thread ? megabytes / 4 : 0);
+    EXPECT_GE(count("glClientWaitSync"), count("glFenceSync") - 2);
+    EXPECT_EQ(count("glFenceSync") > 0, thread);
+  }
 }
 
 // A call that is not noted would make every number above too small.

@@ -365,6 +365,8 @@ std::vector<CommandEntry> addCommands(CLI::App& app, Options& options) {
   addOutput(*draw, options, "picture to write");
   draw->add_flag_callback(
       "--no-ink", [&options] { options.ink = false; }, "a picture without the page and the options in it");
+  draw->add_flag("--timings", options.timings,
+                 "tell where the time went, and the most memory, on standard error");
   OptionGroup drawn(*draw);
   addDrawing(drawn, options);
 

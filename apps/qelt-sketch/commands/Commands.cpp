@@ -8,10 +8,13 @@
 #include <cstdint>
 #include <cstdio>
 #include <filesystem>
+#include <functional>
 #include <optional>
 #include <span>
 #include <string>
+#include <string_view>
 #include <system_error>
+#include <utility>
 
 #include "commands/CommandLine.h"
 #include "commands/Compare.h"
@@ -24,6 +27,8 @@
 #include "output/LabelFont.h"
 #include "output/OutputFile.h"
 #include "output/Picture.h"
+#include "output/PngWriter.h"
+#include "output/StageTimes.h"
 #include "output/Terminal.h"
 #include "pen/RenderingVersions.h"
 #include "pencommon/IPenMorphable.h"
@@ -90,6 +95,10 @@ std::size_t strokesToPlay(const Page& page, const Options& options) {
   return page.strokes.size() * static_cast<std::size_t>(options.repeat);
 }
 
+std::function<void(std::string_view)> writerTo(OutputFile& file) {
+  return [&file](std::string_view bytes) { file.write(bytes); };
+}
+
 // The page, with the options that the picture was drawn with where it is one.
 Page readPage(Options& options) {
   PageInput input = readPageInput(inputPath(options));
@@ -122,23 +131,54 @@ PictureText inkOf(const Page& page, Options options) {
   return ink;
 }
 
-void draw(const Options& asked) {
-  Options options = asked;
-  Page page = readPage(options);
-  OutputFile file(options.output, inputFile(page, options));
-  const PictureText ink = options.ink ? inkOf(page, options) : PictureText{};
-  const PluginLibrary plugin(pluginPath(options));
-  RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
+// A page to be drawn to a file, made before there is a GL context, so that what cannot be read or written is
+// refused at once.
+struct DrawnFile {
+  DrawnFile(const Options& asked, StageTimes& times)
+      : DrawnFile(asked, StageTimes::Watch(times, Stage::Read)) {}
 
+  Options options;
+  Page page;
+  OutputFile file;
+  PictureText ink;
+
+ private:
+  DrawnFile(const Options& asked, const StageTimes::Watch&)
+      : options(asked),
+        page(readPage(options)),
+        file(options.output, inputFile(page, options)),
+        ink(options.ink ? inkOf(page, options) : PictureText{}) {}
+};
+
+void drawFile(DrawnFile& drawn, const PluginLibrary& plugin, RenderQueue& queue, StageTimes& times) {
+  Options& options = drawn.options;
+  Page& page = drawn.page;
   // The extent of the whole page: what --points leaves out keeps its place.
   const PageLayout layout = layOutPage(plugin, queue, page, options);
   if (options.points) cutLastStroke(page, *options.points);
 
   Progress progress("drawing stroke", strokesToPlay(page, options));
-  const Picture picture =
-      drawPage(plugin, queue, page, options, layout, drawablesFor(page, options), progress);
-  file.write(encodePng(picture, ink));
-  file.commit();
+  PngWriter png(writerTo(drawn.file), std::move(drawn.ink));
+  PageDrawer(plugin, queue, times)
+      .draw(page, options, layout, drawablesFor(page, options), progress, png);
+  const StageTimes::Watch watch(times, Stage::Encode);
+  drawn.file.commit();
+}
+
+void draw(const Options& options) {
+  StageTimes times;
+  {
+    DrawnFile drawn(options, times);
+    std::optional<PluginLibrary> plugin;
+    std::optional<RenderQueue> queue;
+    {
+      const StageTimes::Watch watch(times, Stage::GL);
+      plugin.emplace(pluginPath(drawn.options));
+      queue.emplace(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
+    }
+    drawFile(drawn, *plugin, *queue, times);
+  }
+  if (options.timings) std::fputs(times.report().c_str(), stderr);
 }
 
 // It tells how the first stroke is drawn.
@@ -200,9 +240,9 @@ void preview(const Options& asked) {
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
   Progress progress("drawing stroke", 1);
   const PageLayout layout = layOut({0.0f, 0.0f, kPanelWidth, kPanelHeight}, 1.0f, 0.0f);
-  const Picture picture =
-      drawPage(plugin, queue, samplePanel(), options, layout, {.preview = true}, progress);
-  file.write(encodePng(picture));
+  StageTimes times;
+  PngWriter png(writerTo(file));
+  PageDrawer(plugin, queue, times).draw(samplePanel(), options, layout, {.preview = true}, progress, png);
   file.commit();
 }
 

@@ -20,6 +20,7 @@
 #include "output/OutputFile.h"
 #include "output/Picture.h"
 #include "output/PngReader.h"
+#include "output/PngWriter.h"
 #include "output/Terminal.h"
 #include "text/Refusal.h"
 

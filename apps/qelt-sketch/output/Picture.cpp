@@ -2,15 +2,7 @@
 
 #include <algorithm>
 #include <cstddef>
-#include <cstdio>
-#include <cstdlib>
-#include <memory>
-#include <new>
 #include <utility>
-
-#include <spng.h>
-
-#include "text/Refusal.h"
 
 namespace QeltDesktop {
 
@@ -46,44 +38,6 @@ void paste(Picture& picture, const Picture& part, int x, int y) {
     std::copy_n(part.rgba.begin() + static_cast<std::ptrdiff_t>(from), (right - left) * 4,
                 picture.pixelAt(left, row));
   }
-}
-
-std::string encodePng(const Picture& picture, const PictureText& text) {
-  const std::unique_ptr<spng_ctx, void (*)(spng_ctx*)> encoder(spng_ctx_new(SPNG_CTX_ENCODER),
-                                                               &spng_ctx_free);
-  if (!encoder) throw std::bad_alloc();
-  const auto check = [](int error) {
-    if (error != 0) throw Refusal(std::string("the picture cannot be encoded: ") + spng_strerror(error));
-  };
-  check(spng_set_option(encoder.get(), SPNG_ENCODE_TO_BUFFER, 1));
-  spng_ihdr header{};
-  header.width = static_cast<std::uint32_t>(picture.width);
-  header.height = static_cast<std::uint32_t>(picture.height);
-  header.bit_depth = 8;
-  header.color_type = SPNG_COLOR_TYPE_TRUECOLOR_ALPHA;
-  check(spng_set_ihdr(encoder.get(), &header));
-  // The encoder reads it while it encodes.
-  std::string carried = text.text, none;
-  spng_text chunk{};
-  if (!carried.empty()) {
-    constexpr std::size_t kWorthCompressing = 4096;
-    std::snprintf(chunk.keyword, sizeof chunk.keyword, "%s", text.keyword);
-    chunk.type = SPNG_ITXT;
-    chunk.text = carried.data();
-    chunk.length = carried.size();
-    chunk.compression_flag = carried.size() > kWorthCompressing ? 1 : 0;
-    chunk.language_tag = none.data();
-    chunk.translated_keyword = none.data();
-    check(spng_set_text(encoder.get(), &chunk, 1));
-  }
-  check(spng_encode_image(encoder.get(), picture.rgba.data(), picture.rgba.size(), SPNG_FMT_PNG,
-                          SPNG_ENCODE_FINALIZE));
-  std::size_t size = 0;
-  int error = 0;
-  const std::unique_ptr<void, void (*)(void*)> bytes(spng_get_png_buffer(encoder.get(), &size, &error),
-                                                     &std::free);
-  check(error);
-  return std::string(static_cast<const char*>(bytes.get()), size);
 }
 
 }  // namespace QeltDesktop

@@ -1,7 +1,6 @@
 #pragma once
 
 #include <cstdint>
-#include <string>
 #include <vector>
 
 namespace QeltDesktop {
@@ -22,15 +21,5 @@ Picture plainPicture(int width, int height, std::uint32_t rgb);
 
 // Copies `part` to (x, y); what would lie outside the picture is left out.
 void paste(Picture& picture, const Picture& part, int x, int y);
-
-// A text that a picture carries: a keyword of Latin letters, at most 79, and UTF-8.
-struct PictureText {
-  const char* keyword = "";
-  std::string text;  // none if it is empty
-};
-
-// The bytes of the picture as a PNG file, with the text in an iTXt chunk before the pixels, compressed where
-// that pays. Throws Refusal when it cannot be encoded.
-std::string encodePng(const Picture& picture, const PictureText& text = {});
 
 }  // namespace QeltDesktop

@@ -81,6 +81,7 @@ struct Options {
   bool ink = true;                    // the picture carries the page that it shows
   std::optional<std::string> plugin;  // none: the one built with the program
   bool log = false;                   // show the platform log
+  bool timings = false;               // tell where the time went, and the memory
 
   std::optional<int> renderingVersion;  // none: the stroke's. Any number: the pen knows what to do
   std::optional<float> size;            // none: the brush's, else the pen's own. Any float: the pen checks it

@@ -7,9 +7,11 @@
 
 namespace QeltDesktop {
 
+class PictureSink;
 class PluginLibrary;
 class Progress;
 class RenderQueue;
+class StageTimes;
 
 // The most pixels that a picture has on a side and in all; the latter take 256 MiB per layer.
 constexpr int kLongestSide = 32'767;
@@ -33,8 +35,27 @@ float largestPenSize(const PluginLibrary& plugin, RenderQueue& queue, const Page
 // The largest outline size on the page, as `outlineFor` gives it; 0 without outlines.
 float largestOutlineSize(const Page& page, const Options& options);
 
-// Plays the page to new pens and composes the layers on the background. Throws Refusal when the picture is
-// too large to draw or a pen lacks a drawable.
+// Draws pages, one after the other, with one plug-in and one GL context. A page takes its pixels once for
+// each layer, and little besides: the picture is composed and handed on in bands. Main thread.
+class PageDrawer {
+ public:
+  // All outlive it.
+  PageDrawer(const PluginLibrary& plugin, RenderQueue& queue, StageTimes& times)
+      : mPlugin(plugin), mQueue(queue), mTimes(times) {}
+
+  // Plays the page to new pens, composes the layers on the background, and hands the picture to `sink`.
+  // Throws Refusal when the picture is too large to draw or a pen lacks a drawable; until the page is drawn,
+  // the sink has heard nothing.
+  void draw(const Page& page, const Options& options, const PageLayout& layout, const DrawableSet& drawables,
+            Progress& progress, PictureSink& sink);
+
+ private:
+  const PluginLibrary& mPlugin;
+  RenderQueue& mQueue;
+  StageTimes& mTimes;
+};
+
+// One page as a picture in memory.
 Picture drawPage(const PluginLibrary& plugin, RenderQueue& queue, const Page& page, const Options& options,
                  const PageLayout& layout, const DrawableSet& drawables, Progress& progress);
 

@@ -16,8 +16,13 @@
 namespace QeltDesktop {
 namespace {
 
-// What the cached drawings of a page may take together.
-constexpr std::size_t kMostCachedBytes = std::size_t{256} << 20;
+// What the cached drawings of a page may take together. A trace tells which calls took theirs from the cache;
+// a picture is the same either way, and what is drawn once needs none.
+std::size_t mostCachedBytes(const Options& options) {
+  constexpr std::size_t kTraced = std::size_t{256} << 20, kDrawn = std::size_t{4} << 20;
+  if (options.command == Command::Trace) return kTraced;
+  return options.repeat > 1 ? kDrawn : 0;
+}
 
 // The pen's drawable of one kind, set to draw into the canvas; null when there is no canvas.
 template <typename Drawable>
@@ -110,7 +115,6 @@ void PagePlayer::playLive(std::size_t index, PlayObserver& observer) {
            [&](LiveEvent& live) {
              const Qelt::MotionEvent& event = live.event;
              const int action = event.GetAction();
-             if (mNow->prediction != nullptr) observer.predictionEnds();
              if (mNow->stroke != nullptr) {
                observer.call(call(DrawableKind::Stroke, index, "Draw", action),
                              [&](Qelt::RectF* rect) { return mNow->stroke->Draw(&event, rect); });
@@ -119,17 +123,20 @@ void PagePlayer::playLive(std::size_t index, PlayObserver& observer) {
                observer.call(call(DrawableKind::Preview, index, "Draw", action),
                              [&](Qelt::RectF* rect) { return mNow->preview->Draw(&event, rect); });
              }
-             if (mNow->prediction != nullptr && action == Qelt::kActionMove)
-               predict(index, live.sample, observer);
+             if (mNow->prediction != nullptr && action == Qelt::kActionMove) {
+               const bool isLast = live.sample + 1 == mPage.strokes[index].samples.size();
+               predict(index, live.sample, penStaysDown && isLast, observer);
+             }
            });
 }
 
-void PagePlayer::predict(std::size_t index, std::size_t sample, PlayObserver& observer) {
+void PagePlayer::predict(std::size_t index, std::size_t sample, bool staysInSight, PlayObserver& observer) {
   const Samples samples = mPage.strokes[index].samples;
   const Qelt::MotionEvent event =
       predictedEvent(samples[sample - 1], samples[sample], pointerOf(index), mOptions.predict);
-  observer.call(call(DrawableKind::Prediction, index, "Draw", event.GetAction()),
-                [&](Qelt::RectF* rect) { return mNow->prediction->Draw(&event, rect); });
+  DrawableCall prediction = call(DrawableKind::Prediction, index, "Draw", event.GetAction());
+  prediction.staysInSight = staysInSight;
+  observer.call(prediction, [&](Qelt::RectF* rect) { return mNow->prediction->Draw(&event, rect); });
 }
 
 // The stroke as one recorded event. In live mode that is the outline's alone, as it has no live input.
@@ -189,7 +196,7 @@ void PagePlayer::boundCache(std::size_t index) {
   }
   mCachedBytes += bytes - mCachedBytesOf[index];
   mCachedBytesOf[index] = bytes;
-  if (mCachedBytes > kMostCachedBytes) {
+  if (mCachedBytes > mostCachedBytes(mOptions)) {
     data->SetPointData(nullptr);
     mCachedBytes -= bytes;
     mCachedBytesOf[index] = 0;

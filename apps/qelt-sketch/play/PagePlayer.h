@@ -34,6 +34,7 @@ struct DrawableCall {
   int renderingVersion;
   const char* operation;
   std::optional<int> action;  // of the event; none when a stored stroke is drawn
+  bool staysInSight = false;  // of a prediction: none follows it, nor does the pen go up
 };
 
 // Watches a page being played. Main thread.
@@ -42,8 +43,6 @@ class PlayObserver {
   virtual ~PlayObserver() = default;
   // The page is about to be played, for the first time or again.
   virtual void passBegins() {}
-  // The prediction shown so far is out of date.
-  virtual void predictionEnds() {}
   // Makes the call by calling `make` once, with a rectangle of zeros.
   virtual void call(const DrawableCall& call, const std::function<bool(Qelt::RectF*)>& make) = 0;
   virtual void strokeEnds() {}
@@ -93,7 +92,7 @@ class PagePlayer {
   void playRecorded(std::size_t index, PlayObserver& observer);
   void playStored(std::size_t index, PlayObserver& observer);
   void boundCache(std::size_t index);
-  void predict(std::size_t index, std::size_t sample, PlayObserver& observer);
+  void predict(std::size_t index, std::size_t sample, bool staysInSight, PlayObserver& observer);
   Pointer pointerOf(std::size_t index) const;
   bool outlinesNow(std::size_t index);
   DrawableCall call(DrawableKind drawable, std::size_t index, const char* operation,

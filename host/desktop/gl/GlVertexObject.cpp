@@ -7,6 +7,7 @@
 #include <cstdio>
 #include <limits>
 #include <new>
+#include <utility>
 
 #include "desktop/base/Log.h"
 #include "desktop/gl/GlCall.h"
@@ -24,6 +25,8 @@ namespace {
 
 // The list of those whose batches of several slices the running task has uploaded.
 thread_local GlVertexObject* tFirstLarge = nullptr;
+
+thread_local std::size_t tUploaded = 0;  // bytes
 
 std::atomic<std::uint64_t> gUndrawn{0};
 
@@ -102,6 +105,7 @@ bool GlVertexObject::upload(Buffer& buffer, const void* data, int vertices) {
       if (!takeGlErrors()) return false;
     }
     done += most;
+    tUploaded += size;
   }
   return buffer.slices.size() == 1 || hasRoomForDriver();
 }
@@ -132,6 +136,10 @@ void GlVertexObject::release() {
 
 std::uint64_t GlVertexObject::undrawnBatches() {
   return gUndrawn;
+}
+
+std::size_t GlVertexObject::takeUploadedBytes() {
+  return std::exchange(tUploaded, 0);
 }
 
 void GlVertexObject::dropLargeBatches() {

@@ -41,6 +41,9 @@ class QELT_HOST_API GlVertexObject final : public Qelt::GraphicsObject, public G
   // How many batches there was no memory for since the process began. Any thread.
   static std::uint64_t undrawnBatches();
 
+  // How many bytes of vertices have been uploaded on this thread since the last time.
+  static std::size_t takeUploadedBytes();
+
   // A render task has ended: drops the batches of several slices that it uploaded on this thread.
   static void dropLargeBatches();
 

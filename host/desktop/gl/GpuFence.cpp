@@ -23,6 +23,13 @@ bool GpuFence::hasPassed() {
   return true;
 }
 
+void GpuFence::wait() {
+  constexpr GLuint64 kSecond = 1'000'000'000;  // ns; drivers may not take more
+  while (mFence != nullptr && isLive() && gl(glClientWaitSync)(mFence, 0, kSecond) == GL_TIMEOUT_EXPIRED) {
+  }
+  drop();
+}
+
 void GpuFence::drop() {
   if (mFence != nullptr && isLive()) gl(glDeleteSync)(mFence);
   mFence = nullptr;

@@ -7,7 +7,7 @@
 
 namespace QeltDesktop {
 
-// Tells, without waiting, whether the GPU has done with everything up to a point. Render thread.
+// Tells whether the GPU has done with everything up to a point, or waits for that. Render thread.
 class QELT_HOST_API GpuFence final : public GlResource {
  public:
   GpuFence() = default;
@@ -18,6 +18,8 @@ class QELT_HOST_API GpuFence final : public GlResource {
   // Whether the GPU is past the point. True as well where there is none, and while there is no context. In a
   // browser the answer changes only between two turns of its event loop.
   bool hasPassed();
+  // Waits until the GPU is past the point. Not in a browser, which forbids it.
+  void wait();
 
  private:
   void forget() noexcept override { mFence = nullptr; }

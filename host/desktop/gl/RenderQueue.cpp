@@ -7,12 +7,14 @@
 #include <exception>
 #include <future>
 #include <new>
+#include <optional>
 #include <utility>
 #include <vector>
 
 #include "desktop/base/Log.h"
 #include "desktop/gl/GlDevice.h"
 #include "desktop/gl/GlVertexObject.h"
+#include "desktop/gl/WorkInFlight.h"
 #include "gl/ITask.h"
 
 namespace Qelt {
@@ -194,10 +196,11 @@ std::uint64_t RenderQueue::enqueue(Qelt::ITask* task, bool internal) {
 }
 
 void RenderQueue::threadMain() {
+  std::optional<WorkInFlight> inFlight(std::in_place);
   std::unique_lock lock(mMutex);
   for (;;) {
     if (mFirst != nullptr) {
-      runNext(lock);
+      runNext(lock, &*inFlight);
       continue;
     }
     if (mClosed) break;
@@ -206,13 +209,14 @@ void RenderQueue::threadMain() {
     mThreadWaits = false;
   }
   lock.unlock();
+  inFlight.reset();
   mDevice.reset();
   lock.lock();
   // The system gives the number of a thread that has ended to another.
   mRunner = {};
 }
 
-void RenderQueue::runNext(std::unique_lock<std::mutex>& lock) {
+void RenderQueue::runNext(std::unique_lock<std::mutex>& lock, WorkInFlight* inFlight) {
   Qelt::ITask* const task = mFirst;
   mFirst = task->mNext;
   if (mFirst == nullptr) mLast = nullptr;
@@ -220,6 +224,7 @@ void RenderQueue::runNext(std::unique_lock<std::mutex>& lock) {
   lock.unlock();
   const bool ran = runAndDelete(task);
   GlVertexObject::dropLargeBatches();
+  if (inFlight != nullptr) inFlight->taskEnded();
   lock.lock();
   mTaskRuns = false;
   if (!ran) ++mDropped;
@@ -247,7 +252,7 @@ bool RenderQueue::isInsideTask() const {
 void RenderQueue::waitFor(std::unique_lock<std::mutex>& lock, std::uint64_t last) {
   while (mRan < last) {
     if (mMode == Mode::Caller) {
-      runNext(lock);
+      runNext(lock, nullptr);
     } else {
       // Those who wait for more look again and wait on.
       mWakeAt = std::min(mWakeAt, last);

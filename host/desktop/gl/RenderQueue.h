@@ -16,6 +16,7 @@
 namespace QeltDesktop {
 
 class GlDevice;
+class WorkInFlight;
 
 // The render thread: a queue of tasks, the thread that runs them in posting order, and the GL context they
 // draw with. A task runs once and is then deleted; what it throws is logged and goes no further. Posting,
@@ -94,7 +95,7 @@ class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
   void openDevice(GL gl, const Surface& surface);
 
   // These are called with the lock held. The first two release it while they run a task or wait.
-  void runNext(std::unique_lock<std::mutex>& lock);
+  void runNext(std::unique_lock<std::mutex>& lock, WorkInFlight* inFlight);
   void waitFor(std::unique_lock<std::mutex>& lock, std::uint64_t last);
   bool isRunner() const;
   bool isInsideTask() const;

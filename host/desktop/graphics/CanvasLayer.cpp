@@ -1,6 +1,7 @@
 #include "desktop/graphics/CanvasLayer.h"
 
 #include <algorithm>
+#include <cstddef>
 #include <stdexcept>
 #include <string>
 
@@ -16,6 +17,14 @@ ISPLayer::~ISPLayer() = default;
 }  // namespace Qelt
 
 namespace QeltDesktop {
+
+namespace {
+
+std::size_t rowBytes(int width) {
+  return static_cast<std::size_t>(width) * 4;
+}
+
+}  // namespace
 
 CanvasLayer::CanvasLayer(RenderQueue& queue, int width, int height, int tileSize)
     : mQueue(queue), mWidth(width), mHeight(height) {
@@ -76,10 +85,20 @@ int CanvasLayer::timesEmptied() const {
 }
 
 std::vector<std::uint8_t> CanvasLayer::readPixels() {
-  std::vector<std::uint8_t> pixels;
-  mQueue.run([&] { pixels = mBitmap->readPixels(); });
-  if (pixels.empty()) throw std::runtime_error("a page cannot be read back without OpenGL");
+  std::vector<std::uint8_t> pixels(rowBytes(mWidth) * static_cast<std::size_t>(mHeight));
+  readRows(0, pixels);
   return pixels;
+}
+
+void CanvasLayer::readRows(int top, std::span<std::uint8_t> pixels) {
+  const std::size_t rows = pixels.size() / rowBytes(mWidth);
+  if (top < 0 || top > mHeight || rows > static_cast<std::size_t>(mHeight - top) ||
+      pixels.size() % rowBytes(mWidth) != 0) {
+    throw std::invalid_argument("a page has no such rows");
+  }
+  bool read = false;
+  mQueue.run([&] { read = mBitmap->readRows(top, pixels); });
+  if (!read) throw std::runtime_error("a page cannot be read back without OpenGL");
 }
 
 }  // namespace QeltDesktop

@@ -3,6 +3,7 @@
 #include <cstdint>
 #include <limits>
 #include <memory>
+#include <span>
 #include <vector>
 
 #include "base/HostApi.h"
@@ -51,6 +52,9 @@ class QELT_HOST_API CanvasLayer : public Qelt::ISPLayer {
   // width x height x 4 bytes, red first, premultiplied, first row = top, after everything posted so far.
   // Throws std::runtime_error while there is no context.
   std::vector<std::uint8_t> readPixels();
+  // The same for as many whole rows as `pixels` has room for, from row `top` on. Throws std::invalid_argument
+  // when the layer has no such rows.
+  void readRows(int top, std::span<std::uint8_t> pixels);
 
  private:
   friend class LayerBackup;

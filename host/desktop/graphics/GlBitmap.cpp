@@ -136,17 +136,16 @@ void GlBitmap::copyFrom(GlBitmap& source, int fromX, int fromY, int x, int y, in
   gl(glCopyTexSubImage2D)(GL_TEXTURE_2D, 0, x, y, fromX, fromY, width, height);
 }
 
-std::vector<std::uint8_t> GlBitmap::readPixels() {
-  std::vector<std::uint8_t> pixels;
-  if (!bindFramebuffer()) return pixels;
-  pixels.resize(byteCount(mWidth, mHeight));
+bool GlBitmap::readRows(int top, std::span<std::uint8_t> pixels) {
+  if (!bindFramebuffer()) return false;
   // What another user of the context left would make the pixels run past their end.
   gl(glBindBuffer)(GL_PIXEL_PACK_BUFFER, 0);
   for (const GLenum packing : {GL_PACK_ROW_LENGTH, GL_PACK_SKIP_ROWS, GL_PACK_SKIP_PIXELS}) {
     gl(glPixelStorei)(packing, 0);
   }
-  gl(glReadPixels)(0, 0, mWidth, mHeight, GL_RGBA, GL_UNSIGNED_BYTE, pixels.data());
-  return pixels;
+  const int rows = static_cast<int>(pixels.size() / byteCount(mWidth, 1));
+  gl(glReadPixels)(0, top, mWidth, rows, GL_RGBA, GL_UNSIGNED_BYTE, pixels.data());
+  return true;
 }
 
 std::vector<std::uint8_t>& GlBitmap::canvasPixels() {

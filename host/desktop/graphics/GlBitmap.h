@@ -5,6 +5,7 @@
 #include <atomic>
 #include <cstdint>
 #include <memory>
+#include <span>
 #include <utility>
 #include <vector>
 
@@ -82,8 +83,8 @@ class QELT_HOST_API GlBitmap final : public Qelt::ISPBitmap, public GlResource {
   // Copies a rectangle of that size, from (fromX, fromY) of another bitmap of the same context to (x, y).
   // Both hold it whole.
   void copyFrom(GlBitmap& source, int fromX, int fromY, int x, int y, int width, int height);
-  // width x height x 4 bytes, first row first; empty without a context.
-  std::vector<std::uint8_t> readPixels();
+  // Copies whole rows from row `top` on, which are there, 4 bytes a pixel. False without a context.
+  bool readRows(int top, std::span<std::uint8_t> pixels);
 
  private:
   friend class GlTexture;
