@@ -36,8 +36,13 @@ macro(qelt_package group package section description)
     set(CPACK_COMPONENT_${component_key}_GROUP ${group})
     list(APPEND CPACK_COMPONENTS_ALL ${component})
   endforeach()
+  if(${ARGV4} STREQUAL debug)
+    set(only_on_demand EXCLUDE_FROM_ALL)
+  else()
+    set(only_on_demand "")
+  endif()
   install(FILES ${PROJECT_SOURCE_DIR}/LICENSE DESTINATION ${CMAKE_INSTALL_DATADIR}/doc/${package} RENAME copyright
-    COMPONENT ${ARGV4})
+    COMPONENT ${ARGV4} ${only_on_demand})
 endmacro()
 
 qelt_package(runtime libqeltpencil2 libs "graphite pencil as a pen plug-in, and its desktop host
