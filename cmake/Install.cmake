@@ -99,3 +99,22 @@ function(qelt_install_package)
   install(FILES ${PROJECT_BINARY_DIR}/QeltPencil2Config.cmake ${PROJECT_BINARY_DIR}/QeltPencil2ConfigVersion.cmake
     DESTINATION ${QELT_INSTALL_CMAKEDIR} COMPONENT dev)
 endfunction()
+
+# The target `prefab`: what is built, as Android's builds take it (Prefab.cmake). The names are those that the NDK's
+# toolchain file gives its settings.
+function(qelt_add_prefab)
+  set(api ${ANDROID_PLATFORM_LEVEL})
+  if(NOT api)
+    string(REGEX REPLACE "^android-" "" api "${ANDROID_PLATFORM}")
+  endif()
+  set(ndk ${ANDROID_NDK_MAJOR})
+  if(NOT ndk AND EXISTS "${ANDROID_NDK}/source.properties")
+    file(READ ${ANDROID_NDK}/source.properties properties)
+    string(REGEX REPLACE ".*Pkg.Revision = ([0-9]+).*" "\\1" ndk "${properties}")
+  endif()
+  add_custom_target(prefab
+    COMMAND ${CMAKE_COMMAND} -D BUILD=${PROJECT_BINARY_DIR} -D ABI=${ANDROID_ABI} -D API=${api} -D NDK=${ndk}
+      -D STL=${ANDROID_STL} -D VERSION=${PROJECT_VERSION}
+      -D OUTPUT=${PROJECT_BINARY_DIR}/qelt-pencil2-${PROJECT_VERSION}.aar -P ${PROJECT_SOURCE_DIR}/cmake/Prefab.cmake
+    DEPENDS QeltPencil2 VERBATIM COMMENT "Packing the plug-in for Android")
+endfunction()
