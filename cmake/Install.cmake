@@ -4,7 +4,7 @@
 # What is installed in parts (cmake --install BUILD --component NAME):
 #   plugin   libQeltPencil2.so
 #   host     the desktop host's libraries
-#   tools    qelt-sketch and its sample page
+#   tools    qelt-sketch with its manual page, completion and sample page
 #   dev      the headers of both, and what find_package(QeltPencil2) reads
 #   debug    the debugging information of all of it; left out unless it is asked for
 

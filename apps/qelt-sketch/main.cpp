@@ -62,6 +62,8 @@ int main(int argc, char** argv) {
   } catch (const std::bad_alloc&) {
     std::fputs("qelt-sketch: out of memory\n", stderr);
     return 1;
+  } catch (const QeltDesktop::WrongUsage& wrong) {
+    return end(wrong.end());
   } catch (const QeltDesktop::Refusal& refusal) {
     return endNotDone(refusal.what());
   } catch (const std::exception& error) {

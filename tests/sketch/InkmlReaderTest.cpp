@@ -176,6 +176,197 @@ TEST(InkmlReader, NamesTheToolOfATraceOrItsGroup) {
   for (std::size_t i = 0; i < 4; ++i) EXPECT_EQ(page.strokes[i].tool, tools[i]) << i;
 }
 
+// A page as programs write it that know their digitizer: the context's ink source says what a step is.
+std::string digitized(const std::string& channels, const std::string& properties, const std::string& points) {
+  return "<ink><definitions><context xml:id='c'><inkSource><traceFormat>\n" + channels +
+         "</traceFormat>\n<channelProperties>" + properties +
+         "</channelProperties></inkSource></context></definitions>\n<trace contextRef='#c'>" + points +
+         "</trace></ink>";
+}
+
+std::string resolution(const std::string& channel, const std::string& value, const std::string& units) {
+  return "<channelProperty channel='" + channel + "' name='resolution' value='" + value + "' units='" +
+         units + "'/>";
+}
+
+TEST(InkmlReader, TakesLengthsInTheirUnits) {
+  const auto channels = [](const std::string& units) {
+    return "<channel name='X'" + units + "/><channel name='Y'" + units + "/>";
+  };
+  // Everywhere 1 and 2 inches, unless there is no unit.
+  const struct {
+    std::string units, properties, points;
+    float x, y;
+  } pages[] = {
+      {" units='in'", "", "1 2", 96, 192},
+      {" units='cm'", "", "2.54 5.08", 96, 192},
+      {" units='mm'", "", "25.4 50.8", 96, 192},
+      {" units='m'", "", "0.0254 0.0508", 96, 192},
+      {" units='himetric'", "", "2540 5080", 96, 192},
+      {" units='pt'", "", "72 144", 96, 192},
+      {" units='pc'", "", "6 12", 96, 192},
+      {" units='px'", "", "96 192", 96, 192},
+      {" units='dev'", "", "1 2", 1, 2},
+      {"", "", "1 2", 1, 2},
+      // The resolution wins over the units; each channel has its own.
+      {" units='in'", resolution("X", "1000", "1/cm"), "2540 2", 96, 192},
+      {"", resolution("X", "1000", "1/cm") + resolution("Y", "600", "1/in"), "2540 1200", 96, 192},
+      {"", resolution("Y", "20", "1/mm") + resolution("Y", "5", "1/mm"), "1 1016", 1, 192},
+      // These say nothing of a length.
+      {" units='in'", resolution("X", "0", "1/cm") + resolution("Y", "7", "1/dev"), "1 2", 96, 192},
+      {"", resolution("X", "7", "") + resolution("W", "much", "1/furlong") + resolution("F", "0", "1/dev"),
+       "1 2", 1, 2},
+      {"", "<channelProperty channel='X' name='accuracy' value='3' units='mm'/>", "1 2", 1, 2},
+      // Differences are counted in steps too.
+      {"", resolution("X", "10", "1/in") + resolution("Y", "10", "1/in"), "3 5,'7'15", 96, 192}};
+  for (const auto& [units, properties, points, x, y] : pages) {
+    const Page page = read(digitized(channels(units), properties, points));
+    EXPECT_EQ(page.strokes.at(0).samples.back().x, x) << units << properties;
+    EXPECT_EQ(page.strokes.at(0).samples.back().y, y) << units << properties;
+  }
+  // Axes that point the other way, so that the page comes out upright.
+  const std::string turned = "<channel name='X' orientation='+ve'/><channel name='Y' orientation='-ve'";
+  for (const std::string& y : {turned + "/>", turned + " units='px'/>"}) {
+    EXPECT_EQ(samplesOf(y, "3 4")[0].x, 3.0f);
+    EXPECT_EQ(samplesOf(y, "3 4")[0].y, -4.0f);
+  }
+  const Page page = read(digitized(turned + "/>", resolution("Y", "2", "1/in"), "3 4"));
+  EXPECT_EQ(page.strokes.at(0).samples.at(0).y, -192.0f);
+}
+
+TEST(InkmlReader, TakesAnglesTimesAndForcesInTheirUnits) {
+  constexpr float kPi = 3.14159265f;
+  const std::string oa = "<channel name='OA'", oe = "<channel name='OE'", f = "<channel name='F'";
+  const struct {
+    std::string channel, properties, value;
+    float pressure, tilt, orientation;
+  } pages[] = {
+      // Steps of a digitizer, told by a range beyond a turn or by none.
+      {oa + " max='3600' units='deg'/>", resolution("OA", "10", "1/deg"), "900", 1, 0, kPi / 2},
+      {oa + " units='deg'/>", resolution("OA", "10", "1/deg"), "900", 1, 0, kPi / 2},
+      {oe + " max='900'/>", resolution("OE", "10", ""), "450", 1, kPi / 4, 0},
+      {oe + " max='15708' units='rad'/>", resolution("OE", "10000", "1/rad"), "10000", 1, kPi / 2 - 1, 0},
+      {oe + " units='rad'/>", resolution("OE", "10", "1/deg"), "450", 1, kPi / 4, 0},
+      // A range of a turn at most is in degrees, or radians, whatever the resolution.
+      {oa + " max='360' units='deg'/>", resolution("OA", "1000", "1/deg"), "90", 1, 0, kPi / 2},
+      {oe + " max='90' units='deg'/>", resolution("OE", "1000", "1/deg"), "45", 1, kPi / 4, 0},
+      {oa + " max='6.2832' units='rad'/>", resolution("OA", "1000", "1/rad"), "1", 1, 0, 1},
+      {oa + " units='dev'/>", "", "90", 1, 0, kPi / 2},
+      {f + " min='100' max='300'/>", resolution("F", "10", "1/dev"), "150", 0.25f, 0, 0},
+      {f + " min='-1' max='0'/>", "", "-0.5", 0.5f, 0, 0},
+      {f + " max='32767' units='dev'/>", resolution("F", "0", "1/dev"), "32767", 1, 0, 0},
+      {f + " min='7' units='N'/>", "", "0.5", 0.5f, 0, 0}};
+  for (const auto& [channel, properties, value, pressure, tilt, orientation] : pages) {
+    const Page page = read(digitized(kXY + channel, properties, "0 0 " + value));
+    const Sample sample = page.strokes.at(0).samples.at(0);
+    EXPECT_EQ(sample.pressure, pressure) << channel << properties;
+    EXPECT_NEAR(sample.tilt, tilt, 1e-6f) << channel << properties;
+    EXPECT_NEAR(sample.orientation, orientation, 1e-6f) << channel << properties;
+  }
+  const std::string time = "<channel name='T'";
+  EXPECT_EQ(samplesOf(kXY + time + " units='dev'/>", "0 0 7")[0].time, 7.0);
+  EXPECT_EQ(
+      read(digitized(kXY + time + "/>", resolution("T", "100", "1/s"), "0 0 7")).strokes[0].samples[0].time,
+      70.0);
+}
+
+TEST(InkmlReader, TakesBrushesInTheirUnitsAndWithoutPressure) {
+  const Page page =
+      read(R"(<ink><traceFormat><channel name="X"/><channel name="Y"/><channel name="F"/></traceFormat>
+      <brush xml:id="a"><brushProperty name="width" value="0.0254" units="cm"/>
+        <brushProperty name="height" value="1" units="cm"/><brushProperty name="ignorePressure" value="1"/></brush>
+      <brush xml:id="b"><brushProperty name="width" value="3" units="dev"/>
+        <brushProperty name="ignorePressure" value="false"/></brush>
+      <brush xml:id="c" brushRef="#a"><brushProperty name="ignorePressure" value="0"/></brush>
+      <brush xml:id="d" brushRef="#a"/>
+      <brush xml:id="e"><brushProperty name="width" value="1"/><brushProperty name="outlineSize" value="3" units="pt"/></brush>
+      <trace brushRef="#a">0 0 0.5</trace><trace brushRef="#b">0 0 0.5</trace><trace brushRef="#c">0 0 0.5</trace>
+      <trace brushRef="#d">0 0 0.5</trace><trace brushRef="#e">0 0 0.5</trace></ink>)");
+  const float widths[] = {0.96f, 3, 0.96f, 0.96f, 1}, pressures[] = {1, 0.5f, 0.5f, 1, 0.5f};
+  ASSERT_EQ(page.strokes.size(), 5u);
+  for (std::size_t i = 0; i < 5; ++i) {
+    EXPECT_EQ(page.strokes[i].brush.width, widths[i]) << i;
+    EXPECT_EQ(page.strokes[i].samples.at(0).pressure, pressures[i]) << i;
+  }
+  EXPECT_EQ(page.strokes[4].brush.outlineSize, 4.0f);
+}
+
+TEST(InkmlReader, CountsEachTraceByTheInkSourceOfItsContext) {
+  const std::string properties =
+      "<channelProperties>" + resolution("X", "10", "1/in") + "</channelProperties>";
+  const Page page = read(R"(<ink><definitions>
+      <inkSource xml:id="tablet"><channelProperties>)" +
+                         resolution("X", "5", "1/in") + R"(</channelProperties></inkSource>
+      <traceFormat xml:id="inches"><channel name="X" units="in"/><channel name="Y"/></traceFormat>
+      <context xml:id="plain" inkSourceRef="#tablet"/>
+      <context xml:id="own"><inkSource>)" +
+                         properties + R"(</inkSource></context>
+      <context xml:id="format" traceFormatRef="#inches"/>
+      <context xml:id="both" contextRef="#own" traceFormatRef="#inches"/>
+      <context xml:id="heir" contextRef="#both"><brush><brushProperty name="width" value="2"/></brush></context>
+      <context xml:id="source"><inkSource><traceFormat xml:id="within"><channel name="Y"/><channel name="X"/></traceFormat>)" +
+                         properties + R"(</inkSource></context>
+      <context xml:id="borrowed" traceFormatRef="#within" inkSourceRef="#tablet"/></definitions>
+    <trace contextRef="#plain">1 1</trace><trace contextRef="#own">1 1</trace><trace contextRef="#format">1 1</trace>
+    <trace contextRef="#both">1 1</trace><trace contextRef="#heir">1 1</trace><trace contextRef="#source">1 1</trace>
+    <trace contextRef="#borrowed">1 1</trace><traceGroup contextRef="#own"><trace>1 1</trace>
+    <trace contextRef="#plain">1 1</trace></traceGroup></ink>)");
+  const float x[] = {19.2f, 9.6f, 96, 9.6f, 9.6f, 9.6f, 19.2f, 9.6f, 19.2f};
+  ASSERT_EQ(page.strokes.size(), std::size(x));
+  for (std::size_t i = 0; i < std::size(x); ++i) {
+    EXPECT_EQ(page.strokes[i].samples.at(0).x, x[i]) << i;
+    EXPECT_EQ(page.strokes[i].samples.at(0).y, 1.0f) << i;
+  }
+  EXPECT_EQ(page.strokes[4].brush.width, 2.0f);
+}
+
+TEST(InkmlReader, TellsInkmlFromOtherNamespaces) {
+  const std::string ink = "http://www.w3.org/2003/InkML";
+  const auto x = [](const std::string& text) {
+    std::vector<float> found;
+    for (const Stroke& stroke : read(text).strokes) found.push_back(stroke.samples.at(0).x);
+    return found;
+  };
+  const std::vector<float> both{1, 2};
+  const std::vector<std::string> pages{
+      "<a:ink xmlns:a='" + ink + "'><a:trace>1 0</a:trace><b:trace xmlns:b='" + ink +
+          "'>2 0</b:trace></a:ink>",
+      "<ink xmlns='" + ink +
+          "' xmlns:a='urn:a'><a:trace>9 0</a:trace><trace>1 0</trace><trace>2 0</trace></ink>",
+      // Bound to another name inside, and back outside.
+      "<a:ink xmlns:a='" + ink +
+          "'><a:trace>1 0</a:trace><x xmlns:a='urn:a'><a:brush/></x><a:trace>2 0</a:trace></a:ink>",
+      "<ink><trace>1 0</trace><math xmlns='urn:math'><trace>9 0</trace><trace/></math><trace>2 "
+      "0</trace></ink>",
+      // No namespace, one that is bound to nothing, and one with another name.
+      std::string("<ink><trace>1 0</trace><a:trace>2 0</a:trace></ink>"),
+      std::string("<a:ink><a:trace>1 0</a:trace><trace>2 0</trace></a:ink>"),
+      "<ink xmlns='urn:own'><trace>1 0</trace><a:trace xmlns:a='" + ink + "'>2 0</a:trace></ink>",
+      "<ink xmlns='" + ink +
+          "' xmlns:a='urn:a'><trace a:type='penUp' a:brushRef='#b' xmlns:type='penUp'>1<a:b>7</a:b> 0"
+          "</trace><trace>2 0</trace></ink>"};
+  for (const std::string& page : pages) EXPECT_EQ(x(page), both) << page;
+  EXPECT_TRUE(refusalOf("<ink xmlns:a='urn:a'>\n<a:x>\n</a:x><trace>x</trace></ink>")
+                  .starts_with("page.inkml:3: not a"));
+}
+
+TEST(InkmlReader, PassesOverWhatItDoesNotDraw) {
+  const Page page =
+      read(R"(<ink><definitions><traceFormat><channel name="X"><mapping type="identity"/></channel>
+      <channel name="F" type="boolean"/><channel name="Y"/><channel name="H" units="furlong"/>
+      <intermittentChannels><channel name="OE" units="furlong"/></intermittentChannels></traceFormat>
+      <canvas/><mapping/><timestamp xml:id="t"/><trace xml:id="kept">7 T 7 7</trace></definitions>
+    <annotationXML type="truth"><math><mi>x</mi><trace>no</trace></math></annotationXML>
+    <traceView traceDataRef="#kept"><traceView from="1"/><annotation type="tool">quill</annotation></traceView>
+    <news><item/>more</news>
+    <traceGroup><annotationXML/><traceView/><trace id="0">1 T 2 3<annotationXML><a/>5</annotationXML>, 4 F <news>8</news>
+    5 6 30</trace></traceGroup></ink>)");
+  ASSERT_EQ(page.strokes.size(), 1u);
+  ASSERT_EQ(page.strokes[0].samples.size(), 2u);
+  const Sample last = page.strokes[0].samples[1];
+  EXPECT_EQ(valuesOf(last), (std::vector<double>{4, 5, 1, 0, 0, 1000.0 / 240.0}));
+}
+
 TEST(InkmlReader, ReadsFilesOfUtf16AndRefusesWhatIsNoFile) {
   std::string bytes("\xFF\xFE", 2);
   for (const char c : std::string("<ink>\n<trace>1 2</trace></ink>")) bytes += {c, '\0'};
@@ -238,14 +429,27 @@ TEST(InkmlReader, RefusesWhatIsMalformedWithFileLineAndValue) {
       {trace("1 2,\n3 4&#0;, 5 6"), "3: not XML: reference to invalid character number: &#0;"},
       {trace("1 &#10;2, <!--\n-->3 &nbsp;, 5 6"), "3: not a number: &nbsp;"},
       {trace("1 #1234567890abc"), "2: more than 12 hexadecimal digits: #1234567890abc"},
-      {trace("1 2<br/>"), "2: element that a trace cannot hold: br"},
+      {trace("1 2<brush/>"), "2: element that a trace cannot hold: brush"},
       {format(R"(<channel name="X"/>)"), "1: traceFormat without channel: Y"},
       {format(R"(<channel name="Y"/>)"), "1: traceFormat without channel: X"},
       {formatAnd("<channel/>"), "3: channel without a name"},
       {formatAnd(R"(<channel name="X"/>)"), "3: channel named twice: X"},
       {formatAnd(R"(<channel name="F" max="0"/>)"), "3: max of channel F must be a number above 0: 0"},
       {formatAnd(R"(<channel name="F" max="inf"/>)"), "3: max of channel F must be a number above 0: inf"},
+      {formatAnd(R"(<channel name="F" min="low"/>)"), "3: min of channel F must be a number: low"},
+      {formatAnd(R"(<channel name="F" min="5" max="5"/>)"),
+       "3: max of channel F must be a number above its min: 5"},
       {formatAnd(R"(<channel name="OE" units="grad"/>)"), "3: unknown unit of channel OE: grad"},
+      {formatAnd(R"(<channel name="OE" max="high"/>)"), "3: max of channel OE must be a number: high"},
+      {format(R"(<channel name="X" units="in"/><channel name="Y" units="furlong"/>)"),
+       "2: unknown unit of channel Y: furlong"},
+      {format("<channel name='X' units='m'/><channel name='Y'/>", "1e38 0"), "2: number out of range: 1e38"},
+      {digitized(kXY, "\n" + resolution("X", "10", "1/furlong"), "0 0"),
+       "4: unknown unit of the resolution of channel X: 1/furlong"},
+      {digitized(kXY, resolution("X", "10", "dpi"), "0 0"),
+       "3: unknown unit of the resolution of channel X: dpi"},
+      {digitized(kXY, resolution("Y", "fine", "1/cm"), "0 0"),
+       "3: no number as the resolution of channel Y: fine"},
       {format(R"(<channel name="X" type="boolean"/><channel name="Y"/>)", "T 0"),
        "2: channel X cannot be: boolean"},
       {"<ink>" + times(200'000, "<traceGroup>") + times(200'000, "</traceGroup>") + "</ink>",
@@ -264,6 +468,11 @@ TEST(InkmlReader, RefusesWhatIsMalformedWithFileLineAndValue) {
        "3: brush transparency must be a number from 0 to 255: 256"},
       {brush("<brushProperty name='renderingVersion' value='100'/>"),
        "3: brush renderingVersion must be a whole number from 1 to 99: 100"},
+      {brush("<brushProperty name='width' value='2' units='furlong'/>"),
+       "3: unknown unit of brush width: furlong"},
+      {brush("<brushProperty name='width' value='1e38' units='m'/>"), "3: brush width is out of range: 1e38"},
+      {brush("<brushProperty name='ignorePressure' value='maybe'/>"),
+       "3: brush ignorePressure must be true or false: maybe"},
       {brush("<brushProperty name='curve' value='maybe'/>"), "3: brush curve must be true or false: maybe"},
       {brush("<brushProperty name='outlineSize' value='0'/>"),
        "3: brush outlineSize must be a number above 0: 0"},

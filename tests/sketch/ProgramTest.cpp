@@ -284,6 +284,72 @@ TEST_F(Program, DrawsInkWhereTheInkIs) {
             draw("draw ink.inkml --mode stroke --repeat 2").bytes);
 }
 
+TEST_F(Program, DrawsAPageAsLargeAsItFits) {
+  const auto sizeOf = [this](const std::string& options) {
+    const Rgba picture = draw("draw " + options);
+    return std::to_string(picture.width) + 'x' + std::to_string(picture.height);
+  };
+  EXPECT_EQ(draw("draw ink.inkml --page 120x60 --fit 240x900").bytes,
+            draw("draw ink.inkml --page 120x60 --zoom 2").bytes);
+  EXPECT_EQ(sizeOf("ink.inkml --page 120x60 --fit 900x15"), "30x15");
+  EXPECT_EQ(sizeOf("ink.inkml --page 120x60 --rotate 90 --fit 240x60"), "30x60");
+  // The page of 70 x 25 with margins of 26 all around; a third of a pixel is a row.
+  EXPECT_EQ(sizeOf("ink.inkml --fit 183x183"), "183x116");
+  EXPECT_EQ(trace("--page 120x60 --fit 240x900"), trace("--page 120x60 --zoom 2"));
+  // In a picture it stands in place of the zoom, and the other way round.
+  EXPECT_EQ(sizeOf("ink.inkml --page 120x60 --fit 30x30"), "30x15");
+  sh("cp drawn.png fitted.png");
+  EXPECT_EQ(sizeOf("fitted.png"), "30x15");
+  EXPECT_EQ(sizeOf("fitted.png --zoom 2"), "240x120");
+  EXPECT_EQ(sizeOf("fitted.png --fit 60x60"), "60x30");
+  EXPECT_EQ(sh("$sketch draw ink.inkml --zoom 2 -o zoomed.png").status, 0);
+  EXPECT_EQ(sizeOf("zoomed.png --fit 61x9999"), "61x39");
+  // A cell as for the picture, in two columns under labels.
+  const Rgba sheet = draw("sheet ink.inkml --size 5 --fit 61x999");
+  EXPECT_EQ(sheet.width, 2u * (61 + 16) + 16);
+}
+
+// As data sets have them: no format, and lengths in shares of a page, here the strokes of an F.
+TEST_F(Program, DrawsInkBelowOneUnitAsLargeAsItIsAskedFor) {
+  write("small.inkml",
+        "<ink><trace>0.1 0.1, 0.1 0.3, 0.1 0.5, 0.1 0.7, 0.1 0.9</trace>"
+        "<trace>0.1 0.1, 0.3 0.1, 0.5 0.1</trace><trace>0.1 0.4, 0.25 0.4, 0.4 0.4</trace></ink>");
+  for (const std::string command : {"draw small.inkml --fit 300x200", "draw carried.png"}) {
+    const Rgba picture = draw(command);
+    sh("cp drawn.png carried.png");
+    // 0.8 high within margins of 17 for the size of the pen's own, and 0.4 wide: 83 + 2 * 17.
+    ASSERT_EQ(picture.height, 200u);
+    EXPECT_NEAR(picture.width, 117, 1);
+    const auto ink = [&](std::uint32_t left, std::uint32_t top, std::uint32_t right, std::uint32_t bottom) {
+      return picture.darker(255, left, top, right, bottom) > 0;
+    };
+    EXPECT_TRUE(ink(15, 100, 20, 183) && ink(90, 15, 101, 20) && ink(70, 75, 81, 83));
+    EXPECT_FALSE(ink(22, 84, 117, 200) || ink(22, 20, 117, 74));
+    EXPECT_FALSE(ink(0, 0, 117, 14) || ink(0, 0, 14, 200) || ink(0, 186, 117, 200));
+  }
+  // Ten times as wide as it is high, with the page that was asked for.
+  EXPECT_EQ(draw("draw small.inkml --page 2x0.2 --fit 300x200").height, 30u);
+  // Without a size asked for they are stroke units, as everywhere.
+  EXPECT_EQ(draw("draw small.inkml").width, 35u);
+}
+
+// An inch each way, in steps of a digitizer, with a brush of a millimetre.
+TEST_F(Program, DrawsInkInItsNaturalSize) {
+  write("digitized.inkml",
+        R"(<w:ink xmlns:w="http://www.w3.org/2003/InkML"><w:definitions><w:context xml:id="c"><w:inkSource>
+        <w:traceFormat><w:channel name="X" units="cm"/><w:channel name="Y" units="cm"/><w:channel name="F" max="1023"/>
+        </w:traceFormat><w:channelProperties><w:channelProperty channel="X" name="resolution" value="1000" units="1/cm"/>
+        <w:channelProperty channel="Y" name="resolution" value="1000" units="1/cm"/></w:channelProperties></w:inkSource>
+        </w:context><w:brush xml:id="b"><w:brushProperty name="width" value="1" units="mm"/>
+        <w:brushProperty name="ignorePressure" value="true"/></w:brush></w:definitions>
+        <w:trace contextRef="#c" brushRef="#b">5000 5000 9, 6270 6270 9, 7540 7540 9</w:trace></w:ink>)");
+  EXPECT_NEAR(trace("", "digitized.inkml")[0]["size"].get<float>(), 96 / 25.4, 1e-6);
+  // 96 and margins of 16 + 2 * 3.78 on both sides.
+  const Rgba picture = draw("draw digitized.inkml");
+  EXPECT_EQ(picture.width * 1000 + picture.height, 144'144u);
+  EXPECT_GT(picture.darker(100, 60, 60, 84, 84), 20);
+}
+
 TEST_F(Program, TracesOutlinesPreviewsAndPredictions) {
   const std::vector<Json> outlines = trace("--drawable outline --outline 3,#FF00FF00");
   ASSERT_EQ(outlines.size(), 3u);
@@ -457,6 +523,10 @@ TEST_F(Program, SaysWhatCannotBeDoneInOneLineAndLeavesAnOlderFileAlone) {
       {"trace bad.inkml -o no.png", "bad.inkml:2: not a number: four\n"},
       {"sheet bad.inkml -o no.png", "bad.inkml:2: not a number: four\n"},
       {"draw ink.inkml --zoom 1e6 -o older.png", "ink.inkml: the picture is too large to draw: "},
+      {"draw ink.inkml --page 2e4x2e4 --zoom 1 -o older.png", "--page: the picture is too large to draw: "},
+      {"draw ink.inkml --zoom 1e4 -o older.png", "67108864 in all; --fit WxH draws it smaller\n"},
+      {"draw ink.inkml --fit 40000x9000 -o older.png", "--fit: the picture is too large to draw: "},
+      {"sheet ink.inkml --fit 9000x9000 -o older.png", "--fit: the sheet is too large to draw: "},
       {"draw ink.inkml --page 40000x1 -o older.png",
        "--page: the picture is too large to draw: 40000 x 1 pixels, at most 32767 a side and 67108864 in "
        "all\n"},
@@ -550,6 +620,113 @@ TEST_F(Program, FindsPlugInsInItsFolderAndItsLibrariesFromWhereItStands) {
   EXPECT_NE(contentsOf(QELT_PLUGIN_PATH).find("$ORIGIN/../host/desktop"), std::string::npos);
 }
 
+TEST_F(Program, ReadsStandardInput) {
+  write("bad.inkml", "<ink>\n<trace>1 2, 3 four</trace>\n</ink>");
+  write("-", "no ink");
+  draw("draw ink.inkml --predict 3");
+  const struct {
+    std::string commands, out, err;
+    int status;
+  } cases[] = {
+      {"$sketch draw - -o a.png <ink.inkml; $sketch draw ink.inkml -o b.png; cmp a.png b.png", "", "", 0},
+      {"cat drawn.png | $sketch draw - -o a.png && cmp a.png drawn.png", "", "", 0},
+      {"cat ink.inkml | $sketch trace - -o a; $sketch trace ink.inkml -o b; cmp a b", "", "", 0},
+      {"$sketch sheet - -o a.png <ink.inkml; $sketch sheet ink.inkml -o b.png; cmp a.png b.png", "", "", 0},
+      {"$sketch trace - -o no <bad.inkml", "", "standard input:2: not a number: four\n", 1},
+      {"$sketch trace - -o no <&-", "", "standard input: cannot be read: Bad file descriptor\n", 1},
+      {"$sketch trace - -o no <.", "", "standard input: cannot be read: Is a directory\n", 1},
+      {"$sketch trace ./- -o no", "", "./-:1: not XML: syntax error\n", 1},
+      {"$sketch trace - -o bad.inkml <bad.inkml", "", "standard input:2: not a number: four\n", 1},
+      {"$sketch trace - -o ink.inkml <ink.inkml", "",
+       "ink.inkml: cannot be written: it is the page to read\n", 1},
+      // What the command line leaves out may stand in the picture.
+      {"$sketch trace - -o - --drawable prediction <drawn.png | wc -l", "4\n", "", 0},
+      {"$sketch trace - -o no --drawable prediction <ink.inkml", "",
+       "--drawable prediction: needs --mode live and --predict K\nRun with --help for more information.\n",
+       2}};
+  for (const auto& [commands, out, err, status] : cases) {
+    const Ran ran = sh(commands);
+    EXPECT_EQ(ran.status, status) << commands;
+    EXPECT_EQ(ran.out, out) << commands;
+    // A driver may speak where something is drawn.
+    EXPECT_TRUE(ran.err == err || (err.empty() && status == 0)) << commands << "\n" << ran.err;
+  }
+  EXPECT_FALSE(holds("no") || holdsUnfinished());
+}
+
+// The long names of all options, with the command in front of those that belong to one.
+std::vector<std::string> optionsIn(const std::string& help, const std::string& command) {
+  std::vector<std::string> names;
+  const std::regex option(R"(^ +(?:-\w,)?--([a-z-]+))");
+  std::istringstream lines(help);
+  std::smatch found;
+  for (std::string line; std::getline(lines, line);)
+    if (std::regex_search(line, found, option)) names.push_back(command + "--" + found[1].str());
+  return names;
+}
+
+TEST_F(Program, DocumentsItselfFromItsOptions) {
+  EXPECT_TRUE(std::regex_match(run("--version").out, std::regex(R"(qelt-sketch \d+\.\d+\.\d+\n)")));
+  std::vector<std::string> options = optionsIn(run("--help").out, "");
+  EXPECT_EQ(options.size(), 4u);
+  for (const std::string command : {"draw", "trace", "preview", "sheet", "info"}) {
+    const std::vector<std::string> more = optionsIn(run(command + " --help").out, command);
+    EXPECT_GE(more.size(), 2u) << command;
+    options.insert(options.end(), more.begin(), more.end());
+  }
+  const std::string manual = run("--man").out;
+  const std::string bash = run("--completion bash").out, zsh = run("--completion zsh").out;
+  for (const std::string& option : options) {
+    const std::size_t dashes = option.find("--");
+    const std::string command = option.substr(0, dashes), name = option.substr(dashes);
+    const std::string escaped = std::regex_replace(name, std::regex("-"), "\\-");
+    EXPECT_NE(manual.find("\\fB" + escaped + "\\fR", command.empty() ? 0 : manual.find(".SS " + command)),
+              std::string::npos)
+        << option;
+    const std::string listed = (command.empty() ? "''" : command) + ") options='";
+    const std::size_t line = bash.find("\n      " + listed);
+    ASSERT_NE(line, std::string::npos) << option;
+    const std::string here = bash.substr(line + 1, bash.find('\n', line + 1) - line) + " ";
+    EXPECT_TRUE(std::regex_search(here, std::regex("[ ']" + name + "[ ']"))) << option;
+    EXPECT_NE(zsh.find(name, command.empty() ? 0 : zsh.find(" " + command + ") _arguments")),
+              std::string::npos)
+        << option;
+  }
+  write("manual", manual);
+  write("completion", zsh);
+  // Where the checkers are installed, they have nothing to say.
+  const Ran checked =
+      sh("! command -v groff >/dev/null || groff -man -Tutf8 -ww -z manual; "
+         "! command -v zsh >/dev/null || zsh -n completion");
+  EXPECT_EQ(checked.out + checked.err, "");
+  for (const char* const part : {"EXIT STATUS", "cannot be read: REASON", "default 4"})
+    EXPECT_NE(manual.find(part), std::string::npos) << part;
+}
+
+TEST_F(Program, IsCompletedByBash) {
+  write("completion", run("--completion bash").out);
+  const std::pair<std::string, std::string> cases[] = {{"tr", "trace"},
+                                                       {"--ver", "--version"},
+                                                       {"--completion ''", "bash zsh"},
+                                                       {"draw --mo", "--mode"},
+                                                       {"draw --mode ''", "live event stroke"},
+                                                       {"draw ink.inkml --mode = l", "live"},
+                                                       {"trace --mode =", "live event stroke"},
+                                                       {"trace --background t", "transparent"},
+                                                       {"draw ink", "ink.inkml"},
+                                                       {"draw -o ink", "ink.inkml"},
+                                                       {"draw --zoom ''", ""},
+                                                       {"info ink", ""},
+                                                       {"preview --fit", ""},
+                                                       {"sheet --fi", "--fit"}};
+  for (const auto& [words, wanted] : cases) {
+    write("complete", ". ./completion; COMP_WORDS=(qelt-sketch " + words +
+                          "); COMP_CWORD=$((${#COMP_WORDS[@]} - 1)); _qelt_sketch; echo \"${COMPREPLY[*]}\"");
+    const Ran ran = sh("bash complete");
+    EXPECT_EQ(ran.out, wanted + "\n") << words << "\n" << ran.err;
+  }
+}
+
 TEST_F(Program, TellsWrongUsageFromHelp) {
   const auto expectWrong = [&](const std::string& before, const std::string& list) {
     std::istringstream each(list);
@@ -559,11 +736,12 @@ TEST_F(Program, TellsWrongUsageFromHelp) {
       EXPECT_TRUE(ran.out.empty() && !ran.err.empty()) << arguments;
     }
   };
-  expectWrong("", "; paint -o a.png; draw; draw a.inkml b.inkml -o a.png; info -o a.txt");
+  expectWrong("", "; paint -o a.png; draw; draw a.inkml b.inkml -o a.png; info -o a.txt; --completion fish");
   expectWrong("trace -o - --drawable ", "line; prediction; preview --mode stroke");
   expectWrong("draw -o a.png ",
               "--sise 3; --size; --size big; --size 3 --size 4; --color red; --color '#FFFFFF'; --mode slow; "
               "--batch 0; --batch 1.5; --tool quill; --source x; --repeat 0; --zoom 0; --zoom inf; "
+              "--fit 800; --fit 0x9; --fit 9x-9; --fit 9.5x9; --fit 9x9 --zoom 2; "
               "--rotate nan; --page 800; --page 0x600; --background grey; --outline 3; --predict -1; "
               "--predict 2000000000; --opacity 1.5; --points 0; --drawable stroke; "
               "--rendering-version 99999999999");

@@ -12,10 +12,13 @@
 
 #include <CLI/CLI.hpp>
 
+#include "commands/Completion.h"
+#include "commands/Manual.h"
 #include "commands/PageInput.h"
 #include "engine/MotionEvent.h"
 #include "ink/Definitions.h"
 #include "play/PageDrawing.h"
+#include "play/PageFit.h"
 #include "text/NumberText.h"
 #include "text/Refusal.h"
 
@@ -41,18 +44,22 @@ class OptionGroup {
 
   // The target holds a Value, or an optional one.
   template <typename Value, typename Target>
-  void add(const char* name, Target& target, const Form<Value>& form, const std::string& help) {
-    mApp.add_option_function<std::string>(
-            name,
-            [&target, form, name](const std::string& text) {
-              const std::optional<Value> value = form.parse(text);
-              if (!value) throw CLI::ValidationError(name, "expects " + form.wanted + ", not '" + text + "'");
-              target = *value;
-            },
-            help)
-        ->type_name(form.shape);
+  CLI::Option* add(const char* name, Target& target, const Form<Value>& form, const std::string& help) {
     if (const std::optional<Value> value = target)
       mWritten += ' ' + std::string(name) + '=' + form.print(*value);
+    return addUnwritten<Value>(name, target, form, help);
+  }
+
+  // An option whose value is not written.
+  template <typename Value, typename Target>
+  CLI::Option* addUnwritten(const char* name, Target& target, const Form<Value>& form,
+                            const std::string& help) {
+    const auto read = [&target, form, name](const std::string& text) {
+      const std::optional<Value> value = form.parse(text);
+      if (!value) throw CLI::ValidationError(name, "expects " + form.wanted + ", not '" + text + "'");
+      target = *value;
+    };
+    return mApp.add_option_function<std::string>(name, read, help)->type_name(form.shape);
   }
 
   // Two flags for one choice.
@@ -122,6 +129,15 @@ std::optional<PageSize> pageSize(const std::string& text) {
   return PageSize{*width, *height};
 }
 
+std::optional<PixelSize> pixelSize(const std::string& text) {
+  const std::size_t cross = text.find('x');
+  if (cross == std::string::npos) return std::nullopt;
+  const std::optional<int> width = count(text.substr(0, cross));
+  const std::optional<int> height = count(text.substr(cross + 1));
+  if (!width || !height) return std::nullopt;
+  return PixelSize{*width, *height};
+}
+
 std::optional<OutlineOptions> outline(const std::string& text) {
   const std::size_t comma = text.find(',');
   if (comma == std::string::npos) return std::nullopt;
@@ -173,6 +189,9 @@ std::string printColor(const std::uint32_t& argb) {
 std::string printPage(const PageSize& page) {
   return printFloat(page.width) + 'x' + printFloat(page.height);
 }
+std::string printPixels(const PixelSize& size) {
+  return printInt(size.width) + 'x' + printInt(size.height);
+}
 std::string printOutline(const OutlineOptions& outline) {
   return printFloat(outline.size) + ',' + formatArgb(outline.argb);
 }
@@ -191,9 +210,13 @@ const Form<float> kDegrees{"DEG", "a number of degrees", finiteFloat, printFloat
 const Form<float> kShare{"O", "a number from 0 to 1", share, printFloat};
 const Form<std::uint32_t> kColor{"'#AARRGGBB'", "a colour as #AARRGGBB", argbColor, printColor};
 const Form<PageSize> kPage{"WxH", "WxH, two numbers above 0", pageSize, printPage};
+const Form<PixelSize> kPixels{"WxH", "WxH, two whole numbers from 1", pixelSize, printPixels};
 const Form<Background> kBackground{"white|transparent|'#RRGGBB'", "white, transparent or #RRGGBB", background,
                                    printBackground};
 const Form<OutlineOptions> kOutline{"SIZE,'#AARRGGBB'", "SIZE,#AARRGGBB", outline, printOutline};
+
+// What --version tells, and the manual page.
+const std::string kVersion = "qelt-sketch " QELT_VERSION;
 
 // What the help tells as defaults.
 const Options kDefaults;
@@ -205,8 +228,9 @@ std::string withDefault(const std::string& help, const std::string& value) {
 // Option by option, in the order the help shows them.
 
 void addInput(CLI::App& app, Options& options) {
-  app.add_option("INPUT", options.input,
-                 "page of W3C InkML, or a picture that draw made (default: the sample page)")
+  app.add_option(
+         "INPUT", options.input,
+         "page of W3C InkML, or a picture that draw made; - is standard input (default: the sample page)")
       ->type_name("");
 }
 
@@ -245,28 +269,40 @@ void addFeeding(OptionGroup& group, Options& options) {
                                                  std::to_string(Qelt::kSourceMouse) + " mouse"));
 }
 
+// One of the two, where a picture was drawn with one and the command line says the other too.
+void addZoom(OptionGroup& group, Options& options) {
+  const std::string help = withDefault("canvas pixels a stroke unit", printFloat(kDefaults.zoom));
+  CLI::Option* const zoom = options.fit ? group.addUnwritten<float>("--zoom", options.zoom, kZoom, help)
+                                        : group.add<float>("--zoom", options.zoom, kZoom, help);
+  zoom->each([&options](const std::string&) { options.fit.reset(); });
+  group
+      .add<PixelSize>("--fit", options.fit, kPixels,
+                      "the largest zoom at which the page fits into so many pixels")
+      ->excludes(zoom);
+}
+
 void addDrawing(OptionGroup& group, Options& options) {
-  group.add<int>("--rendering-version", options.renderingVersion, kInteger,
-                 "of the pen (default: the stroke's, else " + printInt(kUsualRenderingVersion) + ")");
+  group.add<int>(
+      "--rendering-version", options.renderingVersion, kInteger,
+      "rendering version of the pen (default: the stroke's, else " + printInt(kUsualRenderingVersion) + ")");
   addPen(group, options);
   addFeeding(group, options);
   group.add<int>("--repeat", options.repeat, kCount,
                  "draw the page N times, each onto a cleared layer; in stroke mode from the cache");
-  group.add<float>("--zoom", options.zoom, kZoom,
-                   withDefault("canvas pixels a stroke unit", printFloat(kDefaults.zoom)));
+  addZoom(group, options);
   group.add<float>("--rotate", options.rotate, kDegrees,
                    withDefault("turn clockwise about the page's centre", printFloat(kDefaults.rotate)));
   group.add<PageSize>("--page", options.page, kPage,
                       "page in stroke units, from (0, 0) (default: the file's extent plus a margin)");
   group.add<Background>("--background", options.background, kBackground,
-                        "default " + printBackground(kDefaults.background));
+                        withDefault("what lies under the ink", printBackground(kDefaults.background)));
   group.add<OutlineOptions>("--outline", options.outline, kOutline,
                             "draw every stroke's outline under the strokes (default: those of the file)");
   group.add<int>(
       "--predict", options.predict, kPredictionCount,
       "live: K predicted samples, at most " + std::to_string(kMostPredicted) + ", after every move event");
   group.add<float>("--opacity", options.opacity, kShare,
-                   withDefault("of the prediction, 0 to 1", printFloat(kDefaults.opacity)));
+                   withDefault("opacity of the prediction, 0 to 1", printFloat(kDefaults.opacity)));
   group.add<int>("--points", options.points, kCount,
                  "stop after the first N points of the last trace, the pen still down");
 }
@@ -306,12 +342,15 @@ void readInstruction(const std::string& instruction, Options& options, Command c
   app.parse(std::move(words));
 }
 
-// Reads the command line; where it says nothing, the options stay as they are.
-std::variant<Options, UsageEnd> parseOver(Options options, bool pictureIsRead) {
-  std::vector<const char*> argv;
-  for (const std::string& word : options.commandLine) argv.push_back(word.c_str());
-  const int argc = static_cast<int>(argv.size());
-  CLI::App app("Draws recorded ink with the pencil plug-in.", "qelt-sketch");
+// A command of the program, with its options.
+struct CommandEntry {
+  CLI::App* app;
+  Command command;
+};
+
+// All of the program's options, read into `options`; the help, the manual page and the completion tell what
+// is here.
+std::vector<CommandEntry> addCommands(CLI::App& app, Options& options) {
   app.require_subcommand(1);
 
   CLI::App* const draw = app.add_subcommand("draw", "draw the page as a PNG picture");
@@ -342,17 +381,61 @@ std::variant<Options, UsageEnd> parseOver(Options options, bool pictureIsRead) {
   OptionGroup shown(*sheet);
   addPen(shown, options);
   addFeeding(shown, options);
+  shown.add<PixelSize>(
+      "--fit", options.fit, kPixels,
+      "of each drawing: the largest zoom at which the page fits into so many pixels (default: "
+      "at most 1, within " +
+          printPixels(kUsualCell) + ")");
 
   CLI::App* const info =
       app.add_subcommand("info", "show plug-in path, GL renderer, version table and pen limits");
 
-  const std::pair<CLI::App*, Command> commands[] = {{draw, Command::Draw},
-                                                    {trace, Command::Trace},
-                                                    {preview, Command::Preview},
-                                                    {sheet, Command::Sheet},
-                                                    {info, Command::Info}};
-  for (const auto& [command, value] : commands) addPlugin(*command, options);
+  const std::vector<CommandEntry> commands{{draw, Command::Draw},
+                                           {trace, Command::Trace},
+                                           {preview, Command::Preview},
+                                           {sheet, Command::Sheet},
+                                           {info, Command::Info}};
+  for (const CommandEntry& entry : commands) addPlugin(*entry.app, options);
   for (CLI::App* const command : {draw, trace, sheet}) command->footer(limits());
+  return commands;
+}
+
+// A text that was asked for instead of a command.
+class AskedText : public CLI::Success {
+ public:
+  explicit AskedText(const std::string& text) : CLI::Success("AskedText", text, CLI::ExitCodes::Success) {}
+};
+
+// What the program tells about itself without a command.
+void addTexts(CLI::App& app) {
+  app.add_flag_callback(
+      "--version", [] { throw AskedText(kVersion + "\n"); }, "show the program's version");
+  app.add_flag_callback(
+      "--man", [&app] { throw AskedText(manualPage(app, kVersion)); }, "print the manual page, for man -l");
+  static constexpr std::array<std::pair<const char*, std::string (*)(const CLI::App&)>, 2> kShells{
+      {{"bash", bashCompletion}, {"zsh", zshCompletion}}};
+  const auto form = oneOf(kShells);
+  app.add_option_function<std::string>(
+         "--completion",
+         [&app, form](const std::string& shell) {
+           const auto script = form.parse(shell);
+           if (!script)
+             throw CLI::ValidationError("--completion", "expects " + form.wanted + ", not '" + shell + "'");
+           throw AskedText((*script)(app));
+         },
+         "print a script by which the shell completes the program's command line")
+      ->type_name(form.shape);
+  app.footer(exitStatuses());
+}
+
+// Reads the command line; where it says nothing, the options stay as they are.
+std::variant<Options, UsageEnd> parseOver(Options options, bool pictureIsRead) {
+  std::vector<const char*> argv;
+  for (const std::string& word : options.commandLine) argv.push_back(word.c_str());
+  const int argc = static_cast<int>(argv.size());
+  CLI::App app("Draws recorded ink with the pencil plug-in.", "qelt-sketch");
+  addTexts(app);
+  const std::vector<CommandEntry> commands = addCommands(app, options);
 
   try {
     app.parse(argc, argv.data());
@@ -363,8 +446,10 @@ std::variant<Options, UsageEnd> parseOver(Options options, bool pictureIsRead) {
       checkTogether(options);
     } catch (const CLI::ValidationError&) {
       // What is missing may be in the picture.
-      if (pictureIsRead || !options.input || !isPng(*options.input)) throw;
+      if (pictureIsRead || !options.input || !maybePng(*options.input)) throw;
     }
+  } catch (const AskedText& text) {
+    return UsageEnd{text.what(), 0};
   } catch (const CLI::RequiredError& error) {
     if (!app.get_subcommands().empty() || argc < 2) return usageEnd(app, error);
     return UsageEnd{"no command '" + oneLine(argv[1]) + "'; see qelt-sketch --help\n", 2};
@@ -405,6 +490,11 @@ Options withInstruction(const Options& asked, const std::string& name, const std
   if (const auto* const usage = std::get_if<UsageEnd>(&merged))
     throw Refusal(name + ": as the picture was drawn, " + usage->text.substr(0, usage->text.find('\n')));
   return std::get<Options>(std::move(merged));
+}
+
+void checkWithoutInstruction(const Options& asked) {
+  const std::variant<Options, UsageEnd> parsed = parseOver(asked, true);
+  if (const auto* const usage = std::get_if<UsageEnd>(&parsed)) throw WrongUsage(*usage);
 }
 
 }  // namespace QeltDesktop

@@ -28,6 +28,7 @@
 #include "pencommon/IPenMorphable.h"
 #include "play/CallRecorder.h"
 #include "play/PageDrawing.h"
+#include "play/PageFit.h"
 #include "play/PageLayout.h"
 #include "play/PagePlayer.h"
 #include "play/PenSession.h"
@@ -76,6 +77,16 @@ float marginFor(const PluginLibrary& plugin, RenderQueue& queue, const Page& pag
   return pageMargin(largestPenSize(plugin, queue, page, options), largestOutlineSize(page, options));
 }
 
+// Where the page and its margin lie in the picture. Ink that a pen cannot draw as small as it is grows to the
+// size that was asked for.
+PageLayout layOutPage(const PluginLibrary& plugin, RenderQueue& queue, Page& page, Options& options) {
+  if (options.fit && isBelowStrokeUnits(page))
+    enlargeToFit(page, options, marginFor(plugin, queue, page, options));
+  const PageArea area = pageArea(page, options.page, marginFor(plugin, queue, page, options));
+  const float zoom = options.fit ? zoomToFit(area, options.rotate, *options.fit) : options.zoom;
+  return layOut(area, zoom, options.rotate);
+}
+
 std::size_t strokesToPlay(const Page& page, const Options& options) {
   return page.strokes.size() * static_cast<std::size_t>(options.repeat);
 }
@@ -83,8 +94,17 @@ std::size_t strokesToPlay(const Page& page, const Options& options) {
 // The page, with the options that the picture was drawn with where it is one.
 Page readPage(Options& options) {
   PageInput input = readPageInput(inputPath(options));
-  if (input.drawnWith) options = withInstruction(options, input.page.name, *input.drawnWith);
+  if (input.drawnWith) {
+    options = withInstruction(options, input.page.name, *input.drawnWith);
+  } else {
+    checkWithoutInstruction(options);
+  }
   return std::move(input.page);
+}
+
+// The file that holds the page, which must not be written over.
+std::string inputFile(const Page& page, const Options& options) {
+  return options.input == kStandardInput ? "/dev/stdin" : page.name;
 }
 
 // What a picture of the page carries, so that it can be drawn again from nothing else.
@@ -106,18 +126,18 @@ PictureText inkOf(const Page& page, Options options) {
 void draw(const Options& asked) {
   Options options = asked;
   Page page = readPage(options);
-  OutputFile file(options.output, page.name);
+  OutputFile file(options.output, inputFile(page, options));
   const PictureText ink = options.ink ? inkOf(page, options) : PictureText{};
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
 
   // The extent of the whole page: what --points leaves out keeps its place.
-  const PageArea area = pageArea(page, options.page, marginFor(plugin, queue, page, options));
+  const PageLayout layout = layOutPage(plugin, queue, page, options);
   if (options.points) cutLastStroke(page, *options.points);
 
   Progress progress("drawing stroke", strokesToPlay(page, options));
-  const Picture picture = drawPage(plugin, queue, page, options, layOut(area, options.zoom, options.rotate),
-                                   drawablesFor(page, options), progress);
+  const Picture picture =
+      drawPage(plugin, queue, page, options, layout, drawablesFor(page, options), progress);
   file.write(encodePng(picture, ink));
   file.commit();
 }
@@ -154,15 +174,14 @@ Canvases canvasesFor(DrawableKind wanted, PenCanvas& canvas) {
 void trace(const Options& asked) {
   Options options = asked;
   Page page = readPage(options);
-  OutputFile file(options.output, page.name);
+  OutputFile file(options.output, inputFile(page, options));
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::None);
   Progress progress("tracing stroke", strokesToPlay(page, options));
   CallRecorder recorder(queue, file, progress, options.drawable);
 
   PenCanvas canvas(&queue, nullptr);
-  const PageArea area = pageArea(page, options.page, marginFor(plugin, queue, page, options));
-  canvas.setMatrix(layOut(area, options.zoom, options.rotate).matrix);
+  canvas.setMatrix(layOutPage(plugin, queue, page, options).matrix);
   if (options.points) cutLastStroke(page, *options.points);
 
   {
@@ -188,28 +207,37 @@ void preview(const Options& asked) {
   file.commit();
 }
 
+// Only the cells that were asked for can make it too large.
+void checkSheetSize(int width, int height) {
+  if (width <= kLongestSide && height <= kLongestSide && std::int64_t{width} * height <= kMostPixels) return;
+  throw Refusal("--fit: the sheet is too large to draw: " + std::to_string(width) + " x " +
+                std::to_string(height) + " pixels, at most " + std::to_string(kLongestSide) + " a side and " +
+                std::to_string(kMostPixels) + " in all");
+}
+
 // Every rendering version in a cell of its own, under a label, row by row.
 void sheet(const Options& asked) {
   constexpr int kColumns = 2;
   constexpr int kRows = (static_cast<int>(Qelt::kRenderingVersions.size()) + kColumns - 1) / kColumns;
   // Pixels.
-  constexpr double kWidestCell = 800.0, kHighestCell = 600.0;
   constexpr int kGap = 16;
   constexpr int kLabelScale = 2;
   constexpr int kLabelHeight = kGlyphHeight * kLabelScale;
   constexpr std::uint32_t kPaper = 0xE8E8E8, kInk = 0x404040;
 
   Options options = asked;
-  const Page page = readPage(options);
-  OutputFile file(options.output, page.name);
+  Page page = readPage(options);
+  OutputFile file(options.output, inputFile(page, options));
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
 
   // Without outlines.
-  const float margin = pageMargin(largestPenSize(plugin, queue, page, options), 0.0f);
-  const PageArea area = pageArea(page, std::nullopt, margin);
-  const double fit = std::min({1.0, kWidestCell / area.width, kHighestCell / area.height});
-  const PageLayout layout = layOut(area, static_cast<float>(fit), 0.0f);
+  const auto margin = [&] { return pageMargin(largestPenSize(plugin, queue, page, options), 0.0f); };
+  if (options.fit && isBelowStrokeUnits(page)) enlargeToFit(page, options, margin());
+  const PageArea area = pageArea(page, std::nullopt, margin());
+  const float zoom =
+      options.fit ? zoomToFit(area, 0.0f, *options.fit) : std::min(1.0f, zoomToFit(area, 0.0f, kUsualCell));
+  const PageLayout layout = layOut(area, zoom, 0.0f);
 
   Progress progress("drawing stroke", page.strokes.size() * Qelt::kRenderingVersions.size());
   std::optional<Picture> sheet;
@@ -219,7 +247,11 @@ void sheet(const Options& asked) {
     const Picture cell = drawPage(plugin, queue, page, options, layout, {.stroke = true}, progress);
     const int stepX = cell.width + kGap;
     const int stepY = cell.height + kLabelHeight + kGap;
-    if (!sheet) sheet = plainPicture(kColumns * stepX + kGap, kRows * stepY + kGap, kPaper);
+    if (!sheet) {
+      const int width = kColumns * stepX + kGap, height = kRows * stepY + kGap;
+      checkSheetSize(width, height);
+      sheet = plainPicture(width, height, kPaper);
+    }
     const int x = kGap + column * stepX;
     const int y = kGap + row * stepY;
     writeLabel(*sheet, x, y, kLabelScale, kInk, "RENDERING VERSION " + std::to_string(version.number));

@@ -121,16 +121,18 @@ class InstructionFinder final : public XmlVisitor {
 }  // namespace
 
 PageInput readPageInput(const std::string& path) {
-  SourceText source = SourceText::fromFile(path);
+  SourceText source = path == kStandardInput ? SourceText::fromStandardInput() : SourceText::fromFile(path);
   if (!source.text().starts_with(kPngSignature)) return {readInkml(source), std::nullopt};
-  source = SourceText(path, PictureReader(path, source.text()).ink());
+  const std::string name = source.name();
+  source = SourceText(name, PictureReader(name, source.text()).ink());
   Page page = readInkml(source);
   InstructionFinder finder(source);
   walkXml(source, finder);
   return {std::move(page), finder.found};
 }
 
-bool isPng(const std::string& path) {
+bool maybePng(const std::string& path) {
+  if (path == kStandardInput) return true;
   const std::unique_ptr<std::FILE, int (*)(std::FILE*)> file(std::fopen(path.c_str(), "rb"), &std::fclose);
   if (!file) return false;
   std::string start(kPngSignature.size(), '\0');

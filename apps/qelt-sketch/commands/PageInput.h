@@ -22,12 +22,16 @@ struct PageInput {
   std::optional<std::string> drawnWith;
 };
 
+// The path that stands for standard input.
+constexpr const char* kStandardInput = "-";
+
 // Reads a page of InkML, or a PNG picture that carries one; a picture is told by its first bytes. Throws
 // Refusal, for what is wrong with the page with its line, within a picture the line of the text that it
 // carries.
 PageInput readPageInput(const std::string& path);
 
-// Whether a file begins like a PNG picture; false where it cannot be read.
-bool isPng(const std::string& path);
+// Whether a file may be a PNG picture: it begins like one, or is standard input, which can be read only once.
+// False where it cannot be read.
+bool maybePng(const std::string& path);
 
 }  // namespace QeltDesktop

@@ -8,6 +8,7 @@
 #include <utility>
 
 #include "engine/MotionEvent.h"
+#include "ink/Lengths.h"
 #include "text/NumberText.h"
 
 namespace QeltDesktop {
@@ -16,51 +17,75 @@ namespace {
 // Far above those that any pen has.
 constexpr int kHighestVersion = 99;
 
-void readBrushProperty(const SourceText& source, const XmlElement& element, Brush& brush) {
-  const std::string name = element.text("name");
-  const std::string value = element.text("value");
-  const auto malformed = [&](const std::string& what) {
-    return source.refusalAt(element.offset(), what, value.empty() ? "\"\"" : value);
-  };
-  const auto length = [&] {
-    const std::optional<float> number = parseFloat(value);
-    if (!number || !std::isfinite(*number) || *number <= 0.0f) {
-      throw malformed("brush " + name + " must be a number above 0");
+// Reads one property of a brush into what is known of it.
+class BrushPropertyReader {
+ public:
+  BrushPropertyReader(const SourceText& source, const XmlElement& element)
+      : mSource(source),
+        mOffset(element.offset()),
+        mName(element.text("name")),
+        mValue(element.text("value")),
+        mUnits(element.text("units")) {}
+
+  void readInto(Brush& brush, std::optional<bool>& ignoresPressure) const {
+    if (mName == "width") {
+      brush.width = length();
+    } else if (mName == "color") {
+      brush.rgb = color(parseRgb(mValue), "#RRGGBB");
+    } else if (mName == "transparency") {
+      const std::optional<float> transparency = parseFloat(mValue);
+      if (!transparency || !(*transparency >= 0.0f && *transparency <= 255.0f))
+        throw malformed("must be a number from 0 to 255");
+      brush.transparency = static_cast<std::uint8_t>(std::lround(*transparency));
+    } else if (mName == "ignorePressure") {
+      ignoresPressure = choice();
+    } else if (mName == "renderingVersion") {
+      const std::optional<int> version = parseInt(mValue);
+      // Each takes a pen of its own, so a page must not name any number of them.
+      if (!version || *version < 1 || *version > kHighestVersion)
+        throw malformed("must be a whole number from 1 to " + std::to_string(kHighestVersion));
+      brush.renderingVersion = version;
+    } else if (mName == "curve") {
+      brush.curve = choice();
+    } else if (mName == "outlineSize") {
+      brush.outlineSize = length();
+    } else if (mName == "outlineColor") {
+      brush.outlineArgb = color(parseArgb(mValue), "#AARRGGBB");
     }
-    return number;
-  };
-  if (name == "width") {
-    brush.width = length();
-  } else if (name == "color") {
-    const std::optional<unsigned int> rgb = parseRgb(value);
-    if (!rgb) throw malformed("brush color must be #RRGGBB");
-    brush.rgb = rgb;
-  } else if (name == "transparency") {
-    const std::optional<float> transparency = parseFloat(value);
-    if (!transparency || !(*transparency >= 0.0f && *transparency <= 255.0f)) {
-      throw malformed("brush transparency must be a number from 0 to 255");
-    }
-    brush.transparency = static_cast<std::uint8_t>(std::lround(*transparency));
-  } else if (name == "renderingVersion") {
-    const std::optional<int> version = parseInt(value);
-    // Each takes a pen of its own, so a page must not name any number of them.
-    if (!version || *version < 1 || *version > kHighestVersion) {
-      throw malformed("brush renderingVersion must be a whole number from 1 to " +
-                      std::to_string(kHighestVersion));
-    }
-    brush.renderingVersion = version;
-  } else if (name == "curve") {
-    const bool on = value == "true" || value == "1";
-    if (!on && value != "false" && value != "0") throw malformed("brush curve must be true or false");
-    brush.curve = on;
-  } else if (name == "outlineSize") {
-    brush.outlineSize = length();
-  } else if (name == "outlineColor") {
-    const std::optional<unsigned int> argb = parseArgb(value);
-    if (!argb) throw malformed("brush outlineColor must be #AARRGGBB");
-    brush.outlineArgb = argb;
   }
-}
+
+ private:
+  float length() const {
+    const std::optional<double> unit = strokeUnitsIn(mUnits);
+    if (!unit && !isUnitless(mUnits))
+      throw mSource.refusalAt(mOffset, "unknown unit of brush " + mName, mUnits);
+    const std::optional<float> number = parseFloat(mValue);
+    if (!number || !std::isfinite(*number) || *number <= 0.0f) throw malformed("must be a number above 0");
+    if (!unit || *unit == 1.0) return *number;
+    const auto strokeUnits = static_cast<float>(*parseDouble(mValue) * *unit);
+    if (!std::isfinite(strokeUnits) || strokeUnits <= 0.0f) throw malformed("is out of range");
+    return strokeUnits;
+  }
+
+  bool choice() const {
+    const bool on = mValue == "true" || mValue == "1";
+    if (!on && mValue != "false" && mValue != "0") throw malformed("must be true or false");
+    return on;
+  }
+
+  unsigned int color(std::optional<unsigned int> parsed, const char* form) const {
+    if (!parsed) throw malformed(std::string("must be ") + form);
+    return *parsed;
+  }
+
+  Refusal malformed(const std::string& what) const {
+    return mSource.refusalAt(mOffset, "brush " + mName + " " + what, mValue.empty() ? "\"\"" : mValue);
+  }
+
+  const SourceText& mSource;
+  std::size_t mOffset;
+  std::string mName, mValue, mUnits;
+};
 
 // Fills in from `base` what `brush` leaves open.
 void takeOver(Brush& brush, const Brush& base) {
@@ -138,10 +163,10 @@ class Definitions::Collector final : public XmlVisitor {
   }
 
  private:
-  enum class What { Other, Group, Brush, Context, Format, Intermittent, Source, Tool };
+  enum class What { Other, Group, Brush, Context, Format, Intermittent, Source, Properties, Tool };
   struct Open {
     What what = What::Other;
-    std::size_t index = 0;  // among its kind; of a tool, the group's
+    std::size_t index = 0;  // among its kind; of a tool, the group's, of properties, the source's
     std::size_t offset = 0;
     std::vector<ChannelText> regular, intermittent;
     std::string text;
@@ -201,16 +226,23 @@ class Definitions::Collector final : public XmlVisitor {
       open.what = What::Format;
       open.index = numberAfter(mAll.mFormats.size());
       mAll.mFormats.emplace_back();
+      mAll.mFormatSources.push_back(within == What::Source ? static_cast<std::uint32_t>(parent->index)
+                                                           : kNoNumber);
       remember(element, Kind::Format, open.index);
       if (within == What::Context) addPart(parent->index, Part::OwnFormat, open.index);
-      if (within == What::Source && mAll.mSources[parent->index] == kNoNumber)
-        mAll.mSources[parent->index] = static_cast<std::uint32_t>(open.index);
+      if (within == What::Source && mAll.mSources[parent->index].format == kNoNumber)
+        mAll.mSources[parent->index].format = static_cast<std::uint32_t>(open.index);
     } else if (name == "inkSource") {
       open.what = What::Source;
       open.index = numberAfter(mAll.mSources.size());
-      mAll.mSources.push_back(kNoNumber);
+      mAll.mSources.emplace_back();
       remember(element, Kind::Source, open.index);
       if (within == What::Context) addPart(parent->index, Part::OwnSource, open.index);
+    } else if (name == "channelProperties" && within == What::Source) {
+      open.what = What::Properties;
+      open.index = parent->index;
+    } else if (name == "channelProperty" && within == What::Properties) {
+      addResolution(mAll.mSources[parent->index], resolutionOf(mSource, element));
     } else if (name == "brushProperty" && within == What::Brush) {
       readProperty(element, mAll.mBrushes[parent->index]);
     } else if (name == "channel" && within == What::Format) {
@@ -249,12 +281,25 @@ class Definitions::Collector final : public XmlVisitor {
     if (kept != kNoNumber) addPart(context, part, kept);
   }
 
+  // Of each quantity, only the first resolution counts.
+  void addResolution(SourceEntry& source, const std::optional<Resolution>& stated) {
+    if (!stated) return;
+    for (std::uint32_t at = source.resolution; at != kNoNumber; at = mAll.mResolutions[at].before) {
+      if (mAll.mResolutions[at].stated.quantity == stated->quantity) return;
+    }
+    const std::uint32_t added = numberAfter(mAll.mResolutions.size());
+    mAll.mResolutions.push_back({.stated = *stated, .before = source.resolution});
+    source.resolution = added;
+  }
+
   void readProperty(const XmlElement& element, BrushEntry& brush) {
     if (brush.text == kNoNumber) {
       brush.text = numberAfter(mAll.mBrushTexts.size());
       mAll.mBrushTexts.emplace_back();
+      mAll.mIgnoringPressure.emplace_back();
     }
-    readBrushProperty(mSource, element, mAll.mBrushTexts[brush.text]);
+    BrushPropertyReader(mSource, element)
+        .readInto(mAll.mBrushTexts[brush.text], mAll.mIgnoringPressure[brush.text]);
   }
 
   void remember(const XmlElement& element, Kind kind, std::size_t index) {
@@ -388,11 +433,36 @@ std::uint32_t Definitions::brush(std::size_t brush) {
         entry.text = text;
       } else if (text != kNoNumber) {
         takeOver(mBrushTexts[entry.text], mBrushTexts[text]);
+        std::optional<bool>& ignoring = mIgnoringPressure[entry.text];
+        if (!ignoring) ignoring = mIgnoringPressure[text];
       }
     }
     entry.state = kKnown;
   }
   return mBrushes[brush].text;
+}
+
+bool Definitions::ignoresPressure(std::uint32_t brushText) const {
+  return brushText != kNoNumber && mIgnoringPressure[brushText].value_or(false);
+}
+
+const TraceFormat& Definitions::format(std::optional<std::size_t> format, std::optional<std::size_t> source) {
+  const std::uint32_t asked = format ? static_cast<std::uint32_t>(*format) : kNoNumber;
+  std::uint32_t counting = kNoNumber;
+  if (source) {
+    counting = static_cast<std::uint32_t>(*source);
+  } else if (format) {
+    counting = mFormatSources[asked];
+  }
+  if (!mApplied.channels.empty() && mAppliedFormat == asked && mAppliedSource == counting) return mApplied;
+  mApplied = asked == kNoNumber ? plainFormat() : mFormats[asked];
+  mAppliedFormat = asked;
+  mAppliedSource = counting;
+  if (counting == kNoNumber) return mApplied;
+  for (std::uint32_t at = mSources[counting].resolution; at != kNoNumber; at = mResolutions[at].before) {
+    applyResolution(mApplied, mResolutions[at].stated);
+  }
+  return mApplied;
 }
 
 std::optional<std::uint32_t> Definitions::partOf(const ContextEntry& context, Part part) const {
@@ -418,9 +488,14 @@ std::optional<std::size_t> Definitions::formatIn(const ContextEntry& context) co
   const auto source = referredTo(context, Part::SourceRef, "inkSourceRef", Kind::Source);
   const std::optional<std::size_t> ownSource = partOf(context, Part::OwnSource);
   for (const std::optional<std::size_t>& ink : {ownSource, source}) {
-    if (ink && mSources[*ink] != kNoNumber) return mSources[*ink];
+    if (ink && mSources[*ink].format != kNoNumber) return mSources[*ink].format;
   }
   return std::nullopt;
+}
+
+std::optional<std::size_t> Definitions::sourceIn(const ContextEntry& context) const {
+  if (const auto own = partOf(context, Part::OwnSource)) return *own;
+  return referredTo(context, Part::SourceRef, "inkSourceRef", Kind::Source);
 }
 
 std::optional<std::size_t> Definitions::alongContexts(
@@ -456,6 +531,10 @@ std::optional<std::size_t> Definitions::alongContexts(
 
 std::optional<std::size_t> Definitions::brushOfContext(std::size_t context) {
   return alongContexts(context, &ContextEntry::brush, &Definitions::brushIn);
+}
+
+std::optional<std::size_t> Definitions::sourceOfContext(std::size_t context) {
+  return alongContexts(context, &ContextEntry::source, &Definitions::sourceIn);
 }
 
 std::optional<std::size_t> Definitions::formatOfContext(std::size_t context) {

@@ -44,7 +44,9 @@ class Definitions {
   // The tool that a group's own annotation names, if any; throws Refusal for an unknown tool. Only for groups
   // that are drawn: those that lie in nothing but groups.
   std::optional<int> toolOfGroup(std::size_t group) const;
-  const TraceFormat& format(std::size_t format) const { return mFormats[format]; }
+  // A format as the ink source counts that is given, else the one that it stands in. Without a format, the
+  // one that traces have by default. Valid until the next call.
+  const TraceFormat& format(std::optional<std::size_t> format, std::optional<std::size_t> source);
 
   // The number that a reference leads to; none without the attribute, and for the defaults that every
   // document has ("#DefaultBrush"). These functions throw Refusal for a reference that leads nowhere or back
@@ -54,10 +56,13 @@ class Definitions {
   // A brush together with the properties of those it builds on, as an index into `takeBrushes`; kNoNumber if
   // it has no properties.
   std::uint32_t brush(std::size_t brush);
-  // A context's brush: its own, else the one it refers to, else that of the context it builds on. Its format
-  // in the same way, where an ink source may give one too.
+  // Whether strokes of a brush that `brush` returned are drawn as if without pressure.
+  bool ignoresPressure(std::uint32_t brushText) const;
+  // A context's brush: its own, else the one it refers to, else that of the context it builds on. Its ink
+  // source in the same way, and its format, where an ink source may give one too.
   std::optional<std::size_t> brushOfContext(std::size_t context);
   std::optional<std::size_t> formatOfContext(std::size_t context);
+  std::optional<std::size_t> sourceOfContext(std::size_t context);
   // The properties of the brushes, to be taken once all traces are read.
   std::deque<Brush> takeBrushes() { return std::move(mBrushTexts); }
 
@@ -81,7 +86,15 @@ class Definitions {
   };
   struct ContextEntry {
     std::uint32_t part = kNoNumber;  // the last one that it has
-    Found brush, format;
+    Found brush, format, source;
+  };
+  struct SourceEntry {
+    std::uint32_t format = kNoNumber;
+    std::uint32_t resolution = kNoNumber;  // the last one that it has
+  };
+  struct ResolutionEntry {
+    Resolution stated;
+    std::uint32_t before;  // the source's resolution before this one
   };
   // What a context refers to, or the first definition of a kind in it.
   enum class Part : std::uint64_t { BrushRef, FormatRef, SourceRef, Base, OwnBrush, OwnFormat, OwnSource };
@@ -113,6 +126,7 @@ class Definitions {
                                         Kind kind) const;
   std::optional<std::size_t> brushIn(const ContextEntry& context) const;
   std::optional<std::size_t> formatIn(const ContextEntry& context) const;
+  std::optional<std::size_t> sourceIn(const ContextEntry& context) const;
   std::optional<std::size_t> alongContexts(std::size_t context, Found ContextEntry::*result,
                                            std::optional<std::size_t> (Definitions::*in)(const ContextEntry&)
                                                const);
@@ -121,10 +135,16 @@ class Definitions {
   std::deque<std::vector<char>> mTexts;  // blocks of ids and references, which never move
   std::deque<BrushEntry> mBrushes;
   std::deque<Brush> mBrushTexts;
+  std::deque<std::optional<bool>> mIgnoringPressure;  // of each of the texts
   std::deque<ContextEntry> mContexts;
   std::deque<ContextPart> mContextParts;
   std::deque<TraceFormat> mFormats;
-  std::deque<std::uint32_t> mSources;  // the format of each ink source
+  std::deque<std::uint32_t> mFormatSources;  // the ink source that each format stands in
+  std::deque<SourceEntry> mSources;
+  std::deque<ResolutionEntry> mResolutions;
+  // What `format` returned last, and from which format and ink source.
+  TraceFormat mApplied;
+  std::uint32_t mAppliedFormat = kNoNumber, mAppliedSource = kNoNumber;
   std::deque<KeptReference> mReferences;
   std::deque<Id> mIds;  // sorted by name, once the document is read
   std::deque<std::uint8_t> mGroupTools;

@@ -45,6 +45,14 @@ void Strokes::cutLast(std::size_t size) {
   mOpen = SamplePacker(mWords.size());
 }
 
+void Strokes::enlarge(float factor) {
+  for (std::size_t i = 0; i < mRecords.size(); ++i) {
+    const std::size_t first = mRecords[i].first;
+    const std::size_t end = i + 1 < mRecords.size() ? mRecords[i + 1].first : mOpen.first();
+    enlargePlaces(mWords, first, end, static_cast<Columns>(mRecords[i].columns), factor);
+  }
+}
+
 void Strokes::finishStroke(std::uint32_t brush, std::optional<int> tool) {
   mRecords.push_back({.first = mOpen.first(),
                       .columns = mOpen.columns(),

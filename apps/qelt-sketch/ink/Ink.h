@@ -62,6 +62,8 @@ class Strokes {
   void add(const std::vector<Sample>& samples, const Brush& brush = {}, std::optional<int> tool = {});
   // Drops all but the first `size` samples of the last stroke.
   void cutLast(std::size_t size);
+  // Multiplies all places.
+  void enlarge(float factor);
 
   // For a reader, which adds sample by sample and then ends the stroke that they make up, or drops it and
   // them. `brush` is an index into the brushes, or kNoNumber.

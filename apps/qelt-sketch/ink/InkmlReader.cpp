@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cstddef>
 #include <cstdint>
+#include <iterator>
 #include <optional>
 #include <string_view>
 #include <utility>
@@ -124,10 +125,32 @@ class TraceCollector final : public XmlVisitor {
     bool inTool = false;
   };
 
+  // Elements that InkML has elsewhere, so that something is wrong with the page. What it does not know at all
+  // is passed over.
+  static bool isOutOfPlace(std::string_view name) {
+    static constexpr std::string_view kElsewhere[] = {"ink",
+                                                      "definitions",
+                                                      "context",
+                                                      "trace",
+                                                      "traceGroup",
+                                                      "traceFormat",
+                                                      "channel",
+                                                      "inkSource",
+                                                      "brush",
+                                                      "brushProperty",
+                                                      "intermittentChannels",
+                                                      "canvas",
+                                                      "canvasTransform",
+                                                      "timestamp",
+                                                      "mapping",
+                                                      "channelProperties"};
+    return std::find(std::begin(kElsewhere), std::end(kElsewhere), name) != std::end(kElsewhere);
+  }
+
   static void beginWithin(OpenTrace& trace, const XmlElement& element, std::string_view name) {
     trace.inTool = name == "annotation" && !trace.tool && element.text("type") == "tool";
     if (trace.inTool) trace.tool = {element.offset(), {}};
-    if (name != "annotation" && !trace.stranger) trace.stranger = {element.offset(), element.qualifiedName()};
+    if (isOutOfPlace(name) && !trace.stranger) trace.stranger = {element.offset(), element.qualifiedName()};
   }
 
   void beginWithinTrace(const XmlElement& element, std::string_view name) {
@@ -158,9 +181,9 @@ class TraceCollector final : public XmlVisitor {
 
   const TraceFormat& formatFor(const Scope& scope) {
     const std::optional<std::size_t> context = scope.context ? scope.context : mCurrentContext;
-    const auto format = context ? mDefinitions.formatOfContext(*context) : std::nullopt;
-    if (format) return mDefinitions.format(*format);
-    return mLastFormat ? mDefinitions.format(*mLastFormat) : mPlainFormat;
+    if (!context) return mDefinitions.format(mLastFormat, std::nullopt);
+    const std::optional<std::size_t> format = mDefinitions.formatOfContext(*context);
+    return mDefinitions.format(format ? format : mLastFormat, mDefinitions.sourceOfContext(*context));
   }
 
   // The index among the brushes of the page.
@@ -179,8 +202,9 @@ class TraceCollector final : public XmlVisitor {
       throw mSource.refusalAt(open.stranger->offset, "element that a trace cannot hold", open.stranger->name);
     }
     if (open.text.isBlank()) throw mSource.refusalAt(open.offset, "trace without points", "");
-    readSamples(open.text, formatFor(scope), mPage.strokes);
+    const TraceFormat& format = formatFor(scope);
     const std::uint32_t brush = brushFor(scope);
+    readSamples(open.text, format, mDefinitions.ignoresPressure(brush), mPage.strokes);
     if (open.penUp) {
       mPage.strokes.dropStroke();  // a pen in the air leaves nothing on the paper
     } else {
@@ -197,7 +221,6 @@ class TraceCollector final : public XmlVisitor {
   std::size_t mSkippedDepth = 0;  // how deep within an annotationXML, which may hold any XML
   std::optional<std::size_t> mEndingContext;
   std::size_t mInkOffset = 0;
-  const TraceFormat mPlainFormat = plainFormat();
   std::optional<std::size_t> mLastFormat;
   std::optional<std::size_t> mLastBrush;
   std::optional<std::size_t> mCurrentContext;

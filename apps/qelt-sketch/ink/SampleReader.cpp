@@ -23,6 +23,24 @@ struct Reading {
   float nearest = 0.0f;  // the float nearest to a plain number's decimal, rounded once
 };
 
+// A place in stroke units; not finite where a float cannot hold it.
+float placeOf(const Channel& channel, const Reading& reading) {
+  return channel.unit == 1.0 ? reading.nearest : static_cast<float>(reading.value * channel.unit);
+}
+
+// A force as a share of the channel's range. Without a range it is taken as it is.
+float pressureOf(const Channel& channel, const Reading& reading) {
+  if (channel.max <= channel.min) return reading.nearest;
+  const double min = static_cast<double>(channel.min);
+  const double share =
+      (static_cast<double>(reading.nearest) - min) / (static_cast<double>(channel.max) - min);
+  return static_cast<float>(share);
+}
+
+bool isPlace(Quantity quantity) {
+  return quantity == Quantity::X || quantity == Quantity::Y;
+}
+
 enum class Order { Value, Change, ChangeOfChange };
 
 // What a channel keeps from point to point.
@@ -75,9 +93,8 @@ class PointScanner {
     }
     if (count < mFormat.regularCount) throw wrongCount();
     for (std::size_t i = 0; i < mStates.size(); ++i) {
-      const Quantity quantity = mFormat.channels[i].quantity;
-      const bool isPlace = quantity == Quantity::X || quantity == Quantity::Y;
-      if (isPlace && !mStates[i].reading.known) throw badPoint("point without a place");
+      if (isPlace(mFormat.channels[i].quantity) && !mStates[i].reading.known)
+        throw badPoint("point without a place");
     }
     if (!atEnd()) {
       ++mAt;
@@ -122,9 +139,9 @@ class PointScanner {
         state.written = readNumber();
     }
     add(state);
-    if (channel.quantity != Quantity::Ignored && !std::isfinite(state.reading.nearest)) {
-      throw badValue("number out of range");
-    }
+    if (channel.quantity == Quantity::Ignored) return;
+    const bool tooFar = isPlace(channel.quantity) && !std::isfinite(placeOf(channel, state.reading));
+    if (tooFar || !std::isfinite(state.reading.nearest)) throw badValue("number out of range");
   }
 
   void add(ChannelState& state) const {
@@ -255,25 +272,23 @@ void setAttitude(Sample& sample, const Readings& readings, bool hasSphericalAngl
 
 }  // namespace
 
-void readSamples(const TraceText& text, const TraceFormat& format, Strokes& strokes) {
+void readSamples(const TraceText& text, const TraceFormat& format, bool ignoresPressure, Strokes& strokes) {
   const bool hasSphericalAngles = format.has(Quantity::Elevation) || format.has(Quantity::Azimuth);
   std::size_t count = 0;
   for (PointScanner scanner(text, format); !scanner.atEnd(); ++count) {
     const std::vector<Reading>& point = scanner.readPoint();
+    Sample sample;
     Readings readings;
-    float maxForce = 0.0f;
     for (std::size_t i = 0; i < point.size(); ++i) {
       const Channel& channel = format.channels[i];
+      if (channel.quantity == Quantity::X) sample.x = placeOf(channel, point[i]);
+      if (channel.quantity == Quantity::Y) sample.y = placeOf(channel, point[i]);
+      if (channel.quantity == Quantity::Force && point[i].known && !ignoresPressure)
+        sample.pressure = pressureOf(channel, point[i]);
       Reading& reading = readings[static_cast<std::size_t>(channel.quantity)];
       reading = point[i];
       reading.value *= channel.unit;
-      if (channel.quantity == Quantity::Force) maxForce = channel.max;
     }
-    Sample sample;
-    sample.x = of(readings, Quantity::X).nearest;
-    sample.y = of(readings, Quantity::Y).nearest;
-    const Reading& force = of(readings, Quantity::Force);
-    if (force.known) sample.pressure = maxForce > 0.0f ? force.nearest / maxForce : force.nearest;
     setAttitude(sample, readings, hasSphericalAngles);
     const Reading& time = of(readings, Quantity::Time);
     sample.time = time.known ? time.value : usualTime(count);

@@ -74,6 +74,13 @@ std::size_t wordsPerSample(Columns columns) {
   return 2 + static_cast<std::size_t>(std::popcount(unsigned{columns})) + ((columns & kTime) != 0 ? 1 : 0);
 }
 
+void enlargePlaces(PackedWords& words, std::size_t first, std::size_t end, Columns columns, float factor) {
+  const std::size_t each = wordsPerSample(columns);
+  for (std::size_t at = first; at < end; at += each) {
+    for (const std::size_t place : {at, at + 1}) words[place] = bitsOf(bitCast<float>(words[place]) * factor);
+  }
+}
+
 Sample Samples::operator[](std::size_t index) const {
   const PackedWords& words = *mWords;
   std::size_t at = mFirst + index * wordsPerSample(mColumns);

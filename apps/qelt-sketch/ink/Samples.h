@@ -41,6 +41,9 @@ class PackedWords {
 using Columns = std::uint8_t;
 std::size_t wordsPerSample(Columns columns);
 
+// Multiplies the places of the samples in the words from `first` to `end`, the latter not included.
+void enlargePlaces(PackedWords& words, std::size_t first, std::size_t end, Columns columns, float factor);
+
 // The samples of one stroke: a view into words that somebody else keeps, valid as long as those stay. The
 // samples come out bit for bit as they went in.
 class Samples {

@@ -12,6 +12,14 @@
 #include "text/Utf8.h"
 
 namespace QeltDesktop {
+namespace {
+
+// For the error that just happened.
+Refusal unreadable(const std::string& name) {
+  return Refusal(name + ": cannot be read: " + std::strerror(errno));
+}
+
+}  // namespace
 
 int lineEndsIn(std::string_view text) {
   int ends = 0;
@@ -22,20 +30,27 @@ int lineEndsIn(std::string_view text) {
 }
 
 SourceText SourceText::fromFile(const std::string& path) {
-  const auto unreadable = [&] { return Refusal(path + ": cannot be read: " + std::strerror(errno)); };
   const std::unique_ptr<std::FILE, int (*)(std::FILE*)> file(std::fopen(path.c_str(), "rb"), &std::fclose);
-  if (!file) throw unreadable();
+  if (!file) throw unreadable(path);
+  return fromStream(path, file.get());
+}
+
+SourceText SourceText::fromStandardInput() {
+  return fromStream("standard input", stdin);
+}
+
+SourceText SourceText::fromStream(const std::string& name, std::FILE* stream) {
   std::string bytes;
   // A text that grows piece by piece is held twice at times.
   struct stat status {};
-  if (fstat(fileno(file.get()), &status) == 0 && S_ISREG(status.st_mode))
+  if (fstat(fileno(stream), &status) == 0 && S_ISREG(status.st_mode))
     bytes.reserve(static_cast<std::size_t>(status.st_size));
   char block[65536];
-  while (const std::size_t count = std::fread(block, 1, sizeof block, file.get())) bytes.append(block, count);
-  if (std::ferror(file.get())) throw unreadable();
+  while (const std::size_t count = std::fread(block, 1, sizeof block, stream)) bytes.append(block, count);
+  if (std::ferror(stream)) throw unreadable(name);
   if (bytes.starts_with("\xFE\xFF")) bytes = utf8FromUtf16(bytes, true);
   if (bytes.starts_with("\xFF\xFE")) bytes = utf8FromUtf16(bytes, false);
-  return SourceText(path, std::move(bytes));
+  return SourceText(name, std::move(bytes));
 }
 
 SourceText::SourceText(std::string name, std::string text) : mName(std::move(name)), mText(std::move(text)) {}

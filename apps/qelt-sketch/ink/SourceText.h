@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdio>
 #include <string>
 #include <string_view>
 
@@ -14,8 +15,10 @@ int lineEndsIn(std::string_view text);
 // The text of a file, with its name, for messages that say where something stands.
 class SourceText {
  public:
-  // Reads the file; UTF-16 with a byte order mark is converted. Throws Refusal when it cannot be read.
+  // Reads the file, or standard input to its end, which is called so; UTF-16 with a byte order mark is
+  // converted. Throws Refusal when it cannot be read.
   static SourceText fromFile(const std::string& path);
+  static SourceText fromStandardInput();
   SourceText(std::string name, std::string text);
 
   const std::string& name() const { return mName; }
@@ -29,6 +32,8 @@ class SourceText {
   Refusal refusalAt(std::size_t offset, const std::string& what, const std::string& value) const;
 
  private:
+  static SourceText fromStream(const std::string& name, std::FILE* stream);
+
   std::string mName;
   std::string mText;
 };

@@ -15,9 +15,13 @@ enum class Quantity { Ignored, X, Y, Force, Elevation, Azimuth, TiltX, TiltY, Ti
 
 struct Channel {
   Quantity quantity = Quantity::Ignored;
-  bool boolean = false;  // its values are T and F
-  float max = 0.0f;      // of Force: the value at full pressure; 0 when not given
-  double unit = 1.0;     // of angles: radians per unit; of Time: milliseconds per unit
+  bool boolean = false;      // its values are T and F
+  bool inFullUnits = false;  // of angles: their range fits a turn in degrees, so they are no device steps
+  float min = 0.0f;          // of Force: the value without pressure
+  float max = 0.0f;          // of Force: the value at full pressure, above min; not above it when not given
+  // What one step of the channel's values is: of X and Y stroke units, below 0 where they grow to the left or
+  // upwards; of angles radians; of Time milliseconds.
+  double unit = 1.0;
 };
 
 // The order of the values in a point. Those after the regular ones may be missing in a point (intermittent
@@ -37,8 +41,8 @@ struct ChannelText {
   explicit ChannelText(const XmlElement& element);
 
   std::size_t offset;
-  std::string name, type, units;
-  std::optional<std::string> max;
+  std::string name, type, units, orientation;
+  std::optional<std::string> min, max;
 };
 
 // The format of a <traceFormat> at `offset`, from the channels in it and those in its <intermittentChannels>.
@@ -46,5 +50,19 @@ struct ChannelText {
 TraceFormat traceFormatOf(const SourceText& source, std::size_t offset,
                           const std::vector<ChannelText>& regular,
                           const std::vector<ChannelText>& intermittent);
+
+// How many steps of a channel an ink source counts to a unit.
+struct Resolution {
+  Quantity quantity;
+  double steps;                // above 0
+  std::optional<double> unit;  // as Channel has it; none: the channel's own
+};
+
+// The resolution that a <channelProperty> states; none if it is another property, or says nothing that
+// matters here. Throws Refusal when it is malformed.
+std::optional<Resolution> resolutionOf(const SourceText& source, const XmlElement& element);
+
+// Has the channels of the quantity count in such steps.
+void applyResolution(TraceFormat& format, const Resolution& resolution);
 
 }  // namespace QeltDesktop

@@ -4,19 +4,92 @@
 
 #include <algorithm>
 #include <exception>
+#include <functional>
+#include <map>
 #include <memory>
 #include <new>
 #include <type_traits>
+#include <vector>
 
 #include "text/Utf8.h"
 
 namespace QeltDesktop {
 namespace {
 
+constexpr std::string_view kInkmlNamespace = "http://www.w3.org/2003/InkML";
+
 std::string_view withoutPrefix(std::string_view name) {
   const std::size_t colon = name.rfind(':');
   return colon == std::string_view::npos ? name : name.substr(colon + 1);
 }
+
+// Empty if the name has none.
+std::string_view prefixOf(std::string_view name) {
+  const std::size_t colon = name.rfind(':');
+  return colon == std::string_view::npos ? std::string_view() : name.substr(0, colon);
+}
+
+// The prefix that an attribute declares a namespace for, empty for the default namespace; none for any other
+// attribute.
+std::optional<std::string_view> declaredPrefix(std::string_view attribute) {
+  if (attribute == "xmlns") return std::string_view();
+  if (!attribute.starts_with("xmlns:")) return std::nullopt;
+  return attribute.substr(std::string_view("xmlns:").size());
+}
+
+// Tells the names of InkML from those of other namespaces. Pages without namespaces, with prefixes that are
+// bound to none or with a namespace of their own for the root element are common, so everything counts as
+// InkML unless it lies in another namespace than InkML's and the root's.
+class Namespaces {
+ public:
+  // `attributes` are `count` pairs of name and value.
+  void elementBegins(std::string_view element, const char* const* attributes, std::size_t count) {
+    const bool isRoot = mDepth == 0;
+    ++mDepth;
+    if (isRoot) mRoot = declared(prefixOf(element), attributes, count);
+    for (std::size_t i = 0; i < count; ++i) {
+      const std::optional<std::string_view> prefix = declaredPrefix(attributes[2 * i]);
+      if (!prefix) continue;
+      const std::string_view name = attributes[2 * i + 1];
+      const auto bindings = mBindings.try_emplace(std::string(*prefix)).first;
+      bindings->second.push_back(!name.empty() && name != kInkmlNamespace && name != mRoot);
+      mDeclared.push_back({mDepth, bindings});
+    }
+  }
+
+  void elementEnds() {
+    for (; !mDeclared.empty() && mDeclared.back().depth == mDepth; mDeclared.pop_back()) {
+      mDeclared.back().bindings->second.pop_back();
+    }
+    --mDepth;
+  }
+
+  // Elements without a prefix lie in the default namespace, attributes without one in none.
+  bool isForeign(std::string_view prefix) const {
+    const auto found = mBindings.find(prefix);
+    return found != mBindings.end() && !found->second.empty() && found->second.back();
+  }
+
+ private:
+  // What a prefix stands for, within the elements that are open; the last one holds. True: a foreign name.
+  using Bindings = std::map<std::string, std::vector<bool>, std::less<>>;
+  struct Declaration {
+    int depth;
+    Bindings::iterator bindings;
+  };
+
+  static std::string declared(std::string_view prefix, const char* const* attributes, std::size_t count) {
+    for (std::size_t i = 0; i < count; ++i) {
+      if (declaredPrefix(attributes[2 * i]) == prefix) return attributes[2 * i + 1];
+    }
+    return {};
+  }
+
+  Bindings mBindings;
+  std::vector<Declaration> mDeclared;
+  std::string mRoot;
+  int mDepth = 0;
+};
 
 struct FreeParser {
   void operator()(XML_Parser parser) const { XML_ParserFree(parser); }
@@ -91,19 +164,45 @@ class Walk {
     Walk& walk = of(user);
     ++walk.mDepth;
     const int given = XML_GetSpecifiedAttributeCount(walk.mParser.get());
-    walk.visit([&] {
-      walk.mVisitor.elementBegins({name, attributes, static_cast<std::size_t>(given) / 2, walk.offset()});
-    });
+    walk.visit([&] { walk.begin(name, attributes, static_cast<std::size_t>(given) / 2); });
+  }
+
+  void begin(const XML_Char* name, const XML_Char** attributes, std::size_t count) {
+    if (mForeignDepth > 0) {
+      ++mForeignDepth;
+      return;
+    }
+    mNamespaces.elementBegins(name, attributes, count);
+    if (mNamespaces.isForeign(prefixOf(name))) {
+      mForeignDepth = 1;
+      return;
+    }
+    mAttributes.clear();
+    for (std::size_t i = 0; i < count; ++i) {
+      const std::string_view attribute = attributes[2 * i];
+      const std::string_view prefix = prefixOf(attribute);
+      if (declaredPrefix(attribute) || (!prefix.empty() && mNamespaces.isForeign(prefix))) continue;
+      mAttributes.insert(mAttributes.end(), {attributes[2 * i], attributes[2 * i + 1]});
+    }
+    mVisitor.elementBegins({name, mAttributes.data(), mAttributes.size() / 2, offset()});
   }
 
   static void ends(void* user, const XML_Char*) {
     Walk& walk = of(user);
     --walk.mDepth;
-    walk.visit([&] { walk.mVisitor.elementEnds(); });
+    walk.visit([&] { walk.end(); });
+  }
+
+  void end() {
+    const bool isForeign = mForeignDepth > 0;
+    if (isForeign && --mForeignDepth > 0) return;
+    if (!isForeign) mVisitor.elementEnds();
+    mNamespaces.elementEnds();
   }
 
   static void comes(void* user, const XML_Char* characters, int count) {
     Walk& walk = of(user);
+    if (walk.mForeignDepth > 0) return;
     const auto size = static_cast<std::size_t>(count);
     const auto written = static_cast<std::size_t>(XML_GetCurrentByteCount(walk.mParser.get()));
     // A reference is longer than the character it stands for; an "&" in a CDATA section stands for itself.
@@ -150,6 +249,9 @@ class Walk {
   std::size_t mStart = 0;
   std::unique_ptr<std::remove_pointer_t<XML_Parser>, FreeParser> mParser;
   int mDepth = 0;
+  Namespaces mNamespaces;
+  int mForeignDepth = 0;                 // how deep within an element of another namespace
+  std::vector<const char*> mAttributes;  // of the element that begins, without those of other namespaces
   std::exception_ptr mThrown;
 };
 

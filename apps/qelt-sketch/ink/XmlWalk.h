@@ -61,8 +61,11 @@ class XmlVisitor {
   virtual void instructionComes(const XmlInstruction&) {}
 };
 
-// Walks through a document from its first tag to its last, keeping only the tags that are open. Throws
-// Refusal where the text is not XML, else what the visitor threw first, after which it is not called again.
+// Walks through a document from its first tag to its last, keeping only the tags that are open. Elements of
+// other namespaces than InkML's are passed over with all that is in them, and so are such attributes; the
+// root's namespace counts as InkML's, whatever it is called, and a name that lies in none counts as well.
+// Throws Refusal where the text is not XML, else what the visitor threw first, after which it is not called
+// again.
 void walkXml(const SourceText& source, XmlVisitor& visitor);
 
 }  // namespace QeltDesktop

@@ -43,6 +43,10 @@ struct PageSize {
   float width, height;  // stroke units, above 0
 };
 
+struct PixelSize {
+  int width, height;  // above 0
+};
+
 struct Background {
   std::uint32_t rgb = 0xFFFFFF;  // 0xRRGGBB
   bool transparent = false;
@@ -86,8 +90,9 @@ struct Options {
   float opacity = 0.5f;
   std::optional<OutlineOptions> outline;  // none: the stroke's
 
-  float zoom = 1.0f;    // canvas pixels per stroke unit; finite, above 0
-  float rotate = 0.0f;  // degrees clockwise, finite
+  float zoom = 1.0f;             // canvas pixels per stroke unit; finite, above 0
+  std::optional<PixelSize> fit;  // as large as the page comes out within it, instead of the zoom
+  float rotate = 0.0f;           // degrees clockwise, finite
   std::optional<PageSize> page;
   Background background;
 

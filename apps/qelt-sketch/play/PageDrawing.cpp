@@ -33,10 +33,6 @@ double pixelsFor(double length) {
   return std::max(std::ceil(length - 1e-3), 1.0);
 }
 
-struct PixelSize {
-  int width, height;
-};
-
 PixelSize pixelSizeOf(const PageLayout& layout, const Page& page, const Options& options) {
   const double width = pixelsFor(layout.width);
   const double height = pixelsFor(layout.height);
@@ -48,7 +44,9 @@ PixelSize pixelSizeOf(const PageLayout& layout, const Page& page, const Options&
   std::snprintf(text.data(), text.size(),
                 ": the picture is too large to draw: %.6g x %.6g pixels, at most %d a side and %d in all",
                 width, height, kLongestSide, kMostPixels);
-  throw Refusal((options.page ? "--page" : page.name) + text.data());
+  if (options.fit && std::isfinite(width + height)) throw Refusal(std::string("--fit") + text.data());
+  if (options.page) throw Refusal(std::string("--page") + text.data());
+  throw Refusal(page.name + text.data() + "; --fit WxH draws it smaller");
 }
 
 // A layer of the picture, and the canvas through which a drawable draws the page into it.
