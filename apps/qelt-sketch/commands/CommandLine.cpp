@@ -360,9 +360,21 @@ struct CommandEntry {
 std::vector<CommandEntry> addCommands(CLI::App& app, Options& options) {
   app.require_subcommand(1);
 
-  CLI::App* const draw = app.add_subcommand("draw", "draw the page as a PNG picture");
-  addInput(*draw, options);
-  addOutput(*draw, options, "picture to write");
+  CLI::App* const draw = app.add_subcommand("draw", "draw a page, or many, as PNG pictures");
+  draw->add_option(
+          "INPUT", options.inputs,
+          "pages of W3C InkML, pictures that draw made, or folders of pages (*.inkml); - is standard "
+          "input: a page, or with a folder to write to a list of such names, one a line (default: the "
+          "sample page)")
+      ->type_name("");
+  draw->add_option("-o,--output", options.output,
+                   "picture to write; or a folder (DIR/), in which every page gets a picture of its name")
+      ->required()
+      ->type_name("PATH");
+  OptionGroup archived(*draw);
+  archived.add<int>("--jobs", options.jobs, kCount, "pages to draw at a time (default: as many as cores)");
+  draw->add_flag("--again", options.again,
+                 "draw pages, too, whose pictures in the folder are newer than they and the program");
   draw->add_flag_callback(
       "--no-ink", [&options] { options.ink = false; }, "a picture without the page and the options in it");
   draw->add_flag("--timings", options.timings,
@@ -511,7 +523,11 @@ Options withInstruction(const Options& asked, const std::string& name, const std
   std::variant<Options, UsageEnd> merged = parseOver(std::move(options), true);
   if (const auto* const usage = std::get_if<UsageEnd>(&merged))
     throw Refusal(name + ": as the picture was drawn, " + usage->text.substr(0, usage->text.find('\n')));
-  return std::get<Options>(std::move(merged));
+  options = std::get<Options>(std::move(merged));
+  // The command line may name many pages, of which this is one.
+  options.input = asked.input;
+  options.output = asked.output;
+  return options;
 }
 
 void checkWithoutInstruction(const Options& asked) {

@@ -1,24 +1,29 @@
 #include "commands/Commands.h"
 
-#include <dlfcn.h>
-#include <link.h>
-
 #include <algorithm>
 #include <cstddef>
 #include <cstdint>
 #include <cstdio>
+#include <cstdlib>
 #include <filesystem>
 #include <functional>
+#include <memory>
 #include <optional>
-#include <span>
+#include <set>
 #include <string>
 #include <string_view>
 #include <system_error>
+#include <thread>
 #include <utility>
+#include <vector>
 
+#include "commands/Archive.h"
 #include "commands/CommandLine.h"
 #include "commands/Compare.h"
+#include "commands/Info.h"
 #include "commands/PageInput.h"
+#include "commands/ProgramFiles.h"
+#include "commands/Workers.h"
 #include "desktop/engine/PluginLibrary.h"
 #include "desktop/gl/RenderQueue.h"
 #include "desktop/graphics/PenCanvas.h"
@@ -47,36 +52,6 @@ namespace QeltDesktop {
 namespace {
 
 namespace fs = std::filesystem;
-
-// A file that comes with the program. It is looked for beside the program, then where installing and building
-// put it, seen from the program, so that all of it may be moved together. An installed program takes no file
-// of a build tree that it may have been installed into.
-std::string besideProgram(const char* fromInstalled, const char* fromBuilt) {
-  std::error_code error;
-  const fs::path folder = fs::read_symlink("/proc/self/exe", error).parent_path();
-  const fs::path installed = (folder / fromInstalled).lexically_normal();
-  for (const fs::path& path :
-       {folder / installed.filename(), installed, (folder / fromBuilt).lexically_normal()}) {
-    if (fs::exists(path, error)) return path.string();
-  }
-  throw Refusal(installed.string() + ": not there; it comes with the program");
-}
-
-// The plug-in that was asked for, else the one built with the program.
-std::string pluginPath(const Options& options) {
-  if (!options.plugin) return besideProgram(QELT_PLUGIN_FROM_INSTALLED, QELT_PLUGIN_FROM_PROGRAM);
-  // The loader looks for a name without a folder among the system's libraries only; here it may also stand
-  // in the current folder.
-  std::error_code error;
-  const fs::path asked = *options.plugin;
-  return !asked.has_parent_path() && fs::exists(asked, error) ? (fs::path(".") / asked).string()
-                                                              : asked.string();
-}
-
-// The page that was asked for, else the sample page.
-std::string inputPath(const Options& options) {
-  return options.input ? *options.input : besideProgram(QELT_SAMPLE_FROM_INSTALLED, QELT_SAMPLE_FROM_PROGRAM);
-}
 
 // The margin of a page that is drawn or traced with all its options.
 float marginFor(const PluginLibrary& plugin, RenderQueue& queue, const Page& page, const Options& options) {
@@ -152,35 +127,140 @@ struct DrawnFile {
         ink(options.ink ? inkOf(page, options) : PictureText{}) {}
 };
 
-void drawFile(DrawnFile& drawn, const PluginLibrary& plugin, RenderQueue& queue, StageTimes& times) {
+void drawFile(DrawnFile& drawn, const PluginLibrary& plugin, RenderQueue& queue, StageTimes& times,
+              Progress& progress) {
   Options& options = drawn.options;
   Page& page = drawn.page;
   // The extent of the whole page: what --points leaves out keeps its place.
   const PageLayout layout = layOutPage(plugin, queue, page, options);
   if (options.points) cutLastStroke(page, *options.points);
 
-  Progress progress("drawing stroke", strokesToPlay(page, options));
   PngWriter png(writerTo(drawn.file), std::move(drawn.ink));
-  PageDrawer(plugin, queue, times)
-      .draw(page, options, layout, drawablesFor(page, options), progress, png);
+  PageDrawer(plugin, queue, times).draw(page, options, layout, drawablesFor(page, options), progress, png);
   const StageTimes::Watch watch(times, Stage::Encode);
   drawn.file.commit();
 }
 
-void draw(const Options& options) {
+// What pages are drawn with, one after the other: a plug-in and a GL context.
+struct DrawingDesk {
+  DrawingDesk(const Options& options, StageTimes& times)
+      : DrawingDesk(options, StageTimes::Watch(times, Stage::GL)) {}
+
+  PluginLibrary plugin;
+  RenderQueue queue;
+
+ private:
+  DrawingDesk(const Options& options, const StageTimes::Watch&)
+      : plugin(pluginPath(options)), queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context) {}
+};
+
+void tellTimes(const Options& options, StageTimes& times) {
+  if (options.timings) std::fputs(times.report().c_str(), stderr);
+}
+
+void drawOne(Options options) {
+  if (!options.inputs.empty()) options.input = options.inputs.front();
   StageTimes times;
   {
     DrawnFile drawn(options, times);
-    std::optional<PluginLibrary> plugin;
-    std::optional<RenderQueue> queue;
-    {
-      const StageTimes::Watch watch(times, Stage::GL);
-      plugin.emplace(pluginPath(drawn.options));
-      queue.emplace(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
-    }
-    drawFile(drawn, *plugin, *queue, times);
+    DrawingDesk desk(drawn.options, times);
+    Progress progress("drawing stroke", strokesToPlay(drawn.page, drawn.options));
+    drawFile(drawn, desk.plugin, desk.queue, times, progress);
   }
-  if (options.timings) std::fputs(times.report().c_str(), stderr);
+  tellTimes(options, times);
+}
+
+// One of the processes that draw an archive.
+class ArchiveWorker {
+ public:
+  explicit ArchiveWorker(const Options& options) : mOptions(options), mDesk(options, mTimes) {}
+  ~ArchiveWorker() { tellTimes(mOptions, mTimes); }
+  ArchiveWorker(const ArchiveWorker&) = delete;
+  ArchiveWorker& operator=(const ArchiveWorker&) = delete;
+
+  void draw(const ArchivePage& page) {
+    Options options = mOptions;
+    options.input = page.input;
+    options.output = page.output.string();
+    DrawnFile drawn(options, mTimes);
+    Progress silent = Progress::silent();
+    drawFile(drawn, mDesk.plugin, mDesk.queue, mTimes, silent);
+  }
+
+ private:
+  const Options& mOptions;
+  StageTimes mTimes;
+  DrawingDesk mDesk;
+};
+
+void makeFolder(const fs::path& folder) {
+  std::error_code error;
+  fs::create_directories(folder, error);
+  if (error) throw Refusal(folder.string() + ": no folder for pictures: " + error.message());
+}
+
+// Each page as a picture of its own in the folder that is the output.
+int drawArchive(const Options& options) {
+  std::size_t refused = 0;
+  const auto refuse = [&](const std::string& line) {
+    ++refused;
+    std::fprintf(stderr, "%s\n", printable(line).c_str());
+  };
+  std::vector<std::string> inputs = options.inputs;
+  if (inputs.empty()) inputs.push_back(inputPath(options));
+  std::vector<ArchivePage> pages = pagesOf(inputs, options.output, refuse);
+  const std::size_t all = pages.size();
+  if (!options.again) {
+    const std::vector<fs::path> program{fs::read_symlink("/proc/self/exe"), pluginPath(options)};
+    std::erase_if(pages, [&](const ArchivePage& page) { return isUpToDate(page, program); });
+  }
+  std::set<fs::path> folders{options.output};
+  for (const ArchivePage& page : pages) folders.insert(page.output.parent_path());
+  for (const fs::path& folder : folders) makeFolder(folder);
+
+  const std::size_t cores = std::max(std::thread::hardware_concurrency(), 1u);
+  const std::size_t jobs =
+      std::min(options.jobs ? static_cast<std::size_t>(*options.jobs) : cores, pages.size());
+  std::size_t drawn = 0;
+  {
+    Progress progress("drawing page", pages.size());
+    doInWorkers(
+        pages.size(), jobs,
+        [&]() -> Job {
+          // Several processes are enough to keep the cores busy: none shares its drawing among threads.
+          if (jobs > 1) setenv("LP_NUM_THREADS", "1", 0);
+          const auto worker = std::make_shared<ArchiveWorker>(options);
+          return [&pages, worker](std::size_t index) { worker->draw(pages[index]); };
+        },
+        [&](const JobEnd& end) {
+          progress.step();
+          if (!end.refusal) {
+            ++drawn;
+            return;
+          }
+          // Most refusals name the page; what a driver or a crash says does not.
+          const std::string& input = pages[end.index].input;
+          progress.clear();
+          refuse(end.refusal->starts_with(input) ? *end.refusal : input + ": " + *end.refusal);
+        });
+  }
+  std::printf("%zu pages: %zu drawn, %zu up to date, %zu refused\n", all, drawn, all - pages.size(), refused);
+  finishStandardOutput();
+  return refused == 0 ? 0 : 1;
+}
+
+// Whether pictures go to a folder: it is written as one, there is one, or there may be several.
+bool isForFolder(const Options& options) {
+  std::error_code error;
+  if (options.output.ends_with('/') || fs::is_directory(options.output, error)) return true;
+  if (options.inputs.size() == 1) return fs::is_directory(options.inputs.front(), error);
+  return options.inputs.size() > 1;
+}
+
+int draw(const Options& options) {
+  if (isForFolder(options)) return drawArchive(options);
+  drawOne(options);
+  return 0;
 }
 
 // It tells how the first stroke is drawn.
@@ -303,73 +383,6 @@ void sheet(const Options& asked) {
   file.commit();
 }
 
-// A row of the plug-in's version table.
-struct TableRow {
-  std::int32_t strokeVersion, outlineVersion;
-};
-
-// The table as the loaded plug-in exports it, which may be of another age than this program. The index is
-// the rendering version.
-std::span<const TableRow> versionTable(const PluginLibrary& plugin) {
-  const void* const table = plugin.symbol("versionTable");
-  Dl_info where{};
-  const ElfW(Sym)* symbol = nullptr;
-  if (table == nullptr ||
-      dladdr1(table, &where, reinterpret_cast<void**>(const_cast<ElfW(Sym)**>(&symbol)), RTLD_DL_SYMENT) ==
-          0 ||
-      symbol == nullptr) {
-    throw Refusal(plugin.path() + ": the plug-in has no versionTable");
-  }
-  return {static_cast<const TableRow*>(table), symbol->st_size / sizeof(TableRow)};
-}
-
-// Where the plug-in's table and this program's list of versions disagree, one line for each version.
-std::string disagreements(std::span<const TableRow> table) {
-  std::string lines;
-  const auto tell = [&](std::size_t number, const char* what) {
-    lines += "rendering version " + std::to_string(number) + what + '\n';
-  };
-  const std::size_t known = Qelt::kRenderingVersions.size();
-  for (const Qelt::RenderingVersion& version : Qelt::kRenderingVersions) {
-    const auto number = static_cast<std::size_t>(version.number);
-    if (number >= table.size()) {
-      tell(number, " is known to this program, not to the plug-in");
-    } else if (table[number].strokeVersion != version.strokeVersion ||
-               table[number].outlineVersion != version.outlineVersion) {
-      tell(number, (" has stroke version " + std::to_string(version.strokeVersion) + " and outline version " +
-                    std::to_string(version.outlineVersion) + " in this program's list")
-                       .c_str());
-    }
-  }
-  for (std::size_t number = known + 1; number < table.size(); ++number) {
-    tell(number, " is known to the plug-in, not to this program");
-  }
-  return lines;
-}
-
-void info(const Options& options) {
-  const PluginLibrary plugin(pluginPath(options));
-  std::printf("plug-in      %s\n", printable(plugin.path()).c_str());
-  const std::span<const TableRow> table = versionTable(plugin);
-
-  RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
-  std::printf("GL renderer  %s\n", queue.rendererName().c_str());
-
-  PenSession session(plugin, queue, {kUsualRenderingVersion, kUsualCurve});
-  const PenStyle& style = session.ownStyle();
-  std::printf("pen size     %g to %g, a new pen has %g\n", static_cast<double>(session.pen().GetMinSize()),
-              static_cast<double>(session.pen().GetMaxSize()), static_cast<double>(style.size));
-  std::printf("pen colour   #%08X\n", static_cast<unsigned int>(style.argb));
-  std::printf("\nrendering version  stroke version  outline version\n");
-  for (std::size_t version = 0; version < table.size(); ++version) {
-    std::printf("%17zu  %14d  %15d\n", version, table[version].strokeVersion, table[version].outlineVersion);
-  }
-  if (const std::string lines = disagreements(table); !lines.empty()) {
-    std::printf("\nThe plug-in is of another age than this program:\n%s", lines.c_str());
-  }
-  finishStandardOutput();
-}
-
 }  // namespace
 
 int runCommand(const Options& options) {
@@ -377,8 +390,7 @@ int runCommand(const Options& options) {
   if (!options.log) silenceLog();
   switch (options.command) {
     case Command::Draw:
-      draw(options);
-      break;
+      return draw(options);
     case Command::Trace:
       trace(options);
       break;

@@ -2,6 +2,7 @@
 
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
@@ -23,10 +24,14 @@ Progress::Progress(std::string what, std::size_t total)
     : mWhat(std::move(what)),
       mTotal(total),
       mOnTerminal(isatty(STDERR_FILENO) != 0),
-      mNextShow(Clock::now() + std::chrono::milliseconds(300)) {}
+      mNextShow(mBegin + std::chrono::milliseconds(300)) {}
 
-Progress::~Progress() {
-  if (mShown) std::fputs("\r\033[K", stderr);
+Progress Progress::silent() {
+  return Progress();
+}
+
+void Progress::clear() {
+  if (std::exchange(mShown, false)) std::fputs("\r\033[K", stderr);
 }
 
 void Progress::step() {
@@ -34,7 +39,10 @@ void Progress::step() {
   if (!mOnTerminal || Clock::now() < mNextShow) return;
   mNextShow = Clock::now() + std::chrono::milliseconds(100);
   mShown = true;
-  std::fprintf(stderr, "\r%s %zu of %zu\033[K", mWhat.c_str(), mDone, mTotal);
+  const double seconds = std::chrono::duration<double>(Clock::now() - mBegin).count();
+  const double rate = static_cast<double>(mDone) / seconds;
+  std::fprintf(stderr, "\r%s %zu of %zu, %.3g a second, %.0f s left\033[K", mWhat.c_str(), mDone, mTotal,
+               rate, static_cast<double>(mTotal - std::min(mDone, mTotal)) / rate);
   std::fflush(stderr);
 }
 

@@ -77,7 +77,10 @@ struct Options {
 
   Command command = Command::Draw;
   std::optional<std::string> input;   // none: the sample page
+  std::vector<std::string> inputs;    // of draw, which takes several: pages, folders, "-"
   std::string output;                 // "-": standard output
+  std::optional<int> jobs;            // pages at a time; none: as many as there are cores
+  bool again = false;                 // draw pages whose pictures are up to date, too
   bool ink = true;                    // the picture carries the page that it shows
   std::optional<std::string> plugin;  // none: the one built with the program
   bool log = false;                   // show the platform log
