@@ -7,6 +7,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <chrono>
 #include <csignal>
 #include <cstddef>
 #include <cstdint>
@@ -794,6 +795,92 @@ TEST_F(Program, TellsWrongUsageFromHelp) {
   const Ran help = run("trace --help");
   EXPECT_TRUE(help.status == 0 && help.err.empty());
   EXPECT_NE(help.out.find("live: samples a move event (default 4)"), std::string::npos) << help.out;
+}
+
+// --- Archives ---
+
+class Archive : public Program {
+ protected:
+  Archive() {
+    const std::string page = contentsOf(path("ink.inkml"));
+    for (const char* const name : {"in/a.inkml", "in/deep/b.inkml", "in/deep/c.inkml", "other/a.inkml"}) {
+      fs::create_directories(path(name).parent_path());
+      write(name, page);
+    }
+    write("in/notes.txt", "no page");
+  }
+  static std::string summary(int pages, int drawn, int upToDate, int refused) {
+    return std::to_string(pages) + " pages: " + std::to_string(drawn) + " drawn, " +
+           std::to_string(upToDate) + " up to date, " + std::to_string(refused) + " refused\n";
+  }
+};
+
+TEST_F(Archive, HasAPictureForEveryPageEachAsIfDrawnAlone) {
+  EXPECT_EQ(run("draw ink.inkml -o alone.png --zoom 2").status, 0);
+  EXPECT_EQ(run("draw in -o out --zoom 2 --jobs 2").out, summary(3, 3, 0, 0));
+  for (const char* const name : {"out/a.png", "out/deep/b.png", "out/deep/c.png"})
+    EXPECT_EQ(contentsOf(path(name)), contentsOf(path("alone.png"))) << name;
+  // Several inputs, lists, and a single page into a folder.
+  EXPECT_EQ(run("draw in/a.inkml in/deep -o more/").out, summary(3, 3, 0, 0));
+  EXPECT_TRUE(holds("more/a.png") && holds("more/b.png"));
+  EXPECT_EQ(sh("printf 'in/deep\\n\\nother/a.inkml\\n' | $sketch draw - -o listed/").out,
+            summary(3, 3, 0, 0));
+  EXPECT_TRUE(holds("listed/a.png") && holds("listed/c.png"));
+  EXPECT_EQ(run("draw ink.inkml -o one/").out, summary(1, 1, 0, 0));
+  EXPECT_EQ(run("draw -o sample/").out, summary(1, 1, 0, 0));
+  EXPECT_TRUE(holds("sample/sample.png"));
+  // Its pictures are pages as well, each drawn as it was.
+  EXPECT_EQ(run("draw out/a.png -o again/").out, summary(1, 1, 0, 0));
+  EXPECT_EQ(contentsOf(path("again/a.png")), contentsOf(path("alone.png")));
+}
+
+TEST_F(Archive, TellsBadPagesAndDrawsTheOthers) {
+  write("in/deep/b.inkml", "<ink>\n<trace>1 x</trace></ink>");
+  write("in/empty.inkml", "");
+  const Ran ran = run("draw in other/a.inkml nowhere.inkml ink.inkml -o out/ --jobs 1");
+  EXPECT_EQ(ran.status, 1);
+  EXPECT_EQ(ran.out, summary(5, 2, 0, 4).replace(0, 1, "6").replace(9, 1, "3"));
+  for (const char* const line : {"in/deep/b.inkml:2: not a number: x\n", "in/empty.inkml:1: not XML: ",
+                                 "other/a.inkml: its picture would be that of in/a.inkml: out/a.png\n",
+                                 "nowhere.inkml: cannot be read: No such file or directory\n"})
+    EXPECT_NE(ran.err.find(line), std::string::npos) << line << ran.err;
+  EXPECT_FALSE(holds("out/deep/b.png"));
+  // A plug-in that ends the process takes its page alone; one that is none ends the run at once.
+  EXPECT_EQ(run("draw in -o none/ --plugin ink.inkml").status, 1);
+  EXPECT_FALSE(holds("none/a.png"));
+  EXPECT_EQ(run("draw in -o ink.inkml").err, "ink.inkml: no folder for pictures: Not a directory\n");
+}
+
+TEST_F(Archive, DrawsOnlyWhatIsNotUpToDate) {
+  EXPECT_EQ(run("draw in -o out/").out, summary(3, 3, 0, 0));
+  EXPECT_EQ(run("draw in -o out/").out, summary(3, 0, 3, 0));
+  fs::last_write_time(path("in/a.inkml"), fs::file_time_type::clock::now());
+  EXPECT_EQ(run("draw in -o out/").out, summary(3, 1, 2, 0));
+  // Older than the program.
+  fs::last_write_time(path("out/deep/c.png"),
+                      fs::file_time_type::clock::now() - std::chrono::hours(24 * 365 * 20));
+  EXPECT_EQ(run("draw in -o out/").out, summary(3, 1, 2, 0));
+  EXPECT_EQ(run("draw in -o out/ --again").out, summary(3, 3, 0, 0));
+}
+
+// Killed at any moment, and run again.
+TEST_F(Archive, IsWholeAfterItWasKilled) {
+  const std::string page = contentsOf(path("ink.inkml"));
+  for (int i = 0; i < 30; ++i) write("in/page" + std::to_string(i) + ".inkml", page);
+  EXPECT_EQ(run("draw ink.inkml -o alone.png").status, 0);
+  const Ran killed =
+      sh("setsid $sketch draw in -o out/ --jobs 2 & until [ -e out/page0.png ]; do sleep 0.01; done; kill -9 "
+         "-- -$!; wait $!");
+  EXPECT_EQ(killed.status, 128 + SIGKILL) << killed.out;
+  const Ran resumed = run("draw in -o out/");
+  EXPECT_EQ(resumed.status, 0) << resumed.err;
+  std::size_t pictures = 0;
+  for (const auto& entry : fs::recursive_directory_iterator(path("out"))) {
+    if (entry.is_directory()) continue;
+    ++pictures;
+    EXPECT_EQ(contentsOf(entry.path()), contentsOf(path("alone.png"))) << entry.path();
+  }
+  EXPECT_EQ(pictures, 33u);
 }
 
 }  // namespace
