@@ -390,11 +390,11 @@ std::vector<CommandEntry> addCommands(CLI::App& app, Options& options) {
   CLI::App* const info =
       app.add_subcommand("info", "show plug-in path, GL renderer, version table and pen limits");
 
-  const std::vector<CommandEntry> commands{{draw, Command::Draw},
-                                           {trace, Command::Trace},
-                                           {preview, Command::Preview},
-                                           {sheet, Command::Sheet},
-                                           {info, Command::Info}};
+  std::vector<CommandEntry> commands{{draw, Command::Draw},
+                                     {trace, Command::Trace},
+                                     {preview, Command::Preview},
+                                     {sheet, Command::Sheet},
+                                     {info, Command::Info}};
   for (const CommandEntry& entry : commands) addPlugin(*entry.app, options);
   for (CLI::App* const command : {draw, trace, sheet}) command->footer(limits());
   return commands;

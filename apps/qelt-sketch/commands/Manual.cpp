@@ -148,7 +148,7 @@ std::string exitStatuses() {
 }
 
 std::string manualPage(const CLI::App& app, const std::string& version) {
-  const std::string program = app.get_name();
+  const std::string& program = app.get_name();
   std::string roff = ".\\\" Made by " + literal(program + " --man") + " from its options.\n";
   // No date, so that the same program makes the same page.
   roff += ".TH " + capitals(program) + " 1 \"\" \"" + version + "\" \"User Commands\"\n";
