@@ -18,6 +18,10 @@ if(QELT_SANITIZE)
 elseif(NOT EMSCRIPTEN)
   add_link_options(LINKER:--no-undefined)
 endif()
+if(NOT EMSCRIPTEN)
+  # Names a library's or program's debugging information, which is installed apart from it.
+  add_link_options(LINKER:--build-id=sha1)
+endif()
 find_program(QELT_CCACHE ccache)
 if(QELT_CCACHE)
   # Else it keeps nothing that uses a precompiled header.

@@ -57,8 +57,7 @@ int main(int argc, char** argv) {
     const std::variant<QeltDesktop::Options, QeltDesktop::UsageEnd> parsed =
         QeltDesktop::parseOptions(argc, argv);
     if (const auto* const usage = std::get_if<QeltDesktop::UsageEnd>(&parsed)) return end(*usage);
-    QeltDesktop::runCommand(std::get<QeltDesktop::Options>(parsed));
-    return 0;
+    return QeltDesktop::runCommand(std::get<QeltDesktop::Options>(parsed));
   } catch (const std::bad_alloc&) {
     std::fputs("qelt-sketch: out of memory\n", stderr);
     return 1;

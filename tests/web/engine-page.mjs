@@ -1,7 +1,7 @@
 // Debian's Chromium, headless, driven through playwright-core, and the engine alone on a bare page in it.
 
 import {execFileSync} from 'node:child_process';
-import {existsSync, mkdirSync, mkdtempSync, readFileSync, rmSync, writeFileSync} from 'node:fs';
+import {existsSync, mkdirSync, mkdtempSync, readFileSync, readdirSync, rmSync, writeFileSync} from 'node:fs';
 import {tmpdir} from 'node:os';
 import {dirname, join} from 'node:path';
 import {fileURLToPath, pathToFileURL} from 'node:url';
@@ -44,6 +44,18 @@ export async function openBrowser(renderer, {profile = scratch(), width = 1000, 
   });
   context.setDefaultTimeout(60_000);
   return context;
+}
+
+/** The processes of the browser that has this `profile`, each with its command line; the browser's own is the first. */
+export function processesOf(profile) {
+  return readdirSync('/proc').filter((name) => /^\d+$/.test(name)).map(Number).sort((a, b) => a - b).flatMap((pid) => {
+    try {
+      const command = readFileSync(`/proc/${pid}/cmdline`, 'utf8');
+      return command.includes(profile) ? [{pid, command}] : [];
+    } catch {
+      return [];  // it ended meanwhile
+    }
+  });
 }
 
 /** A tab, and the errors that its scripts made. */

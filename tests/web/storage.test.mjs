@@ -3,6 +3,7 @@
 import assert from 'node:assert/strict';
 import {after, before, describe, test} from 'node:test';
 import {launch, messages, openFor, openPage, paper, settled, stored, strokes, wave} from './browser.mjs';
+import {openBrowser, processesOf, scratch} from './engine-page.mjs';
 
 let browser;
 before(async () => { browser = await launch(); });
@@ -61,6 +62,23 @@ describe('a page', () => {
     assert.deepEqual(await messages(next), []);
   });
 
+  test('loses at most the stroke under the pen when the whole browser is killed', async (t) => {
+    const profile = scratch();
+    const open = async () => openPage(null, {context: await openBrowser('swiftshader', {profile})});
+    const page = await open();
+    for (const y of [100, 200, 300]) await draw(page, y);
+    assert.equal(await stored(page), 3);
+    await page.hand.pen('mousePressed', 100, 400);
+    await page.hand.pen('mouseMoved', 300, 400);
+    const closed = page.context().waitForEvent('close');
+    for (const {pid} of processesOf(profile)) process.kill(pid, 'SIGKILL');
+    await closed;
+    const next = await open();
+    t.after(() => next.context().close());
+    assert.equal(await strokes(next), 3);
+    assert.deepEqual(await messages(next), []);
+  });
+
   test('keeps undo, redo, erasing and clearing too', async (t) => {
     const page = await opened(t);
     const both = async (count) => {
@@ -97,9 +115,10 @@ describe('a page', () => {
     await reload(two);
     assert.deepEqual([await strokes(one), await strokes(two)], [1, 2]);
 
-    // The list shows both, and leads to a page that no other tab has.
-    await two.close();
+    // The list shows both, follows what other tabs do, and leads to a page that no other tab has.
     await one.getByRole('button', {name: 'Files and pages'}).click();
+    assert.ok(await one.getByRole('button', {name: 'Page 2 open in another tab'}).isDisabled());
+    await two.close();
     await one.getByRole('button', {name: /^Page 2 2 strokes/}).click();
     await one.waitForFunction(() => window.qeltPage?.store.page === 2 && 'ready' in document.documentElement.dataset);
     assert.equal(await strokes(one), 2);

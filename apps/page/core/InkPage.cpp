@@ -80,6 +80,7 @@ struct InkPage::Parts {
   void setShape(int width, int height, const PageView& view);
   bool placeOnTop(std::size_t index, Step* step);
   void backUpInto(Step& step, const PixelArea& area);
+  std::optional<PageChange> travel(bool isForth);
   void apply(Step& step, bool isDone);
   bool swapBackups(Step& step, bool isDone);
   Step* additionOf(std::size_t index);
@@ -455,30 +456,28 @@ std::optional<PageChange> InkPage::eraseEnd() {
   return PageChange{.shown = {}, .hidden = page.history.toUndo()->strokes};
 }
 
-std::optional<PageChange> InkPage::undo() {
-  Parts& page = *mParts;
-  page.refuseIfBusy();
-  page.isErasing = false;
-  Step* const step = page.history.toUndo();
+// Undoes the last step, or does the next one again.
+std::optional<PageChange> InkPage::Parts::travel(bool isForth) {
+  refuseIfBusy();
+  isErasing = false;
+  Step* const step = isForth ? history.toRedo() : history.toUndo();
   if (step == nullptr) return std::nullopt;
   PageChange change;
-  (step->isAddition ? change.hidden : change.shown) = step->strokes;
-  page.history.undone();
-  page.apply(*step, false);
+  (step->isAddition == isForth ? change.shown : change.hidden) = step->strokes;
+  if (isForth) {
+    history.redone();
+  } else {
+    history.undone();
+  }
+  apply(*step, isForth);
   return change;
 }
 
+std::optional<PageChange> InkPage::undo() {
+  return mParts->travel(false);
+}
 std::optional<PageChange> InkPage::redo() {
-  Parts& page = *mParts;
-  page.refuseIfBusy();
-  page.isErasing = false;
-  Step* const step = page.history.toRedo();
-  if (step == nullptr) return std::nullopt;
-  PageChange change;
-  (step->isAddition ? change.shown : change.hidden) = step->strokes;
-  page.history.redone();
-  page.apply(*step, true);
-  return change;
+  return mParts->travel(true);
 }
 
 std::optional<PageChange> InkPage::clear() {

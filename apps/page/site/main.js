@@ -192,11 +192,19 @@ async function start() {
     measure: {label: 'Measurements', keys: ['t'], run: () => settings.set({measure: !settings.get('measure')})},
   }, guard, () => !isLost);
   for (const [text, isBad] of early) ui.say(text, isBad);
+  // While the list of pages is open, it follows what other tabs do.
+  let nextListing = 0;
+  const listPages = () => guard(async () => {
+    if (!ui.isOpen('files')) return;
+    ui.showPages(await store.pages(), store.page, goTo);
+    clearTimeout(nextListing);
+    nextListing = setTimeout(listPages, 1000);
+  });
   ui.opened = (id) => {
     if (id !== 'files') return;
     // Asked here rather than while somebody draws, since some browsers ask the person.
     navigator.storage?.persist?.().catch(() => {});
-    guard(() => store.pages().then((pages) => ui.showPages(pages, store.page, goTo)));
+    listPages();
   };
 
   // The window.

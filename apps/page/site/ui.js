@@ -155,6 +155,8 @@ export class Ui {
   /** Told of every panel that opens. */
   opened = (_id) => {};
 
+  isOpen(id) { return !$(`${id}-panel`).hidden; }
+
   /** Closes what is open, if anything; the keyboard goes back to where it came from. */
   close() {
     let wasOpen = false;
@@ -309,14 +311,21 @@ export class Ui {
   }
 
   showPages(pages, current, go) {
-    $('pages').replaceChildren(...pages.map(({page, count, last, taken}) => {
+    const list = $('pages');
+    const shown = JSON.stringify([pages, current]);
+    if (list.dataset.shown === shown) return;  // whoever reads it, or has the focus there, is not disturbed
+    list.dataset.shown = shown;
+    const focused = /** @type {HTMLElement | null} */ (document.activeElement?.closest('#pages button'))?.dataset.page;
+    list.replaceChildren(...pages.map(({page, count, last, taken}) => {
       const isHere = page === current;
       const when = new Date(last).toLocaleString(undefined, {dateStyle: 'short', timeStyle: 'short'});
       const button = make('button', {type: 'button', disabled: taken}, make('span', {textContent: `Page ${page}`}), ' ',
                           make('small', {textContent: taken ? 'open in another tab' : `${count} ${count === 1 ? 'stroke' : 'strokes'}, ${when}`}));
       if (isHere) button.setAttribute('aria-current', 'page');
+      button.dataset.page = page;
       button.addEventListener('click', () => (isHere ? this.close() : go(page)));
       return make('li', {}, button);
     }));
+    /** @type {HTMLElement | null} */ (list.querySelector(`[data-page="${focused}"]`))?.focus();
   }
 }

@@ -97,6 +97,12 @@ std::optional<int> integer(const std::string& text) {
   return parseInt(text);
 }
 
+constexpr int kMostLevels = 255;
+std::optional<int> levels(const std::string& text) {
+  const std::optional<int> count = countFrom(0, text);
+  return count && *count <= kMostLevels ? count : std::nullopt;
+}
+
 std::optional<float> anyFloat(const std::string& text) {
   return parseFloat(text);
 }
@@ -204,6 +210,7 @@ const Form<int> kCount{"N", "a whole number from 1", count, printInt};
 const Form<int> kInteger{"N", "a whole number", integer, printInt};
 const Form<int> kPredictionCount{"K", "a whole number from 0 to " + std::to_string(kMostPredicted),
                                  predictionCount, printInt};
+const Form<int> kLevels{"T", "a whole number from 0 to " + std::to_string(kMostLevels), levels, printInt};
 const Form<float> kSize{"S", "a number", anyFloat, printFloat};
 const Form<float> kZoom{"Z", "a number above 0", positiveFloat, printFloat};
 const Form<float> kDegrees{"DEG", "a number of degrees", finiteFloat, printFloat};
@@ -390,14 +397,27 @@ std::vector<CommandEntry> addCommands(CLI::App& app, Options& options) {
   CLI::App* const info =
       app.add_subcommand("info", "show plug-in path, GL renderer, version table and pen limits");
 
-  std::vector<CommandEntry> commands{{draw, Command::Draw},
-                                     {trace, Command::Trace},
-                                     {preview, Command::Preview},
-                                     {sheet, Command::Sheet},
-                                     {info, Command::Info}};
-  for (const CommandEntry& entry : commands) addPlugin(*entry.app, options);
+  CLI::App* const compare =
+      app.add_subcommand("compare", "tell which pictures differ between two folders, or how two pictures do");
+  compare->add_option("BEFORE", options.compare.before, "picture, or folder of pictures")
+      ->required()
+      ->type_name("");
+  compare->add_option("AFTER", options.compare.after, "the same, to compare with it")
+      ->required()
+      ->type_name("");
+  OptionGroup compared(*compare);
+  compared.add<int>("--tolerance", options.compare.tolerance, kLevels,
+                    withDefault("levels of 255 by which a pixel may differ: beyond it the exit status is 1",
+                                printInt(kDefaults.compare.tolerance)));
+  compare
+      ->add_option("-o,--output", options.compare.output,
+                   "picture of what differs to write, or a folder for such")
+      ->type_name("PATH");
+
+  for (CLI::App* const command : {draw, trace, preview, sheet, info}) addPlugin(*command, options);
   for (CLI::App* const command : {draw, trace, sheet}) command->footer(limits());
-  return commands;
+  return {{draw, Command::Draw},   {trace, Command::Trace}, {preview, Command::Preview},
+          {sheet, Command::Sheet}, {info, Command::Info},   {compare, Command::Compare}};
 }
 
 // A text that was asked for instead of a command.

@@ -14,6 +14,7 @@
 #include <system_error>
 
 #include "commands/CommandLine.h"
+#include "commands/Compare.h"
 #include "commands/PageInput.h"
 #include "desktop/engine/PluginLibrary.h"
 #include "desktop/gl/RenderQueue.h"
@@ -42,21 +43,23 @@ namespace {
 
 namespace fs = std::filesystem;
 
-// A file that comes with the program. It is looked for beside the program and where the build tree has it,
-// seen from the program, so that both may be moved.
-std::string besideProgram(const char* pathFromProgram) {
+// A file that comes with the program. It is looked for beside the program, then where installing and building
+// put it, seen from the program, so that all of it may be moved together. An installed program takes no file
+// of a build tree that it may have been installed into.
+std::string besideProgram(const char* fromInstalled, const char* fromBuilt) {
   std::error_code error;
   const fs::path folder = fs::read_symlink("/proc/self/exe", error).parent_path();
-  const fs::path builtIn = (folder / pathFromProgram).lexically_normal();
-  for (const fs::path& path : {folder / builtIn.filename(), builtIn}) {
+  const fs::path installed = (folder / fromInstalled).lexically_normal();
+  for (const fs::path& path :
+       {folder / installed.filename(), installed, (folder / fromBuilt).lexically_normal()}) {
     if (fs::exists(path, error)) return path.string();
   }
-  throw Refusal(builtIn.string() + ": not there; it comes with the program");
+  throw Refusal(installed.string() + ": not there; it comes with the program");
 }
 
 // The plug-in that was asked for, else the one built with the program.
 std::string pluginPath(const Options& options) {
-  if (!options.plugin) return besideProgram(QELT_PLUGIN_FROM_PROGRAM);
+  if (!options.plugin) return besideProgram(QELT_PLUGIN_FROM_INSTALLED, QELT_PLUGIN_FROM_PROGRAM);
   // The loader looks for a name without a folder among the system's libraries only; here it may also stand
   // in the current folder.
   std::error_code error;
@@ -67,7 +70,7 @@ std::string pluginPath(const Options& options) {
 
 // The page that was asked for, else the sample page.
 std::string inputPath(const Options& options) {
-  return options.input ? *options.input : besideProgram(QELT_SAMPLE_FROM_PROGRAM);
+  return options.input ? *options.input : besideProgram(QELT_SAMPLE_FROM_INSTALLED, QELT_SAMPLE_FROM_PROGRAM);
 }
 
 // The margin of a page that is drawn or traced with all its options.
@@ -329,21 +332,29 @@ void info(const Options& options) {
 
 }  // namespace
 
-void runCommand(const Options& options) {
+int runCommand(const Options& options) {
   // Without --log, standard error holds only the line that says what could not be done.
   if (!options.log) silenceLog();
   switch (options.command) {
     case Command::Draw:
-      return draw(options);
+      draw(options);
+      break;
     case Command::Trace:
-      return trace(options);
+      trace(options);
+      break;
     case Command::Preview:
-      return preview(options);
+      preview(options);
+      break;
     case Command::Sheet:
-      return sheet(options);
+      sheet(options);
+      break;
     case Command::Info:
-      return info(options);
+      info(options);
+      break;
+    case Command::Compare:
+      return compare(options.compare);
   }
+  return 0;
 }
 
 }  // namespace QeltDesktop

@@ -4,8 +4,8 @@
 
 namespace QeltDesktop {
 
-// Does what the options ask for: draw, trace, preview, sheet or info. Writes the output whole or throws
-// Refusal, or another std::exception whose text is one line.
-void runCommand(const Options& options);
+// Does what the options ask for, and answers the exit status: 0, or 1 where pictures that were compared
+// differ. Writes the output whole or throws Refusal, or another std::exception whose text is one line.
+int runCommand(const Options& options);
 
 }  // namespace QeltDesktop

@@ -17,7 +17,8 @@ struct Entry {
 
 constexpr Entry kStatuses[] = {
     {"0", "done"},
-    {"1", "could not be done; one line on standard error says what and where"},
+    {"1",
+     "could not be done; one line on standard error says what and where. Of compare also: pictures differ"},
     {"2", "wrong usage; standard error says what is wrong, and nothing was done"},
 };
 
@@ -40,6 +41,7 @@ constexpr Entry kExamples[] = {
     {"qelt-sketch draw ink.inkml -o page.png --zoom 2", "A page of InkML as a picture, twice as large."},
     {"qelt-sketch draw ink.inkml -o page.png --fit 1024x768", "The same, as large as it fits."},
     {"qelt-sketch draw page.png -o again.png", "The same picture again, from the page that it carries."},
+    {"qelt-sketch compare before/ after/ --tolerance 1", "Which pictures differ, after a new driver say."},
     {"zcat ink.inkml.gz | qelt-sketch trace - -o - | wc -l", "From standard input to standard output."},
 };
 
@@ -120,7 +122,8 @@ std::string synopsis(const std::string& program, const CLI::App& command) {
   std::string required;
   for (const ShownOption& option : shownOptions(command)) {
     if (option.positional) {
-      positionals += " [" + italic(option.names.front()) + ']';
+      const std::string name = italic(option.names.front());
+      positionals += option.required ? ' ' + name : " [" + name + ']';
     } else if (option.required) {
       required += ' ' + bold(option.names.front()) + ' ' + italic(option.shape);
     } else {

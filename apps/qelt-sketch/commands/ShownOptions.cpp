@@ -9,7 +9,7 @@
 namespace QeltDesktop {
 namespace {
 
-constexpr std::string_view kFile = "FILE", kInput = "INPUT";
+constexpr std::string_view kFile = "FILE", kFileOrFolder = "PATH";
 
 std::vector<std::string> namesOf(const CLI::Option& option) {
   std::vector<std::string> names;
@@ -45,7 +45,7 @@ std::vector<ShownOption> shownOptions(const CLI::App& app) {
     added.takesValue = option->get_items_expected_max() > 0;
     if (added.takesValue) added.shape = option->get_type_name();
     added.words = wordsIn(added.shape);
-    added.takesFile = added.shape == kFile || (added.positional && added.names.front() == kInput);
+    added.takesFile = added.positional || added.shape == kFile || added.shape == kFileOrFolder;
     for (const CLI::Option* const other : option->get_excludes()) {
       const std::vector<std::string> names = namesOf(*other);
       added.excluded.insert(added.excluded.end(), names.begin(), names.end());

@@ -19,7 +19,7 @@ struct ShownOption {
   bool positional = false;
   bool required = false;
   bool takesValue = false;
-  bool takesFile = false;  // the value is a path
+  bool takesFile = false;  // the value is a path, as that of every positional argument is
 };
 
 // The options of the program or of a command, in the order of the help; hidden ones are left out.

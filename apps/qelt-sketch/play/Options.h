@@ -11,7 +11,7 @@
 
 namespace QeltDesktop {
 
-enum class Command { Draw, Trace, Preview, Sheet, Info };
+enum class Command { Draw, Trace, Preview, Sheet, Info, Compare };
 // How strokes reach the plug-in: event by event, as one recorded event, or as a stored stroke.
 enum class Mode { Live, Event, Stroke };
 enum class DrawableKind { Stroke, Outline, Preview, Prediction };
@@ -63,6 +63,13 @@ struct OutlineOptions {
 constexpr int kUsualRenderingVersion = Qelt::kRenderingVersions.back().number;
 constexpr bool kUsualCurve = true;
 
+// What `compare` is asked for: two pictures or two folders.
+struct CompareOptions {
+  std::string before, after;
+  int tolerance = 0;                  // levels of 255 by which pixels may differ
+  std::optional<std::string> output;  // a picture of what differs, or a folder for such
+};
+
 // What the command line asks for. The defaults stand here alone; the help takes them from here.
 struct Options {
   // As it was written, to be read once more over what a picture says.
@@ -97,6 +104,8 @@ struct Options {
   Background background;
 
   DrawableKind drawable = DrawableKind::Stroke;
+
+  CompareOptions compare;
 };
 
 }  // namespace QeltDesktop
