@@ -558,6 +558,11 @@ TEST(InkmlReader, HoldsNoMoreThanThreeTimesItsFile) {
       {"traces of 20 points",
        "<ink>" + times(100'000, "<trace>" + ink.substr(0, 200) + "7 8</trace>\n") + "</ink>"},
       {"traces of 1 point", "<ink>" + times(500'000, "<trace>1 2</trace>") + "</ink>"},
+      {"ink sources",
+       "<ink>" +
+           times(100'000, "<inkSource><channelProperties>" + resolution("X", "9", "1/in") +
+                              resolution("Y", "9", "1/in") + "</channelProperties></inkSource>") +
+           "<trace>1 2</trace></ink>"},
       {"tools that are not drawn",
        "<ink><definitions>" +
            times(50'000, "<traceGroup><annotation type='tool'>x</annotation></traceGroup>") +

@@ -195,6 +195,12 @@ TEST(PictureOptions, StandBehindTheCommandLine) {
       parsed({"trace", "-o", "b", "--curve", "--zoom", "3", "--background", "white"}), "a.png", instruction);
   EXPECT_TRUE(other.command == Command::Trace && other.curve == true && other.zoom == 3.0f);
   EXPECT_TRUE(other.background.rgb == 0xFFFFFF && other.mode == Mode::Event);
+  const std::string fitted = instructionFor(parsed({"draw", "-o", "a.png", "--fit", "80x90"}));
+  EXPECT_NE(fitted.find(" --fit=80x90 "), std::string::npos) << fitted;
+  EXPECT_EQ(fitted.find("--zoom"), std::string::npos) << fitted;
+  EXPECT_EQ(instructionFor(withInstruction(parsed({"draw", "-o", "b"}), "a.png", fitted)), fitted);
+  EXPECT_FALSE(withInstruction(parsed({"draw", "-o", "b", "--zoom", "2"}), "a.png", fitted).fit);
+  EXPECT_FALSE(withInstruction(parsed({"sheet", "-o", "b"}), "a.png", fitted).fit);
   // Of what a sheet does not offer it takes nothing.
   const Options sheet = withInstruction(parsed({"sheet", "-o", "b.png"}), "a.png", instruction);
   EXPECT_TRUE(sheet.mode == Mode::Event && sheet.curve == false && sheet.argb == 0x0A0B0C0Du);

@@ -716,7 +716,7 @@ TEST_F(Program, DocumentsItselfFromItsOptions) {
   EXPECT_TRUE(std::regex_match(run("--version").out, std::regex(R"(qelt-sketch \d+\.\d+\.\d+\n)")));
   std::vector<std::string> options = optionsIn(run("--help").out, "");
   EXPECT_EQ(options.size(), 4u);
-  for (const std::string command : {"draw", "trace", "preview", "sheet", "info"}) {
+  for (const std::string command : {"draw", "trace", "preview", "sheet", "info", "compare"}) {
     const std::vector<std::string> more = optionsIn(run(command + " --help").out, command);
     EXPECT_GE(more.size(), 2u) << command;
     options.insert(options.end(), more.begin(), more.end());
@@ -746,7 +746,8 @@ TEST_F(Program, DocumentsItselfFromItsOptions) {
       sh("! command -v groff >/dev/null || groff -man -Tutf8 -ww -z manual; "
          "! command -v zsh >/dev/null || zsh -n completion");
   EXPECT_EQ(checked.out + checked.err, "");
-  for (const char* const part : {"EXIT STATUS", "cannot be read: REASON", "default 4"})
+  for (const char* const part :
+       {"EXIT STATUS", "cannot be read: REASON", "default 4", "[\\fIINPUT\\fR]", " \\fIBEFORE\\fR"})
     EXPECT_NE(manual.find(part), std::string::npos) << part;
 }
 

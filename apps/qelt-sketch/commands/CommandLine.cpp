@@ -531,8 +531,11 @@ Options withInstruction(const Options& asked, const std::string& name, const std
 }
 
 void checkWithoutInstruction(const Options& asked) {
-  const std::variant<Options, UsageEnd> parsed = parseOver(asked, true);
-  if (const auto* const usage = std::get_if<UsageEnd>(&parsed)) throw WrongUsage(*usage);
+  try {
+    checkTogether(asked);
+  } catch (const CLI::ValidationError& error) {
+    throw WrongUsage(usageEnd(CLI::App(), error));
+  }
 }
 
 }  // namespace QeltDesktop

@@ -36,7 +36,7 @@ std::string bashValues(const CLI::App& app, const std::string& command) {
   for (const ShownOption& option : shownOptions(app)) {
     if (option.positional || !option.takesValue) continue;
     std::vector<std::string> patterns;
-    for (const std::string& name : option.names) patterns.push_back(command + ':' + name);
+    for (const std::string& name : option.names) patterns.emplace_back(command).append(":").append(name);
     std::string action = "return";
     if (option.takesFile) action = "files=yes";
     if (!option.words.empty()) action = "words='" + joined(option.words, " ") + "'";
@@ -98,7 +98,8 @@ std::string zshOptions(const CLI::App& app, const std::string& indent) {
 }  // namespace
 
 std::string bashCompletion(const CLI::App& app) {
-  const std::string program = app.get_name(), function = functionName(app);
+  const std::string& program = app.get_name();
+  const std::string function = functionName(app);
   const std::vector<std::string> commands = commandNames(app);
   std::string values = bashValues(app, ""), options = bashOptions(app, "");
   for (const CLI::App* const command : shownCommands(app)) {
@@ -147,7 +148,8 @@ complete -F )" +
 }
 
 std::string zshCompletion(const CLI::App& app) {
-  const std::string program = app.get_name(), function = functionName(app);
+  const std::string& program = app.get_name();
+  const std::string function = functionName(app);
   std::string commands, branches;
   for (const CLI::App* const command : shownCommands(app)) {
     const std::string name = command->get_name();

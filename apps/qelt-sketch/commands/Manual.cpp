@@ -122,7 +122,8 @@ std::string synopsis(const std::string& program, const CLI::App& command) {
   std::string required;
   for (const ShownOption& option : shownOptions(command)) {
     if (option.positional) {
-      positionals += " [" + italic(option.names.front()) + ']';
+      const std::string name = italic(option.names.front());
+      positionals += option.required ? ' ' + name : " [" + name + ']';
     } else if (option.required) {
       required += ' ' + bold(option.names.front()) + ' ' + italic(option.shape);
     } else {
@@ -150,7 +151,7 @@ std::string exitStatuses() {
 }
 
 std::string manualPage(const CLI::App& app, const std::string& version) {
-  const std::string program = app.get_name();
+  const std::string& program = app.get_name();
   std::string roff = ".\\\" Made by " + literal(program + " --man") + " from its options.\n";
   // No date, so that the same program makes the same page.
   roff += ".TH " + capitals(program) + " 1 \"\" \"" + version + "\" \"User Commands\"\n";

@@ -59,7 +59,9 @@ class Namespaces {
 
   void elementEnds() {
     for (; !mDeclared.empty() && mDeclared.back().depth == mDepth; mDeclared.pop_back()) {
-      mDeclared.back().bindings->second.pop_back();
+      const Bindings::iterator bindings = mDeclared.back().bindings;
+      bindings->second.pop_back();
+      if (bindings->second.empty()) mBindings.erase(bindings);
     }
     --mDepth;
   }
@@ -67,11 +69,11 @@ class Namespaces {
   // Elements without a prefix lie in the default namespace, attributes without one in none.
   bool isForeign(std::string_view prefix) const {
     const auto found = mBindings.find(prefix);
-    return found != mBindings.end() && !found->second.empty() && found->second.back();
+    return found != mBindings.end() && found->second.back();
   }
 
  private:
-  // What a prefix stands for, within the elements that are open; the last one holds. True: a foreign name.
+  // What each prefix stands for in the elements that are open, true for a foreign name; the last one holds.
   using Bindings = std::map<std::string, std::vector<bool>, std::less<>>;
   struct Declaration {
     int depth;
