@@ -868,13 +868,14 @@ TEST_F(Archive, DrawsOnlyWhatIsNotUpToDate) {
 TEST_F(Archive, IsWholeAfterItWasKilled) {
   const std::string page = contentsOf(path("ink.inkml"));
   for (int i = 0; i < 30; ++i) write("in/page" + std::to_string(i) + ".inkml", page);
-  EXPECT_EQ(run("draw ink.inkml -o alone.png").status, 0);
+  EXPECT_EQ(run("draw ink.inkml -o alone.png --zoom 4").status, 0);
   const Ran killed =
-      sh("setsid $sketch draw in -o out/ --jobs 2 & until [ -e out/page0.png ]; do sleep 0.01; done; kill -9 "
-         "-- -$!; wait $!");
-  EXPECT_EQ(killed.status, 128 + SIGKILL) << killed.out;
-  const Ran resumed = run("draw in -o out/");
+      sh("setsid $sketch draw in -o out/ --zoom 4 --jobs 2 & until [ -e out/page0.png ]; do sleep 0.01; "
+         "done; kill -9 -$!; wait $!");
+  EXPECT_EQ(killed.status, 128 + SIGKILL) << killed.out << killed.err;
+  const Ran resumed = run("draw in -o out/ --zoom 4");
   EXPECT_EQ(resumed.status, 0) << resumed.err;
+  EXPECT_EQ(resumed.out.find(" 0 up to date"), std::string::npos) << resumed.out;
   std::size_t pictures = 0;
   for (const auto& entry : fs::recursive_directory_iterator(path("out"))) {
     if (entry.is_directory()) continue;
