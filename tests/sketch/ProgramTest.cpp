@@ -580,7 +580,7 @@ TEST_F(Program, SaysWhatCannotBeDoneInOneLineAndLeavesAnOlderFileAlone) {
       {"draw unsound.png -o no.png", "unsound.png: not a sound PNG picture: end of stream\n"},
       {"draw none.inkml -o no.png", "none.inkml: cannot be read: "},
       {"draw ink.inkml -o no/folder/a.png", "no/folder/a.png: cannot be written: "},
-      {"draw ink.inkml -o ./", "Is a directory\n"},
+      {"draw ink.inkml -o .", "Is a directory\n"},
       {"trace ink.inkml -o ink.inkml", "it is the page to read\n"},
       {"draw ink.inkml -o /dev/full", "No space left on device\n"},
       {"trace ink.inkml -o /dev/full", "No space left on device\n"},
@@ -818,7 +818,7 @@ class Archive : public Program {
 
 TEST_F(Archive, HasAPictureForEveryPageEachAsIfDrawnAlone) {
   EXPECT_EQ(run("draw ink.inkml -o alone.png --zoom 2").status, 0);
-  EXPECT_EQ(run("draw in -o out --zoom 2 --jobs 2").out, summary(3, 3, 0, 0));
+  EXPECT_EQ(run("draw in -o out/ --zoom 2 --jobs 2").out, summary(3, 3, 0, 0));
   for (const char* const name : {"out/a.png", "out/deep/b.png", "out/deep/c.png"})
     EXPECT_EQ(contentsOf(path(name)), contentsOf(path("alone.png"))) << name;
   // Several inputs, lists, and a single page into a folder.
@@ -849,7 +849,7 @@ TEST_F(Archive, TellsBadPagesAndDrawsTheOthers) {
   // A plug-in that ends the process takes its page alone; one that is none ends the run at once.
   EXPECT_EQ(run("draw in -o none/ --plugin ink.inkml").status, 1);
   EXPECT_FALSE(holds("none/a.png"));
-  EXPECT_EQ(run("draw in -o ink.inkml").err, "ink.inkml: no folder for pictures: Not a directory\n");
+  EXPECT_EQ(run("draw in -o ink.inkml/").err, "ink.inkml: no folder for pictures: Not a directory\n");
 }
 
 TEST_F(Archive, DrawsOnlyWhatIsNotUpToDate) {

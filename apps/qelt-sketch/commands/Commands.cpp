@@ -249,12 +249,16 @@ int drawArchive(const Options& options) {
   return refused == 0 ? 0 : 1;
 }
 
-// Whether pictures go to a folder: it is written as one, there is one, or there may be several.
+// Whether pictures go to a folder: because it is written as one, or because there may be several. Throws
+// WrongUsage where several would go to one file. A single page does not go to a folder by mistake.
 bool isForFolder(const Options& options) {
   std::error_code error;
-  if (options.output.ends_with('/') || fs::is_directory(options.output, error)) return true;
-  if (options.inputs.size() == 1) return fs::is_directory(options.inputs.front(), error);
-  return options.inputs.size() > 1;
+  if (options.output.ends_with('/')) return true;
+  const bool areSeveral = options.inputs.size() > 1 ||
+                          (!options.inputs.empty() && fs::is_directory(options.inputs.front(), error));
+  if (areSeveral && !fs::is_directory(options.output, error))
+    throw WrongUsage({"--output: several pages take a folder (DIR/), not '" + options.output + "'\n", 2});
+  return areSeveral;
 }
 
 int draw(const Options& options) {

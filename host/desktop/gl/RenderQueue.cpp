@@ -7,7 +7,6 @@
 #include <exception>
 #include <future>
 #include <new>
-#include <optional>
 #include <utility>
 #include <vector>
 
@@ -120,9 +119,11 @@ RenderQueue::RenderQueue(Mode mode, GL gl, const Surface& surface)
   mThread = std::thread([this, gl, &surface, opened = std::move(opened)]() mutable {
     try {
       openDevice(gl, surface);
+      mInFlight = std::make_unique<WorkInFlight>();
       const std::lock_guard guard(mMutex);
       mRunner = std::this_thread::get_id();
     } catch (...) {
+      mDevice.reset();
       opened.set_exception(std::current_exception());
       return;
     }
@@ -196,11 +197,10 @@ std::uint64_t RenderQueue::enqueue(Qelt::ITask* task, bool internal) {
 }
 
 void RenderQueue::threadMain() {
-  std::optional<WorkInFlight> inFlight(std::in_place);
   std::unique_lock lock(mMutex);
   for (;;) {
     if (mFirst != nullptr) {
-      runNext(lock, &*inFlight);
+      runNext(lock);
       continue;
     }
     if (mClosed) break;
@@ -209,14 +209,14 @@ void RenderQueue::threadMain() {
     mThreadWaits = false;
   }
   lock.unlock();
-  inFlight.reset();
+  mInFlight.reset();
   mDevice.reset();
   lock.lock();
   // The system gives the number of a thread that has ended to another.
   mRunner = {};
 }
 
-void RenderQueue::runNext(std::unique_lock<std::mutex>& lock, WorkInFlight* inFlight) {
+void RenderQueue::runNext(std::unique_lock<std::mutex>& lock) {
   Qelt::ITask* const task = mFirst;
   mFirst = task->mNext;
   if (mFirst == nullptr) mLast = nullptr;
@@ -224,7 +224,7 @@ void RenderQueue::runNext(std::unique_lock<std::mutex>& lock, WorkInFlight* inFl
   lock.unlock();
   const bool ran = runAndDelete(task);
   GlVertexObject::dropLargeBatches();
-  if (inFlight != nullptr) inFlight->taskEnded();
+  if (mInFlight != nullptr) mInFlight->taskEnded();
   lock.lock();
   mTaskRuns = false;
   if (!ran) ++mDropped;
@@ -252,7 +252,7 @@ bool RenderQueue::isInsideTask() const {
 void RenderQueue::waitFor(std::unique_lock<std::mutex>& lock, std::uint64_t last) {
   while (mRan < last) {
     if (mMode == Mode::Caller) {
-      runNext(lock, nullptr);
+      runNext(lock);
     } else {
       // Those who wait for more look again and wait on.
       mWakeAt = std::min(mWakeAt, last);

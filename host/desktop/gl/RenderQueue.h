@@ -95,7 +95,7 @@ class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
   void openDevice(GL gl, const Surface& surface);
 
   // These are called with the lock held. The first two release it while they run a task or wait.
-  void runNext(std::unique_lock<std::mutex>& lock, WorkInFlight* inFlight);
+  void runNext(std::unique_lock<std::mutex>& lock);
   void waitFor(std::unique_lock<std::mutex>& lock, std::uint64_t last);
   bool isRunner() const;
   bool isInsideTask() const;
@@ -119,7 +119,9 @@ class QELT_HOST_API RenderQueue : public Qelt::IGLMsgQueue {
   bool mTaskRuns = false;
   std::thread::id mRunner;  // the thread that runs tasks; none once it has ended
 
-  std::unique_ptr<GlDevice> mDevice;  // used by the runner alone
+  // Used by the runner alone; the latter in `Thread` mode alone.
+  std::unique_ptr<GlDevice> mDevice;
+  std::unique_ptr<WorkInFlight> mInFlight;
   std::string mRendererName;
   std::thread mThread;
 

@@ -16,7 +16,8 @@ using Pixel = std::array<std::uint8_t, 4>;
 // Rounded to the nearest, halves up. The sum is exact in double.
 std::uint8_t toByte(float share) {
   const float level = std::clamp(share, 0.0f, 1.0f) * 255.0f;
-  return static_cast<std::uint8_t>(static_cast<int>(static_cast<double>(level) + 0.5));
+  const double raised = static_cast<double>(level) + 0.5;  // NOLINT(bugprone-incorrect-roundings)
+  return static_cast<std::uint8_t>(static_cast<int>(raised));
 }
 
 // Byte / 255, for each byte.
