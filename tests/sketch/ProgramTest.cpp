@@ -885,4 +885,29 @@ TEST_F(Archive, IsWholeAfterItWasKilled) {
   EXPECT_EQ(pictures, 33u);
 }
 
+// As docs/archives.md says: by two tasks of an array, and by workers of which one is killed half way.
+TEST_F(Archive, IsSharedOutByOthers) {
+  const std::string page = contentsOf(path("ink.inkml"));
+  fs::create_directory(path("pages"));
+  for (int i = 10; i < 40; ++i) write("pages/page" + std::to_string(i) + ".inkml", page);
+  EXPECT_EQ(run("draw pages -o alone/ --zoom 4").status, 0);
+  const std::string alike =
+      "30 pictures: 30 alike, 0 within the tolerance, 0 different, 0 in one folder only, 0 not compared\n";
+  sh("ls pages/* >pages.txt; for task in 0 1; do awk -v tasks=2 -v task=$task 'NR % tasks == task' pages.txt "
+     "| "
+     "$sketch draw - -o array/ --zoom 4; done");
+  EXPECT_EQ(run("compare alone array").out, alike);
+  if (std::system("command -v parallel >/dev/null") != 0) GTEST_SKIP() << "GNU parallel is not installed";
+  write("worker", R"($sketch draw "$@" -o shared/ --jobs 1 --zoom 4 >&2 &
+if mkdir killed; then until [ -e shared/$(basename "$1" .inkml).png ]; do sleep 0.01; done; kill -9 $!; fi
+wait $!)");
+  // It says how many jobs failed.
+  EXPECT_EQ(
+      sh("export sketch HOME=.; for run in 1 2; do parallel --will-cite -a pages.txt -n 10 -j 2 --joblog "
+         "drawn.log --resume-failed sh worker {}; echo $?; done")
+          .out,
+      "1\n0\n");
+  EXPECT_EQ(run("compare alone shared").out, alike);
+}
+
 }  // namespace
