@@ -395,6 +395,8 @@ std::vector<CommandEntry> addCommands(CLI::App& app, Options& options) {
   addOutput(*preview, options, "picture to write");
   OptionGroup previewed(*preview);
   addPen(previewed, options);
+  previewed.add<float>("--zoom", options.zoom, kZoom,
+                       withDefault("canvas pixels a stroke unit", printFloat(kDefaults.zoom)));
 
   CLI::App* const sheet = app.add_subcommand("sheet", "draw the page once in every rendering version");
   addInput(*sheet, options);

@@ -325,7 +325,7 @@ void preview(const Options& asked) {
   const PluginLibrary plugin(pluginPath(options));
   RenderQueue queue(RenderQueue::Mode::Thread, RenderQueue::GL::Context);
   Progress progress("drawing stroke", 1);
-  const PageLayout layout = layOut({0.0f, 0.0f, kPanelWidth, kPanelHeight}, 1.0f, 0.0f);
+  const PageLayout layout = layOut({0.0f, 0.0f, kPanelWidth, kPanelHeight}, options.zoom, 0.0f);
   StageTimes times;
   PngWriter png(writerTo(file));
   PageDrawer(plugin, queue, times).draw(samplePanel(), options, layout, {.preview = true}, progress, png);
@@ -346,8 +346,8 @@ void sheet(const Options& asked) {
   constexpr int kRows = (static_cast<int>(Qelt::kRenderingVersions.size()) + kColumns - 1) / kColumns;
   // Pixels.
   constexpr int kGap = 16;
-  constexpr int kLabelScale = 2;
-  constexpr int kLabelHeight = kGlyphHeight * kLabelScale;
+  constexpr int kUsualLabelScale = 2, kLargestLabelScale = 4;
+  constexpr int kLabelWidth = 19 * kGlyphAdvance;  // at scale 1
   constexpr std::uint32_t kPaper = 0xE8E8E8, kInk = 0x404040;
 
   Options options = asked;
@@ -363,6 +363,11 @@ void sheet(const Options& asked) {
   const float zoom =
       options.fit ? zoomToFit(area, 0.0f, *options.fit) : std::min(1.0f, zoomToFit(area, 0.0f, kUsualCell));
   const PageLayout layout = layOut(area, zoom, 0.0f);
+  // Labels go with cells that were asked for.
+  const int labelScale = options.fit
+                             ? std::clamp(static_cast<int>(layout.width) / kLabelWidth, 1, kLargestLabelScale)
+                             : kUsualLabelScale;
+  const int labelHeight = kGlyphHeight * labelScale;
 
   Progress progress("drawing stroke", page.strokes.size() * Qelt::kRenderingVersions.size());
   std::optional<Picture> sheet;
@@ -371,7 +376,7 @@ void sheet(const Options& asked) {
     options.renderingVersion = version.number;
     const Picture cell = drawPage(plugin, queue, page, options, layout, {.stroke = true}, progress);
     const int stepX = cell.width + kGap;
-    const int stepY = cell.height + kLabelHeight + kGap;
+    const int stepY = cell.height + labelHeight + kGap;
     if (!sheet) {
       const int width = kColumns * stepX + kGap, height = kRows * stepY + kGap;
       checkSheetSize(width, height);
@@ -379,8 +384,8 @@ void sheet(const Options& asked) {
     }
     const int x = kGap + column * stepX;
     const int y = kGap + row * stepY;
-    writeLabel(*sheet, x, y, kLabelScale, kInk, "RENDERING VERSION " + std::to_string(version.number));
-    paste(*sheet, cell, x, y + kLabelHeight + kGap / 2);
+    writeLabel(*sheet, x, y, labelScale, kInk, "RENDERING VERSION " + std::to_string(version.number));
+    paste(*sheet, cell, x, y + labelHeight + kGap / 2);
     if (++column == kColumns) column = 0, ++row;
   }
   file.write(encodePng(*sheet));

@@ -55,6 +55,7 @@ PixelSize pixelSizeOf(const PageLayout& layout, const Page& page, const Options&
                 width, height, kLongestSide, kMostPixels);
   if (options.fit && std::isfinite(width + height)) throw Refusal(std::string("--fit") + text.data());
   if (options.page) throw Refusal(std::string("--page") + text.data());
+  if (options.command == Command::Preview) throw Refusal(std::string("--zoom") + text.data());
   throw Refusal(page.name + text.data() + "; --fit WxH draws it smaller");
 }
 
