@@ -43,7 +43,16 @@ struct Inputs {
   float size = 3.2f;
 };
 
-// (b) AddPoint alone, as the walk calls it.
+template <typename Appender, typename Renderer>
+void addStamps(Renderer& renderer) {
+  Inputs in;
+  Appender(renderer, kStampsPerBatch).AddPoints(kStampsPerBatch, {0.2f, in.point[1]}, [&in](int) {
+    benchmark::DoNotOptimize(in);
+    return Qelt::PlacedStamp{{in.point[0].x, in.point[0].y}, in.size, 0.1f, 1};
+  });
+}
+
+// (b) AddPoints alone, as the walk calls it.
 template <typename Renderer>
 void addPoint(benchmark::State& state) {
   Renderer renderer(nullptr);
@@ -53,12 +62,7 @@ void addPoint(benchmark::State& state) {
   Inputs in;
   for (auto _ : state) {
     batch.clear();
-    typename Renderer::Appender stamps(renderer, kStampsPerBatch);
-    for (int i = 0; i < kStampsPerBatch; ++i) {
-      benchmark::DoNotOptimize(in);
-      stamps.AddPoint(in.point, in.size, 0.1f, 0.2f, 1);
-    }
-    stamps.flush();
+    addStamps<typename Renderer::Appender>(renderer);
     benchmark::ClobberMemory();
   }
   countStamps(state);
@@ -81,12 +85,7 @@ void addOutlinePoint(benchmark::State& state) {
   for (auto _ : state) {
     inner.clear();
     outer.clear();
-    Qelt::Pencil2OutlineDrawableRTV1::Appender stamps(renderer, kStampsPerBatch);
-    for (int i = 0; i < kStampsPerBatch; ++i) {
-      benchmark::DoNotOptimize(in);
-      stamps.AddPoint(in.point, in.size, 0.2f);
-    }
-    stamps.flush();
+    addStamps<Qelt::Pencil2OutlineDrawableRTV1::Appender>(renderer);
     benchmark::ClobberMemory();
   }
   countStamps(state);
