@@ -11,9 +11,10 @@ Qelt::PointerCoords sampleAt(int i, Attitude attitude) {
   const auto at = static_cast<float>(i);
   const float angle = 0.02f * at;
   const float radius = kUnitsPerSample / 0.02f;
-  const float swing = attitude == Attitude::Turning ? 0.1f * std::sin(0.05f * at) : 0.0f;
+  const float swing = attitude == Attitude::Turning ? std::sin(0.05f * at) : 0.0f;
   return {600.0f + radius * std::cos(angle), 600.0f + radius * std::sin(angle),
-          0.6f + 0.2f * std::sin(0.3f * at), 0.4f + swing, 0.5f + swing};
+          0.6f + 0.2f * std::sin(0.3f * at), (attitude == Attitude::Turning ? 0.77f : 0.4f) + 0.02f * swing,
+          0.5f + 0.1f * swing};
 }
 
 Qelt::MotionEvent eventOf(int action, int firstSample, int samples, Attitude attitude) {

@@ -9,13 +9,17 @@
 #include "BenchPen.h"
 #include "LiveMoves.h"
 #include "Stopwatch.h"
+#include "base/PointF.h"
 #include "base/RectF.h"
 #include "desktop/pencommon/BatchObserver.h"
+#include "graphics/SmPath.h"
 #include "pen/RenderingVersions.h"
 #include "pencommon/PenStrokeDrawableGL.h"
+#include "stroke/placing/SegmentPath.h"
+#include "stroke/placing/StampWalk.h"
 
 // Nanoseconds a stamp of a live move event, the whole road on the main thread: the pen, the host's path, the
-// tasks and their posting; and what of that every event costs, however little it draws.
+// tasks and their posting.
 namespace {
 
 using QeltBench::Attitude;
@@ -73,28 +77,55 @@ void eachStrokeClass(benchmark::internal::Benchmark* bench) {
     if (version.drawnBy == version.strokeVersion) bench->Arg(version.number);
   }
 }
-BENCHMARK_CAPTURE(liveMove, still, Attitude::Still)->Name("d/live_move_V")->Apply(eachStrokeClass)->UseManualTime();
+BENCHMARK_CAPTURE(liveMove, still, Attitude::Still)
+    ->Name("d/live_move_V")
+    ->Apply(eachStrokeClass)
+    ->UseManualTime();
 BENCHMARK_CAPTURE(liveMove, turning, Attitude::Turning)->Name("d/turning_move_V")->Arg(8)->UseManualTime();
 
-// The fixed cost of an event: the pen is up, so that a move places nothing and is handed over all the same:
-// an empty batch, four tasks, four posts.
-void emptyEvent(benchmark::State& state) {
-  BenchPen bench(8, 6.0f);
-  Qelt::PenStrokeDrawableGL* drawable = bench.pen().GetStrokeDrawableGL();
-  drawable->SetCanvas(&bench.canvas());
-  const LiveStroke stroke(1, 1, Attitude::Still);
-  double fastest = 1.0;
-  Qelt::RectF rect;
+// What of (d) is the host's: its path alone, built and asked for the places of the same stamps.
+void hostPath(benchmark::State& state) {
+  struct NoStamps {
+    Qelt::SmPoint at;
+    Qelt::SmPoint* next() { return &at; }
+    void place() {}
+    void passOver(float) {}
+  };
+  constexpr float kSpacing = 0.4f;
+  const LiveStroke stroke(kEvents, kSamplesPerEvent, Attitude::Still);
+  std::vector<double> fastest(stroke.moves.size(), 1.0);
+  std::int64_t stamps = 0;
   for (auto _ : state) {
-    const Stopwatch watch;
-    drawable->Draw(&stroke.moves.front(), &rect);
-    const double cost = watch.seconds();
-    fastest = std::min(fastest, cost);
-    state.SetIterationTime(cost);
-    bench.drain();
+    Qelt::SegmentPath path;
+    path.start({stroke.down.GetX(0), stroke.down.GetY(0)});
+    float carried = kSpacing;
+    NoStamps run;
+    double seconds = 0.0;
+    for (std::size_t i = 0; i < stroke.moves.size(); ++i) {
+      const Qelt::MotionEvent& move = stroke.moves[i];
+      const Stopwatch watch;
+      for (int sample = 0; sample < kSamplesPerEvent; ++sample) {
+        const bool isLast = sample + 1 == kSamplesPerEvent;
+        const Qelt::PointF to = isLast
+                                    ? Qelt::PointF{move.GetX(0), move.GetY(0)}
+                                    : Qelt::PointF{move.GetHistoricalX(sample), move.GetHistoricalY(sample)};
+        const float length = path.extend(to, Qelt::Smoothing::Curve);
+        const Qelt::WalkResult walk =
+            Qelt::walkSpaced(path.path(), carried, kSpacing, length, Qelt::kMostStampsPerSegment, run);
+        path.setLast(to);
+        carried = walk.carry;
+        stamps += walk.stamps;
+        benchmark::DoNotOptimize(run);
+      }
+      const double cost = watch.seconds();
+      fastest[i] = std::min(fastest[i], cost);
+      seconds += cost;
+    }
+    state.SetIterationTime(seconds);
   }
-  state.counters["ns/event"] = fastest * 1e9;
+  state.counters["ns/stamp"] = std::accumulate(fastest.begin(), fastest.end(), 0.0) * 1e9 *
+                               static_cast<double>(state.iterations()) / static_cast<double>(stamps);
 }
-BENCHMARK(emptyEvent)->Name("event/empty")->UseManualTime();
+BENCHMARK(hostPath)->Name("d/host_path_alone")->UseManualTime();
 
 }  // namespace

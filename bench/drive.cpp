@@ -53,15 +53,20 @@ void drawMoves(int samplesPerEvent, Attitude attitude) {
   report(kEvents, (QeltDesktop::writtenBytes() - before) / (QeltBench::kStampFloats * sizeof(float)));
 }
 
-// Events that place nothing, since the pen is up: what is left is what any event costs.
+// Moves too short to place anything: what is left is what any event costs.
 void drawNothing() {
   BenchPen bench(8, 6.0f);
   Qelt::PenStrokeDrawableGL* drawable = bench.pen().GetStrokeDrawableGL();
   drawable->SetCanvas(&bench.canvas());
-  const LiveStroke stroke(1, 1, Attitude::Still);
+  const LiveStroke stroke(0, 1, Attitude::Still);
+  const Qelt::PointerProperties stylus{0, Qelt::kToolStylus};
+  const Qelt::PointerCoords at{stroke.down.GetX(0) + 0.5f, stroke.down.GetY(0), 0.6f, 0.4f, 0.5f};
+  const Qelt::MotionEvent move(0, 1, Qelt::kActionMove, 1, &stylus, &at, 0, Qelt::kSourceStylus, 0);
   Qelt::RectF rect;
+  drawable->Draw(&stroke.down, &rect);
+  bench.drain();
   for (int i = 0; i < kEvents; ++i) {
-    counted([&] { drawable->Draw(&stroke.moves.front(), &rect); });
+    counted([&] { drawable->Draw(&move, &rect); });
     bench.drain();
   }
   report(kEvents, 0);
