@@ -1,85 +1,99 @@
-#include "EventBench.h"
+#include <benchmark/benchmark.h>
 
 #include <algorithm>
-#include <chrono>
 #include <cmath>
-#include <cstddef>
-#include <cstdio>
+#include <exception>
 #include <vector>
 
 #include "BenchPen.h"
+#include "RecordedInk.h"
+#include "Stopwatch.h"
 #include "base/RectF.h"
 #include "engine/MotionEvent.h"
-#include "ink/Ink.h"
-#include "ink/InkmlReader.h"
 #include "pencommon/PenStrokeDrawableGL.h"
-#include "play/StrokeFeeder.h"
 
-namespace QeltBench {
+// Microseconds of the main thread an event: of recorded ink, one sample each; with nothing to draw; early and
+// late in a long stroke.
 namespace {
 
-using Clock = std::chrono::steady_clock;
+using QeltBench::BenchPen;
+using QeltBench::EventCosts;
+using QeltBench::Stopwatch;
 
-double microseconds(Clock::duration duration) {
-  return std::chrono::duration<double, std::micro>(duration).count();
-}
-
-double percentile(std::vector<double> values, double share) {
-  const auto at = static_cast<std::ptrdiff_t>(share * static_cast<double>(values.size() - 1));
-  std::nth_element(values.begin(), values.begin() + at, values.end());
-  return values[static_cast<std::size_t>(at)];
-}
-
-}  // namespace
-
-void reportEvents(const std::string& inkPath) {
-  const QeltDesktop::Page page = QeltDesktop::readInkmlFile(inkPath);
-  std::vector<double> costs;
-  for (int round = 0; round < 20; ++round) {
+void recordedEvents(benchmark::State& state) {
+  try {
+    const auto strokes = QeltBench::recordedStrokes();
     BenchPen bench(8, 6.0f);
-    Qelt::PenStrokeDrawableGL* drawable = bench.pen().GetStrokeDrawableGL();
-    drawable->SetCanvas(&bench.canvas());
-    for (const auto& stroke : page.strokes) {
-      const auto pointer = QeltDesktop::pointerFor(stroke, {}, {});
-      QeltDesktop::feedLive(stroke, pointer, 1, false, [&](QeltDesktop::LiveEvent& live) {
-        Qelt::RectF rect;
-        const auto begin = Clock::now();
-        drawable->Draw(&live.event, &rect);
-        const auto end = Clock::now();
-        bench.drain();
-        // The first round warms up.
-        if (round > 0 && live.event.GetAction() == Qelt::kActionMove)
-          costs.push_back(microseconds(end - begin));
-      });
+    EventCosts costs;
+    for (auto _ : state) {
+      costs.restart();
+      for (const auto& stroke : strokes) QeltBench::drawRecorded(bench, stroke, costs);
     }
+    state.counters["us/event"] = costs.percentile(0.5);
+    state.counters["us/event p99"] = costs.percentile(0.99);
+  } catch (const std::exception& error) {
+    state.SkipWithError(error.what());
   }
-  std::printf("move events of %s, one sample each: median %.2f us, p99 %.2f us (%zu events)\n",
-              inkPath.c_str(), percentile(costs, 0.5), percentile(costs, 0.99), costs.size());
+}
+BENCHMARK(recordedEvents)->Name("event/recorded");
+
+Qelt::MotionEvent sampleEvent(int action, int time, float x, float y) {
+  const Qelt::PointerProperties stylus{0, Qelt::kToolStylus};
+  const Qelt::PointerCoords at{x, y, 0.6f, 0.3f, 0.2f};
+  return Qelt::MotionEvent(0, time, action, 1, &stylus, &at, 0, Qelt::kSourceStylus, 0);
 }
 
-void reportLongStroke() {
-  constexpr int kPoints = 100000;
+// The fixed cost of an event: a move too short to place anything is handed over all the same. So this is a
+// batch with some room, four tasks and four posts.
+void shortEvent(benchmark::State& state) {
   BenchPen bench(8, 6.0f);
   Qelt::PenStrokeDrawableGL* drawable = bench.pen().GetStrokeDrawableGL();
   drawable->SetCanvas(&bench.canvas());
-  const Qelt::PointerProperties stylus{0, Qelt::kToolStylus};
-  std::vector<double> costs;
-  for (int i = 0; i < kPoints; ++i) {
-    const float angle = 0.02f * static_cast<float>(i % 31416);
-    const Qelt::PointerCoords at{600.0f + 500.0f * std::cos(angle), 600.0f + 500.0f * std::sin(angle), 0.6f,
-                                 0.3f, 0.2f};
-    const Qelt::MotionEvent event(0, i, i == 0 ? Qelt::kActionDown : Qelt::kActionMove, 1, &stylus, &at, 0,
-                                  Qelt::kSourceStylus, 0);
-    Qelt::RectF rect;
-    const auto begin = Clock::now();
-    drawable->Draw(&event, &rect);
-    costs.push_back(microseconds(Clock::now() - begin));
+  Qelt::RectF rect;
+  const Qelt::MotionEvent down = sampleEvent(Qelt::kActionDown, 0, 100.0f, 100.0f);
+  const Qelt::MotionEvent move = sampleEvent(Qelt::kActionMove, 1, 100.5f, 100.0f);
+  drawable->Draw(&down, &rect);
+  bench.drain();
+  double fastest = 1.0;
+  for (auto _ : state) {
+    const Stopwatch watch;
+    drawable->Draw(&move, &rect);
+    const double cost = watch.seconds();
+    fastest = std::min(fastest, cost);
+    state.SetIterationTime(cost);
     bench.drain();
   }
-  const std::vector<double> early(costs.begin() + 1000, costs.begin() + 2000);
-  const std::vector<double> late(costs.end() - 1000, costs.end());
-  std::printf("a stroke of %d points: an early event %.2f us, a late one %.2f us (medians of 1000)\n",
-              kPoints, percentile(early, 0.5), percentile(late, 0.5));
+  state.counters["us/event"] = fastest * 1e6;
 }
+BENCHMARK(shortEvent)->Name("event/fixed")->UseManualTime();
 
-}  // namespace QeltBench
+// The cost of an event must not grow with the stroke. Medians of the first and the last thousand events.
+void longStroke(benchmark::State& state) {
+  constexpr int kPoints = 100000;
+  EventCosts early, late;
+  for (auto _ : state) {
+    BenchPen bench(8, 6.0f);
+    Qelt::PenStrokeDrawableGL* drawable = bench.pen().GetStrokeDrawableGL();
+    drawable->SetCanvas(&bench.canvas());
+    early.restart();
+    late.restart();
+    for (int i = 0; i < kPoints; ++i) {
+      const float angle = 0.02f * static_cast<float>(i % 31416);
+      const Qelt::MotionEvent event =
+          sampleEvent(i == 0 ? Qelt::kActionDown : Qelt::kActionMove, i, 600.0f + 500.0f * std::cos(angle),
+                      600.0f + 500.0f * std::sin(angle));
+      Qelt::RectF rect;
+      const Stopwatch watch;
+      drawable->Draw(&event, &rect);
+      const double cost = watch.seconds();
+      bench.drain();
+      if (i >= 1000 && i < 2000) early.add(cost);
+      if (i >= kPoints - 1000) late.add(cost);
+    }
+  }
+  state.counters["us/event early"] = early.percentile(0.5);
+  state.counters["us/event late"] = late.percentile(0.5);
+}
+BENCHMARK(longStroke)->Name("event/long_stroke")->Iterations(1);
+
+}  // namespace

@@ -3,6 +3,7 @@
 #include <benchmark/benchmark.h>
 
 #include <cmath>
+#include <memory>
 
 namespace QeltBench {
 
@@ -50,6 +51,23 @@ std::size_t CheapWalk::walk(float spacing, float* out, std::size_t most) const {
     width += 0.001f;
     alpha += 0.002f;
   }
+  return stamps;
+}
+
+std::size_t walkCheaply() {
+  constexpr int kCurves = 4;
+  constexpr std::size_t kMostStamps = 100;
+  // Read anew each time, so that nothing is worked out ahead. (DoNotOptimize of GCC 12 would change it.)
+  static volatile float far = 10.0f;
+  const float end = far;
+  const auto out = std::make_unique_for_overwrite<float[]>((kMostStamps + 8) * kStampFloats);
+  std::size_t stamps = 0;
+  for (int i = 0; i < kCurves; ++i) {
+    const CheapWalk walk(0.0f, 0.0f, end / 2.0f, 1.0f, end, 0.0f);
+    stamps += walk.walk(0.4f, out.get() + stamps * kStampFloats, kMostStamps - stamps);
+  }
+  benchmark::DoNotOptimize(out.get());
+  benchmark::ClobberMemory();
   return stamps;
 }
 

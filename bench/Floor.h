@@ -31,4 +31,8 @@ class CheapWalk {
   std::array<float, kChords + 1> mDistance;  // from the start to each chord's end
 };
 
+// Walks over as many curves as a move event of four samples has, into a batch of its own, as it must be
+// handed over. Returns how many stamps that were.
+std::size_t walkCheaply();
+
 }  // namespace QeltBench

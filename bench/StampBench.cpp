@@ -1,6 +1,6 @@
 #include <benchmark/benchmark.h>
 
-#include <memory>
+#include <cstddef>
 #include <vector>
 
 #include "Floor.h"
@@ -43,7 +43,16 @@ struct Inputs {
   float size = 3.2f;
 };
 
-// (b) AddPoint alone, as the walk calls it.
+template <typename Appender, typename Renderer>
+void addStamps(Renderer& renderer) {
+  Inputs in;
+  Appender(renderer, kStampsPerBatch).AddPoints(kStampsPerBatch, {0.2f, in.point[1]}, [&in](int) {
+    benchmark::DoNotOptimize(in);
+    return Qelt::PlacedStamp{{in.point[0].x, in.point[0].y}, in.size, 0.1f, 1};
+  });
+}
+
+// (b) AddPoints alone, as the walk calls it.
 template <typename Renderer>
 void addPoint(benchmark::State& state) {
   Renderer renderer(nullptr);
@@ -53,12 +62,7 @@ void addPoint(benchmark::State& state) {
   Inputs in;
   for (auto _ : state) {
     batch.clear();
-    typename Renderer::Appender stamps(renderer, kStampsPerBatch);
-    for (int i = 0; i < kStampsPerBatch; ++i) {
-      benchmark::DoNotOptimize(in);
-      stamps.AddPoint(in.point, in.size, 0.1f, 0.2f, 1);
-    }
-    stamps.flush();
+    addStamps<typename Renderer::Appender>(renderer);
     benchmark::ClobberMemory();
   }
   countStamps(state);
@@ -81,12 +85,7 @@ void addOutlinePoint(benchmark::State& state) {
   for (auto _ : state) {
     inner.clear();
     outer.clear();
-    Qelt::Pencil2OutlineDrawableRTV1::Appender stamps(renderer, kStampsPerBatch);
-    for (int i = 0; i < kStampsPerBatch; ++i) {
-      benchmark::DoNotOptimize(in);
-      stamps.AddPoint(in.point, in.size, 0.2f);
-    }
-    stamps.flush();
+    addStamps<Qelt::Pencil2OutlineDrawableRTV1::Appender>(renderer);
     benchmark::ClobberMemory();
   }
   countStamps(state);
@@ -112,23 +111,10 @@ void addPointOneByOne(benchmark::State& state) {
 }
 BENCHMARK(addPointOneByOne)->Name("b/AddPoint_RTV3_one_by_one");
 
-// (c) The cheapest honest walk, on a segment of a typical event's length.
+// (c) The cheapest honest walk, on segments of a typical event's length.
 void cheapWalk(benchmark::State& state) {
   std::size_t stamps = 0;
-  float end = 40.0f;
-  for (auto _ : state) {
-    benchmark::DoNotOptimize(end);
-    // As many curves as a move event of four samples has, into a batch of its own, as it must be handed over.
-    const auto out = std::make_unique_for_overwrite<float[]>((kStampsPerBatch + 8) * QeltBench::kStampFloats);
-    std::size_t inEvent = 0;
-    for (int i = 0; i < 4; ++i) {
-      const QeltBench::CheapWalk walk(0.0f, 0.0f, end / 8.0f, 1.0f, end / 4.0f, 0.0f);
-      inEvent += walk.walk(0.4f, out.get() + inEvent * QeltBench::kStampFloats, kStampsPerBatch - inEvent);
-    }
-    benchmark::DoNotOptimize(out.get());
-    benchmark::ClobberMemory();
-    stamps += inEvent;
-  }
+  for (auto _ : state) stamps += QeltBench::walkCheaply();
   state.counters["ns/stamp"] = benchmark::Counter(static_cast<double>(stamps) * 1e-9,
                                                   benchmark::Counter::kIsRate | benchmark::Counter::kInvert);
 }

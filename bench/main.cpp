@@ -3,12 +3,11 @@
 #include <algorithm>
 #include <cstdio>
 #include <cstring>
-#include <exception>
 #include <map>
 #include <string>
 #include <vector>
 
-#include "EventBench.h"
+#include "RecordedInk.h"
 #include "pen/RenderingVersions.h"
 
 // Runs all benchmarks once and prints the ratios that count; machines differ, ratios within one run hardly.
@@ -47,7 +46,6 @@ class RatioReporter : public benchmark::ConsoleReporter {
 }  // namespace
 
 int main(int argc, char** argv) {
-  std::string ink = QELT_SAMPLE_INK;
   // Short repetitions, mixed, so that what disturbs them disturbs all alike; later options win.
   char repetitions[] = "--benchmark_repetitions=9";
   char interleaving[] = "--benchmark_enable_random_interleaving=true";
@@ -55,7 +53,7 @@ int main(int argc, char** argv) {
   std::vector<char*> rest = {argv[0], repetitions, interleaving, shortRuns};
   for (int i = 1; i < argc; ++i) {
     if (std::strncmp(argv[i], "--ink=", 6) == 0) {
-      ink = argv[i] + 6;
+      QeltBench::inkPath() = argv[i] + 6;
     } else {
       rest.push_back(argv[i]);
     }
@@ -82,12 +80,5 @@ int main(int argc, char** argv) {
   }
   reporter.printRatio("cache", "redraw/cached/1000", "redraw/computed/1000");
   reporter.printRatio("cache", "redraw/page_2000_cached/1", "redraw/page_2000_computed/0");
-  try {
-    QeltBench::reportEvents(ink);
-    QeltBench::reportLongStroke();
-  } catch (const std::exception& error) {
-    std::fprintf(stderr, "%s\n", error.what());
-    return 1;
-  }
   return 0;
 }

@@ -43,9 +43,9 @@ bool hasFloats(const std::vector<float>* batch) {
 void Pencil2OutlineDrawableRTV1::AddPoint(Vector2<float>, float) {}
 
 void Pencil2OutlineDrawableRTV1::AddPoint(const Vector2<float>* point, float size, float tiltBlend) {
-  Appender one(*this, 1);
-  one.AddPoint(point, size, tiltBlend);
-  one.flush();
+  Appender(*this, 1).AddPoints(1, {tiltBlend, point[1]}, [&](int) {
+    return PlacedStamp{{point[0].x, point[0].y}, size, 0.0f, 0};
+  });
 }
 
 void Pencil2OutlineDrawableRTV1::SetInverseScale(const Vector2<float>& inverseScale) {

@@ -37,14 +37,14 @@ class Pencil2OutlineDrawableRT : public PenOutlineDrawableRT {
 class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
  public:
   static constexpr std::size_t kFloatsPerVertex = kOutlineVertex.floats();
+  static constexpr std::size_t kFloatsPerStamp = 6 * kFloatsPerVertex;
 
   using Pencil2OutlineDrawableRT::Pencil2OutlineDrawableRT;
 
   void AddPoint(Vector2<float> point, float size) override;
 
-  // Appends stamps to the write buffers, or to the one that is there. Every stamp has a centre and a
-  // direction (-sin a, cos a), as two vectors in a row; a width in stroke units; and a tilt blend. Must not
-  // outlive a change of the buffers or of the outline size.
+  // Appends stamps to the write buffers, or to the one that is there. Must not outlive a change of the
+  // buffers or of the outline size.
   class Appender {
    public:
     // Makes room for so many stamps, so that appending them does not allocate. Throws std::bad_alloc.
@@ -53,19 +53,28 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
           mOuter(drawable.mOuterWriteBuffer, stamps),
           mOutlineSize(drawable.GetOutlineSize()) {}
 
-    void AddPoint(const Vector2<float>* point, float size, float tiltBlend) {
-      const StampLook look{0.0f, tiltBlend, 0.0f, point[1]};
-      StampExtent extent = squareExtent(size);
-      mInner.add(stampQuad(point[0], extent), look);
-      extent.x = std::max(extent.x + mOutlineSize, 0.0f);
-      extent.y = std::max(extent.y + mOutlineSize, 0.0f);
-      mOuter.add(stampQuad(point[0], extent), look);
-    }
-
-    // The buffers hold all stamps from here on.
-    void flush() {
-      mInner.flush();
-      mOuter.flush();
+    // Appends `count` stamps, for which there must be room: stampAt(i), asked for in order, tells the i-th.
+    template <typename StampAt>
+    void AddPoints(int count, const StampPose& pose, StampAt&& stampAt) {
+      StampWriter<kFloatsPerVertex> writer(pose);
+      float* inner = mInner.take(count);
+      float* outer = mOuter.take(count);
+      for (int i = 0; i < count; ++i) {
+        const PlacedStamp stamp = stampAt(i);
+        StampExtent extent = squareExtent(stamp.size);
+        if (inner != nullptr) {
+          writer.setExtent(extent);
+          writer.write(inner, stamp);
+          inner += kFloatsPerStamp;
+        }
+        if (outer != nullptr) {
+          extent.x = std::max(extent.x + mOutlineSize, 0.0f);
+          extent.y = std::max(extent.y + mOutlineSize, 0.0f);
+          writer.setExtent(extent);
+          writer.write(outer, stamp);
+          outer += kFloatsPerStamp;
+        }
+      }
     }
 
    private:
@@ -74,7 +83,8 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
     float mOutlineSize;
   };
 
-  // Appends one stamp. Throws std::bad_alloc where a buffer cannot grow.
+  // Appends one stamp: its centre and direction (-sin a, cos a), as two vectors in a row; its width, stroke
+  // units; its tilt blend. Throws std::bad_alloc where a buffer cannot grow.
   void AddPoint(const Vector2<float>* point, float size, float tiltBlend);
 
   UnclaimedBatch* unclaimedBatch() { return &mUnclaimed; }

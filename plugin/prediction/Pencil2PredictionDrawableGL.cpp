@@ -53,8 +53,8 @@ bool Pencil2PredictionDrawableGL::startPen() {
   mPlacer.setCarried(Version::profile.repeatDistance);
   mPlacer.path().start(lastStamp, last);
   mLook = {.width = live.mLastWidth,
-           .alpha = live.mLastAlpha,
            .widthStep = 0.0f,
+           .alpha = live.mLastAlpha,
            .alphaStep = 0.0f,
            .tiltBlend = live.mTiltBlend,
            .direction = stampDirection(live.mLastOrientation)};

@@ -88,31 +88,38 @@ class StampRenderer : public HostBase {
 
   void AddPoint(Vector2<float>, float) final {}
 
-  // Appends stamps to the write buffer. Each has a centre and a direction (-sin a, cos a), as two vectors in
-  // a row; the width of a square stamp or half the width of an anti-aliased one, stroke units; an alpha; a
-  // tilt blend; and one of the shapes 0, 1 and 2. Must not outlive a change of the buffer or of the inverse
-  // scale.
+  // Appends stamps to the write buffer. Must not outlive a change of the buffer or of the inverse scale.
   class Appender {
    public:
     // Makes room for so many stamps, so that appending them does not allocate. Throws std::bad_alloc.
     Appender(StampRenderer& renderer, int stamps)
         : mStamps(renderer.mWriteBuffer, stamps), mInverseScale(renderer.mInverseScale) {}
 
-    void AddPoint(const Vector2<float>* point, float size, float alpha, float tiltBlend, int tile) {
-      // Most stamps are as large as the one before; the divisions of an extent take a third of the time that
-      // a stamp takes.
-      if (size != mSize) {
-        mExtent = extent(size);
-        mSize = size;
+    // Appends `count` stamps, for which there must be room: stampAt(i), asked for in order, tells the i-th.
+    template <typename StampAt>
+    void AddPoints(int count, const StampPose& pose, StampAt&& stampAt) {
+      float* out = mStamps.take(count);
+      StampWriter<kFloatsPerVertex> writer(pose);
+      writer.setExtent(mExtent);
+      float size = mSize;
+      for (int i = 0; i < count; ++i) {
+        const PlacedStamp stamp = stampAt(i);
+        if (out == nullptr) continue;
+        // Most stamps are as large as the one before; the divisions of an extent take a third of the time
+        // that a stamp takes.
+        if (stamp.size != size) {
+          size = stamp.size;
+          mExtent = extentOf(size);
+          writer.setExtent(mExtent);
+        }
+        writer.write(out, stamp);
+        out += kFloatsPerStamp;
       }
-      mStamps.add(stampQuad(point[0], mExtent), {alpha, tiltBlend, static_cast<float>(tile), point[1]});
+      mSize = size;
     }
 
-    // The buffer holds all stamps from here on.
-    void flush() { mStamps.flush(); }
-
    private:
-    StampExtent extent(float size) const {
+    StampExtent extentOf(float size) const {
       if constexpr (kAntialiased) {
         return antialiasedExtent(size, mInverseScale);
       } else {
@@ -126,11 +133,13 @@ class StampRenderer : public HostBase {
     StampExtent mExtent{};
   };
 
-  // Appends one stamp. Throws std::bad_alloc where the buffer cannot grow; without a buffer nothing happens.
+  // Appends one stamp: its centre and direction (-sin a, cos a), as two vectors in a row; its width, or half
+  // of it where it is anti-aliased, stroke units; its alpha and tilt blend; one of the shapes 0, 1 and 2.
+  // Throws std::bad_alloc where the buffer cannot grow; without a buffer nothing happens.
   void AddPoint(const Vector2<float>* point, float size, float alpha, float tiltBlend, int tile) {
-    Appender one(*this, 1);
-    one.AddPoint(point, size, alpha, tiltBlend, tile);
-    one.flush();
+    Appender(*this, 1).AddPoints(1, {tiltBlend, point[1]}, [&](int) {
+      return PlacedStamp{{point[0].x, point[0].y}, size, alpha, tile};
+    });
   }
 
   // Makes room for stamps to come. Throws std::bad_alloc.

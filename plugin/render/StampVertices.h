@@ -4,11 +4,13 @@
 #include <array>
 #include <cmath>
 #include <cstddef>
+#include <utility>
 #include <vector>
 
 #include "base/Vector.h"
 #include "gl/GraphicsFactory.h"
 #include "gl/VertexDescriptor.h"
+#include "graphics/SmPath.h"
 
 // How one stamp becomes two triangles: six vertices of a square around its centre, in the order
 //
@@ -46,26 +48,29 @@ inline GraphicsObject* createStampObject(const VertexLayout& layout) {
   return GraphicsFactory::createGraphicsObject(1, GraphicsFactory::kTriangles, descriptor, 0, 0);
 }
 
-// What every vertex of a stamp carries besides its corner.
-struct StampLook {
-  float alpha;      // an outline's has none
-  float tiltBlend;  // 0: upright
-  float tile;       // which of the three stamp shapes, 0 to 2; an outline's has none
-  Vector2<float> direction;
+// Four floats that are computed together.
+using Four [[gnu::vector_size(16)]] = float;
+
+// A stamp as the walk places it.
+struct PlacedStamp {
+  SmPoint centre;
+  float size;   // its width, or half of it where it is anti-aliased
+  float alpha;  // an outline's has none
+  int tile;     // which of the three stamp shapes, 0 to 2; an outline's has none
 };
 
-// Where a stamp's square lies, and how its rim is smoothed.
-struct StampQuad {
-  float left, top, right, bottom;
-  // Of anti-aliased vertices alone.
-  float innerRadius;   // where the rim's fade begins, in texture units from the centre; the rim ends at 0.5
-  float alphaByWidth;  // factor that dims a stamp widened to one pixel; else 1, or 0 to hide the stamp
+// What stamps in a row have in common.
+struct StampPose {
+  float tiltBlend;           // 0: upright
+  Vector2<float> direction;  // (-sin a, cos a)
 };
 
 // How far a stamp's square reaches from its centre, and how its rim is smoothed: all that its size decides.
 struct StampExtent {
   float x, y;
-  float innerRadius, alphaByWidth;
+  // Of anti-aliased vertices alone.
+  float innerRadius;   // where the rim's fade begins, in texture units from the centre; the rim ends at 0.5
+  float alphaByWidth;  // factor that dims a stamp widened to one pixel; else 1, or 0 to hide the stamp
 };
 
 // A square of side `width`.
@@ -99,91 +104,103 @@ inline StampExtent antialiasedExtent(float halfWidth, Vector2<float> inverseScal
   return {inverseScale.x * a, inverseScale.y * b, innerRadius, alphaByWidth};
 }
 
-inline StampQuad stampQuad(Vector2<float> centre, const StampExtent& extent) {
-  return {centre.x - extent.x, centre.y - extent.y, centre.x + extent.x,
-          centre.y + extent.y, extent.innerRadius,  extent.alphaByWidth};
-}
+// How many floats a stamp's last store reaches past it (StampWriter).
+inline constexpr std::size_t kPastLast = 1;
 
 // Makes room for `count` more stamps, at least doubling so that a long redraw stays linear.
 inline void reserveStamps(std::vector<float>* buffer, int count, std::size_t floatsPerStamp) {
   if (buffer == nullptr) return;
-  const std::size_t needed = buffer->size() + static_cast<std::size_t>(count) * floatsPerStamp;
+  const std::size_t needed = buffer->size() + static_cast<std::size_t>(count) * floatsPerStamp + kPastLast;
   if (needed > buffer->capacity()) buffer->reserve(std::max(needed, 2 * buffer->capacity()));
 }
 
-// Writes the vertices of a stamp, 6 * Stride floats, where Stride is that of one of the layouts above. The
-// 16-byte stores overlap from vertex to vertex, which is twice as fast as float by float; see
-// docs/performance.md.
+// Writes the vertices of stamps that are posed alike: 6 * Stride floats each, where Stride is that of one of
+// the layouts above. The 16-byte stores overlap from vertex to vertex, and the last one may reach kPastLast
+// floats past the stamp: that is twice as fast as float by float; see docs/performance.md.
 template <std::size_t Stride>
-void writeStamp(float* out, const StampQuad& q, const StampLook& look) {
-  constexpr bool kOutline = Stride == kOutlineVertex.floats();
-  constexpr bool kAntialiased = Stride == kAntialiasedVertex.floats();
+class StampWriter {
+  static constexpr bool kOutline = Stride == kOutlineVertex.floats();
+  static constexpr bool kAntialiased = Stride == kAntialiasedVertex.floats();
   static_assert(kOutline || kAntialiased || Stride == kSquareVertex.floats());
-  using Four [[gnu::vector_size(16), gnu::aligned(4), gnu::may_alias]] = float;
-  const Four corners[6] = {{q.left, q.top, 0.0f, 1.0f},    {q.left, q.bottom, 0.0f, 0.0f},
-                           {q.right, q.top, 1.0f, 1.0f},   {q.right, q.top, 1.0f, 1.0f},
-                           {q.left, q.bottom, 0.0f, 0.0f}, {q.right, q.bottom, 1.0f, 0.0f}};
-  if constexpr (kOutline) {
-    const Four rest = {look.tiltBlend, look.direction.x, look.direction.y, 0.0f};
-    for (int i = 0; i < 6; ++i, out += Stride) {
-      *reinterpret_cast<Four*>(out) = corners[i];
-      if (i < 5) {
-        *reinterpret_cast<Four*>(out + 4) = rest;  // its last lane is where the next vertex begins
-      } else {
-        out[4] = rest[0];
-        out[5] = rest[1];
-        out[6] = rest[2];
-      }
-    }
-    return;
-  }
-  const Four common = {look.alpha, look.tiltBlend, look.tile, look.direction.x};
-  const Four rest = {look.direction.y, q.innerRadius, q.alphaByWidth, 0.0f};
-  for (int i = 0; i < 6; ++i, out += Stride) {
-    *reinterpret_cast<Four*>(out) = corners[i];
-    *reinterpret_cast<Four*>(out + 4) = common;
-    if (kAntialiased && i < 5) {
-      *reinterpret_cast<Four*>(out + 8) = rest;  // its last lane is where the next vertex begins
-    } else {
-      out[8] = rest[0];
-      if constexpr (kAntialiased) {
-        out[9] = rest[1];
-        out[10] = rest[2];
-      }
-    }
-  }
-}
 
-// Appends stamps to a batch in blocks, so that each stamp is written once into a block that stays in the
-// cache and the batch grows by whole blocks. The batch holds all stamps only after `flush`.
+ public:
+  explicit StampWriter(const StampPose& pose) : mDirectionY(pose.direction.y) {
+    for (int tile = 0; tile < 3; ++tile) {
+      mLooks[tile] = kOutline ? Four{pose.tiltBlend, pose.direction.x, pose.direction.y}
+                              : Four{0.0f, pose.tiltBlend, static_cast<float>(tile), pose.direction.x};
+    }
+  }
+
+  // For the stamps written from here on. Before the first of them.
+  void setExtent(const StampExtent& extent) {
+    mReach = Four{-extent.x, -extent.y, extent.x, extent.y};
+    mRest = Four{mDirectionY, extent.innerRadius, extent.alphaByWidth};
+  }
+
+  void write(float* out, const PlacedStamp& stamp) const {
+    const SmPoint centre = stamp.centre;
+    const Four edges = Four{centre.x, centre.y, centre.x, centre.y} + mReach;
+    const Four leftTop = __builtin_shufflevector(edges, Four{0.0f, 1.0f}, 0, 1, 4, 5);
+    const Four leftBottom = __builtin_shufflevector(edges, Four{0.0f, 0.0f}, 0, 3, 4, 5);
+    const Four rightTop = __builtin_shufflevector(edges, Four{1.0f, 1.0f}, 2, 1, 4, 5);
+    const Four rightBottom = __builtin_shufflevector(edges, Four{1.0f, 0.0f}, 2, 3, 4, 5);
+    const Four corners[6] = {leftTop, leftBottom, rightTop, rightTop, leftBottom, rightBottom};
+    Four look = mLooks[stamp.tile];
+    if constexpr (!kOutline) look[0] = stamp.alpha;
+    for (std::size_t i = 0; i < 6; ++i, out += Stride) {
+      store(out, corners[i]);
+      store(out + 4, look);
+      if constexpr (kAntialiased) {
+        store(out + 8, mRest);
+      } else if constexpr (!kOutline) {
+        out[8] = mDirectionY;
+      }
+    }
+  }
+
+ private:
+  static void store(float* out, Four four) {
+    using FourAnywhere [[gnu::vector_size(16), gnu::aligned(4), gnu::may_alias]] = float;
+    *reinterpret_cast<FourAnywhere*>(out) = four;
+  }
+
+  Four mLooks[3];  // what follows the corner: one for each stamp shape
+  float mDirectionY;
+  Four mReach{};  // what to add to a centre for left, top, right and bottom
+  Four mRest{};   // what follows the look
+};
+
+// Appends stamps to a batch. They are written in place: the batch grows at once by all that may come, and at
+// the end shrinks by those that did not.
 template <std::size_t Stride>
 class StampAppender {
  public:
-  // Makes room for so many stamps. Throws std::bad_alloc before anything is changed. Without a batch all
-  // stamps are dropped.
+  // Makes room for so many stamps. Throws std::bad_alloc before anything is changed. Without a batch there is
+  // room for none.
   StampAppender(std::vector<float>* batch, int stamps) : mBatch(batch) {
+    if (batch == nullptr) return;
+    mUsed = batch->size();
     reserveStamps(batch, stamps, kFloats);
+    batch->resize(mUsed + static_cast<std::size_t>(stamps) * kFloats + kPastLast);
+  }
+  ~StampAppender() {
+    if (mBatch != nullptr) mBatch->resize(mUsed);
   }
   StampAppender(const StampAppender&) = delete;
   StampAppender& operator=(const StampAppender&) = delete;
 
-  void add(const StampQuad& quad, const StampLook& look) {
-    writeStamp<Stride>(mEnd, quad, look);
-    mEnd += kFloats;
-    if (mEnd == mBlock + sizeof mBlock / sizeof *mBlock) flush();
-  }
-
-  void flush() {
-    if (mBatch != nullptr) mBatch->insert(mBatch->end(), mBlock, mEnd);
-    mEnd = mBlock;
+  // Where the next stamps are to be written, of those that there is room for; null without a batch.
+  float* take(int stamps) {
+    return mBatch != nullptr
+               ? mBatch->data() + std::exchange(mUsed, mUsed + static_cast<std::size_t>(stamps) * kFloats)
+               : nullptr;
   }
 
  private:
   static constexpr std::size_t kFloats = 6 * Stride;
 
   std::vector<float>* mBatch;
-  float* mEnd = mBlock;
-  alignas(64) float mBlock[16 * kFloats];
+  std::size_t mUsed = 0;
 };
 
 }  // namespace Qelt

@@ -316,7 +316,7 @@ class StampPen {
   }
 
   SegmentLook lookOf(float width, float alpha, float widthStep, float alphaStep, float blend) const {
-    return {width, alpha, widthStep, alphaStep, blend, stampDirection(mAttitude.meanOrientation())};
+    return {width, widthStep, alpha, alphaStep, blend, stampDirection(mAttitude.meanOrientation())};
   }
 
   // The alpha that the pressure asks for. A stroke that has none yet begins with it.

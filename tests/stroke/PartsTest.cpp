@@ -71,6 +71,17 @@ TEST(DirtyBoxTest, LeavesOutEdgesThatAreNaN) {
   }
 }
 
+// An edge at zero is written as 0, never as -0.
+TEST(DirtyBoxTest, HasPositiveZeros) {
+  DirtyBox box;
+  box.add(-2.0f, -3.0f, 2.0f);
+  box.add(-3.0f, -2.0f, 2.0f);
+  RectF rect{-9.0f, -9.0f, -9.0f, -9.0f};
+  box.uniteInto(&rect);
+  EXPECT_EQ(std::bit_cast<std::uint32_t>(rect.right), 0u);
+  EXPECT_EQ(std::bit_cast<std::uint32_t>(rect.bottom), 0u);
+}
+
 TEST(DistanceTest, IsTakenInDoublesWhereSquaresDoNotFit) {
   EXPECT_FLOAT_EQ(distanceBetween({-2e19f, 0.0f}, {2e19f, 0.0f}), 4e19f);
   EXPECT_FLOAT_EQ(distanceBetween({0.0f, -2e19f}, {0.0f, 2e19f}), 4e19f);
@@ -82,25 +93,34 @@ TEST(StampWalkTest, EndsWhereItCannotGoOn) {
   path.moveTo(0.0f, 0.0f);
   path.lineTo(2e8f, 0.0f);
   path.resetPath(0);
-  struct Place {
-    void operator()(const SmPoint&) { ++placed; }
+  struct Run {
+    SmPoint* next() { return &at; }
+    void place() { ++placed; }
     void passOver(float) { ++passed; }
+    SmPoint at;
     int placed = 0, passed = 0;
   };
   for (const int most : {0, 9}) {
-    Place place;
-    const WalkResult walk = walkSpaced(path, 1e8f, 0.4f, 2e8f, most, place);
+    Run run;
+    const WalkResult walk = walkSpaced(path, 1e8f, 0.4f, 2e8f, most, run);
     EXPECT_EQ(walk.stamps, 1);
     EXPECT_TRUE(walk.cutShort);
     EXPECT_EQ(walk.carry, 0.4f);
-    EXPECT_EQ(most == 0 ? place.passed : place.placed, 1);
+    EXPECT_EQ(most == 0 ? run.passed : run.placed, 1);
   }
 }
 
 TEST(StampCounterTest, LetsTheShapesTakeTurnsEvenPastTheLargestCount) {
-  StampCounter stamps(std::numeric_limits<std::int32_t>::max() - 1);  // 2147483646 = 3 * 715827882
-  for (const int shape : {0, 1, 2, 0}) EXPECT_EQ(stamps.next(), shape);
-  EXPECT_GT(stamps.count(), 0);
+  constexpr int kMost = std::numeric_limits<std::int32_t>::max();  // 2147483646 = 3 * 715827882
+  StampCounter one(kMost - 1);
+  for (const int shape : {0, 1, 2, 0}) EXPECT_EQ(one.take(1), shape);
+  EXPECT_EQ(one.count(), 4);  // after the largest count comes 2
+  // Some at a time, the largest count passed at any of them.
+  for (const int stamps : {1, 2, 3, 16}) {
+    StampCounter some(kMost - 1);
+    EXPECT_EQ(some.take(stamps), 0);
+    EXPECT_EQ(some.take(1), stamps % 3);
+  }
 }
 
 }  // namespace

@@ -5,28 +5,28 @@
 namespace Qelt {
 
 // The mean of the last `Size` samples. The sum runs from slot 0 upwards in single precision. The part of it
-// below the slot written next does not change until the ring wraps, so it is kept from sample to sample.
+// below the slot written next does not change until the ring wraps, so it is kept from sample to sample; and
+// nothing changes at all where a sample is what it replaces, as with tablets that know no tilt.
 template <int Size>
 class MeanRing {
  public:
   void fill(float value) {
     mSlots.fill(value);
     restart();
+    updateMean();
   }
 
   void push(float value) {
     if (mNext == Size) restart();
+    const bool changes = mSlots[mNext] != value;
     mSlots[mNext] = value;
     mSumBelow += value;
     ++mNext;
+    if (changes) updateMean();
   }
 
   // The mean of all slots.
-  float mean() const {
-    float sum = mSumBelow;
-    for (int i = mNext; i < Size; ++i) sum += mSlots[i];
-    return sum / static_cast<float>(Size);
-  }
+  float mean() const { return mMean; }
 
  private:
   void restart() {
@@ -34,9 +34,16 @@ class MeanRing {
     mSumBelow = 0.0f;
   }
 
+  void updateMean() {
+    float sum = mSumBelow;
+    for (int i = mNext; i < Size; ++i) sum += mSlots[i];
+    mMean = sum / static_cast<float>(Size);
+  }
+
   std::array<float, Size> mSlots{};
   int mNext = 0;           // the slot written next; `Size` stands for slot 0
   float mSumBelow = 0.0f;  // the sum of the slots below it
+  float mMean = 0.0f;
 };
 
 // How the pen is held: tilt and orientation, each averaged over the last samples.

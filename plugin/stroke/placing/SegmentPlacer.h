@@ -64,7 +64,8 @@ class SegmentPlacer {
   void placeOne(const SegmentLook& look, RectF* rect) {
     Appender appender(*mRenderDrawable, 1);
     StampRun<Version> run(appender, look, mStamps);
-    run({mPath.last().x, mPath.last().y});
+    *run.next() = {mPath.last().x, mPath.last().y};
+    run.place();
     finish(run, rect);
   }
 

@@ -1,13 +1,17 @@
 #pragma once
 
+#include <array>
 #include <cmath>
 #include <concepts>
+#include <cstddef>
 #include <cstdint>
 #include <limits>
+#include <utility>
 
 #include "base/RectF.h"
 #include "base/Vector.h"
 #include "graphics/SmPath.h"
+#include "render/StampVertices.h"
 
 namespace Qelt {
 
@@ -30,26 +34,25 @@ concept StampRow = requires(float running) {
 class DirtyBox {
  public:
   void add(float x, float y, float reach) {
+    const Four edges = Four{x, y, -x, -y} - Four{reach, reach, reach, reach};
     // Written so that an edge that is NaN changes nothing.
-    const float left = x - reach, top = y - reach, right = x + reach, bottom = y + reach;
-    mLeft = left < mLeft ? left : mLeft;
-    mTop = top < mTop ? top : mTop;
-    mRight = right > mRight ? right : mRight;
-    mBottom = bottom > mBottom ? bottom : mBottom;
+    mLeast = edges < mLeast ? edges : mLeast;
   }
 
   void uniteInto(RectF* rect) const {
-    if (mLeft > mRight || mTop > mBottom) return;
+    // Subtracted, so that no zero becomes a negative one.
+    const float left = mLeast[0], top = mLeast[1], right = 0.0f - mLeast[2], bottom = 0.0f - mLeast[3];
+    if (left > right || top > bottom) return;
     RectF box;
-    box.Set(mLeft, mTop, mRight, mBottom);
+    box.Set(left, top, right, bottom);
     rect->Union(box);
   }
 
  private:
-  float mLeft = std::numeric_limits<float>::infinity();
-  float mTop = std::numeric_limits<float>::infinity();
-  float mRight = -std::numeric_limits<float>::infinity();
-  float mBottom = -std::numeric_limits<float>::infinity();
+  static constexpr float kInfinity = std::numeric_limits<float>::infinity();
+
+  // Left and top, and right and bottom negated, so that all four grow downwards.
+  Four mLeast{kInfinity, kInfinity, kInfinity, kInfinity};
 };
 
 // Counts the stamps of a stroke. The three stamp shapes take turns by the count.
@@ -60,13 +63,16 @@ class StampCounter {
   explicit StampCounter(std::int32_t count = 0) : mCount(count) {}
   std::int32_t count() const { return mCount; }
 
-  // The shape of the next stamp, 0 to 2.
-  int next() {
+  // Counts so many stamps, at least one, and returns the first one's shape, 0 to 2.
+  int take(int stamps) {
     const int shape = mCount % kShapes;
     // Past the largest count, whose shape is 1, the count begins again at 2: the shapes stay in turn.
-    mCount = mCount == INT32_MAX ? 2 : mCount + 1;
+    const int left = INT32_MAX - mCount;
+    mCount = stamps <= left ? mCount + stamps : 1 + stamps - left;
     return shape;
   }
+  // The shape of the stamp after one of that shape.
+  static int shapeAfter(int shape) { return shape + 1 == kShapes ? 0 : shape + 1; }
 
  private:
   std::int32_t mCount;
@@ -82,15 +88,24 @@ inline Vector2<float> stampDirection(float orientation) {
 // What the stamps of one segment look like: where width and alpha stand at the first stamp, and by how much
 // they change from stamp to stamp; tilt blend and direction are the same for all of them.
 struct SegmentLook {
-  float width, alpha;
-  float widthStep, alphaStep;
+  float width, widthStep;
+  float alpha, alphaStep;
   float tiltBlend;
   Vector2<float> direction;  // see stampDirection
+
+  // Goes on to the next stamp; returns the alpha of the one it leaves.
+  float advance() {
+    width += widthStep;
+    return std::exchange(alpha, alpha + alphaStep);
+  }
 };
 
-// The stamps of one segment: hands them to the render drawable and gathers the area they cover. Its state is
-// local to the segment, so that the walk runs in registers. The walks of StampWalk.h take it as `place`;
-// `finish` is called once afterwards.
+// The stamps of one segment: gathers their places, hands the stamps to the render drawable some at a time,
+// and gathers the area they cover. The walks of StampWalk.h take it as `run`; `finish` is called once
+// afterwards.
+//
+// Some at a time, because the path is asked for each place by a call, and no register keeps a float across a
+// call: whatever goes on from stamp to stamp would be loaded and stored again for each.
 template <StampRow Version>
 class StampRun {
   static constexpr const auto& kProfile = Version::profile;
@@ -100,61 +115,74 @@ class StampRun {
 
   // `counter`: where the stroke's count stands before the segment.
   StampRun(Appender& appender, const SegmentLook& look, StampCounter counter)
-      : mAppender(appender), mLook(look), mCounter(counter) {
-    mStamp[1] = look.direction;
-  }
+      : mAppender(appender), mLook(look), mCounter(counter) {}
 
-  // Places a stamp.
-  void operator()(SmPoint at) {
-    mBox.add(at.x, at.y, kProfile.stampReach(mLook.width));
-    [[maybe_unused]] const int shape = mCounter.next();
-    if constexpr (kProfile.isOutline) {
-      // Kept: an outline's centres are cut to whole numbers; the area is not.
-      mStamp[0] = {std::trunc(at.x), std::trunc(at.y)};
-      mAppender.AddPoint(mStamp, kProfile.stampSize(mLook.width), mLook.tiltBlend);
-    } else {
-      mStamp[0] = {at.x, at.y};
-      mAppender.AddPoint(mStamp, kProfile.stampSize(mLook.width), kProfile.stampAlpha(mLook.alpha),
-                         mLook.tiltBlend, shape);
-    }
-    advance();
+  // Where to write the place of the next stamp.
+  SmPoint* next() { return mNext; }
+  // Places a stamp where that says.
+  void place() {
+    if (++mNext == mPlaces.data() + mPlaces.size()) handOver();
   }
 
   // Leaves out the stamp at that distance, and goes on as if it had been placed.
   void passOver(float distance) {
-    mCounter.next();
+    handOver();
+    mCounter.take(1);
     mPassedOver = distance;
-    advance();
+    mLastAlpha = mLook.advance();
   }
 
-  // Call after the last stamp: from then on the batch holds all stamps, and `rect` takes in their area.
+  // Call after the last stamp: from then on all stamps are handed over, and `rect` takes in their area.
   // `path` is the segment's.
   void finish(const SmPath& path, RectF* rect) {
-    mAppender.flush();
+    handOver();
     mBox.uniteInto(rect);
     SmPoint at;
-    if (mPassedOver >= 0.0f && path.getPosTan(mPassedOver, &at, nullptr)) mStamp[0] = {at.x, at.y};
+    if (mPassedOver >= 0.0f && path.getPosTan(mPassedOver, &at, nullptr)) mLastStamp = {at.x, at.y};
   }
 
   StampCounter counter() const { return mCounter; }
   // Centre and alpha of the last stamp, where there was one.
-  Vector2<float> lastStamp() const { return mStamp[0]; }
+  Vector2<float> lastStamp() const { return mLastStamp; }
   float lastAlpha() const { return mLastAlpha; }
 
  private:
-  void advance() {
-    mLastAlpha = mLook.alpha;
-    mLook.width += mLook.widthStep;
-    mLook.alpha += mLook.alphaStep;
+  // Hands over the stamps whose places have been gathered.
+  void handOver() {
+    const auto count = static_cast<int>(mNext - mPlaces.data());
+    if (count == 0) return;
+    // Copies, which stay in registers.
+    SegmentLook look = mLook;
+    DirtyBox box = mBox;
+    float lastAlpha = 0.0f;
+    int tile = mCounter.take(count);
+    mAppender.AddPoints(count, {look.tiltBlend, look.direction}, [&](int i) {
+      SmPoint centre = mPlaces[static_cast<std::size_t>(i)];
+      box.add(centre.x, centre.y, kProfile.stampReach(look.width));
+      // Kept: an outline's centres are cut to whole numbers; the area is not.
+      if constexpr (kProfile.isOutline) centre = {std::trunc(centre.x), std::trunc(centre.y)};
+      PlacedStamp stamp{centre, kProfile.stampSize(look.width), 0.0f, tile};
+      if constexpr (!kProfile.isOutline) stamp.alpha = kProfile.stampAlpha(look.alpha);
+      tile = StampCounter::shapeAfter(tile);
+      lastAlpha = look.advance();
+      return stamp;
+    });
+    mLook = look;
+    mBox = box;
+    mLastAlpha = lastAlpha;
+    mLastStamp = {mNext[-1].x, mNext[-1].y};
+    mNext = mPlaces.data();
   }
 
   Appender& mAppender;
   SegmentLook mLook;
-  float mLastAlpha = 0.0f;
-  float mPassedOver = -1.0f;  // where the last stamp left out would lie; below 0 when none was left out
   StampCounter mCounter;
   DirtyBox mBox;
-  Vector2<float> mStamp[2];  // centre, direction
+  std::array<SmPoint, 16> mPlaces;
+  SmPoint* mNext = mPlaces.data();
+  Vector2<float> mLastStamp;
+  float mLastAlpha = 0.0f;
+  float mPassedOver = -1.0f;  // where the last stamp left out would lie; below 0 when none was left out
 };
 
 }  // namespace Qelt

@@ -27,50 +27,46 @@ inline int spacedStamps(float first, float spacing, float length) {
   return std::min(count, kMostStampsPerSegment - 2) + 2;
 }
 
-// Calls place(point) every `spacing` along the path, from distance `first` on, at most `most` times; after
-// that it calls place.passOver(distance) instead. A walk that cannot advance, or meets the bound of a
+// A walk writes each stamp's place where run.next() says and then calls run.place(); see StampRun.
+
+// Places stamps every `spacing` along the path, from distance `first` on, at most `most` of them; after that
+// it calls run.passOver(distance) instead. A walk that cannot advance, or meets the bound of a
 // segment, returns as if its last stamp lay at the end of the path.
-template <typename Place>
-WalkResult walkSpaced(const SmPath& path, float first, float spacing, float length, int most, Place&& place) {
-  const int bound = std::min(most, kMostStampsPerSegment);
+template <typename Run>
+WalkResult walkSpaced(const SmPath& path, float first, float spacing, float length, int most, Run&& run) {
   float distance = first;
   int stamps = 0;
-  const auto goesOn = [&distance, spacing] {
+  while (distance <= length) {
+    if (stamps == kMostStampsPerSegment) return {spacing, true, stamps};
+    if (stamps >= most) {
+      run.passOver(distance);
+    } else if (path.getPosTan(distance, run.next(), nullptr)) {
+      run.place();
+    }
+    ++stamps;
     const float next = distance + spacing;
-    const bool isFarther = next > distance;
+    if (!(next > distance)) return {spacing, true, stamps};
     distance = next;
-    return isFarther;
-  };
-  for (; distance <= length && stamps < bound; ++stamps) {
-    SmPoint at;
-    if (path.getPosTan(distance, &at, nullptr)) place(at);
-    if (!goesOn()) return {spacing, true, stamps + 1};
   }
-  for (; distance <= length && stamps < kMostStampsPerSegment; ++stamps) {
-    place.passOver(distance);
-    if (!goesOn()) return {spacing, true, stamps + 1};
-  }
-  if (distance <= length) return {spacing, true, stamps};
   const float carry = distance - length;
   if (!std::isfinite(carry)) return {spacing, true, stamps};
   return {carry, false, stamps};
 }
 
-// Calls place(point) `count` times at even distances, from the path's start on to one step before its end;
-// after `most` of them it calls place.passOver(distance) instead. Stops early where the path has no position.
+// Places `count` stamps at even distances, from the path's start on to one step before its end;
+// after `most` of them it calls run.passOver(distance) instead. Stops early where the path has no position.
 // Only the bound of a segment cuts it short.
-template <typename Place>
-WalkResult walkEvenly(const SmPath& path, int count, float length, int most, Place&& place) {
+template <typename Run>
+WalkResult walkEvenly(const SmPath& path, int count, float length, int most, Run&& run) {
   const float step = length / static_cast<float>(count);
   const int stamps = std::min(count, kMostStampsPerSegment);
   const int bound = std::min(most, stamps);
   int i = 0;
   for (; i < bound; ++i) {
-    SmPoint at;
-    if (!path.getPosTan(static_cast<float>(i) * step, &at, nullptr)) return {0.0f, stamps < count, i};
-    place(at);
+    if (!path.getPosTan(static_cast<float>(i) * step, run.next(), nullptr)) return {0.0f, stamps < count, i};
+    run.place();
   }
-  for (; i < stamps; ++i) place.passOver(static_cast<float>(i) * step);
+  for (; i < stamps; ++i) run.passOver(static_cast<float>(i) * step);
   return {0.0f, stamps < count, stamps};
 }
 
