@@ -5,6 +5,10 @@
 
 namespace QeltDesktop {
 
+// The most pixels that a picture has on a side and in all; the latter take 256 MiB per layer.
+constexpr int kLongestSide = 32'767;
+constexpr int kMostPixels = 67'108'864;
+
 // An RGBA8 picture, its colour not premultiplied: the first row at the top, rows without padding.
 struct Picture {
   // Pixels missing at the end of `pixels` are zero.

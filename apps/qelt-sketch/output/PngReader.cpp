@@ -5,7 +5,7 @@
 
 #include <spng.h>
 
-#include "play/PageDrawing.h"
+#include "output/Picture.h"
 #include "text/Refusal.h"
 
 namespace QeltDesktop {

@@ -13,10 +13,6 @@ class Progress;
 class RenderQueue;
 class StageTimes;
 
-// The most pixels that a picture has on a side and in all; the latter take 256 MiB per layer.
-constexpr int kLongestSide = 32'767;
-constexpr int kMostPixels = 67'108'864;
-
 // The drawables that take part in a picture, each on a layer of its own: outlines below, then strokes or the
 // preview, predictions on top.
 struct DrawableSet {
