@@ -811,8 +811,8 @@ class Archive : public Program {
     write("in/notes.txt", "no page");
   }
   static std::string summary(int pages, int drawn, int upToDate, int refused) {
-    return std::to_string(pages) + " pages: " + std::to_string(drawn) + " drawn, " +
-           std::to_string(upToDate) + " up to date, " + std::to_string(refused) + " refused\n";
+    return std::to_string(pages) + (pages == 1 ? " page: " : " pages: ") + std::to_string(drawn) +
+           " drawn, " + std::to_string(upToDate) + " up to date, " + std::to_string(refused) + " refused\n";
   }
 };
 
@@ -840,16 +840,22 @@ TEST_F(Archive, TellsBadPagesAndDrawsTheOthers) {
   write("in/empty.inkml", "");
   const Ran ran = run("draw in other/a.inkml nowhere.inkml ink.inkml -o out/ --jobs 1");
   EXPECT_EQ(ran.status, 1);
-  EXPECT_EQ(ran.out, summary(5, 2, 0, 4).replace(0, 1, "6").replace(9, 1, "3"));
+  EXPECT_EQ(ran.out, summary(7, 3, 0, 4));
   for (const char* const line : {"in/deep/b.inkml:2: not a number: x\n", "in/empty.inkml:1: not XML: ",
                                  "other/a.inkml: its picture would be that of in/a.inkml: out/a.png\n",
                                  "nowhere.inkml: cannot be read: No such file or directory\n"})
     EXPECT_NE(ran.err.find(line), std::string::npos) << line << ran.err;
   EXPECT_FALSE(holds("out/deep/b.png"));
+  // What would be waited for, and a folder that cannot be made.
+  EXPECT_EQ(
+      sh("mkdir -p odd/stuck; mkfifo odd/pipe.inkml; cp ink.inkml odd; cp ink.inkml odd/stuck/no.inkml; "
+         "mkdir half; touch half/stuck; $sketch draw odd -o half")
+          .out,
+      summary(2, 1, 0, 1));
   // A plug-in that ends the process takes its page alone; one that is none ends the run at once.
   EXPECT_EQ(run("draw in -o none/ --plugin ink.inkml").status, 1);
   EXPECT_FALSE(holds("none/a.png"));
-  EXPECT_EQ(run("draw in -o ink.inkml/").err, "ink.inkml: no folder for pictures: Not a directory\n");
+  EXPECT_EQ(run("draw in -o ink.inkml/").err, "ink.inkml/: no folder for pictures: File exists\n");
 }
 
 TEST_F(Archive, DrawsOnlyWhatIsNotUpToDate) {
@@ -857,6 +863,13 @@ TEST_F(Archive, DrawsOnlyWhatIsNotUpToDate) {
   EXPECT_EQ(run("draw in -o out/").out, summary(3, 0, 3, 0));
   fs::last_write_time(path("in/a.inkml"), fs::file_time_type::clock::now());
   EXPECT_EQ(run("draw in -o out/").out, summary(3, 1, 2, 0));
+  // Changed while it was drawn.
+  EXPECT_EQ(sh("$sketch draw ink.inkml -o late/ --zoom 40 & until ls late/.qelt-*; do :; done; sleep 0.02; "
+               "touch ink.inkml; "
+               "wait; $sketch draw ink.inkml -o late/ >second")
+                .err.find("refused"),
+            std::string::npos);
+  EXPECT_EQ(contentsOf(path("second")), summary(1, 1, 0, 0));
   // Older than the program.
   fs::last_write_time(path("out/deep/c.png"),
                       fs::file_time_type::clock::now() - std::chrono::hours(24 * 365 * 20));

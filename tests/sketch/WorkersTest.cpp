@@ -60,6 +60,35 @@ TEST(Workers, ThatCannotBeginEndTheRun) {
   EXPECT_EQ(refusal([]() -> Job { _exit(4); }), "a process to draw in ended with exit status 4");
 }
 
+// A worker dies some time after its job, while nobody listens or while there is nothing more to do for it.
+TEST(Workers, ThatDieBetweenTheirJobsCostNoJob) {
+  const auto dieSoon = [] {
+    if (fork() > 0) return;
+    usleep(20'000);
+    kill(getppid(), SIGKILL);
+    _exit(0);
+  };
+  struct Case {
+    std::size_t jobs, workers;
+    useconds_t notListening, lastJob;
+  };
+  for (const Case& one : {Case{3, 1, 100'000, 0}, Case{2, 2, 0, 200'000}}) {
+    std::size_t done = 0;
+    const Job job = [&](std::size_t index) {
+      if (index == 0) dieSoon();
+      if (index == one.jobs - 1) usleep(one.lastJob);
+    };
+    doInWorkers(
+        one.jobs, one.workers, [&job] { return job; },
+        [&](const JobEnd& end) {
+          EXPECT_FALSE(end.refusal) << end.index << *end.refusal;
+          ++done;
+          if (end.index == 0) usleep(one.notListening);
+        });
+    EXPECT_EQ(done, one.jobs);
+  }
+}
+
 // They must not draw on when nobody collects what they draw.
 TEST(Workers, EndWithTheProcessThatAsks) {
   int pipe[2];

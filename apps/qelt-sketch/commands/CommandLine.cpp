@@ -97,6 +97,12 @@ std::optional<int> integer(const std::string& text) {
   return parseInt(text);
 }
 
+// More processes than this would fill the memory of any machine of today.
+constexpr int kMostJobs = 256;
+std::optional<int> jobs(const std::string& text) {
+  const std::optional<int> processes = countFrom(1, text);
+  return processes && *processes <= kMostJobs ? processes : std::nullopt;
+}
 constexpr int kMostLevels = 255;
 std::optional<int> levels(const std::string& text) {
   const std::optional<int> count = countFrom(0, text);
@@ -207,6 +213,7 @@ std::string printBackground(const Background& background) {
 }
 
 const Form<int> kCount{"N", "a whole number from 1", count, printInt};
+const Form<int> kJobs{"N", "a whole number from 1 to " + std::to_string(kMostJobs), jobs, printInt};
 const Form<int> kInteger{"N", "a whole number", integer, printInt};
 const Form<int> kPredictionCount{"K", "a whole number from 0 to " + std::to_string(kMostPredicted),
                                  predictionCount, printInt};
@@ -372,7 +379,7 @@ std::vector<CommandEntry> addCommands(CLI::App& app, Options& options) {
       ->required()
       ->type_name("PATH");
   OptionGroup archived(*draw);
-  archived.add<int>("--jobs", options.jobs, kCount, "pages to draw at a time (default: as many as cores)");
+  archived.add<int>("--jobs", options.jobs, kJobs, "pages to draw at a time (default: as many as cores)");
   draw->add_flag("--again", options.again,
                  "draw pages, too, whose pictures in the folder are newer than they and the program");
   draw->add_flag_callback(

@@ -35,6 +35,7 @@
 #include "output/PngWriter.h"
 #include "output/StageTimes.h"
 #include "output/Terminal.h"
+#include "output/UnfinishedFile.h"
 #include "pen/RenderingVersions.h"
 #include "pencommon/IPenMorphable.h"
 #include "play/CallRecorder.h"
@@ -111,8 +112,10 @@ PictureText inkOf(const Page& page, Options options) {
 // A page to be drawn to a file, made before there is a GL context, so that what cannot be read or written is
 // refused at once.
 struct DrawnFile {
-  DrawnFile(const Options& asked, StageTimes& times)
-      : DrawnFile(asked, StageTimes::Watch(times, Stage::Read)) {}
+  using Abandoned = OutputFile::Abandoned;
+
+  DrawnFile(const Options& asked, StageTimes& times, Abandoned abandoned = Abandoned::Remove)
+      : DrawnFile(asked, abandoned, StageTimes::Watch(times, Stage::Read)) {}
 
   Options options;
   Page page;
@@ -120,10 +123,10 @@ struct DrawnFile {
   PictureText ink;
 
  private:
-  DrawnFile(const Options& asked, const StageTimes::Watch&)
+  DrawnFile(const Options& asked, Abandoned abandoned, const StageTimes::Watch&)
       : options(asked),
         page(readPage(options)),
-        file(options.output, inputFile(page, options)),
+        file(options.output, inputFile(page, options), abandoned),
         ink(options.ink ? inkOf(page, options) : PictureText{}) {}
 };
 
@@ -170,11 +173,20 @@ void drawOne(Options options) {
   tellTimes(options, times);
 }
 
+void makeFolder(const fs::path& folder) {
+  std::error_code error;
+  fs::create_directories(folder, error);
+  if (error) throw Refusal(folder.string() + ": no folder for pictures: " + error.message());
+}
+
 // One of the processes that draw an archive.
 class ArchiveWorker {
  public:
   explicit ArchiveWorker(const Options& options) : mOptions(options), mDesk(options, mTimes) {}
-  ~ArchiveWorker() { tellTimes(mOptions, mTimes); }
+  ~ArchiveWorker() {
+    if (mOptions.timings) std::fputs("one of the processes that drew pages:\n", stderr);
+    tellTimes(mOptions, mTimes);
+  }
   ArchiveWorker(const ArchiveWorker&) = delete;
   ArchiveWorker& operator=(const ArchiveWorker&) = delete;
 
@@ -182,7 +194,11 @@ class ArchiveWorker {
     Options options = mOptions;
     options.input = page.input;
     options.output = page.output.string();
-    DrawnFile drawn(options, mTimes);
+    makeFolder(page.output.parent_path());
+    // The picture is as old as what was read of the page: if that is changed meanwhile, it is out of date.
+    const FileTime begin = clockOfFiles();
+    DrawnFile drawn(options, mTimes, OutputFile::Abandoned::Leave);
+    drawn.file.setTime(begin);
     Progress silent = Progress::silent();
     drawFile(drawn, mDesk.plugin, mDesk.queue, mTimes, silent);
   }
@@ -192,12 +208,6 @@ class ArchiveWorker {
   StageTimes mTimes;
   DrawingDesk mDesk;
 };
-
-void makeFolder(const fs::path& folder) {
-  std::error_code error;
-  fs::create_directories(folder, error);
-  if (error) throw Refusal(folder.string() + ": no folder for pictures: " + error.message());
-}
 
 // Each page as a picture of its own in the folder that is the output.
 int drawArchive(const Options& options) {
@@ -209,14 +219,15 @@ int drawArchive(const Options& options) {
   std::vector<std::string> inputs = options.inputs;
   if (inputs.empty()) inputs.push_back(inputPath(options));
   std::vector<ArchivePage> pages = pagesOf(inputs, options.output, refuse);
-  const std::size_t all = pages.size();
-  if (!options.again) {
-    const std::vector<fs::path> program{fs::read_symlink("/proc/self/exe"), pluginPath(options)};
-    std::erase_if(pages, [&](const ArchivePage& page) { return isUpToDate(page, program); });
-  }
-  std::set<fs::path> folders{options.output};
+  const std::size_t all = pages.size() + refused;
+  makeFolder(options.output);
+  std::set<fs::path> folders;
   for (const ArchivePage& page : pages) folders.insert(page.output.parent_path());
-  for (const fs::path& folder : folders) makeFolder(folder);
+  std::size_t upToDate = 0;
+  if (!options.again) {
+    const FileTime program = programTime(pluginPath(options));
+    upToDate = std::erase_if(pages, [&](const ArchivePage& page) { return isUpToDate(page, program); });
+  }
 
   const std::size_t cores = std::max(std::thread::hardware_concurrency(), 1u);
   const std::size_t jobs =
@@ -244,7 +255,9 @@ int drawArchive(const Options& options) {
           refuse(end.refusal->starts_with(input) ? *end.refusal : input + ": " + *end.refusal);
         });
   }
-  std::printf("%zu pages: %zu drawn, %zu up to date, %zu refused\n", all, drawn, all - pages.size(), refused);
+  for (const fs::path& folder : folders) removeAbandoned(folder.string());
+  std::printf("%zu %s: %zu drawn, %zu up to date, %zu refused\n", all, all == 1 ? "page" : "pages", drawn,
+              upToDate, refused);
   finishStandardOutput();
   return refused == 0 ? 0 : 1;
 }
@@ -254,9 +267,11 @@ int drawArchive(const Options& options) {
 bool isForFolder(const Options& options) {
   std::error_code error;
   if (options.output.ends_with('/')) return true;
-  const bool areSeveral = options.inputs.size() > 1 ||
-                          (!options.inputs.empty() && fs::is_directory(options.inputs.front(), error));
-  if (areSeveral && !fs::is_directory(options.output, error))
+  const bool isFolder = fs::is_directory(options.output, error);
+  const std::string first = options.inputs.empty() ? "" : options.inputs.front();
+  if (first == kStandardInput && isFolder) return true;
+  const bool areSeveral = options.inputs.size() > 1 || fs::is_directory(first, error);
+  if (areSeveral && !isFolder)
     throw WrongUsage({"--output: several pages take a folder (DIR/), not '" + options.output + "'\n", 2});
   return areSeveral;
 }

@@ -111,46 +111,93 @@ class Worker {
   pid_t mProcess = -1;
 };
 
+// The workers of a run.
+class Crew {
+ public:
+  Crew(std::size_t workers, const std::function<Job()>& makeJob) : mWanted(workers), mMakeJob(makeJob) {}
+
+  // Starts what is missing of as many as are wanted, and at most `useful`. Where no more can be started,
+  // those that there are have to do; where there are none, it throws Refusal.
+  void fill(std::size_t useful) {
+    while (mWorkers.size() < std::min(mWanted, useful)) {
+      try {
+        mWorkers.push_back(std::make_unique<Worker>(mMakeJob, mWorkers));
+      } catch (const Refusal&) {
+        if (mWorkers.empty()) throw;
+        mWanted = mWorkers.size();
+      }
+    }
+  }
+
+  // One of them could not begin, or ended while it had nothing to do.
+  void doWithout(const Worker* worker, const std::string& why) {
+    std::erase_if(mWorkers, [worker](const auto& one) { return one.get() == worker; });
+    if (mWorkers.empty() && --mStarts == 0) throw Refusal(why);
+    mWanted = std::max<std::size_t>(mWorkers.size(), 1);
+  }
+  void remove(const Worker* worker) {
+    std::erase_if(mWorkers, [worker](const auto& one) { return one.get() == worker; });
+  }
+
+  const std::vector<std::unique_ptr<Worker>>& workers() const { return mWorkers; }
+
+ private:
+  std::size_t mWanted;
+  int mStarts = 3;  // how often a last worker may fail without a job
+  const std::function<Job()>& mMakeJob;
+  std::vector<std::unique_ptr<Worker>> mWorkers;
+};
+
 }  // namespace
 
 void doInWorkers(std::size_t jobs, std::size_t workers, const std::function<Job()>& makeJob,
                  const std::function<void(const JobEnd&)>& ended) {
   // A worker would print what is waiting here once more.
   std::fflush(nullptr);
-  std::vector<std::unique_ptr<Worker>> crew;
-  crew.reserve(workers);
+  Crew crew(workers, makeJob);
   std::size_t next = 0, open = jobs;
   const auto finish = [&](const JobEnd& end) {
     --open;
     ended(end);
   };
   while (open > 0) {
-    while (crew.size() < std::min(workers, open)) crew.push_back(std::make_unique<Worker>(makeJob, crew));
+    crew.fill(open);
     std::vector<pollfd> polled;
-    for (const auto& worker : crew) polled.push_back({worker->connection(), POLLIN, 0});
+    std::vector<Worker*> present;
+    for (const auto& worker : crew.workers()) {
+      polled.push_back({worker->connection(), POLLIN, 0});
+      present.push_back(worker.get());
+    }
     if (poll(polled.data(), polled.size(), -1) < 0) {
       if (errno == EINTR) continue;
       throw Refusal(std::string("workers cannot be waited for: ") + std::strerror(errno));
     }
-    for (std::size_t i = crew.size(); i-- > 0;) {
+    for (std::size_t i = 0; i < present.size(); ++i) {
       if (polled[i].revents == 0) continue;
-      Worker& worker = *crew[i];
+      Worker& worker = *present[i];
       const auto heard = worker.hear();
       const std::optional<std::size_t> job = std::exchange(worker.job, std::nullopt);
-      if (heard && heard->first == Answer::CannotWork) throw Refusal(heard->second);
-      if (job && heard) {
-        finish({*job, heard->first == Answer::Done ? std::nullopt : std::optional(heard->second)});
-      }
-      if (heard && (next == jobs || worker.ask(next))) {
-        next += next < jobs ? 1 : 0;
+      if (!heard) {
+        const std::string how = worker.end();
+        if (job) {
+          crew.remove(&worker);
+          finish({*job, "the process that drew it ended with " + how});
+        } else {
+          crew.doWithout(&worker, "a process to draw in ended with " + how);
+        }
         continue;
       }
-      const std::string how = worker.end();
-      crew.erase(crew.begin() + static_cast<std::ptrdiff_t>(i));
-      if (job) {
-        finish({*job, "the process that drew it ended with " + how});
-      } else if (!heard) {
-        throw Refusal("a process to draw in ended with " + how);
+      if (heard->first == Answer::CannotWork) {
+        if (crew.workers().size() == 1) throw Refusal(heard->second);
+        crew.doWithout(&worker, heard->second);
+        continue;
+      }
+      if (job) finish({*job, heard->first == Answer::Done ? std::nullopt : std::optional(heard->second)});
+      if (next == jobs) continue;
+      if (worker.ask(next)) {
+        ++next;
+      } else {
+        worker.job.reset();  // it is gone, as the next look at it tells
       }
     }
   }

@@ -30,7 +30,8 @@ bool takeOver(int file, const struct stat& older) {
 
 }  // namespace
 
-OutputFile::OutputFile(const std::string& path, const std::string& input) : mShownPath(path) {
+OutputFile::OutputFile(const std::string& path, const std::string& input, Abandoned abandoned)
+    : mShownPath(path), mAbandoned(abandoned) {
   if (path == "-") {
     mFile = stdout;
     return;
@@ -85,7 +86,7 @@ void OutputFile::openBeside(OutputPlace place) {
       throw Refusal(mShownPath + ": cannot be written: it has another name too (a hard link), " +
                     "which would keep the older content");
   }
-  removeAbandoned(mFolder.number(), mName);
+  if (mAbandoned == Abandoned::Remove) removeAbandoned(mFolder.number(), mName);
   FileDescriptor file =
       makeUnfinished(mFolder.number(), mName, place.present ? kOwner : kAnybody, mTemporaryName);
   if (!file) {
@@ -108,10 +109,19 @@ void OutputFile::write(std::string_view bytes) {
   if (std::fwrite(bytes.data(), 1, bytes.size(), mFile) != bytes.size()) refuse();
 }
 
+void OutputFile::setTime(std::chrono::time_point<std::chrono::system_clock, std::chrono::nanoseconds> time) {
+  const auto seconds = std::chrono::floor<std::chrono::seconds>(time);
+  mTime = timespec{static_cast<time_t>(seconds.time_since_epoch().count()), (time - seconds).count()};
+}
+
 void OutputFile::commit() {
   flush();
   if (mFile == stdout) return;
   if (!mTemporaryName.empty()) {
+    if (mTime) {
+      const timespec times[] = {*mTime, *mTime};
+      futimens(fileno(mFile), times);
+    }
     const int folder = mFolder.number();
     if (renameat(folder, mTemporaryName.c_str(), folder, mName.c_str()) != 0) refuse();
     mTemporaryName.clear();

@@ -1,6 +1,9 @@
 #pragma once
 
+#include <chrono>
 #include <cstdio>
+#include <ctime>
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -17,14 +20,21 @@ namespace QeltDesktop {
 // with that signal ignored. A file that SIGKILL leaves behind is removed by the next run onto the same file.
 class OutputFile {
  public:
+  // What a run that was killed left behind of the same file. Whoever writes many files to a folder removes it
+  // for all of them at once (`removeAbandoned`), since that reads the folder.
+  enum class Abandoned { Remove, Leave };
+
   // Throws Refusal when the file cannot be written, or when it is `input`, which would be lost.
-  explicit OutputFile(const std::string& path, const std::string& input = {});
+  explicit OutputFile(const std::string& path, const std::string& input = {},
+                      Abandoned abandoned = Abandoned::Remove);
   // Removes the file unless it was committed.
   ~OutputFile();
   OutputFile(const OutputFile&) = delete;
   OutputFile& operator=(const OutputFile&) = delete;
 
   void write(std::string_view bytes);
+  // The time that the file is to say it was changed at; by itself it is the time at which it is finished.
+  void setTime(std::chrono::time_point<std::chrono::system_clock, std::chrono::nanoseconds> time);
   void commit();
 
  private:
@@ -39,6 +49,8 @@ class OutputFile {
   std::string mName;           // in mFolder
   std::string mTemporaryName;  // there too; empty when written directly
   std::FILE* mFile = nullptr;
+  std::optional<timespec> mTime;
+  Abandoned mAbandoned;
 };
 
 }  // namespace QeltDesktop

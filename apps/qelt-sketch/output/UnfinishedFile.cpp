@@ -18,7 +18,7 @@
 namespace QeltDesktop {
 namespace {
 
-constexpr std::string_view kSuffix = ".part";
+constexpr std::string_view kPrefix = ".qelt-", kSuffix = ".part";
 
 // For the signal handler, which may neither allocate nor call much else.
 std::array<char, 64> gName{};
@@ -41,8 +41,24 @@ std::uint64_t hashOf(std::string_view name) {
 
 std::string prefixFor(std::string_view name) {
   std::array<char, 32> text{};
-  std::snprintf(text.data(), text.size(), ".qelt-%016llx-", static_cast<unsigned long long>(hashOf(name)));
+  std::snprintf(text.data(), text.size(), "%s%016llx-", kPrefix.data(),
+                static_cast<unsigned long long>(hashOf(name)));
   return text.data();
+}
+
+void removeBeginningWith(std::string_view prefix, int folder) {
+  FileDescriptor readable(openat(folder, ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+  if (!readable) return;
+  const std::unique_ptr<DIR, int (*)(DIR*)> entries(fdopendir(readable.number()), &closedir);
+  if (!entries) return;
+  readable.release();
+  while (const dirent* const entry = readdir(entries.get())) {
+    const std::string_view found = entry->d_name;
+    if (!found.starts_with(prefix) || !found.ends_with(kSuffix)) continue;
+    const FileDescriptor file(
+        openat(folder, entry->d_name, O_RDWR | O_NONBLOCK | O_NOFOLLOW | O_NOCTTY | O_CLOEXEC));
+    if (file && flock(file.number(), LOCK_EX | LOCK_NB) == 0) unlinkat(folder, entry->d_name, 0);
+  }
 }
 
 }  // namespace
@@ -71,19 +87,12 @@ FileDescriptor makeUnfinished(int folder, std::string_view name, unsigned int pe
 }
 
 void removeAbandoned(int folder, std::string_view name) {
-  FileDescriptor readable(openat(folder, ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-  if (!readable) return;
-  const std::unique_ptr<DIR, int (*)(DIR*)> entries(fdopendir(readable.number()), &closedir);
-  if (!entries) return;
-  readable.release();
-  const std::string prefix = prefixFor(name);
-  while (const dirent* const entry = readdir(entries.get())) {
-    const std::string_view found = entry->d_name;
-    if (!found.starts_with(prefix) || !found.ends_with(kSuffix)) continue;
-    const FileDescriptor file(
-        openat(folder, entry->d_name, O_RDWR | O_NONBLOCK | O_NOFOLLOW | O_NOCTTY | O_CLOEXEC));
-    if (file && flock(file.number(), LOCK_EX | LOCK_NB) == 0) unlinkat(folder, entry->d_name, 0);
-  }
+  removeBeginningWith(prefixFor(name), folder);
+}
+
+void removeAbandoned(const std::string& folder) {
+  const FileDescriptor opened(open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+  if (opened) removeBeginningWith(kPrefix, opened.number());
 }
 
 void guardUnfinished(int folder, const std::string& temporaryName) {

@@ -18,6 +18,8 @@ FileDescriptor makeUnfinished(int folder, std::string_view name, unsigned int pe
 
 // Removes the unfinished files of `name` whose writers are gone.
 void removeAbandoned(int folder, std::string_view name);
+// The same for every file in the folder.
+void removeAbandoned(const std::string& folder);
 
 // From now on a signal that would end the process removes the file first. One file at a time; its folder
 // stays open until `forgetUnfinished`. Signals that are ignored or handled already are left alone.

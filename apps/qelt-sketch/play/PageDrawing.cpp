@@ -118,6 +118,7 @@ class Drawing : public PlayObserver {
     if (mPrediction) {
       letQueueCatchUp();
       mPrediction->resize(kUnseen);
+      mPredictionIsSeen = false;
     }
   }
 
@@ -126,6 +127,7 @@ class Drawing : public PlayObserver {
       const StageTimes::Watch watch(mTimes, Stage::GL);
       letQueueCatchUp();
       mPrediction->resize(mSize);
+      mPredictionIsSeen = true;
     }
     {
       const StageTimes::Watch watch(mTimes, Stage::Geometry);
@@ -153,8 +155,7 @@ class Drawing : public PlayObserver {
   std::vector<Layer*> pageLayers() {
     std::vector<Layer*> layers;
     for (std::optional<Layer>* layer : {&mOutline, &mStroke, &mPrediction}) {
-      const bool isSeen = *layer && (layer != &mPrediction || mPrediction->pixels().width() == mSize.width);
-      if (isSeen) layers.push_back(&**layer);
+      if (*layer && (layer != &mPrediction || mPredictionIsSeen)) layers.push_back(&**layer);
     }
     return layers;
   }
@@ -172,6 +173,7 @@ class Drawing : public PlayObserver {
   StageTimes& mTimes;
   const PixelSize mSize;
   bool mIsNew = true;  // nothing has been drawn on the layers
+  bool mPredictionIsSeen = false;
   std::uint64_t mWaitingBytes = 0;
   std::optional<Layer> mOutline, mStroke, mPrediction;
   Canvases mCanvases;
