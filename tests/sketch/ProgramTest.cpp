@@ -816,6 +816,11 @@ class Archive : public Program {
   }
 };
 
+// The predictions' layer that nobody sees has one pixel, like this page.
+TEST_F(Program, PredictsOnAPageAsThinAsAPixel) {
+  EXPECT_EQ(draw("draw ink.inkml --page 1x100 --predict 2").width, 1u);
+}
+
 TEST_F(Archive, HasAPictureForEveryPageEachAsIfDrawnAlone) {
   EXPECT_EQ(run("draw ink.inkml -o alone.png --zoom 2").status, 0);
   EXPECT_EQ(run("draw in -o out/ --zoom 2 --jobs 2").out, summary(3, 3, 0, 0));

@@ -31,7 +31,8 @@ PageStyle styleOf(const Stroke& stroke, const PenLimits& own) {
 std::vector<std::unique_ptr<PageStroke>> readStrokes(std::span<const std::uint8_t> bytes,
                                                      const std::string& name, StrokeId first,
                                                      const PenLimits& own) {
-  const Page page = readInkml(SourceText(printable(name), std::string(bytes.begin(), bytes.end())));
+  const Page page =
+      readInkml(SourceText(printable(name), std::string(bytes.begin(), bytes.end())), kFarthest);
   std::vector<std::unique_ptr<PageStroke>> strokes;
   strokes.reserve(page.strokes.size());
   for (const Stroke& stroke : page.strokes) {
@@ -39,7 +40,7 @@ std::vector<std::unique_ptr<PageStroke>> readStrokes(std::span<const std::uint8_
     std::vector<Sample> samples;
     samples.reserve(stroke.samples.size());
     for (const Sample& sample : stroke.samples) {
-      if (!isUsable(sample)) throw Refusal(where + "a sample lies farther away than a page reaches");
+      if (!isUsable(sample)) throw Refusal(where + "a sample's time is out of range");
       samples.push_back(sample);
     }
     try {

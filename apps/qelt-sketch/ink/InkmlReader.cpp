@@ -21,7 +21,8 @@ namespace {
 // Reads the traces, with all that they can refer to known beforehand.
 class TraceCollector final : public XmlVisitor {
  public:
-  explicit TraceCollector(const SourceText& source) : mSource(source), mDefinitions(source) {
+  TraceCollector(const SourceText& source, float farthest)
+      : mSource(source), mFarthest(farthest), mDefinitions(source) {
     mPage.strokes.reserve(mDefinitions.traceCount());
   }
 
@@ -204,7 +205,7 @@ class TraceCollector final : public XmlVisitor {
     if (open.text.isBlank()) throw mSource.refusalAt(open.offset, "trace without points", "");
     const TraceFormat& format = formatFor(scope);
     const std::uint32_t brush = brushFor(scope);
-    readSamples(open.text, format, mDefinitions.ignoresPressure(brush), mPage.strokes);
+    readSamples(open.text, format, mDefinitions.ignoresPressure(brush), mFarthest, mPage.strokes);
     if (open.penUp) {
       mPage.strokes.dropStroke();  // a pen in the air leaves nothing on the paper
     } else {
@@ -213,6 +214,7 @@ class TraceCollector final : public XmlVisitor {
   }
 
   const SourceText& mSource;
+  const float mFarthest;
   Definitions mDefinitions;
   Numbers mNumbers;
   std::vector<Scope> mScopes;  // of <ink> and the groups that are open
@@ -229,8 +231,8 @@ class TraceCollector final : public XmlVisitor {
 
 }  // namespace
 
-Page readInkml(const SourceText& source) {
-  TraceCollector collector(source);
+Page readInkml(const SourceText& source, float farthest) {
+  TraceCollector collector(source, farthest);
   walkXml(source, collector);
   return collector.takePage();
 }

@@ -72,8 +72,9 @@ bool startsValue(char c) {
 // before X or Y has a value.
 class PointScanner {
  public:
-  PointScanner(const TraceText& trace, const TraceFormat& format)
-      : mTrace(trace),
+  PointScanner(const TraceText& trace, const TraceFormat& format, float farthest)
+      : mFarthest(farthest),
+        mTrace(trace),
         mText(trace.text()),
         mFormat(format),
         mStates(format.channels.size()),
@@ -140,8 +141,9 @@ class PointScanner {
     }
     add(state);
     if (channel.quantity == Quantity::Ignored) return;
-    const bool tooFar = isPlace(channel.quantity) && !std::isfinite(placeOf(channel, state.reading));
-    if (tooFar || !std::isfinite(state.reading.nearest)) throw badValue("number out of range");
+    const float place = isPlace(channel.quantity) ? placeOf(channel, state.reading) : 0.0f;
+    if (!std::isfinite(place) || !std::isfinite(state.reading.nearest)) throw badValue("number out of range");
+    if (std::abs(place) > mFarthest) throw badValue("farther away than a page reaches");
   }
 
   void add(ChannelState& state) const {
@@ -233,6 +235,7 @@ class PointScanner {
     return mTrace.refusalAt(mPointStart, what, point.empty() ? "\"\"" : point);
   }
 
+  const float mFarthest;
   const TraceText& mTrace;
   std::string_view mText;
   const TraceFormat& mFormat;
@@ -272,10 +275,11 @@ void setAttitude(Sample& sample, const Readings& readings, bool hasSphericalAngl
 
 }  // namespace
 
-void readSamples(const TraceText& text, const TraceFormat& format, bool ignoresPressure, Strokes& strokes) {
+void readSamples(const TraceText& text, const TraceFormat& format, bool ignoresPressure, float farthest,
+                 Strokes& strokes) {
   const bool hasSphericalAngles = format.has(Quantity::Elevation) || format.has(Quantity::Azimuth);
   std::size_t count = 0;
-  for (PointScanner scanner(text, format); !scanner.atEnd(); ++count) {
+  for (PointScanner scanner(text, format, farthest); !scanner.atEnd(); ++count) {
     const std::vector<Reading>& point = scanner.readPoint();
     Sample sample;
     Readings readings;
