@@ -5,7 +5,7 @@
 #   plugin   libQeltPencil2.so
 #   host     the desktop host's libraries
 #   tools    qelt-sketch with its manual page, completion and sample page
-#   dev      the headers of both, and what find_package(QeltPencil2) reads
+#   dev      the headers of both, and what find_package(QeltPencil2) reads; it finds what is installed of plugin and host
 #   debug    the debugging information of all of it; left out unless it is asked for
 
 # As on Debian, where libraries of several processors may stand side by side.
@@ -41,8 +41,8 @@ function(qelt_debuggable)
   endforeach()
 endfunction()
 
-# qelt_install_binary(TARGET COMPONENT): a library or program, and its debugging information. It looks for the others in
-# the place that they are installed to, seen from its own.
+# qelt_install_binary(TARGET COMPONENT [EXPORT]): a library, which belongs to an export set, or a program, and its
+# debugging information. It looks for the others in the place that they are installed to, seen from its own.
 function(qelt_install_binary target component)
   get_target_property(type ${target} TYPE)
   if(QELT_DESKTOP AND type STREQUAL EXECUTABLE)
@@ -60,7 +60,7 @@ function(qelt_install_binary target component)
   if(type STREQUAL EXECUTABLE)
     install(TARGETS ${target} RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR} COMPONENT ${component})
   else()
-    install(TARGETS ${target} EXPORT QeltPencil2Targets
+    install(TARGETS ${target} EXPORT ${ARGV2}
       LIBRARY DESTINATION ${QELT_INSTALL_LIBDIR} COMPONENT ${component}
       ARCHIVE DESTINATION ${QELT_INSTALL_LIBDIR} COMPONENT ${component})
   endif()
@@ -90,11 +90,20 @@ function(qelt_install_headers folder)
     FILES_MATCHING PATTERN "*.h" REGEX "/desktop/platform/[a-z]+$" EXCLUDE)
 endfunction()
 
-# What find_package(QeltPencil2) reads; after all targets.
+# What find_package(QeltPencil2) reads; after all targets. A file of targets fails where one of its libraries is not
+# installed: each part that may be left out has a file of its own.
 function(qelt_install_package)
-  install(EXPORT QeltPencil2Targets NAMESPACE QeltPencil2:: DESTINATION ${QELT_INSTALL_CMAKEDIR} COMPONENT dev)
+  set(parts Contract Plugin)
+  if(QELT_DESKTOP)
+    list(APPEND parts Host)
+  endif()
+  foreach(part IN LISTS parts)
+    install(EXPORT QeltPencil2${part}Targets NAMESPACE QeltPencil2:: DESTINATION ${QELT_INSTALL_CMAKEDIR}
+      COMPONENT dev)
+  endforeach()
   configure_package_config_file(${PROJECT_SOURCE_DIR}/cmake/QeltPencil2Config.cmake.in
-    ${PROJECT_BINARY_DIR}/QeltPencil2Config.cmake INSTALL_DESTINATION ${QELT_INSTALL_CMAKEDIR})
+    ${PROJECT_BINARY_DIR}/QeltPencil2Config.cmake INSTALL_DESTINATION ${QELT_INSTALL_CMAKEDIR}
+    PATH_VARS QELT_INSTALL_LIBDIR)
   # Before 1.0 the contract may change with every minor version.
   write_basic_package_version_file(${PROJECT_BINARY_DIR}/QeltPencil2ConfigVersion.cmake
     COMPATIBILITY SameMinorVersion)
