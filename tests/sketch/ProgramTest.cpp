@@ -565,6 +565,9 @@ TEST_F(Program, SaysWhatCannotBeDoneInOneLineAndLeavesAnOlderFileAlone) {
   write("older.png", "older");
   write("unsound.png", "\x89PNG\r\n\x1A\n");
   write("bad.inkml", "<ink>\n<trace>1 2, 3 four</trace>\n</ink>");
+  write("vast.inkml", "<ink><trace>-3e38 0, 3e38 0</trace></ink>");
+  const std::string vast =
+      "vast.inkml: the page is too large to draw at any zoom: its points lie too far apart\n";
   const std::pair<std::string, std::string> cases[] = {
       {"draw bad.inkml -o no.png", "bad.inkml:2: not a number: four\n"},
       {"trace bad.inkml -o no.png", "bad.inkml:2: not a number: four\n"},
@@ -574,6 +577,9 @@ TEST_F(Program, SaysWhatCannotBeDoneInOneLineAndLeavesAnOlderFileAlone) {
       {"draw ink.inkml --zoom 1e4 -o older.png", "67108864 in all; --fit WxH draws it smaller\n"},
       {"draw ink.inkml --fit 40000x9000 -o older.png", "--fit: the picture is too large to draw: "},
       {"sheet ink.inkml --fit 9000x9000 -o older.png", "--fit: the sheet is too large to draw: "},
+      {"draw vast.inkml -o older.png", vast},
+      {"draw vast.inkml --fit 100x100 -o older.png", vast},
+      {"sheet vast.inkml -o older.png", vast},
       {"draw ink.inkml --page 40000x1 -o older.png",
        "--page: the picture is too large to draw: 40000 x 1 pixels, at most 32767 a side and 67108864 in "
        "all\n"},
