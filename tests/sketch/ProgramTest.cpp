@@ -611,6 +611,30 @@ TEST_F(Program, SaysWhatCannotBeDoneInOneLineAndLeavesAnOlderFileAlone) {
   EXPECT_FALSE(holds("no.png") || holdsUnfinished());
 }
 
+// As on a terminal, which `script` is to the program.
+TEST_F(Program, TellsOnATerminalHowFarItIsBesideWhatItFinds) {
+  const auto shown = [this](const std::string& arguments) {
+    const Ran ran = sh("script -qec \"$sketch " + arguments + "\" /dev/null");
+    EXPECT_NE(ran.out.find(" a second, "), std::string::npos) << ran.out;
+    return ran.out;
+  };
+  // A second's work each, so that the progress is seen.
+  write("short.inkml", "<ink><trace>1 1, 5 5</trace></ink>");
+  sh("mkdir before after; $sketch draw ink.inkml --page 2000x2000 -o before/0.png; "
+     "$sketch draw ink.inkml --page 2000x2000 --color '#FF0000FF' -o after/0.png; "
+     "for i in 1 2 3 4 5 6 7 8 9; do for to in before after; do ln $to/0.png $to/$i.png; done; done; "
+     "ln before/0.png before/a.png; ln before/0.png before/b.png; echo none >after/b.png");
+  std::istringstream lines(shown("compare before after"));
+  int told = 0;
+  for (std::string line; std::getline(lines, line); ++told) {
+    const std::size_t begin = line.substr(0, line.size() - 1).rfind('\r');  // lines end in "\r\n"
+    EXPECT_TRUE(begin == std::string::npos || line.compare(begin, 4, "\r\033[K") == 0) << line;
+  }
+  EXPECT_EQ(told, 13);
+  EXPECT_EQ(shown("trace short.inkml --mode stroke --repeat 40000 -o /dev/null").find("e+"),
+            std::string::npos);
+}
+
 // What is to be written over is kept, refused or followed, whole.
 TEST_F(Program, RespectsWhatStandsWhereItWrites) {
   const struct {
