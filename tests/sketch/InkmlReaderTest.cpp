@@ -216,6 +216,10 @@ TEST(InkmlReader, TakesLengthsInTheirUnits) {
       {" units='in'", resolution("X", "0", "1/cm") + resolution("Y", "7", "1/dev"), "1 2", 96, 192},
       {"", resolution("X", "7", "") + resolution("W", "much", "1/furlong") + resolution("F", "0", "1/dev"),
        "1 2", 1, 2},
+      {" units='in'", resolution("X", "0", "1/furlong") + resolution("Y", "-1", "dpi"), "1 2", 96, 192},
+      // Nor do those of other channels, whether the format has them or not.
+      {"", resolution("T", "1", "1/us") + resolution("OE", "2", "1/grad") + resolution("OTx", "2", "turns"),
+       "1 2", 1, 2},
       {"", "<channelProperty channel='X' name='accuracy' value='3' units='mm'/>", "1 2", 1, 2},
       // Differences are counted in steps too.
       {"", resolution("X", "10", "1/in") + resolution("Y", "10", "1/in"), "3 5,'7'15", 96, 192}};
@@ -247,6 +251,8 @@ TEST(InkmlReader, TakesAnglesTimesAndForcesInTheirUnits) {
       {oe + " max='900'/>", resolution("OE", "10", ""), "450", 1, kPi / 4, 0},
       {oe + " max='15708' units='rad'/>", resolution("OE", "10000", "1/rad"), "10000", 1, kPi / 2 - 1, 0},
       {oe + " units='rad'/>", resolution("OE", "10", "1/deg"), "450", 1, kPi / 4, 0},
+      // Steps to an unknown unit are taken for steps to the channel's own.
+      {oe + " max='900'/>", resolution("OE", "10", "1/grad"), "450", 1, kPi / 4, 0},
       // A range of a turn at most is in degrees, or radians, whatever the resolution.
       {oa + " max='360' units='deg'/>", resolution("OA", "1000", "1/deg"), "90", 1, 0, kPi / 2},
       {oe + " max='90' units='deg'/>", resolution("OE", "1000", "1/deg"), "45", 1, kPi / 4, 0},
@@ -265,9 +271,8 @@ TEST(InkmlReader, TakesAnglesTimesAndForcesInTheirUnits) {
   }
   const std::string time = "<channel name='T'";
   EXPECT_EQ(samplesOf(kXY + time + " units='dev'/>", "0 0 7")[0].time, 7.0);
-  EXPECT_EQ(
-      read(digitized(kXY + time + "/>", resolution("T", "100", "1/s"), "0 0 7")).strokes[0].samples[0].time,
-      70.0);
+  for (const std::string& stated : {resolution("T", "100", "1/s"), resolution("T", "often", "1/us")})
+    EXPECT_EQ(read(digitized(kXY + time + "/>", stated, "0 0 7")).strokes[0].samples[0].time, 7.0) << stated;
 }
 
 TEST(InkmlReader, TakesBrushesInTheirUnitsAndWithoutPressure) {

@@ -565,6 +565,9 @@ TEST_F(Program, SaysWhatCannotBeDoneInOneLineAndLeavesAnOlderFileAlone) {
   write("older.png", "older");
   write("unsound.png", "\x89PNG\r\n\x1A\n");
   write("bad.inkml", "<ink>\n<trace>1 2, 3 four</trace>\n</ink>");
+  write("vast.inkml", "<ink><trace>-3e38 0, 3e38 0</trace></ink>");
+  const std::string vast =
+      "vast.inkml: the page is too large to draw at any zoom: its points lie too far apart\n";
   const std::pair<std::string, std::string> cases[] = {
       {"draw bad.inkml -o no.png", "bad.inkml:2: not a number: four\n"},
       {"trace bad.inkml -o no.png", "bad.inkml:2: not a number: four\n"},
@@ -574,6 +577,9 @@ TEST_F(Program, SaysWhatCannotBeDoneInOneLineAndLeavesAnOlderFileAlone) {
       {"draw ink.inkml --zoom 1e4 -o older.png", "67108864 in all; --fit WxH draws it smaller\n"},
       {"draw ink.inkml --fit 40000x9000 -o older.png", "--fit: the picture is too large to draw: "},
       {"sheet ink.inkml --fit 9000x9000 -o older.png", "--fit: the sheet is too large to draw: "},
+      {"draw vast.inkml -o older.png", vast},
+      {"draw vast.inkml --fit 100x100 -o older.png", vast},
+      {"sheet vast.inkml -o older.png", vast},
       {"draw ink.inkml --page 40000x1 -o older.png",
        "--page: the picture is too large to draw: 40000 x 1 pixels, at most 32767 a side and 67108864 in "
        "all\n"},
@@ -603,6 +609,30 @@ TEST_F(Program, SaysWhatCannotBeDoneInOneLineAndLeavesAnOlderFileAlone) {
   EXPECT_EQ(contentsOf(path("older.png")), "older");
   EXPECT_TRUE(fs::exists("/dev/full"));
   EXPECT_FALSE(holds("no.png") || holdsUnfinished());
+}
+
+// As on a terminal, which `script` is to the program.
+TEST_F(Program, TellsOnATerminalHowFarItIsBesideWhatItFinds) {
+  const auto shown = [this](const std::string& arguments) {
+    const Ran ran = sh("script -qec \"$sketch " + arguments + "\" /dev/null");
+    EXPECT_NE(ran.out.find(" a second, "), std::string::npos) << ran.out;
+    return ran.out;
+  };
+  // A second's work each, so that the progress is seen.
+  write("short.inkml", "<ink><trace>1 1, 5 5</trace></ink>");
+  sh("mkdir before after; $sketch draw ink.inkml --page 2000x2000 -o before/0.png; "
+     "$sketch draw ink.inkml --page 2000x2000 --color '#FF0000FF' -o after/0.png; "
+     "for i in 1 2 3 4 5 6 7 8 9; do for to in before after; do ln $to/0.png $to/$i.png; done; done; "
+     "ln before/0.png before/a.png; ln before/0.png before/b.png; echo none >after/b.png");
+  std::istringstream lines(shown("compare before after"));
+  int told = 0;
+  for (std::string line; std::getline(lines, line); ++told) {
+    const std::size_t begin = line.substr(0, line.size() - 1).rfind('\r');  // lines end in "\r\n"
+    EXPECT_TRUE(begin == std::string::npos || line.compare(begin, 4, "\r\033[K") == 0) << line;
+  }
+  EXPECT_EQ(told, 13);
+  EXPECT_EQ(shown("trace short.inkml --mode stroke --repeat 40000 -o /dev/null").find("e+"),
+            std::string::npos);
 }
 
 // What is to be written over is kept, refused or followed, whole.

@@ -429,12 +429,14 @@ std::vector<CommandEntry> addCommands(CLI::App& app, Options& options) {
       ->required()
       ->type_name("");
   OptionGroup compared(*compare);
-  compared.add<int>("--tolerance", options.compare.tolerance, kLevels,
-                    withDefault("levels of 255 by which a pixel may differ: beyond it the exit status is 1",
-                                printInt(kDefaults.compare.tolerance)));
+  compared.add<int>(
+      "--tolerance", options.compare.tolerance, kLevels,
+      withDefault("levels of 255 by which a pixel may differ: beyond it the exit status is 1 (pictures of "
+                  "16 bits a channel are compared with 8)",
+                  printInt(kDefaults.compare.tolerance)));
   compare
       ->add_option("-o,--output", options.compare.output,
-                   "picture of what differs to write, or a folder for such")
+                   "picture of what differs to write, in a frame that holds both, or a folder for such")
       ->type_name("PATH");
 
   for (CLI::App* const command : {draw, trace, preview, sheet, info}) addPlugin(*command, options);

@@ -33,7 +33,7 @@ using Pixel = std::span<const std::uint8_t, 4>;
 constexpr int kChannelMost = 255;
 
 // By how many levels of 255 two pixels look different: the most among opacity and the colours as they are
-// seen through it. Never 0 for what can be told apart.
+// seen through it. Pictures of 16 bits a channel are compared with 8; never 0 for what those tell apart.
 int levelsBetween(Pixel one, Pixel other) {
   int most = std::abs(one[3] - other[3]);
   for (std::size_t c = 0; c < 3; ++c) {
@@ -55,13 +55,15 @@ std::array<std::uint8_t, 4> faint(Pixel pixel) {
 struct Difference {
   std::uint64_t pixels = 0, differing = 0;
   int most = 0;
-  std::string sizes;  // where those differ, and nothing else was compared
+  std::string sizes;  // where those differ; the pixels do not count then
 
+  bool isNone() const { return sizes.empty() && differing == 0; }
   bool isWithin(int tolerance) const { return sizes.empty() && most <= tolerance; }
   std::string text() const {
     if (!sizes.empty()) return sizes;
     if (differing == 0) return "alike";
-    return std::to_string(differing) + " of " + std::to_string(pixels) + " pixels differ, by " +
+    return std::to_string(differing) + " of " + std::to_string(pixels) +
+           (pixels == 1 ? " pixel" : " pixels") + (differing == 1 ? " differs" : " differ") + ", by " +
            std::to_string(most) + " of 255 at most";
   }
 };
@@ -70,30 +72,44 @@ std::string sizeOf(const PngReader& picture) {
   return std::to_string(picture.width()) + "x" + std::to_string(picture.height());
 }
 
-// Row by row; what differs is marked in `marked` too, which is made when the sizes are alike.
-Difference differenceOf(PngReader& before, PngReader& after, int tolerance, std::optional<Picture>* marked) {
+// An empty picture that holds both, one over the other.
+Picture frameOf(const PngReader& before, const PngReader& after, const fs::path& output) {
+  const int width = std::max(before.width(), after.width());
+  const int height = std::max(before.height(), after.height());
+  if (std::int64_t{width} * height > kMostPixels)
+    throw Refusal(output.string() + ": cannot be written: too large, " + std::to_string(width) + " x " +
+                  std::to_string(height) + " pixels");
+  return {width, height, {}};
+}
+
+// Row by row, to the end of both; what differs is shown in `marked` too, which is a frame of both. Where
+// sizes differ, what only one of them has is beyond any tolerance, and where neither has a pixel the frame
+// stays clear.
+Difference differenceOf(PngReader& before, PngReader& after, int tolerance, Picture* marked) {
   Difference found;
-  if (before.width() != after.width() || before.height() != after.height()) {
+  if (before.width() != after.width() || before.height() != after.height())
     found.sizes = sizeOf(before) + " pixels before, " + sizeOf(after) + " after";
-    return found;
-  }
-  const int width = after.width(), height = after.height();
-  if (marked != nullptr) marked->emplace(width, height, std::vector<std::uint8_t>{});
-  found.pixels = static_cast<std::uint64_t>(width) * static_cast<std::uint64_t>(height);
-  for (int y = 0; y < height; ++y) {
-    const std::span<const std::uint8_t> was = before.nextRow(), is = after.nextRow();
-    if (marked == nullptr && std::ranges::equal(was, is)) continue;
-    for (int x = 0; x < width; ++x) {
-      const std::size_t at = std::size_t{4} * static_cast<std::size_t>(x);
+  found.pixels = static_cast<std::uint64_t>(after.width()) * static_cast<std::uint64_t>(after.height());
+  for (int y = 0; y < std::max(before.height(), after.height()); ++y) {
+    std::span<const std::uint8_t> was, is;
+    if (y < before.height()) was = before.nextRow();
+    if (y < after.height()) is = after.nextRow();
+    if (marked == nullptr && (!found.sizes.empty() || std::ranges::equal(was, is))) continue;
+    const auto [common, all] = std::minmax({was.size(), is.size()});
+    for (std::size_t at = 0; at < common; at += 4) {
       const Pixel pixel = is.subspan(at).first<4>();
       const int levels = levelsBetween(was.subspan(at).first<4>(), pixel);
       found.differing += levels > 0 ? 1 : 0;
       found.most = std::max(found.most, levels);
       if (marked == nullptr) continue;
       const auto shown = levels == 0 ? faint(pixel) : levels <= tolerance ? kWithinTolerance : kBeyond;
-      std::ranges::copy(shown, (*marked)->pixelAt(x, y));
+      std::ranges::copy(shown, marked->pixelAt(0, y) + at);
     }
+    for (std::size_t at = common; marked != nullptr && at < all; at += 4)
+      std::ranges::copy(kBeyond, marked->pixelAt(0, y) + at);
   }
+  before.finish();
+  after.finish();
   return found;
 }
 
@@ -112,8 +128,9 @@ Difference comparePictures(const fs::path& before, const fs::path& after, int to
   PngReader beforeReader(was.name(), was.text(), kMostInkBytes),
       afterReader(is.name(), is.text(), kMostInkBytes);
   std::optional<Picture> marked;
-  const Difference found = differenceOf(beforeReader, afterReader, tolerance, output ? &marked : nullptr);
-  if (marked && (found.differing > 0 || marking == Marking::Always)) {
+  if (output) marked = frameOf(beforeReader, afterReader, *output);
+  const Difference found = differenceOf(beforeReader, afterReader, tolerance, marked ? &*marked : nullptr);
+  if (marked && (!found.isNone() || marking == Marking::Always)) {
     refuseToOverwrite(*output, before);
     refuseToOverwrite(*output, after);
     if (marking == Marking::WhereDifferent) {
@@ -158,6 +175,7 @@ int compareFolders(const CompareOptions& options) {
       progress.step();
       if (!presence.before || !presence.after) {
         ++alone;
+        progress.clear();
         std::printf("%s: only in %s\n", printable(name).c_str(),
                     printable(presence.before ? options.before : options.after).c_str());
         continue;
@@ -167,17 +185,20 @@ int compareFolders(const CompareOptions& options) {
         if (options.output) output = fs::path(*options.output) / name;
         const Difference found =
             comparePictures(before / name, after / name, options.tolerance, output, Marking::WhereDifferent);
-        const bool isAlike = found.differing == 0 && found.sizes.empty();
-        ++(isAlike ? alike : found.isWithin(options.tolerance) ? within : different);
-        if (!isAlike) std::printf("%s: %s\n", printable(name).c_str(), found.text().c_str());
+        ++(found.isNone() ? alike : found.isWithin(options.tolerance) ? within : different);
+        if (found.isNone()) continue;
+        progress.clear();
+        std::printf("%s: %s\n", printable(name).c_str(), found.text().c_str());
       } catch (const Refusal& refusal) {
         ++unreadable;
+        progress.clear();
         std::fprintf(stderr, "%s\n", printable(refusal.what()).c_str());
       }
     }
   }
-  std::printf("%zu pictures: %zu alike, %zu within the tolerance, %zu different, %zu in one folder only, ",
-              pictures.size(), alike, within, different, alone);
+  std::printf("%zu %s: %zu alike, %zu within the tolerance, %zu different, %zu in one folder only, ",
+              pictures.size(), pictures.size() == 1 ? "picture" : "pictures", alike, within, different,
+              alone);
   std::printf("%zu not compared\n", unreadable);
   finishStandardOutput();
   return different + alone + unreadable == 0 ? 0 : 1;

@@ -34,6 +34,8 @@ constexpr Entry kMessages[] = {
      "not understood."},
     {"FILE: the picture is too large to draw: SIZE, at most LIMITS; --fit WxH draws it smaller",
      "With --page or --fit, the message begins with the option that asks for too much."},
+    {"FILE: the page is too large to draw at any zoom: its points lie too far apart",
+     "They span more than single precision can count, 3.4e38 stroke units. With --page, a part is drawn."},
     {"OPTION: expects WHAT, not 'VALUE'", "Wrong usage, like everything about the command line."},
 };
 

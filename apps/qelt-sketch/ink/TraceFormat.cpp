@@ -182,7 +182,7 @@ std::optional<Resolution> resolutionOf(const SourceText& source, const XmlElemen
   if (element.text("name") != "resolution") return std::nullopt;
   const std::string channel = element.text("channel");
   const Quantity quantity = quantityNamed(channel);
-  if (!hasUnits(quantity)) return std::nullopt;
+  if (!isPlace(quantity) && !isAngle(quantity)) return std::nullopt;
   const auto malformed = [&](const std::string& what, const std::string& value) {
     return source.refusalAt(element.offset(), what + " of channel " + channel,
                             value.empty() ? "\"\"" : value);
@@ -190,15 +190,17 @@ std::optional<Resolution> resolutionOf(const SourceText& source, const XmlElemen
   const std::string value = element.text("value");
   const std::optional<double> steps = parseDouble(value);
   if (!steps || !std::isfinite(*steps)) throw malformed("no number as the resolution", value);
+  if (*steps <= 0.0) return std::nullopt;  // devices that do not know their resolution say 0
   const std::string units = element.text("units");
-  const std::string_view inverse = units;
-  const std::string_view unit = inverse.starts_with("1/") ? inverse.substr(2) : inverse;
-  const std::optional<double> known = unitNamed(quantity, unit);
-  // A unit that is no inverse means as little as one that is unknown.
-  if (!isUnitless(unit) && (!known || unit == inverse))
-    throw malformed("unknown unit of the resolution", units);
-  // Devices that do not know their resolution say 0. Steps of no known length are stroke units.
-  if (*steps <= 0.0 || (!known && !isAngle(quantity))) return std::nullopt;
+  const bool isInverse = units.starts_with("1/");
+  const std::string_view unit = std::string_view(units).substr(isInverse ? 2 : 0);
+  std::optional<double> known;
+  if (isInverse) known = unitNamed(quantity, unit);
+  if (isPlace(quantity) && !known) {
+    // A unit that is no inverse means as little as one that is unknown. Steps of no length are stroke units.
+    if (!isUnitless(unit)) throw malformed("unknown unit of the resolution", units);
+    return std::nullopt;
+  }
   return Resolution{.quantity = quantity, .steps = *steps, .unit = known};
 }
 

@@ -51,11 +51,11 @@ TraceFormat traceFormatOf(const SourceText& source, std::size_t offset,
                           const std::vector<ChannelText>& regular,
                           const std::vector<ChannelText>& intermittent);
 
-// How many steps of a channel an ink source counts to a unit.
+// How many steps of a place or an angle an ink source counts to a unit.
 struct Resolution {
   Quantity quantity;
   double steps;                // above 0
-  std::optional<double> unit;  // as Channel has it; none: the channel's own
+  std::optional<double> unit;  // as Channel has it; none, of angles alone: the channel's own
 };
 
 // The resolution that a <channelProperty> states; none if it is another property, or says nothing that

@@ -48,10 +48,13 @@ std::span<const std::uint8_t> PngReader::nextRow() {
   return mPixels;
 }
 
-std::optional<std::string> PngReader::text(std::string_view keyword) {
-  // The rows do not matter here, but text may stand behind them, and a picture that was cut is refused.
+void PngReader::finish() {
   while (mRow < mHeight) nextRow();
   check(spng_decode_chunks(mDecoder.get()));
+}
+
+std::optional<std::string> PngReader::text(std::string_view keyword) {
+  finish();  // text may stand behind the rows
   std::uint32_t count = 0;
   std::vector<spng_text> texts;
   int error = spng_get_text(mDecoder.get(), nullptr, &count);

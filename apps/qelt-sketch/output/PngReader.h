@@ -30,6 +30,9 @@ class PngReader {
   // `height` of them.
   std::span<const std::uint8_t> nextRow();
 
+  // Reads what is left, so that a picture that was cut is refused, even where its rows are complete.
+  void finish();
+
   // The text with this keyword, from an iTXt chunk; none if there is no such chunk. Goes to the end of the
   // picture.
   std::optional<std::string> text(std::string_view keyword);

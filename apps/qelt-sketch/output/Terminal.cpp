@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <cmath>
 #include <cstdio>
 #include <cstring>
 #include <utility>
@@ -41,8 +42,11 @@ void Progress::step() {
   mShown = true;
   const double seconds = std::chrono::duration<double>(Clock::now() - mBegin).count();
   const double rate = static_cast<double>(mDone) / seconds;
-  std::fprintf(stderr, "\r%s %zu of %zu, %.3g a second, %.0f s left\033[K", mWhat.c_str(), mDone, mTotal,
-               rate, static_cast<double>(mTotal - std::min(mDone, mTotal)) / rate);
+  // Three digits; whole numbers, never in powers of ten, where those are not enough.
+  const bool isLarge = rate >= 100.0;
+  std::fprintf(stderr, "\r%s %zu of %zu, %.*g a second, %.0f s left\033[K", mWhat.c_str(), mDone, mTotal,
+               isLarge ? 15 : 3, isLarge ? std::round(rate) : rate,
+               static_cast<double>(mTotal - std::min(mDone, mTotal)) / rate);
   std::fflush(stderr);
 }
 

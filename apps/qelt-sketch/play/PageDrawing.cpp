@@ -45,7 +45,9 @@ double pixelsFor(double length) {
 PixelSize pixelSizeOf(const PageLayout& layout, const Page& page, const Options& options) {
   const double width = pixelsFor(layout.width);
   const double height = pixelsFor(layout.height);
-  // NaN fails these comparisons, so it is refused too.
+  // The page's extent, in single precision, is then beyond its range.
+  if (!std::isfinite(width) || !std::isfinite(height))
+    throw Refusal(page.name + ": the page is too large to draw at any zoom: its points lie too far apart");
   if (width <= kLongestSide && height <= kLongestSide && width * height <= kMostPixels) {
     return {static_cast<int>(width), static_cast<int>(height)};
   }
@@ -53,7 +55,7 @@ PixelSize pixelSizeOf(const PageLayout& layout, const Page& page, const Options&
   std::snprintf(text.data(), text.size(),
                 ": the picture is too large to draw: %.6g x %.6g pixels, at most %d a side and %d in all",
                 width, height, kLongestSide, kMostPixels);
-  if (options.fit && std::isfinite(width + height)) throw Refusal(std::string("--fit") + text.data());
+  if (options.fit) throw Refusal(std::string("--fit") + text.data());
   if (options.page) throw Refusal(std::string("--page") + text.data());
   if (options.command == Command::Preview) throw Refusal(std::string("--zoom") + text.data());
   throw Refusal(page.name + text.data() + "; --fit WxH draws it smaller");
