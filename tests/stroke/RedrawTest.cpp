@@ -192,6 +192,14 @@ TEST_P(Redraw, OfOnePointPlacesOneStamp) {
   }
 }
 
+// Of a finger the first short move is left out; that far the rectangle reaches all the same, and 5 more.
+TEST_P(Redraw, TakesPointsThatAreLeftOutIntoItsRectangleWhereItIsStraight) {
+  DrawingBoard board({.version = version, .curve = false, .tool = Qelt::kToolFinger});
+  const float leftOut = 30.0f + 0.9f * expected.shortMove;
+  board.redraw(*board.stored({{20.0f, 30.0f}, {20.0f, leftOut}, {24.0f, 30.0f}}));
+  EXPECT_FLOAT_EQ(board.rect.bottom, leftOut + 5.0f);
+}
+
 // Kept: even the redraw of nothing sets how moves are thinned out: a finger's, of which the first of two
 // short ones is dropped, in the middle of a stylus's stroke.
 TEST_P(Redraw, OfNothingThinsTheMovesOfTheStrokeUnderWay) {

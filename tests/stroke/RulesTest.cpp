@@ -5,7 +5,8 @@
 #include <cmath>
 #include <limits>
 
-// What frozen strokes do not come to: counts beyond int, and scales that drawings do not use.
+// What frozen strokes do not come to: counts beyond int, tilts that hardly count, and scales that drawings do
+// not use.
 namespace Qelt::rules {
 namespace {
 
@@ -23,6 +24,14 @@ TEST(StampCountTest, SaturatesInsteadOfOverflowing) {
   EXPECT_EQ(incremented(9), 10);
   EXPECT_EQ(getRepeatV1(10.0f, 1e-30f), kLargest);
   EXPECT_EQ(getRepeatV3(1e30f, 1e-30f), kLargest);
+}
+
+// 0.005 / 0.08 and 0.0005 / 1.9.
+TEST(TiltBlendTest, BeginsAtItsLeastTilt) {
+  EXPECT_EQ(adjustTiltV1(0.7499f), 0.0f);
+  EXPECT_NEAR(adjustTiltV1(0.755f), 0.0625f, 1e-5f);
+  EXPECT_EQ(adjustTiltV5(0.0499f), 0.0f);
+  EXPECT_NEAR(adjustTiltV5(0.0505f), 2.6316e-4f, 1e-7f);
 }
 
 TEST(ScreenScaleTest, GoesByTheShorterSide) {
