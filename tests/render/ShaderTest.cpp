@@ -1,9 +1,12 @@
 #include <gmock/gmock.h>
 
+#include <algorithm>
 #include <string>
 #include <typeinfo>
 
 #include "gl/ShaderManager.h"
+#include "outline/Pencil2OutlineDrawableRTV1.h"
+#include "render/RenderDrawables.h"
 #include "shaders/ShaderRegistry.h"
 #include "support/LogCapture.h"
 
@@ -54,6 +57,31 @@ TEST(ShaderRegistryTest, SharesOneShaderAClassAndDestroysItWithItsLastUser) {
   registry.ReleaseShader(other);
   EXPECT_EQ(Shader::alive, 1);
   EXPECT_THAT(log.take(), IsEmpty());
+}
+
+// Whatever is called on it: a host makes a new one.
+template <typename Drawable>
+void expectNothingIsMadeOnceReleased() {
+  LogCapture log;
+  const auto shadersMade = [&log] {
+    const auto lines = log.take();
+    return std::count_if(lines.begin(), lines.end(), [](const LogLine& line) {
+      return line.text.find(" is added") != std::string::npos;
+    });
+  };
+  Drawable drawable(nullptr);
+  drawable.CreatePenCanvas(1, 1, nullptr);
+  EXPECT_EQ(shadersMade(), 1);
+  drawable.Release();
+  drawable.Init();
+  drawable.CreatePenCanvas(1, 1, nullptr);
+  drawable.RestoreGLObject();
+  EXPECT_EQ(shadersMade(), 0);
+}
+
+TEST(RenderDrawables, OnceReleasedMakeNothingAgain) {
+  expectNothingIsMadeOnceReleased<Qelt::Pencil2StrokeDrawableRTV3>();
+  expectNothingIsMadeOnceReleased<Qelt::Pencil2OutlineDrawableRTV1>();
 }
 
 }  // namespace

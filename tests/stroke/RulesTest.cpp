@@ -17,6 +17,7 @@ TEST(StampCountTest, SaturatesInsteadOfOverflowing) {
   EXPECT_EQ(saturatedCount(2147483648.0f), kLargest);
   EXPECT_EQ(saturatedCount(2147483520.0f), 2147483520);  // the largest float below 2^31
   EXPECT_EQ(saturatedCount(INFINITY), kLargest);
+  EXPECT_EQ(saturatedCount(-2147483648.0f), 0);
   EXPECT_EQ(saturatedCount(-INFINITY), 0);
   EXPECT_EQ(saturatedCount(std::numeric_limits<float>::quiet_NaN()), 0);
   EXPECT_EQ(saturatedCount(-1.5f), -1);
