@@ -5,6 +5,9 @@
 #include <cmath>
 #include <limits>
 
+#include "outline/Pencil2OutlineDrawableGL.h"
+#include "stroke/Pencil2StrokeDrawableGL.h"
+
 // What frozen strokes do not come to: counts beyond int, tilts that hardly count, and scales that drawings do
 // not use.
 namespace Qelt::rules {
@@ -33,6 +36,17 @@ TEST(TiltBlendTest, BeginsAtItsLeastTilt) {
   EXPECT_NEAR(adjustTiltV1(0.755f), 0.0625f, 1e-5f);
   EXPECT_EQ(adjustTiltV5(0.0499f), 0.0f);
   EXPECT_NEAR(adjustTiltV5(0.0505f), 2.6316e-4f, 1e-7f);
+}
+
+// A host may ask a drawable as well.
+TEST(SampleChecksTest, ReplaceNaNAndCapPressure) {
+  for (const auto check : {Pencil2StrokeDrawableGL::checkNan, Pencil2OutlineDrawableGL::checkNan}) {
+    float number = NAN;
+    check(&number, 0.25f);
+    EXPECT_EQ(number, 0.25f);
+  }
+  EXPECT_EQ(Pencil2StrokeDrawableGL::checkPressure(1.5f), 1.0f);
+  EXPECT_EQ(Pencil2OutlineDrawableGL::checkPressure(1.5f), 1.0f);
 }
 
 TEST(ScreenScaleTest, GoesByTheShorterSide) {
