@@ -8,7 +8,6 @@
 #include <cstdint>
 #include <set>
 #include <string>
-#include <utility>
 #include <vector>
 
 #include "desktop/gl/CallTask.h"
@@ -61,7 +60,6 @@ void leaveState() {
   glStencilFunc(GL_NEVER, 1, 0xFF);
   glColorMask(GL_FALSE, GL_TRUE, GL_FALSE, GL_FALSE);
   glDisable(GL_BLEND);
-  glUseProgram(0);
   glBlendFunc(GL_ONE, GL_ONE);
   glEnable(GL_SCISSOR_TEST);
   glScissor(3, 3, 1, 1);
@@ -110,23 +108,6 @@ TEST_P(EveryKind, IsDrawnAlikeWhateverGlStateWasLeftBeforeEachTask) {
   ASSERT_NE(clean, Pixels(clean.size())) << "nothing was drawn";
   EXPECT_TRUE(drawn(leaveState) == clean);
   EXPECT_TRUE(drawn(leaveArraysAndUnpacking) == clean);
-}
-
-// Whatever could not be made comes with the context, without another canvas to ask for it.
-TEST_P(EveryKind, MadeWithoutAContextIsDrawnInTheNextOne) {
-  const auto drawn = [this](bool loses) {
-    PenBoard board(page());
-    if (loses) board.queue.loseContext();
-    board.draw(kind, wave(), [&](const PenBoard::Call& call) {
-      board.finish();
-      if (std::exchange(loses, false)) board.queue.restoreContext();
-      call(&board.rect);
-    });
-    return board.pixels();
-  };
-  const Pixels usual = drawn(false);
-  EXPECT_NE(usual, Pixels(usual.size())) << "nothing was drawn";
-  EXPECT_TRUE(drawn(true) == usual);
 }
 
 // --- The view ---
