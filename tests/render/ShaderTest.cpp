@@ -3,6 +3,7 @@
 #include <initializer_list>
 #include <string>
 #include <typeinfo>
+#include <vector>
 
 #include "gl/ShaderManager.h"
 #include "outline/Pencil2OutlineDrawableRTV1.h"
@@ -77,6 +78,21 @@ TEST(RenderDrawables, OnceReleasedMakeNothingAgain) {
     drawable->RestoreGLObject();
     EXPECT_THAT(log.take(), Not(Contains(Field(&LogLine::text, HasSubstr("is added")))));
   }
+}
+
+// Outside a segment as well: six vertices each, an outline's in both streams.
+TEST(RenderDrawables, TakeStampsOneByOne) {
+  const Qelt::Vector2<float> stamp[2] = {{10.0f, 20.0f}, {0.0f, 1.0f}};
+  std::vector<float> batch, inner, outer;
+  Qelt::Pencil2StrokeDrawableRTV1 stroke(nullptr);
+  stroke.SetBuffer(&batch);
+  stroke.AddPoint(stamp, 4.0f, 0.5f, 0.25f, 1);
+  EXPECT_THAT(batch, SizeIs(6 * 9));
+  Qelt::Pencil2OutlineDrawableRTV1 outline(nullptr);
+  outline.SetBuffer(&inner, &outer);
+  outline.AddPoint(stamp, 4.0f, 0.25f);
+  EXPECT_THAT(inner, SizeIs(6 * 7));
+  EXPECT_THAT(outer, SizeIs(6 * 7));
 }
 
 }  // namespace

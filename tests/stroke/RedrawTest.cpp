@@ -138,6 +138,21 @@ TEST_P(Redraw, FromTheCacheGivesBitForBitWhatComputingGaveUntilTheStrokeIsDirty)
   }
 }
 
+// A drawing that waits for the render thread stays as it is while the stroke gets another, even where the
+// queue refuses to have it given back.
+TEST_P(Redraw, KeepsWhatWaitsWhenItsReleaseIsRefused) {
+  DrawingBoard board({.version = version});
+  StrokeOnPage stroke(board);
+  const std::vector<float> before = redrawn(board, *stroke).buffers.front();
+  board.queue.accept = [](const Qelt::ITask& task) { return taskName(task) != "Unref"; };
+  board.redraw(*stroke);
+  board.queue.accept = nullptr;
+  stroke->addPoint({60.0f, 60.0f}, 100, 0.5f);
+  stroke->SetRedrawingCacheDirtyFlag();
+  board.redraw(*stroke);
+  EXPECT_EQ(board.takeBatches().at(0).buffers.front(), before);
+}
+
 // Moving the view is no zoom.
 TEST_P(Redraw, ComputesAnewAfterAZoomWhereStampsFollowTheView) {
   DrawingBoard board({.version = version});
