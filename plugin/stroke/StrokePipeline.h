@@ -174,12 +174,8 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
   }
 
   // How many stroke units a device pixel takes under the canvas's transform.
-  Vector2<float> getInverseScale() {
-    if constexpr (kFollowsViewScale) {
-      return mViewScale.inverse(mCanvas->GetMatrix());
-    } else {
-      return {1.0f, 1.0f};
-    }
+  Vector2<float> getInverseScale() requires kFollowsViewScale {
+    return mViewScale.inverse(mCanvas->GetMatrix());
   }
 
   void passInverseScale() {

@@ -1,5 +1,6 @@
 #include <gmock/gmock.h>
 
+#include <cmath>
 #include <cstddef>
 #include <cstdint>
 #include <fstream>
@@ -56,12 +57,13 @@ TEST(OutlinePicture, WithoutASizeTheInsideIsErasedToNothing) {
   }
 }
 
-// Kept: of both streams it says 1.
+// Kept: of both streams it says 1. Of no stamps it says nothing.
 TEST(Outline, NotesWhatItDoes) {
   LogCapture log;
   {
     OutlineBoard board({.version = 4, .size = 30.0f, .width = kSide, .height = kSide});
     board.outline({{60.0f, 60.0f}});
+    board.outline({{NAN, 60.0f}});
     board.queue.finish();
     board.queue.loseContext();
     board.queue.restoreContext();
@@ -74,7 +76,7 @@ TEST(Outline, NotesWhatItDoes) {
     lines.push_back(line.text.substr(name.size()));
   }
   EXPECT_THAT(lines, ElementsAre("Update(bool)", "Update(bool) 1 size 42", "Update(bool) 1 size 42",
-                                 "RestoreGLObject()", "Release()"));
+                                 "Update(bool)", "RestoreGLObject()", "Release()"));
 }
 
 // Kept: tools that show bitmaps by name find the outline's texture under another drawable's.

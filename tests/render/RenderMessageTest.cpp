@@ -1,11 +1,13 @@
 #include <gmock/gmock.h>
 
 #include <array>
+#include <cstddef>
 
 #include "base/RectF.h"
 #include "desktop/graphics/PenCanvas.h"
 #include "math/Matrix3.h"
 #include "render/PenGLRenderMsg.h"
+#include "support/DrawableBoard.h"
 
 namespace QeltTests {
 namespace {
@@ -29,6 +31,25 @@ TEST(RenderMessage, BoxesAllFourCornersOfItsRectangle) {
     EXPECT_THAT((std::array{box.left, box.top, box.right, box.bottom}),
                 testing::Pointwise(testing::FloatNear(1e-4f), {left, top, right, bottom}));
   }
+}
+
+// The middle of the ink of a stamp at (40, 60): x 40 + 0.2 * 60 = 52 and y 60, over 0.01 * 40 + 0.005 * 60
+// + 1.5.
+TEST(RenderMessage, DrawsInPerspective) {
+  DrawingBoard board({.version = 1, .size = 12.0f, .width = 64, .height = 64});
+  const float view[9] = {1.0f, 0.0f, 0.01f, 0.2f, 1.0f, 0.005f, 0.0f, 0.0f, 1.5f};
+  board.canvas.setMatrix(Qelt::Matrix3<float>(view));
+  board.stroke({{40.0f, 60.0f, 1.0f}, {40.0f, 60.0f, 1.0f}});
+  const auto pixels = board.pixels();
+  float ink = 0.0f, x = 0.0f, y = 0.0f;
+  for (std::size_t i = 0; i < pixels.size() / 4; ++i) {
+    const float alpha = pixels[4 * i + 3];
+    ink += alpha;
+    x += alpha * (static_cast<float>(i % 64) + 0.5f);
+    y += alpha * (static_cast<float>(i / 64) + 0.5f);
+  }
+  EXPECT_NEAR(x / ink, 52.0f / 2.2f, 0.5f);
+  EXPECT_NEAR(y / ink, 60.0f / 2.2f, 0.5f);
 }
 
 }  // namespace

@@ -48,6 +48,14 @@ void expectBounded(Board& board, int streams, const std::string& name, Call&& ca
   EXPECT_THAT(lines, ElementsAre(HasSubstr(name + ": a call placed 4194304 stamps")));
 }
 
+// Whether a later call, of a short line, places any stamp.
+template <typename Call>
+bool placesMore(Call&& call) {
+  const std::uint64_t before = QeltDesktop::writtenBytes();
+  call(std::vector<Sample>{{0.0f, 0.0f}, {30.0f, 0.0f}});
+  return QeltDesktop::writtenBytes() > before;
+}
+
 TEST(CallBound, HoldsForEveryKindOfDrawable) {
   if (QELT_SANITIZED || *QELT_EMULATOR != '\0') GTEST_SKIP() << "a gigabyte each";
   const std::vector<Sample> samples = farZigzag();
@@ -56,6 +64,7 @@ TEST(CallBound, HoldsForEveryKindOfDrawable) {
     DrawingBoard board({.version = 7, .size = 6.0f, .curve = false});
     const auto stroke = board.stored(samples);
     expectBounded(board, 1, "Pencil2StrokeDrawableGLV7", [&] { board.redraw(*stroke); });
+    EXPECT_TRUE(placesMore([&](const auto& line) { board.redraw(*board.stored(line)); }));
   }
   {
     DrawingBoard board;
@@ -77,17 +86,21 @@ TEST(CallBound, HoldsForEveryKindOfDrawable) {
   {
     OutlineBoard board({.version = 4, .size = 6.0f});
     expectBounded(board, 2, "Pencil2OutlineDrawableGLV4", [&] { board.outline(samples); });
+    EXPECT_TRUE(placesMore([&](const auto& line) { board.outline(line); }));
   }
   {
     DrawableBoard<Qelt::Pencil2PreviewDrawableGL> board({.size = 6.0f});
     const Qelt::MotionEvent event = board.recorded(samples);
     expectBounded(board, 1, "Pencil2PreviewDrawableGL", [&] { board.redraw(event); });
+    EXPECT_TRUE(placesMore([&](const auto& line) { board.stroke(line); }));
   }
   {
     DrawableBoard<Qelt::Pencil2PredictionDrawableGL> board({.size = 6.0f});
     board.shared.mHasLastStroke = true;
     board.shared.mLastWidth = 6.0f;
     expectBounded(board, 1, "Pencil2PredictionDrawableGL", [&] { board.move(rest); });
+    board.shared.mHasLastStroke = true;
+    EXPECT_TRUE(placesMore([&](const auto& line) { board.move(line); }));
   }
 }
 

@@ -131,6 +131,21 @@ TEST_P(LiveStroke, WritesItsCorrectionsBackIntoTheEvent) {
 
 INSTANTIATE_TEST_SUITE_P(Versions, LiveStroke, testing::ValuesIn(allVersions()), versionName);
 
+// What the queue would not delete goes first; until it does, nothing new is handed over.
+TEST(RefusedDeletion, IsOfferedAgainAheadOfTheNextBatch) {
+  DrawingBoard board;
+  board.down({10.0f, 10.0f});
+  board.takePosts();
+  board.queue.accept = [](const Qelt::ITask& task) { return taskName(task) != "DeleteBatch"; };
+  board.move({{30.0f, 10.0f}});
+  EXPECT_THAT(board.takePosts(), ElementsAre("SetRect", "Batch", "Render"));
+  board.move({{50.0f, 10.0f}});
+  EXPECT_THAT(board.takePosts(), ElementsAre("SetRect"));
+  board.queue.accept = nullptr;
+  board.move({{70.0f, 10.0f}});
+  EXPECT_THAT(board.takePosts(), ElementsAre("SetRect", "DeleteBatch", "Batch", "Render", "DeleteBatch"));
+}
+
 // Margins of version 8 are device pixels: at zoom 4 half a pixel is 0.125 units. A view that cannot be
 // inverted counts as unscaled. Each call sees a change of view at once, in either direction.
 TEST(ViewScaleTest, MarginsOfVersion8AreDevicePixels) {

@@ -8,11 +8,14 @@
 #include <random>
 
 #include "base/RectF.h"
+#include "engine/MotionEvent.h"
 #include "graphics/SmPath.h"
+#include "stroke/input/LiveInput.h"
 #include "stroke/input/MoveFilter.h"
 #include "stroke/input/PenAttitude.h"
 #include "stroke/placing/StampRun.h"
 #include "stroke/placing/StampWalk.h"
+#include "support/Board.h"
 
 namespace Qelt {
 namespace {
@@ -34,7 +37,9 @@ void expectTheSameMeans(unsigned seed) {
       ring.fill(slots[0]);
       counter = 0;
     }
-    const float value = values(random) * ((random() % 8 == 0) ? 1000.0f : 1.0f);
+    // Now and then what it replaces.
+    const float value =
+        random() % 4 == 0 ? slots[counter % Size] : values(random) * ((random() % 8 == 0) ? 1000.0f : 1.0f);
     ring.push(value);
     slots[counter++ % Size] = value;
     float sum = 0.0f;
@@ -50,6 +55,27 @@ TEST(MeanRingTest, EqualsAPlainSumBitForBitOverAllWraps) {
     expectTheSameMeans<70>(seed);
     expectTheSameMeans<50>(seed);
     expectTheSameMeans<3>(seed);
+  }
+}
+
+// What lies more than half a turn from the mean is turned by a full one; at exactly that much it stays. A
+// mean may lie beyond half a turn, and 0 is on neither side of it.
+TEST(PenAttitudeTest, TurnsOrientationsThatLieAcrossHalfATurnFromTheMean) {
+  constexpr float kQuarter = 1.5707964f;
+  const struct {
+    float mean, sample, taken;
+  } cases[] = {{3.0f, -3.0f, 3.2831855f},
+               {-3.0f, 3.0f, -3.2831855f},
+               {kQuarter, -kQuarter, -kQuarter},
+               {-kQuarter, kQuarter, kQuarter},
+               {3.2f, 0.0f, 0.0f},
+               {-3.2f, 0.0f, 0.0f},
+               {0.0f, 3.2f, 3.2f}};
+  for (const auto& [mean, sample, taken] : cases) {
+    PenAttitude<1, 1> attitude;
+    attitude.fill(0.0f, mean);
+    attitude.push(0.0f, sample);
+    EXPECT_FLOAT_EQ(attitude.meanOrientation(), taken) << mean << ", " << sample;
   }
 }
 
@@ -87,7 +113,7 @@ TEST(DistanceTest, IsTakenInDoublesWhereSquaresDoNotFit) {
   EXPECT_FLOAT_EQ(distanceBetween({0.0f, -2e19f}, {0.0f, 2e19f}), 4e19f);
 }
 
-// So far out that the next float is further away than the next stamp.
+// So far out that the next float is further away than the next stamp, or that there is none.
 TEST(StampWalkTest, EndsWhereItCannotGoOn) {
   SmPath path;
   path.moveTo(0.0f, 0.0f);
@@ -100,14 +126,28 @@ TEST(StampWalkTest, EndsWhereItCannotGoOn) {
     SmPoint at;
     int placed = 0, passed = 0;
   };
-  for (const int most : {0, 9}) {
-    Run run;
-    const WalkResult walk = walkSpaced(path, 1e8f, 0.4f, 2e8f, most, run);
-    EXPECT_EQ(walk.stamps, 1);
-    EXPECT_TRUE(walk.cutShort);
-    EXPECT_EQ(walk.carry, 0.4f);
-    EXPECT_EQ(most == 0 ? run.passed : run.placed, 1);
+  for (const auto& [first, spacing, length] :
+       {std::array{1e8f, 0.4f, 2e8f}, std::array{3e38f, 3e38f, 3e38f}}) {
+    for (const int most : {0, 9}) {
+      Run run;
+      const WalkResult walk = walkSpaced(path, first, spacing, length, most, run);
+      EXPECT_EQ(walk.stamps, 1);
+      EXPECT_TRUE(walk.cutShort);
+      EXPECT_EQ(walk.carry, spacing);
+      EXPECT_EQ(run.passed, most == 0 ? 1 : 0);
+    }
   }
+}
+
+// Room is made ahead: a stamp every half unit of 1.95 + 5 + 12, which is 37.9, and two a sample, of which one
+// lies nowhere; for a segment one each unit and two more.
+TEST(RoomForStamps, IsMadeForTheWayFromPointToPoint) {
+  const MotionEvent move = QeltTests::motionEvent(kActionMove, {{3.0f, 4.0f}, {NAN, 0.0f}, {3.0f, 16.0f}});
+  EXPECT_EQ(stampsOfMove(move, {0.0f, -1.95f}, {0.0f, 0.0f}, 0.5f), 43);
+  EXPECT_EQ(stampsOfMove(move, {0.0f, -1e6f}, {0.0f, 0.0f}, 0.5f), 8192);
+  EXPECT_EQ(spacedStamps(10.5f, 1.0f, 10.0f), 0);
+  EXPECT_EQ(spacedStamps(10.0f, 1.0f, 10.0f), 2);
+  EXPECT_EQ(spacedStamps(0.0f, 1.0f, INFINITY), kMostStampsPerSegment);
 }
 
 TEST(StampCounterTest, LetsTheShapesTakeTurnsEvenPastTheLargestCount) {

@@ -138,6 +138,21 @@ TEST_P(Redraw, FromTheCacheGivesBitForBitWhatComputingGaveUntilTheStrokeIsDirty)
   }
 }
 
+// A drawing that waits for the render thread stays as it is while the stroke gets another, even where the
+// queue refuses to have it given back.
+TEST_P(Redraw, KeepsWhatWaitsWhenItsReleaseIsRefused) {
+  DrawingBoard board({.version = version});
+  StrokeOnPage stroke(board);
+  const std::vector<float> before = redrawn(board, *stroke).buffers.front();
+  board.queue.accept = [](const Qelt::ITask& task) { return taskName(task) != "Unref"; };
+  board.redraw(*stroke);
+  board.queue.accept = nullptr;
+  stroke->addPoint({60.0f, 60.0f}, 100, 0.5f);
+  stroke->SetRedrawingCacheDirtyFlag();
+  board.redraw(*stroke);
+  EXPECT_EQ(board.takeBatches().at(0).buffers.front(), before);
+}
+
 // Moving the view is no zoom.
 TEST_P(Redraw, ComputesAnewAfterAZoomWhereStampsFollowTheView) {
   DrawingBoard board({.version = version});
@@ -190,6 +205,14 @@ TEST_P(Redraw, OfOnePointPlacesOneStamp) {
     board.redraw(board.recorded({{20.0f, 30.0f, 0.5f}}));
     EXPECT_THAT(board.takeStamps(), ElementsAre(StampNear(20.0f, 30.0f, 0.0f)));
   }
+}
+
+// Of a finger the first short move is left out; that far the rectangle reaches all the same, and 5 more.
+TEST_P(Redraw, TakesPointsThatAreLeftOutIntoItsRectangleWhereItIsStraight) {
+  DrawingBoard board({.version = version, .curve = false, .tool = Qelt::kToolFinger});
+  const float leftOut = 30.0f + 0.9f * expected.shortMove;
+  board.redraw(*board.stored({{20.0f, 30.0f}, {20.0f, leftOut}, {24.0f, 30.0f}}));
+  EXPECT_FLOAT_EQ(board.rect.bottom, leftOut + 5.0f);
 }
 
 // Kept: even the redraw of nothing sets how moves are thinned out: a finger's, of which the first of two

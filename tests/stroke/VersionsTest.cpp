@@ -199,9 +199,12 @@ TEST(PublishedStateTest, IsWrittenByTheVersionsThatPublishAndOnlyOnCurves) {
                   1e-4f);
       board.up(at(112.0f, 50.25f, 0.6f));
       EXPECT_EQ(shared.mLastX, 108.4f);  // the end publishes nothing
-      board.down(at(200.0f, 50.25f, 0.9f));
+      board.down({200.0f, 60.25f, 0.9f, kTilt, 0.75f});
       EXPECT_EQ(shared.mTiltBlend, 0.0f);
       EXPECT_EQ(shared.mStampCount, 0);
+      EXPECT_THAT((std::vector{shared.mStartX, shared.mStartY, shared.mLastX, shared.mLastY,
+                               shared.mLastWidth, shared.mLastOrientation}),
+                  testing::ElementsAre(200.0f, 60.25f, 200.0f, 60.25f, 10.0f, 0.75f));
     }
   }
 }
