@@ -116,7 +116,7 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
 
   bool fits(const CacheLookup& cache) {
     if constexpr (kFollowsViewScale) {
-      const Vector2<float> inverseScale = getInverseScale();
+      const Vector2<float> inverseScale = mViewScale.inverse(mCanvas->GetMatrix());
       return cache.fits(&inverseScale);
     } else {
       return cache.fits(nullptr);
@@ -173,13 +173,10 @@ class StrokePipeline : public Pencil2StrokeDrawableGL {
     postPenData(queue(), mRenderDrawable, getSize(), settings().color());
   }
 
-  // How many stroke units a device pixel takes under the canvas's transform.
-  Vector2<float> getInverseScale() requires kFollowsViewScale {
-    return mViewScale.inverse(mCanvas->GetMatrix());
-  }
-
+  // Tells how many stroke units a device pixel takes under the canvas's transform.
   void passInverseScale() {
-    if constexpr (kFollowsViewScale) mRenderDrawable->SetInverseScale(getInverseScale());
+    if constexpr (kFollowsViewScale)
+      mRenderDrawable->SetInverseScale(mViewScale.inverse(mCanvas->GetMatrix()));
   }
 
   bool canDraw() const { return mRenderDrawable != nullptr && mCanvas != nullptr && settings().exist(); }
