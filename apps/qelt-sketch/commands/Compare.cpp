@@ -129,7 +129,7 @@ Difference comparePictures(const fs::path& before, const fs::path& after, int to
       afterReader(is.name(), is.text(), kMostInkBytes);
   std::optional<Picture> marked;
   if (output) marked = frameOf(beforeReader, afterReader, *output);
-  const Difference found = differenceOf(beforeReader, afterReader, tolerance, marked ? &*marked : nullptr);
+  Difference found = differenceOf(beforeReader, afterReader, tolerance, marked ? &*marked : nullptr);
   if (marked && (!found.isNone() || marking == Marking::Always)) {
     refuseToOverwrite(*output, before);
     refuseToOverwrite(*output, after);

@@ -37,10 +37,6 @@ float pressureOf(const Channel& channel, const Reading& reading) {
   return static_cast<float>(share);
 }
 
-bool isPlace(Quantity quantity) {
-  return quantity == Quantity::X || quantity == Quantity::Y;
-}
-
 enum class Order { Value, Change, ChangeOfChange };
 
 // What a channel keeps from point to point.

@@ -37,10 +37,6 @@ bool isAngle(Quantity quantity) {
          quantity == Quantity::TiltY;
 }
 
-bool isPlace(Quantity quantity) {
-  return quantity == Quantity::X || quantity == Quantity::Y;
-}
-
 // What a unit is in the quantity's own: stroke units, radians or milliseconds. None for a name that is no
 // unit of the quantity.
 std::optional<double> unitNamed(Quantity quantity, std::string_view unit) {

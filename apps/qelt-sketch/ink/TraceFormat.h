@@ -12,6 +12,9 @@ namespace QeltDesktop {
 
 // What the numbers of a channel mean.
 enum class Quantity { Ignored, X, Y, Force, Elevation, Azimuth, TiltX, TiltY, Time };
+inline bool isPlace(Quantity quantity) {
+  return quantity == Quantity::X || quantity == Quantity::Y;
+}
 
 struct Channel {
   Quantity quantity = Quantity::Ignored;
