@@ -341,8 +341,8 @@ TEST(InkmlReader, TellsInkmlFromOtherNamespaces) {
       // Bound to another name inside, and back outside.
       "<a:ink xmlns:a='" + ink +
           "'><a:trace>1 0</a:trace><x xmlns:a='urn:a'><a:brush/></x><a:trace>2 0</a:trace></a:ink>",
-      "<ink><trace>1 0</trace><math xmlns='urn:math'><trace>9 0</trace><trace/></math><trace>2 "
-      "0</trace></ink>",
+      "<ink><trace>1 0</trace><math xmlns='urn:math'><trace>9 0</trace><trace/></math>" +
+          std::string("<trace>2 0</trace></ink>"),
       // No namespace, one that is bound to nothing, and one with another name.
       std::string("<ink><trace>1 0</trace><a:trace>2 0</a:trace></ink>"),
       std::string("<a:ink><a:trace>1 0</a:trace><trace>2 0</trace></a:ink>"),
