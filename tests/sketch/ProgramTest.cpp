@@ -899,7 +899,8 @@ TEST_F(Archive, DrawsOnlyWhatIsNotUpToDate) {
   fs::last_write_time(path("in/a.inkml"), fs::file_time_type::clock::now());
   EXPECT_EQ(run("draw in -o out/").out, summary(3, 1, 2, 0));
   // Changed while it was drawn.
-  EXPECT_EQ(sh("$sketch draw ink.inkml -o late/ --zoom 40 & until ls late/.qelt-*; do :; done; sleep 0.02; "
+  EXPECT_EQ(sh("$sketch draw ink.inkml -o late/ --zoom 40 & until ls late/.qelt-* || ls late/ink.png; do :; "
+               "done; sleep 0.02; "
                "touch ink.inkml; "
                "wait; $sketch draw ink.inkml -o late/ >second")
                 .err.find("refused"),
@@ -916,12 +917,12 @@ TEST_F(Archive, DrawsOnlyWhatIsNotUpToDate) {
 TEST_F(Archive, IsWholeAfterItWasKilled) {
   const std::string page = contentsOf(path("ink.inkml"));
   for (int i = 0; i < 30; ++i) write("in/page" + std::to_string(i) + ".inkml", page);
-  EXPECT_EQ(run("draw ink.inkml -o alone.png --zoom 4").status, 0);
+  EXPECT_EQ(run("draw ink.inkml -o alone.png --zoom 12").status, 0);
   const Ran killed =
-      sh("setsid $sketch draw in -o out/ --zoom 4 --jobs 2 & until [ -e out/page0.png ]; do sleep 0.01; "
+      sh("setsid $sketch draw in -o out/ --zoom 12 --jobs 2 & until [ -e out/page0.png ]; do sleep 0.01; "
          "done; kill -9 -$!; wait $!");
   EXPECT_EQ(killed.status, 128 + SIGKILL) << killed.out << killed.err;
-  const Ran resumed = run("draw in -o out/ --zoom 4");
+  const Ran resumed = run("draw in -o out/ --zoom 12");
   EXPECT_EQ(resumed.status, 0) << resumed.err;
   EXPECT_EQ(resumed.out.find(" 0 up to date"), std::string::npos) << resumed.out;
   std::size_t pictures = 0;
@@ -938,15 +939,15 @@ TEST_F(Archive, IsSharedOutByOthers) {
   const std::string page = contentsOf(path("ink.inkml"));
   fs::create_directory(path("pages"));
   for (int i = 10; i < 40; ++i) write("pages/page" + std::to_string(i) + ".inkml", page);
-  EXPECT_EQ(run("draw pages -o alone/ --zoom 4").status, 0);
+  EXPECT_EQ(run("draw pages -o alone/ --zoom 12").status, 0);
   const std::string alike =
       "30 pictures: 30 alike, 0 within the tolerance, 0 different, 0 in one folder only, 0 not compared\n";
   sh("ls pages/* >pages.txt; for task in 0 1; do awk -v tasks=2 -v task=$task 'NR % tasks == task' pages.txt "
      "| "
-     "$sketch draw - -o array/ --zoom 4; done");
+     "$sketch draw - -o array/ --zoom 12; done");
   EXPECT_EQ(run("compare alone array").out, alike);
   if (std::system("command -v parallel >/dev/null") != 0) GTEST_SKIP() << "GNU parallel is not installed";
-  write("worker", R"($sketch draw "$@" -o shared/ --jobs 1 --zoom 4 >&2 &
+  write("worker", R"($sketch draw "$@" -o shared/ --jobs 1 --zoom 12 >&2 &
 if mkdir killed; then until [ -e shared/$(basename "$1" .inkml).png ]; do sleep 0.01; done; kill -9 $!; fi
 wait $!)");
   // It says how many jobs failed.

@@ -64,18 +64,21 @@ TEST(Workers, ThatCannotBeginEndTheRun) {
 TEST(Workers, ThatDieBetweenTheirJobsCostNoJob) {
   const auto dieSoon = [] {
     if (fork() > 0) return;
-    usleep(20'000);
+    usleep(100'000);
     kill(getppid(), SIGKILL);
     _exit(0);
   };
   struct Case {
     std::size_t jobs, workers;
-    useconds_t notListening, lastJob;
+    useconds_t firstJob, notListening, lastJob;
   };
-  for (const Case& one : {Case{3, 1, 100'000, 0}, Case{2, 2, 0, 200'000}}) {
+  for (const Case& one : {Case{3, 1, 0, 300'000, 0}, Case{2, 2, 200'000, 0, 700'000}}) {
     std::size_t done = 0;
     const Job job = [&](std::size_t index) {
-      if (index == 0) dieSoon();
+      if (index == 0) {
+        usleep(one.firstJob);
+        dieSoon();
+      }
       if (index == one.jobs - 1) usleep(one.lastJob);
     };
     doInWorkers(

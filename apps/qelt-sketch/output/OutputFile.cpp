@@ -5,6 +5,7 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <csignal>
 #include <cstring>
 #include <optional>
 #include <utility>
@@ -27,6 +28,22 @@ bool takeOver(int file, const struct stat& older) {
   const bool sameOwner = fchown(file, older.st_uid, older.st_gid) == 0;
   return fchmod(file, older.st_mode & (sameOwner ? kPermissions : kPermissions & ~kSetId)) == 0;
 }
+
+// Signals wait until it is gone.
+class SignalsHeld {
+ public:
+  SignalsHeld() {
+    sigset_t all;
+    sigfillset(&all);
+    pthread_sigmask(SIG_BLOCK, &all, &mBefore);
+  }
+  ~SignalsHeld() { pthread_sigmask(SIG_SETMASK, &mBefore, nullptr); }
+  SignalsHeld(const SignalsHeld&) = delete;
+  SignalsHeld& operator=(const SignalsHeld&) = delete;
+
+ private:
+  sigset_t mBefore{};
+};
 
 }  // namespace
 
@@ -87,13 +104,16 @@ void OutputFile::openBeside(OutputPlace place) {
                     "which would keep the older content");
   }
   if (mAbandoned == Abandoned::Remove) removeAbandoned(mFolder.number(), mName);
-  FileDescriptor file =
-      makeUnfinished(mFolder.number(), mName, place.present ? kOwner : kAnybody, mTemporaryName);
+  FileDescriptor file;
+  {
+    const SignalsHeld held;  // none comes between the file and who removes it
+    file = makeUnfinished(mFolder.number(), mName, place.present ? kOwner : kAnybody, mTemporaryName);
+    if (file) guardUnfinished(mFolder.number(), mTemporaryName);
+  }
   if (!file) {
     mTemporaryName.clear();
     refuse();
   }
-  guardUnfinished(mFolder.number(), mTemporaryName);
   const bool ready = (!place.present || takeOver(file.number(), *place.present)) &&
                      (mFile = fdopen(file.number(), "wb")) != nullptr;
   if (!ready) {
