@@ -56,7 +56,7 @@ std::string bashOptions(const CLI::App& app, const std::string& command) {
          (takesFiles ? " files=yes" : "") + " ;;\n";
 }
 
-// As a part of a specification in single quotes.
+// As a part of what _arguments takes, in single quotes.
 std::string zshQuoted(std::string_view text) {
   std::string quoted;
   for (const char c : text) {
