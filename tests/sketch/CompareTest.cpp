@@ -18,6 +18,7 @@
 #include "output/Picture.h"
 #include "output/PngReader.h"
 #include "output/PngWriter.h"
+#include "support/TestFolder.h"
 #include "text/Refusal.h"
 
 namespace QeltDesktop {
@@ -26,20 +27,8 @@ namespace {
 namespace fs = std::filesystem;
 using Bytes = std::vector<std::uint8_t>;
 
-class CompareTest : public testing::Test {
+class CompareTest : public QeltTests::InFolder {
  protected:
-  CompareTest() {
-    std::string folder = testing::TempDir() + "qelt-compare-XXXXXX";
-    if (mkdtemp(folder.data()) == nullptr) std::abort();
-    mFolder = folder;
-  }
-  ~CompareTest() override { fs::remove_all(mFolder); }
-
-  fs::path path(const std::string& name) const { return mFolder / name; }
-  void write(const std::string& name, const std::string& bytes) const {
-    fs::create_directories(path(name).parent_path());
-    std::ofstream(path(name), std::ios::binary) << bytes;
-  }
   // Two pixels beside each other, each RGBA.
   void writePair(const std::string& name, const Bytes& rgba) const {
     write(name, encodePng(Picture(2, 1, rgba), {.keyword = "InkML", .text = name}));
@@ -70,13 +59,10 @@ class CompareTest : public testing::Test {
       end = refusal.what();
     }
     std::string all = testing::internal::GetCapturedStdout() + testing::internal::GetCapturedStderr() + end;
-    const std::string folder = mFolder.string() + '/';
-    for (std::size_t at; (at = all.find(folder)) != std::string::npos;) all.erase(at, folder.size());
+    const std::string prefix = folder().string() + '/';
+    for (std::size_t at; (at = all.find(prefix)) != std::string::npos;) all.erase(at, prefix.size());
     return all;
   }
-
- private:
-  fs::path mFolder;
 };
 
 // What can be told apart counts: opacity, and colours as they are seen through it, rounded up.

@@ -25,6 +25,7 @@
 #include <vector>
 
 #include "pen/RenderingVersions.h"
+#include "support/TestFolder.h"
 
 namespace {
 
@@ -79,12 +80,9 @@ void expectHas(const Json& line, const Json& wanted) {
 }
 
 // Runs the program in a folder of its own, which holds ink.inkml.
-class Program : public testing::Test {
+class Program : public QeltTests::InFolder {
  protected:
   Program() {
-    std::string folder = testing::TempDir() + "qelt-sketch-XXXXXX";
-    if (mkdtemp(folder.data()) == nullptr) std::abort();
-    mFolder = folder;
     // A slanted line of 11 points from (20.1, 20.1) to (70.1, 45.1), and a dot at (90.1, 30.1).
     std::string line;
     for (int i = 0; i <= 10; ++i)
@@ -94,12 +92,6 @@ class Program : public testing::Test {
           "</brush><trace>" +
               line + "</trace><trace>90.1 30.1</trace></ink>");
   }
-  ~Program() override { fs::remove_all(mFolder); }
-
-  fs::path path(const std::string& name) const { return mFolder / name; }
-  void write(const std::string& name, const std::string& text) const {
-    std::ofstream(path(name), std::ios::binary) << text;
-  }
 
   // What a shell does in the folder; $sketch is the program. A GL driver may have something to say on
   // standard error too.
@@ -107,7 +99,7 @@ class Program : public testing::Test {
     // The GL driver leaves a few caches behind as it is unloaded; the threaded tests look for leaks.
     const std::string prepare = "export ASAN_OPTIONS=detect_leaks=0; sketch='" QELT_EMULATOR
                                 " " QELT_SKETCH_PATH "'; cd '" +
-                                mFolder.string() + "'; exec >stdout 2>stderr; ";
+                                folder().string() + "'; exec >stdout 2>stderr; ";
     write("script", prepare + commands);
     const int status = std::system(("sh '" + path("script").string() + "'").c_str());
     return {WIFEXITED(status) ? WEXITSTATUS(status) : -1, contentsOf(path("stdout")),
@@ -136,12 +128,9 @@ class Program : public testing::Test {
 
   bool holds(const std::string& name) const { return fs::exists(path(name)); }
   bool holdsUnfinished() const {
-    return std::any_of(fs::directory_iterator(mFolder), fs::directory_iterator(),
+    return std::any_of(fs::directory_iterator(folder()), fs::directory_iterator(),
                        [](const auto& entry) { return entry.path().extension() == ".part"; });
   }
-
- private:
-  fs::path mFolder;
 };
 
 TEST_F(Program, TracesEveryLiveCall) {

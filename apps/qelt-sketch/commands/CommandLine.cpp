@@ -132,22 +132,21 @@ std::optional<std::uint32_t> argbColor(const std::string& text) {
   return parseArgb(text);
 }
 
-std::optional<PageSize> pageSize(const std::string& text) {
+// "WxH"; `side` reads either.
+template <typename Size, typename Side>
+std::optional<Size> sizeFrom(const std::string& text, const Side& side) {
   const std::size_t cross = text.find('x');
   if (cross == std::string::npos) return std::nullopt;
-  const std::optional<float> width = positiveFloat(text.substr(0, cross));
-  const std::optional<float> height = positiveFloat(text.substr(cross + 1));
+  const auto width = side(text.substr(0, cross));
+  const auto height = side(text.substr(cross + 1));
   if (!width || !height) return std::nullopt;
-  return PageSize{*width, *height};
+  return Size{*width, *height};
 }
-
+std::optional<PageSize> pageSize(const std::string& text) {
+  return sizeFrom<PageSize>(text, positiveFloat);
+}
 std::optional<PixelSize> pixelSize(const std::string& text) {
-  const std::size_t cross = text.find('x');
-  if (cross == std::string::npos) return std::nullopt;
-  const std::optional<int> width = count(text.substr(0, cross));
-  const std::optional<int> height = count(text.substr(cross + 1));
-  if (!width || !height) return std::nullopt;
-  return PixelSize{*width, *height};
+  return sizeFrom<PixelSize>(text, count);
 }
 
 std::optional<OutlineOptions> outline(const std::string& text) {

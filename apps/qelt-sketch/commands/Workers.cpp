@@ -131,7 +131,7 @@ class Crew {
 
   // One of them could not begin, or ended while it had nothing to do.
   void doWithout(const Worker* worker, const std::string& why) {
-    std::erase_if(mWorkers, [worker](const auto& one) { return one.get() == worker; });
+    remove(worker);
     if (mWorkers.empty() && --mStarts == 0) throw Refusal(why);
     mWanted = std::max<std::size_t>(mWorkers.size(), 1);
   }
