@@ -1,12 +1,16 @@
 #include <benchmark/benchmark.h>
 
+#include <algorithm>
+#include <array>
 #include <cstddef>
 #include <vector>
 
 #include "Floor.h"
 #include "base/Vector.h"
+#include "graphics/SmPath.h"
 #include "outline/Pencil2OutlineDrawableRTV1.h"
 #include "render/RenderDrawables.h"
+#include "stroke/placing/StampWalk.h"
 
 // Nanoseconds a stamp for what surrounds the walk: the bytes alone, and the pen's vertices.
 namespace {
@@ -37,19 +41,23 @@ void appendPreparedStamps(benchmark::State& state) {
 }
 BENCHMARK(appendPreparedStamps)->Name("a/append_prepared");
 
-// The inputs are hidden from the compiler, so that nothing is worked out ahead.
-struct Inputs {
-  Qelt::Vector2<float> point[2] = {{10.3f, 20.7f}, {-0.6f, 0.8f}};
-  float size = 3.2f;
-};
-
 template <typename Appender, typename Renderer>
 void addStamps(Renderer& renderer) {
-  Inputs in;
-  Appender(renderer, kStampsPerBatch).AddPoints(kStampsPerBatch, {0.2f, in.point[1]}, [&in](int) {
-    benchmark::DoNotOptimize(in);
-    return Qelt::PlacedStamp{{in.point[0].x, in.point[0].y}, in.size, 0.1f, 1};
-  });
+  constexpr int kAtOnce = Qelt::kStampsAtOnce;
+  std::array<Qelt::SmPoint, kAtOnce> centres;
+  std::array<float, kAtOnce> sizes, alphas;
+  centres.fill({10.3f, 20.7f});
+  sizes.fill(3.2f);
+  alphas.fill(0.1f);
+  Appender appender(renderer, kStampsPerBatch);
+  for (int i = 0; i < kStampsPerBatch; i += kAtOnce) {
+    const int count = std::min(kAtOnce, kStampsPerBatch - i);
+    // Hidden from the compiler, so that nothing is worked out ahead.
+    benchmark::DoNotOptimize(centres);
+    benchmark::DoNotOptimize(sizes);
+    benchmark::DoNotOptimize(alphas);
+    appender.AddPoints({count, centres.data(), sizes.data(), alphas.data(), 1}, {0.2f, {-0.6f, 0.8f}});
+  }
 }
 
 // (b) AddPoints alone, as the walk calls it.
@@ -59,7 +67,6 @@ void addPoint(benchmark::State& state) {
   std::vector<float> batch;
   batch.reserve(kStampsPerBatch * Renderer::kFloatsPerStamp);
   renderer.SetBuffer(&batch);
-  Inputs in;
   for (auto _ : state) {
     batch.clear();
     addStamps<typename Renderer::Appender>(renderer);
@@ -81,7 +88,6 @@ void addOutlinePoint(benchmark::State& state) {
   outer.reserve(inner.capacity());
   renderer.SetBuffer(&inner, &outer);
   renderer.SetOutlineSize(3.0f);
-  Inputs in;
   for (auto _ : state) {
     inner.clear();
     outer.clear();
@@ -98,12 +104,14 @@ void addPointOneByOne(benchmark::State& state) {
   std::vector<float> batch;
   batch.reserve(kStampsPerBatch * QeltBench::kStampFloats);
   renderer.SetBuffer(&batch);
-  Inputs in;
+  const Qelt::Vector2<float> point[] = {{10.3f, 20.7f}, {-0.6f, 0.8f}};
+  float size = 3.2f;
   for (auto _ : state) {
     batch.clear();
     for (int i = 0; i < kStampsPerBatch; ++i) {
-      benchmark::DoNotOptimize(in);
-      renderer.AddPoint(in.point, in.size, 0.1f, 0.2f, 1);
+      benchmark::DoNotOptimize(point);
+      benchmark::DoNotOptimize(size);
+      renderer.AddPoint(point, size, 0.1f, 0.2f, 1);
     }
     benchmark::ClobberMemory();
   }

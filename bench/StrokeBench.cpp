@@ -1,6 +1,7 @@
 #include <benchmark/benchmark.h>
 
 #include <algorithm>
+#include <array>
 #include <cstddef>
 #include <cstdint>
 #include <numeric>
@@ -86,9 +87,9 @@ BENCHMARK_CAPTURE(liveMove, turning, Attitude::Turning)->Name("d/turning_move_V"
 // What of (d) is the host's: its path alone, built and asked for the places of the same stamps.
 void hostPath(benchmark::State& state) {
   struct NoStamps {
-    Qelt::SmPoint at;
-    Qelt::SmPoint* next() { return &at; }
-    void place() {}
+    std::array<Qelt::SmPoint, Qelt::kStampsAtOnce> at;
+    Qelt::SmPoint* places() { return at.data(); }
+    void place(int) {}
     void passOver(float) {}
   };
   constexpr float kSpacing = 0.4f;

@@ -43,9 +43,8 @@ bool hasFloats(const std::vector<float>* batch) {
 void Pencil2OutlineDrawableRTV1::AddPoint(Vector2<float>, float) {}
 
 void Pencil2OutlineDrawableRTV1::AddPoint(const Vector2<float>* point, float size, float tiltBlend) {
-  Appender(*this, 1).AddPoints(1, {tiltBlend, point[1]}, [&](int) {
-    return PlacedStamp{{point[0].x, point[0].y}, size, 0.0f, 0};
-  });
+  const SmPoint centre{point[0].x, point[0].y};
+  Appender(*this, 1).AddPoints({1, &centre, &size, nullptr, 0}, {tiltBlend, point[1]});
 }
 
 void Pencil2OutlineDrawableRTV1::SetInverseScale(const Vector2<float>& inverseScale) {

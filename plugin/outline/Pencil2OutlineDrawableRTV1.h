@@ -53,31 +53,29 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
           mOuter(drawable.mOuterWriteBuffer, stamps),
           mOutlineSize(drawable.GetOutlineSize()) {}
 
-    // Appends `count` stamps, for which there must be room: stampAt(i), asked for in order, tells the i-th.
-    template <typename StampAt>
-    void AddPoints(int count, const StampPose& pose, StampAt&& stampAt) {
-      StampWriter<kFloatsPerVertex> writer(pose);
-      float* inner = mInner.take(count);
-      float* outer = mOuter.take(count);
-      for (int i = 0; i < count; ++i) {
-        const PlacedStamp stamp = stampAt(i);
-        StampExtent extent = squareExtent(stamp.size);
-        if (inner != nullptr) {
-          writer.setExtent(extent);
-          writer.write(inner, stamp);
-          inner += kFloatsPerStamp;
-        }
-        if (outer != nullptr) {
-          extent.x = std::max(extent.x + mOutlineSize, 0.0f);
-          extent.y = std::max(extent.y + mOutlineSize, 0.0f);
-          writer.setExtent(extent);
-          writer.write(outer, stamp);
-          outer += kFloatsPerStamp;
-        }
-      }
+    // Appends stamps, for which there must be room.
+    void AddPoints(PlacedStamps stamps, const StampPose& pose) {
+      write(mInner, stamps, pose, [](const StampExtent& extent) { return extent; });
+      write(mOuter, stamps, pose, [size = mOutlineSize](StampExtent extent) {
+        extent.x = std::max(extent.x + size, 0.0f);
+        extent.y = std::max(extent.y + size, 0.0f);
+        return extent;
+      });
     }
 
    private:
+    template <typename Grow>
+    static void write(StampAppender<kFloatsPerVertex>& stream, const PlacedStamps& stamps,
+                      const StampPose& pose, Grow&& grow) {
+      float* out = stream.take(stamps.count);
+      if (out == nullptr) return;
+      StampWriter<kFloatsPerVertex> writer(pose);
+      for (int i = 0; i < stamps.count; ++i, out += kFloatsPerStamp) {
+        writer.setExtent(grow(squareExtent(stamps.sizes[i])));
+        writer.write(out, stamps.centres[i], 0.0f, *writer.look(0));
+      }
+    }
+
     StampAppender<kFloatsPerVertex> mInner;
     StampAppender<kFloatsPerVertex> mOuter;
     float mOutlineSize;

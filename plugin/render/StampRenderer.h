@@ -95,25 +95,25 @@ class StampRenderer : public HostBase {
     Appender(StampRenderer& renderer, int stamps)
         : mStamps(renderer.mWriteBuffer, stamps), mInverseScale(renderer.mInverseScale) {}
 
-    // Appends `count` stamps, for which there must be room: stampAt(i), asked for in order, tells the i-th.
-    template <typename StampAt>
-    void AddPoints(int count, const StampPose& pose, StampAt&& stampAt) {
-      float* out = mStamps.take(count);
+    // Appends stamps, for which there must be room.
+    void AddPoints(PlacedStamps stamps, const StampPose& pose) {
+      float* out = mStamps.take(stamps.count);
+      if (out == nullptr) return;
       StampWriter<kFloatsPerVertex> writer(pose);
       writer.setExtent(mExtent);
       float size = mSize;
-      for (int i = 0; i < count; ++i) {
-        const PlacedStamp stamp = stampAt(i);
-        if (out == nullptr) continue;
+      const Four* look = writer.look(stamps.shape);
+      for (int i = 0; i < stamps.count; ++i) {
         // Most stamps are as large as the one before; the divisions of an extent take a third of the time
         // that a stamp takes.
-        if (stamp.size != size) {
-          size = stamp.size;
+        if (stamps.sizes[i] != size) {
+          size = stamps.sizes[i];
           mExtent = extentOf(size);
           writer.setExtent(mExtent);
         }
-        writer.write(out, stamp);
+        writer.write(out, stamps.centres[i], stamps.alphas[i], *look);
         out += kFloatsPerStamp;
+        look = writer.lookAfter(look);
       }
       mSize = size;
     }
@@ -137,9 +137,8 @@ class StampRenderer : public HostBase {
   // of it where it is anti-aliased, stroke units; its alpha and tilt blend; one of the shapes 0, 1 and 2.
   // Throws std::bad_alloc where the buffer cannot grow; without a buffer nothing happens.
   void AddPoint(const Vector2<float>* point, float size, float alpha, float tiltBlend, int tile) {
-    Appender(*this, 1).AddPoints(1, {tiltBlend, point[1]}, [&](int) {
-      return PlacedStamp{{point[0].x, point[0].y}, size, alpha, tile};
-    });
+    const SmPoint centre{point[0].x, point[0].y};
+    Appender(*this, 1).AddPoints({1, &centre, &size, &alpha, tile}, {tiltBlend, point[1]});
   }
 
   // Makes room for stamps to come. Throws std::bad_alloc.

@@ -2,8 +2,10 @@
 
 #include <algorithm>
 #include <array>
+#include <bit>
 #include <cmath>
 #include <cstddef>
+#include <cstring>
 #include <utility>
 #include <vector>
 
@@ -50,16 +52,35 @@ inline GraphicsObject* createStampObject(const VertexLayout& layout) {
 
 // Four floats that are computed together.
 using Four [[gnu::vector_size(16)]] = float;
+using TwoDoubles [[gnu::vector_size(16)]] = double;
 
-// A stamp as the walk places it.
-struct PlacedStamp {
-  SmPoint centre;
-  float size;   // its width, or half of it where it is anti-aliased
-  float alpha;  // an outline's has none
-  int tile;     // which of the three stamp shapes, 0 to 2; an outline's has none
+// Writes four floats anywhere.
+inline void storeFour(float* out, Four four) {
+  using FourAnywhere [[gnu::vector_size(16), gnu::aligned(4), gnu::may_alias]] = float;
+  *reinterpret_cast<FourAnywhere*>(out) = four;
+}
+
+// The two floats of a point, to be moved as one.
+inline double asDouble(const SmPoint& point) {
+  static_assert(sizeof(SmPoint) == sizeof(double));
+  double both;
+  std::memcpy(&both, &point, sizeof both);
+  return both;
+}
+
+// The stamp shapes, which take turns along a stroke. An outline's stamps have none.
+inline constexpr int kStampShapes = 3;
+
+// Stamps in a row, as the walk places them: `count` of each.
+struct PlacedStamps {
+  int count;
+  const SmPoint* centres;
+  const float* sizes;   // their widths, or half of that where they are anti-aliased
+  const float* alphas;  // null for an outline's, which have none
+  int shape;            // of the first, 0 to 2
 };
 
-// What stamps in a row have in common.
+// What they have in common.
 struct StampPose {
   float tiltBlend;           // 0: upright
   Vector2<float> direction;  // (-sin a, cos a)
@@ -125,9 +146,9 @@ class StampWriter {
 
  public:
   explicit StampWriter(const StampPose& pose) : mDirectionY(pose.direction.y) {
-    for (int tile = 0; tile < 3; ++tile) {
-      mLooks[tile] = kOutline ? Four{pose.tiltBlend, pose.direction.x, pose.direction.y}
-                              : Four{0.0f, pose.tiltBlend, static_cast<float>(tile), pose.direction.x};
+    for (int shape = 0; shape < kStampShapes; ++shape) {
+      mLooks[shape] = kOutline ? Four{pose.tiltBlend, pose.direction.x, pose.direction.y}
+                               : Four{0.0f, pose.tiltBlend, static_cast<float>(shape), pose.direction.x};
     }
   }
 
@@ -137,21 +158,26 @@ class StampWriter {
     mRest = Four{mDirectionY, extent.innerRadius, extent.alphaByWidth};
   }
 
-  void write(float* out, const PlacedStamp& stamp) const {
-    const SmPoint centre = stamp.centre;
-    const Four edges = Four{centre.x, centre.y, centre.x, centre.y} + mReach;
+  // What follows the corners of a stamp of that shape, and of the next one.
+  const Four* look(int shape) const { return mLooks + shape; }
+  const Four* lookAfter(const Four* look) const {
+    return look == mLooks + kStampShapes - 1 ? mLooks : look + 1;
+  }
+
+  void write(float* out, const SmPoint& centre, float alpha, Four look) const {
+    const double both = asDouble(centre);
+    const Four edges = std::bit_cast<Four>(TwoDoubles{both, both}) + mReach;
     const Four leftTop = __builtin_shufflevector(edges, Four{0.0f, 1.0f}, 0, 1, 4, 5);
     const Four leftBottom = __builtin_shufflevector(edges, Four{0.0f, 0.0f}, 0, 3, 4, 5);
     const Four rightTop = __builtin_shufflevector(edges, Four{1.0f, 1.0f}, 2, 1, 4, 5);
     const Four rightBottom = __builtin_shufflevector(edges, Four{1.0f, 0.0f}, 2, 3, 4, 5);
     const Four corners[6] = {leftTop, leftBottom, rightTop, rightTop, leftBottom, rightBottom};
-    Four look = mLooks[stamp.tile];
-    if constexpr (!kOutline) look[0] = stamp.alpha;
+    if constexpr (!kOutline) look[0] = alpha;
     for (std::size_t i = 0; i < 6; ++i, out += Stride) {
-      store(out, corners[i]);
-      store(out + 4, look);
+      storeFour(out, corners[i]);
+      storeFour(out + 4, look);
       if constexpr (kAntialiased) {
-        store(out + 8, mRest);
+        storeFour(out + 8, mRest);
       } else if constexpr (!kOutline) {
         out[8] = mDirectionY;
       }
@@ -159,12 +185,7 @@ class StampWriter {
   }
 
  private:
-  static void store(float* out, Four four) {
-    using FourAnywhere [[gnu::vector_size(16), gnu::aligned(4), gnu::may_alias]] = float;
-    *reinterpret_cast<FourAnywhere*>(out) = four;
-  }
-
-  Four mLooks[3];  // what follows the corner: one for each stamp shape
+  Four mLooks[kStampShapes];
   float mDirectionY;
   Four mReach{};  // what to add to a centre for left, top, right and bottom
   Four mRest{};   // what follows the look

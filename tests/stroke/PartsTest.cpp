@@ -1,5 +1,6 @@
 #include <gmock/gmock.h>
 
+#include <algorithm>
 #include <array>
 #include <bit>
 #include <cmath>
@@ -20,7 +21,7 @@
 namespace Qelt {
 namespace {
 
-using testing::ElementsAre;
+using testing::ElementsAreArray;
 
 // Against the mean as one would write it down: all slots from 0 upwards, in single precision.
 template <int Size>
@@ -79,20 +80,31 @@ TEST(PenAttitudeTest, TurnsOrientationsThatLieAcrossHalfATurnFromTheMean) {
   }
 }
 
-// Whatever is NaN about a stamp, first or last: the box is that of the other two.
+// Whatever is NaN about a stamp, wherever it stands, and however they come: the box is that of the others.
 TEST(DirtyBoxTest, LeavesOutEdgesThatAreNaN) {
   for (const auto& [x, y, reach] : {std::array{NAN, 5.0f, 1.0f}, {5.0f, NAN, 1.0f}, {5.0f, 5.0f, NAN}}) {
-    for (const int bad : {0, 1, 2}) {
-      DirtyBox box;
-      if (bad == 0) box.add(x, y, reach);
-      box.add(0.0f, 0.0f, 2.0f);
-      if (bad == 1) box.add(x, y, reach);
-      box.add(9.0f, 9.0f, 2.0f);
-      if (bad == 2) box.add(x, y, reach);
-      RectF rect{3.0f, 4.0f, 3.0f, 4.0f};
-      box.uniteInto(&rect);
-      EXPECT_THAT((std::array{rect.left, rect.top, rect.right, rect.bottom}),
-                  ElementsAre(-2.0f, -2.0f, 11.0f, 11.0f));
+    for (const std::size_t bad : {0, 1, 2, 3}) {
+      std::array<SmPoint, 4> centres{{{1.0f, 0.0f}, {0.0f, 1.0f}, {9.0f, 7.0f}, {8.0f, 9.0f}}};
+      std::array<float, 4> reaches{1.0f, 2.0f, 2.0f, 3.0f};
+      centres[bad] = {x, y};
+      reaches[bad] = reach;
+      std::array<float, 4> expected{100.0f, 100.0f, -100.0f, -100.0f};
+      for (std::size_t i = 0; i < 4; ++i) {
+        if (i == bad) continue;
+        expected[0] = std::min(expected[0], centres[i].x - reaches[i]);
+        expected[1] = std::min(expected[1], centres[i].y - reaches[i]);
+        expected[2] = std::max(expected[2], centres[i].x + reaches[i]);
+        expected[3] = std::max(expected[3], centres[i].y + reaches[i]);
+      }
+      for (const int atOnce : {1, 2, 3, 4}) {
+        DirtyBox box;
+        for (int i = 0; i < 4; i += atOnce) {
+          box.add(centres.data() + i, reaches.data() + i, std::min(atOnce, 4 - i));
+        }
+        RectF rect{3.0f, 4.0f, 3.0f, 4.0f};
+        box.uniteInto(&rect);
+        EXPECT_THAT((std::array{rect.left, rect.top, rect.right, rect.bottom}), ElementsAreArray(expected));
+      }
     }
   }
 }
@@ -100,8 +112,9 @@ TEST(DirtyBoxTest, LeavesOutEdgesThatAreNaN) {
 // An edge at zero is written as 0, never as -0.
 TEST(DirtyBoxTest, HasPositiveZeros) {
   DirtyBox box;
-  box.add(-2.0f, -3.0f, 2.0f);
-  box.add(-3.0f, -2.0f, 2.0f);
+  const SmPoint centres[] = {{-2.0f, -3.0f}, {-3.0f, -2.0f}};
+  const float reaches[] = {2.0f, 2.0f};
+  box.add(centres, reaches, 2);
   RectF rect{-9.0f, -9.0f, -9.0f, -9.0f};
   box.uniteInto(&rect);
   EXPECT_EQ(std::bit_cast<std::uint32_t>(rect.right), 0u);
@@ -120,10 +133,10 @@ TEST(StampWalkTest, EndsWhereItCannotGoOn) {
   path.lineTo(2e8f, 0.0f);
   path.resetPath(0);
   struct Run {
-    SmPoint* next() { return &at; }
-    void place() { ++placed; }
+    SmPoint* places() { return at.data(); }
+    void place(int count) { placed += count; }
     void passOver(float) { ++passed; }
-    SmPoint at;
+    std::array<SmPoint, kStampsAtOnce> at;
     int placed = 0, passed = 0;
   };
   for (const auto& [first, spacing, length] :
@@ -137,6 +150,12 @@ TEST(StampWalkTest, EndsWhereItCannotGoOn) {
       EXPECT_EQ(run.passed, most == 0 ? 1 : 0);
     }
   }
+  // The last steps before 2^24 are a whole one each; from there on half a step and a bit leads nowhere.
+  Run run;
+  const WalkResult walk = walkSpaced(path, 0x1p24f - 3.0f, 1.0f, 2e8f, 99, run);
+  EXPECT_EQ(walk.stamps, 4);
+  EXPECT_EQ(run.placed, 4);
+  EXPECT_TRUE(walk.cutShort);
 }
 
 // Room is made ahead: a stamp every half unit of 1.95 + 5 + 12, which is 37.9, and two a sample, of which one

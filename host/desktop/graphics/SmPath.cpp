@@ -4,6 +4,8 @@
 #include <array>
 #include <cmath>
 #include <cstddef>
+#include <exception>
+#include <limits>
 #include <new>
 #include <vector>
 
@@ -31,17 +33,54 @@ constexpr double kLengthRounding = 4.0 * 0x1p-23;
 constexpr int kMostPieces = 192;
 constexpr int kMostCuts = 40;
 
+// x and y.
+using Two [[gnu::vector_size(16)]] = double;
+
+Two both(double number) {
+  return Two{number, number};
+}
+double dot(Two a, Two b) {
+  const Two product = a * b;
+  return product[0] + product[1];
+}
+double size(Two a) {
+  return std::sqrt(dot(a, a));
+}
+
 struct Curve {
-  double px, py;  // P(t) = p + t (b + t a)
-  double bx, by;
-  double ax, ay;
+  Two p, b, a;  // P(t) = p + t (b + t a)
 };
 
 // Cubics of the distance since `begin`.
 struct Piece {
   double begin, end;
-  double at[2], first[2], second[2], third[2];
+  Two at, first, second, third;
+
+  bool holds(double distance) const { return distance >= begin && distance <= end; }
+
+  void tell(double distance, SmPoint* position, SmPoint* tangent) const {
+    const Two s = both(distance - begin);
+    if (position != nullptr) {
+      const Two place = at + s * (first + s * (second + s * third));
+      *position = {static_cast<float>(place[0]), static_cast<float>(place[1])};
+    }
+    if (tangent != nullptr) [[unlikely]]
+      tellTangent(s, tangent);
+  }
+
+ private:
+  // Out of line, as is whatever else the usual query can do without.
+  [[gnu::noinline]] void tellTangent(Two s, SmPoint* tangent) const {
+    const Two way = first + s * (2.0 * second + s * (3.0 * third));
+    const double speed = size(way);
+    const Two unit = way * both(speed > 0.0 ? 1.0 / speed : 0.0);
+    *tangent = {static_cast<float>(unit[0]), static_cast<float>(unit[1])};
+  }
 };
+
+constexpr double kInfinity = std::numeric_limits<double>::infinity();
+// What holds no distance.
+constexpr Piece kNowhere{kInfinity, -kInfinity, Two{}, Two{}, Two{}, Two{}};
 
 struct Segment {
   Curve curve;
@@ -50,30 +89,29 @@ struct Segment {
 
 struct Contour {
   std::size_t firstSegment;
-  double x, y;
+  Two at;
 };
 
 // Where a piece may end.
 struct Joint {
   double t;
-  double dx, dy;  // P'(t)
-  double along;   // its component along A
+  double along;  // the component of P'(t) along A
   double speed;
+  Two d;  // P'(t)
 };
 
 // What does not change along a curve.
 class Parabola {
  public:
   explicit Parabola(const Curve& curve) : mCurve(curve) {
-    const double speed = std::sqrt(curve.bx * curve.bx + curve.by * curve.by);
-    mA = std::sqrt(curve.ax * curve.ax + curve.ay * curve.ay);
+    const double speed = size(curve.b);
+    mA = size(curve.a);
     if (mA > 0.0) {
-      mUx = curve.ax / mA;
-      mUy = curve.ay / mA;
-      mAcross = std::abs(mUx * curve.by - mUy * curve.bx);
+      mU = curve.a / both(mA);
+      mAcross = std::abs(mU[0] * curve.b[1] - mU[1] * curve.b[0]);
       // Narrower than any float could say: a line, perhaps there and back.
       mIsStraight = mAcross <= 1e-10 * (speed + 2.0 * mA);
-      mVertex = -(curve.bx * mUx + curve.by * mUy) / (2.0 * mA);
+      mVertex = -dot(curve.b, mU) / (2.0 * mA);
     } else {
       mAcross = speed;
     }
@@ -83,9 +121,9 @@ class Parabola {
   double vertex() const { return mVertex; }
 
   Joint joint(double t) const {
-    Joint j{t, mCurve.bx + 2.0 * t * mCurve.ax, mCurve.by + 2.0 * t * mCurve.ay, 0.0, 0.0};
-    j.along = j.dx * mUx + j.dy * mUy;
-    j.speed = mIsStraight ? std::abs(j.along) : std::sqrt(j.dx * j.dx + j.dy * j.dy);
+    Joint j{t, 0.0, 0.0, mCurve.b + both(2.0 * t) * mCurve.a};
+    j.along = dot(j.d, mU);
+    j.speed = mIsStraight ? std::abs(j.along) : size(j.d);
     return j;
   }
 
@@ -145,39 +183,30 @@ class Parabola {
 
   Piece piece(const Joint& from, const Joint& to, double begin) const {
     const double h = length(from, to);
-    const double x0 = mCurve.px + from.t * (mCurve.bx + from.t * mCurve.ax);
-    const double y0 = mCurve.py + from.t * (mCurve.by + from.t * mCurve.ay);
-    Piece made{begin, begin + h, {x0, y0}, {}, {}, {}};
+    const Two at = mCurve.p + both(from.t) * (mCurve.b + both(from.t) * mCurve.a);
+    Piece made{begin, begin + h, at, Two{}, Two{}, Two{}};
     if (!(h > 0.0)) return made;
-    const double x1 = mCurve.px + to.t * (mCurve.bx + to.t * mCurve.ax);
-    const double y1 = mCurve.py + to.t * (mCurve.by + to.t * mCurve.ay);
-    const double inverse = 1.0 / h;
-    const double chordX = (x1 - x0) * inverse;
-    const double chordY = (y1 - y0) * inverse;
+    const Two end = mCurve.p + both(to.t) * (mCurve.b + both(to.t) * mCurve.a);
+    const Two inverse = both(1.0 / h);
+    const Two chord = (end - at) * inverse;
     if (mIsStraight || mA == 0.0) {
-      made.first[0] = chordX;
-      made.first[1] = chordY;
+      made.first = chord;
       return made;
     }
-    const double fromScale = 1.0 / from.speed;
-    const double toScale = 1.0 / to.speed;
-    const double tx0 = from.dx * fromScale, ty0 = from.dy * fromScale;
-    const double tx1 = to.dx * toScale, ty1 = to.dy * toScale;
-    made.first[0] = tx0;
-    made.first[1] = ty0;
-    made.second[0] = (3.0 * chordX - 2.0 * tx0 - tx1) * inverse;
-    made.second[1] = (3.0 * chordY - 2.0 * ty0 - ty1) * inverse;
-    made.third[0] = (tx0 + tx1 - 2.0 * chordX) * inverse * inverse;
-    made.third[1] = (ty0 + ty1 - 2.0 * chordY) * inverse * inverse;
+    const Two from1 = from.d * both(1.0 / from.speed);
+    const Two to1 = to.d * both(1.0 / to.speed);
+    made.first = from1;
+    made.second = (3.0 * chord - 2.0 * from1 - to1) * inverse;
+    made.third = (from1 + to1 - 2.0 * chord) * inverse * inverse;
     return made;
   }
 
  private:
   const Curve& mCurve;
-  double mA = 0.0;              // |A|
-  double mUx = 0.0, mUy = 0.0;  // A / |A|
-  double mAcross = 0.0;         // n: the speed at the vertex, or the constant one
-  double mVertex = -1.0;        // its t
+  double mA = 0.0;        // |A|
+  Two mU{};               // A / |A|
+  double mAcross = 0.0;   // n: the speed at the vertex, or the constant one
+  double mVertex = -1.0;  // its t
   bool mIsStraight = false;
 };
 
@@ -186,21 +215,21 @@ class Parabola {
 struct SmPath::Measure {
   std::vector<Segment> segments;
   std::vector<Contour> contours;
-  double x = 0.0, y = 0.0;  // the current point
-  double length = 0.0;      // of the measured contour
-  double limit = -1.0;      // the largest distance that has a position
+  Two current{};        // the current point
+  double length = 0.0;  // of the measured contour
+  double limit = -1.0;  // the largest distance that has a position
   double tolerance = kTolerance;
   std::size_t first = 0;  // the measured segments
   std::size_t last = 0;
   std::size_t cut = 0;  // the segment that `pieces` belong to
   int pieceCount = 0;
-  int piece = 0;  // where the last query was
+  const Piece* now = &kNowhere;  // where the last query was
   std::array<Piece, kMostPieces> pieces;
 
   void forget() {
     segments.clear();
     contours.clear();
-    x = y = 0.0;
+    current = Two{};
     first = last = 0;
     setEmpty();
   }
@@ -208,33 +237,42 @@ struct SmPath::Measure {
   void setEmpty() {
     length = 0.0;
     limit = -1.0;
+    now = &kNowhere;
   }
 
-  void addQuad(double controlX, double controlY, double toX, double toY) {
-    addCurve({x, y, 2.0 * (controlX - x), 2.0 * (controlY - y), x - 2.0 * controlX + toX,
-              y - 2.0 * controlY + toY},
-             toX, toY);
+  void addQuad(Two control, Two to) {
+    addCurve({current, 2.0 * (control - current), current - 2.0 * control + to}, to);
   }
 
-  void addLine(double toX, double toY) { addCurve({x, y, toX - x, toY - y, 0.0, 0.0}, toX, toY); }
+  void addLine(Two to) { addCurve({current, to - current, Two{}}, to); }
 
-  // What memory has no room for is left out.
-  void addContour(double atX, double atY) {
-    try {
-      contours.push_back({segments.size(), atX, atY});
-      x = atX;
-      y = atY;
-    } catch (const std::bad_alloc&) {
+  void addContour(Two at) {
+    if (hasRoom(contours)) {
+      contours.push_back({segments.size(), at});
+      current = at;
     }
   }
 
-  void addCurve(const Curve& curve, double toX, double toY) {
-    if (contours.empty()) addContour(x, y);
-    try {
+  void addCurve(const Curve& curve, Two to) {
+    if (contours.empty()) addContour(current);
+    if (hasRoom(segments)) {
       segments.push_back({curve, 0.0, 0.0});
-      x = toX;
-      y = toY;
-    } catch (const std::bad_alloc&) {
+      current = to;
+    }
+  }
+
+  // Room for one more. What memory has no room for is left out.
+  template <typename Kind>
+  static bool hasRoom(std::vector<Kind>& all) {
+    return all.size() < all.capacity() || grows(all);
+  }
+  template <typename Kind>
+  [[gnu::noinline]] static bool grows(std::vector<Kind>& all) {
+    try {
+      all.reserve(std::max<std::size_t>(2 * all.size(), 4));
+      return true;
+    } catch (const std::exception&) {
+      return false;
     }
   }
 
@@ -244,7 +282,7 @@ struct SmPath::Measure {
     const Parabola parabola(segment.curve);
     cut = index;
     pieceCount = 0;
-    piece = 0;
+    now = pieces.data();
     double distance = segment.begin;
     std::array<Joint, kMostCuts + 1> ahead;
     int waiting = 1;
@@ -272,10 +310,11 @@ struct SmPath::Measure {
     if (contour >= contours.size()) return;
     first = contours[contour].firstSegment;
     last = contour + 1 < contours.size() ? contours[contour + 1].firstSegment : segments.size();
-    double farthest = std::abs(contours[contour].x) + std::abs(contours[contour].y);
+    const Two at = contours[contour].at;
+    double farthest = std::abs(at[0]) + std::abs(at[1]);
     for (std::size_t i = first; i < last; ++i) {
-      const Curve& curve = segments[i].curve;
-      farthest += std::abs(curve.ax) + std::abs(curve.ay) + std::abs(curve.bx) + std::abs(curve.by);
+      const auto& [p, b, a] = segments[i].curve;
+      farthest += std::abs(a[0]) + std::abs(a[1]) + std::abs(b[0]) + std::abs(b[1]);
     }
     if (!std::isfinite(farthest)) {
       length = farthest;
@@ -283,9 +322,9 @@ struct SmPath::Measure {
     }
     tolerance = std::max(kTolerance, kRelativeTolerance * farthest);
     if (first == last) {
-      pieces[0] = {0.0, 0.0, {contours[contour].x, contours[contour].y}, {}, {}, {}};
+      pieces[0] = {0.0, 0.0, contours[contour].at, Two{}, Two{}, Two{}};
       pieceCount = 1;
-      piece = 0;
+      now = pieces.data();
     } else {
       for (std::size_t i = first; i < last; ++i) {
         Segment& segment = segments[i];
@@ -302,29 +341,33 @@ struct SmPath::Measure {
     limit = length * (1.0 + kLengthRounding);
   }
 
-  // Finds the piece that holds a distance other than the last one's. Out of line, to keep the usual query
-  // short.
-  [[gnu::noinline]] const Piece& seek(double distance) {
+  // Moves to the piece that holds a distance; the last one takes what rounding adds. False when the path has
+  // no such distance.
+  bool seek(double distance) {
+    if (!(distance >= 0.0 && distance <= limit)) return false;
     if (first != last) {
-      const Segment& now = segments[cut];
-      if (distance < now.begin || (distance > now.end && cut + 1 < last)) {
+      const Segment& segment = segments[cut];
+      if (distance < segment.begin || (distance > segment.end && cut + 1 < last)) {
         const auto begin = segments.begin() + static_cast<std::ptrdiff_t>(first);
         const auto end = segments.begin() + static_cast<std::ptrdiff_t>(last - 1);
         const auto found = std::partition_point(
-            begin, end, [distance](const Segment& segment) { return segment.end < distance; });
+            begin, end, [distance](const Segment& other) { return other.end < distance; });
         cutSegment(static_cast<std::size_t>(found - segments.begin()));
       }
     }
-    const auto begin = pieces.begin();
-    const auto next = begin + std::min(piece + 1, pieceCount - 1);
-    if (distance >= next->begin && distance <= next->end) {
-      piece = static_cast<int>(next - begin);
-    } else {
-      piece = static_cast<int>(std::partition_point(begin, begin + (pieceCount - 1),
-                                                    [distance](const Piece& p) { return p.end < distance; }) -
-                               begin);
+    const Piece* const farthest = pieces.data() + pieceCount - 1;
+    now = std::min(now + 1, farthest);
+    if (!now->holds(distance)) {
+      now = std::partition_point(static_cast<const Piece*>(pieces.data()), farthest,
+                                 [distance](const Piece& piece) { return piece.end < distance; });
     }
-    return pieces[static_cast<std::size_t>(piece)];
+    return true;
+  }
+
+  [[gnu::noinline]] bool tellElsewhere(double distance, SmPoint* position, SmPoint* tangent) {
+    if (!seek(distance)) return false;
+    now->tell(distance, position, tangent);
+    return true;
   }
 };
 
@@ -357,17 +400,17 @@ void SmPath::freeMemory() {
 
 void SmPath::moveTo(float x, float y) {
   if (mMeasure == nullptr) mMeasure.reset(new (std::nothrow) Measure);
-  if (mMeasure != nullptr) mMeasure->addContour(x, y);
+  if (mMeasure != nullptr) mMeasure->addContour(Two{x, y});
 }
 
 void SmPath::lineTo(float x, float y) {
   if (mMeasure == nullptr) mMeasure.reset(new (std::nothrow) Measure);
-  if (mMeasure != nullptr) mMeasure->addLine(x, y);
+  if (mMeasure != nullptr) mMeasure->addLine(Two{x, y});
 }
 
 void SmPath::quadTo(float controlX, float controlY, float x, float y) {
   if (mMeasure == nullptr) mMeasure.reset(new (std::nothrow) Measure);
-  if (mMeasure != nullptr) mMeasure->addQuad(controlX, controlY, x, y);
+  if (mMeasure != nullptr) mMeasure->addQuad(Two{controlX, controlY}, Two{x, y});
 }
 
 void SmPath::resetPath(int contour) {
@@ -383,26 +426,10 @@ float SmPath::getLength() const {
 bool SmPath::getPosTan(float distance, SmPoint* position, SmPoint* tangent) const {
   Measure* const measure = mMeasure.get();
   if (measure == nullptr) return false;
-  const double at = distance;
-  if (!(at >= 0.0 && at <= measure->limit)) return false;
-  const Piece* piece = &measure->pieces[static_cast<std::size_t>(measure->piece)];
-  if (at < piece->begin || at > piece->end) [[unlikely]]
-    piece = &measure->seek(at);
-  const double s = at - piece->begin;
-  if (position != nullptr) {
-    position->x = static_cast<float>(piece->at[0] +
-                                     s * (piece->first[0] + s * (piece->second[0] + s * piece->third[0])));
-    position->y = static_cast<float>(piece->at[1] +
-                                     s * (piece->first[1] + s * (piece->second[1] + s * piece->third[1])));
-  }
-  if (tangent != nullptr) {
-    const double dx = piece->first[0] + s * (2.0 * piece->second[0] + s * (3.0 * piece->third[0]));
-    const double dy = piece->first[1] + s * (2.0 * piece->second[1] + s * (3.0 * piece->third[1]));
-    const double size = std::sqrt(dx * dx + dy * dy);
-    const double scale = size > 0.0 ? 1.0 / size : 0.0;
-    tangent->x = static_cast<float>(dx * scale);
-    tangent->y = static_cast<float>(dy * scale);
-  }
+  const Piece& piece = *measure->now;
+  if (!piece.holds(distance)) [[unlikely]]
+    return measure->tellElsewhere(distance, position, tangent);
+  piece.tell(distance, position, tangent);
   return true;
 }
 

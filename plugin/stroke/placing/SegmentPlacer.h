@@ -64,8 +64,8 @@ class SegmentPlacer {
   void placeOne(const SegmentLook& look, RectF* rect) {
     Appender appender(*mRenderDrawable, 1);
     StampRun<Version> run(appender, look, mStamps);
-    *run.next() = {mPath.last().x, mPath.last().y};
-    run.place();
+    *run.places() = {mPath.last().x, mPath.last().y};
+    run.place(1);
     finish(run, rect);
   }
 

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <algorithm>
 #include <array>
 #include <cmath>
 #include <concepts>
@@ -12,6 +13,7 @@
 #include "base/Vector.h"
 #include "graphics/SmPath.h"
 #include "render/StampVertices.h"
+#include "stroke/placing/StampWalk.h"
 
 namespace Qelt {
 
@@ -33,15 +35,32 @@ concept StampRow = requires(float running) {
 // segment. Growing is minimum and maximum, so the order does not matter. Stroke units.
 class DirtyBox {
  public:
-  void add(float x, float y, float reach) {
-    const Four edges = Four{x, y, -x, -y} - Four{reach, reach, reach, reach};
-    // Written so that an edge that is NaN changes nothing.
-    mLeast = edges < mLeast ? edges : mLeast;
+  // Takes in `count` squares: their centres, and how far they reach from there. Written so that an edge that
+  // is NaN changes nothing.
+  void add(const SmPoint* centres, const float* reaches, int count) {
+    Four least = mLeast, most = mMost;
+    const auto take = [&](Four centre, Four reach) {
+      const Four leftTop = centre - reach, rightBottom = centre + reach;
+      least = leftTop < least ? leftTop : least;
+      most = rightBottom > most ? rightBottom : most;
+    };
+    int i = 0;
+    for (; i + 1 < count; i += 2) {
+      take(std::bit_cast<Four>(TwoDoubles{asDouble(centres[i]), asDouble(centres[i + 1])}),
+           Four{reaches[i], reaches[i], reaches[i + 1], reaches[i + 1]});
+    }
+    if (i < count) {
+      take(std::bit_cast<Four>(TwoDoubles{asDouble(centres[i]), asDouble(centres[i])}),
+           Four{reaches[i], reaches[i], reaches[i], reaches[i]});
+    }
+    mLeast = least;
+    mMost = most;
   }
 
   void uniteInto(RectF* rect) const {
-    // Subtracted, so that no zero becomes a negative one.
-    const float left = mLeast[0], top = mLeast[1], right = 0.0f - mLeast[2], bottom = 0.0f - mLeast[3];
+    const float left = std::min(mLeast[0], mLeast[2]), top = std::min(mLeast[1], mLeast[3]);
+    // Added to 0, so that no zero is a negative one.
+    const float right = 0.0f + std::max(mMost[0], mMost[2]), bottom = 0.0f + std::max(mMost[1], mMost[3]);
     if (left > right || top > bottom) return;
     RectF box;
     box.Set(left, top, right, bottom);
@@ -51,28 +70,25 @@ class DirtyBox {
  private:
   static constexpr float kInfinity = std::numeric_limits<float>::infinity();
 
-  // Left and top, and right and bottom negated, so that all four grow downwards.
+  // x and y of every other square, x and y of those between.
   Four mLeast{kInfinity, kInfinity, kInfinity, kInfinity};
+  Four mMost{-kInfinity, -kInfinity, -kInfinity, -kInfinity};
 };
 
 // Counts the stamps of a stroke. The three stamp shapes take turns by the count.
 class StampCounter {
  public:
-  static constexpr int kShapes = 3;
-
   explicit StampCounter(std::int32_t count = 0) : mCount(count) {}
   std::int32_t count() const { return mCount; }
 
   // Counts so many stamps, at least one, and returns the first one's shape, 0 to 2.
   int take(int stamps) {
-    const int shape = mCount % kShapes;
+    const int shape = mCount % kStampShapes;
     // Past the largest count, whose shape is 1, the count begins again at 2: the shapes stay in turn.
     const int left = INT32_MAX - mCount;
     mCount = stamps <= left ? mCount + stamps : 1 + stamps - left;
     return shape;
   }
-  // The shape of the stamp after one of that shape.
-  static int shapeAfter(int shape) { return shape + 1 == kShapes ? 0 : shape + 1; }
 
  private:
   std::int32_t mCount;
@@ -100,12 +116,25 @@ struct SegmentLook {
   }
 };
 
-// The stamps of one segment: gathers their places, hands the stamps to the render drawable some at a time,
-// and gathers the area they cover. The walks of StampWalk.h take it as `run`; `finish` is called once
-// afterwards.
-//
-// Some at a time, because the path is asked for each place by a call, and no register keeps a float across a
-// call: whatever goes on from stamp to stamp would be loaded and stored again for each.
+// So many floats, one for each stamp that is handed over at once.
+using Floats = std::array<float, kStampsAtOnce>;
+
+// Writes `count` floats that grow by `step`, rounded each time, and returns the next one. Four at a time, as
+// whoever reads them does: a load that spans several stores waits until all of them have left the processor.
+inline float runUp(float value, float step, int count, Floats& floats) {
+  const int fours = count / 4, rest = count % 4;
+  const auto next = [&] { return std::exchange(value, value + step); };
+  float* out = floats.data();
+  for (int i = 0; i < fours; ++i, out += 4) {
+    const float a = next(), b = next(), c = next(), d = next();
+    storeFour(out, Four{a, b, c, d});
+  }
+  for (int i = 0; i < rest; ++i) *out++ = next();
+  return value;
+}
+
+// The stamps of one segment: hands them to the render drawable, some at a time, and gathers the area they
+// cover. The walks of StampWalk.h take it as `run`; `finish` is called once afterwards.
 template <StampRow Version>
 class StampRun {
   static constexpr const auto& kProfile = Version::profile;
@@ -117,25 +146,44 @@ class StampRun {
   StampRun(Appender& appender, const SegmentLook& look, StampCounter counter)
       : mAppender(appender), mLook(look), mCounter(counter) {}
 
-  // Where to write the place of the next stamp.
-  SmPoint* next() { return mNext; }
-  // Places a stamp where that says.
-  void place() {
-    if (++mNext == mPlaces.data() + mPlaces.size()) handOver();
+  // Where to write the places of the next stamps, at most kStampsAtOnce.
+  SmPoint* places() { return mPlaces.data(); }
+  // Places so many stamps where that says.
+  void place(int count) {
+    if (count == 0) return;
+    const auto last = static_cast<std::size_t>(count) - 1;
+    mLastStamp = {mPlaces[last].x, mPlaces[last].y};
+    // Width and alpha where the ramps are at each stamp; then what follows from them.
+    Floats widths, alphas;
+    mLook.width = runUp(mLook.width, mLook.widthStep, count, widths);
+    mLook.alpha = runUp(mLook.alpha, mLook.alphaStep, count, alphas);
+    mLastAlpha = alphas[last];
+    Floats sizes, reaches;
+    for (std::size_t i = 0; i <= last; ++i) {
+      sizes[i] = kProfile.stampSize(widths[i]);
+      reaches[i] = kProfile.stampReach(widths[i]);
+      if constexpr (!kProfile.isOutline) alphas[i] = kProfile.stampAlpha(alphas[i]);
+    }
+    mBox.add(mPlaces.data(), reaches.data(), count);
+    if constexpr (kProfile.isOutline) {
+      // Kept: an outline's centres are cut to whole numbers; the area is not.
+      for (std::size_t i = 0; i <= last; ++i) {
+        mPlaces[i] = {std::trunc(mPlaces[i].x), std::trunc(mPlaces[i].y)};
+      }
+    }
+    mAppender.AddPoints({count, mPlaces.data(), sizes.data(), alphas.data(), mCounter.take(count)},
+                        {mLook.tiltBlend, mLook.direction});
   }
 
   // Leaves out the stamp at that distance, and goes on as if it had been placed.
   void passOver(float distance) {
-    handOver();
     mCounter.take(1);
     mPassedOver = distance;
     mLastAlpha = mLook.advance();
   }
 
-  // Call after the last stamp: from then on all stamps are handed over, and `rect` takes in their area.
-  // `path` is the segment's.
+  // Call after the last stamp: `rect` takes in the area of all. `path` is the segment's.
   void finish(const SmPath& path, RectF* rect) {
-    handOver();
     mBox.uniteInto(rect);
     SmPoint at;
     if (mPassedOver >= 0.0f && path.getPosTan(mPassedOver, &at, nullptr)) mLastStamp = {at.x, at.y};
@@ -147,39 +195,11 @@ class StampRun {
   float lastAlpha() const { return mLastAlpha; }
 
  private:
-  // Hands over the stamps whose places have been gathered.
-  void handOver() {
-    const auto count = static_cast<int>(mNext - mPlaces.data());
-    if (count == 0) return;
-    // Copies, which stay in registers.
-    SegmentLook look = mLook;
-    DirtyBox box = mBox;
-    float lastAlpha = 0.0f;
-    int tile = mCounter.take(count);
-    mAppender.AddPoints(count, {look.tiltBlend, look.direction}, [&](int i) {
-      SmPoint centre = mPlaces[static_cast<std::size_t>(i)];
-      box.add(centre.x, centre.y, kProfile.stampReach(look.width));
-      // Kept: an outline's centres are cut to whole numbers; the area is not.
-      if constexpr (kProfile.isOutline) centre = {std::trunc(centre.x), std::trunc(centre.y)};
-      PlacedStamp stamp{centre, kProfile.stampSize(look.width), 0.0f, tile};
-      if constexpr (!kProfile.isOutline) stamp.alpha = kProfile.stampAlpha(look.alpha);
-      tile = StampCounter::shapeAfter(tile);
-      lastAlpha = look.advance();
-      return stamp;
-    });
-    mLook = look;
-    mBox = box;
-    mLastAlpha = lastAlpha;
-    mLastStamp = {mNext[-1].x, mNext[-1].y};
-    mNext = mPlaces.data();
-  }
-
   Appender& mAppender;
   SegmentLook mLook;
   StampCounter mCounter;
   DirtyBox mBox;
-  std::array<SmPoint, 16> mPlaces;
-  SmPoint* mNext = mPlaces.data();
+  std::array<SmPoint, kStampsAtOnce> mPlaces;
   Vector2<float> mLastStamp;
   float mLastAlpha = 0.0f;
   float mPassedOver = -1.0f;  // where the last stamp left out would lie; below 0 when none was left out
