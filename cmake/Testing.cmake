@@ -43,14 +43,16 @@ if(CMAKE_CROSSCOMPILING_EMULATOR)
   set(QELT_TEST_TIMEOUT 3600)
 endif()
 
-# qelt_add_tests(TARGET SOURCES ... [LIBRARIES ...] [LABEL ...] [PROCESSOR] [SHARDS N]): one executable of GoogleTest
+# qelt_add_tests(TARGET SOURCES ... [LIBRARIES ...] [LABEL ...] [PROCESSOR]
+#   [SLOW FILTER] [SHARDS N]): one executable of GoogleTest
 # cases, each of them a test of ctest's. The label "threaded" marks what ./check runs under ThreadSanitizer, "long" what
 # ./check --quick leaves out and what is begun first. PROCESSOR marks what another processor may answer differently from
 # the one that everything else runs on: there, it is labelled "processor" too, and a plain ./check runs nothing else.
 # Under an emulator or a sanitizer, where starting a program takes longer than most cases, one test of ctest's
-# runs them all, or SHARDS of them share the cases.
+# runs them all, or SHARDS of them share the cases. Those of GoogleTest's FILTER are then a test of their own, which is not
+# labelled "processor".
 function(qelt_add_tests target)
-  cmake_parse_arguments(PARSE_ARGV 1 arg "PROCESSOR" "LABEL;SHARDS" "SOURCES;LIBRARIES")
+  cmake_parse_arguments(PARSE_ARGV 1 arg "PROCESSOR" "LABEL;SLOW;SHARDS" "SOURCES;LIBRARIES")
   if(NOT arg_LABEL)
     set(arg_LABEL single)
   endif()
@@ -83,8 +85,14 @@ function(qelt_add_tests target)
       endif()
       add_test(NAME ${name} COMMAND ${target})
       set_tests_properties(${name} PROPERTIES TIMEOUT ${QELT_TEST_TIMEOUT} LABELS "${labels}" COST ${cost}
-        ENVIRONMENT "${environment};GTEST_TOTAL_SHARDS=${arg_SHARDS};GTEST_SHARD_INDEX=${index}")
+        ENVIRONMENT
+        "${environment};GTEST_TOTAL_SHARDS=${arg_SHARDS};GTEST_SHARD_INDEX=${index};GTEST_FILTER=-${arg_SLOW}")
     endforeach()
+    if(arg_SLOW)
+      add_test(NAME ${target}.slow COMMAND ${target})
+      set_tests_properties(${target}.slow PROPERTIES TIMEOUT ${QELT_TEST_TIMEOUT} LABELS ${arg_LABEL} COST ${cost}
+        ENVIRONMENT "${environment};GTEST_FILTER=${arg_SLOW}")
+    endif()
   else()
     # One label, since it takes no lists.
     gtest_discover_tests(${target}
