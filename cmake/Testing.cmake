@@ -43,14 +43,14 @@ if(CMAKE_CROSSCOMPILING_EMULATOR)
   set(QELT_TEST_TIMEOUT 3600)
 endif()
 
-# qelt_add_tests(TARGET SOURCES ... [LIBRARIES ...] [LABEL ...] [PROCESSOR]
-#   [SLOW FILTER] [SHARDS N]): one executable of GoogleTest
-# cases, each of them a test of ctest's. The label "threaded" marks what ./check runs under ThreadSanitizer, "long" what
-# ./check --quick leaves out and what is begun first. PROCESSOR marks what another processor may answer differently from
-# the one that everything else runs on: there, it is labelled "processor" too, and a plain ./check runs nothing else.
+# qelt_add_tests(TARGET SOURCES ... [LIBRARIES ...] [LABEL ...] [PROCESSOR] [SLOW FILTER] [SHARDS N]): one executable of
+# GoogleTest cases, each of them a test of ctest's. The label "threaded" marks what ./check runs under ThreadSanitizer,
+# "long" what ./check --quick leaves out and what is begun first. PROCESSOR marks what another processor may answer
+# differently from the one that everything runs on: there it is labelled "processor" too, and a plain ./check runs nothing
+# else.
 # Under an emulator or a sanitizer, where starting a program takes longer than most cases, one test of ctest's
-# runs them all, or SHARDS of them share the cases. Those of GoogleTest's FILTER are then a test of their own, which is not
-# labelled "processor".
+# runs them all, or SHARDS of them share the cases. Those of GoogleTest's FILTER are then a test of their own, which is
+# never labelled "processor".
 function(qelt_add_tests target)
   cmake_parse_arguments(PARSE_ARGV 1 arg "PROCESSOR" "LABEL;SLOW;SHARDS" "SOURCES;LIBRARIES")
   if(NOT arg_LABEL)
