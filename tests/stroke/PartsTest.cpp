@@ -159,7 +159,7 @@ TEST(RoomForStamps, IsNeverLessThanAWalkTakes) {
     void passOver(float) {}
     SmPoint at;
   };
-  // Its end answers for what lies beyond.
+  // Only how many stamps there are is looked at, not where they lie.
   SmPath path;
   path.moveTo(0.0f, 0.0f);
   path.lineTo(1.0f, 0.0f);
