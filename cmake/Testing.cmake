@@ -32,28 +32,44 @@ function(qelt_compile_as_test target)
 endfunction()
 qelt_compile_as_test(qelt_test_headers)
 
-# All that ThreadSanitizer is asked about.
+# All that ThreadSanitizer is asked about, and all that ./check has time to ask another processor.
 add_custom_target(qelt_threaded_tests)
+add_custom_target(qelt_processor_tests)
 
-# qelt_add_tests(TARGET SOURCES ... [LIBRARIES ...] [LABEL ...] [SHARDS N]): one executable of GoogleTest
-# cases, each of them a test of ctest's. The label "threaded" marks what ./check runs under ThreadSanitizer, "long" what
-# ./check --quick leaves out and what is begun first.
+# Seconds after which a test program is ended. Under an emulator it takes up to thirty times as long, and the machine may
+# be slow or busy besides.
+set(QELT_TEST_TIMEOUT 900)
+if(CMAKE_CROSSCOMPILING_EMULATOR)
+  set(QELT_TEST_TIMEOUT 3600)
+endif()
+
+# qelt_add_tests(TARGET SOURCES ... [LIBRARIES ...] [LABEL ...] [PROCESSOR] [SLOW FILTER] [SHARDS N]): one executable of
+# GoogleTest cases, each of them a test of ctest's. The label "threaded" marks what ./check runs under ThreadSanitizer,
+# "long" what ./check --quick leaves out and what is begun first. PROCESSOR marks what another processor may answer
+# differently from the one that everything runs on: there it is labelled "processor" too, and a plain ./check runs nothing
+# else.
 # Under an emulator or a sanitizer, where starting a program takes longer than most cases, one test of ctest's
-# runs them all, or SHARDS of them share the cases.
+# runs them all, or SHARDS of them share the cases. Those of GoogleTest's FILTER are then a test of their own, which is
+# never labelled "processor".
 function(qelt_add_tests target)
-  cmake_parse_arguments(PARSE_ARGV 1 arg "" "LABEL;SHARDS" "SOURCES;LIBRARIES")
+  cmake_parse_arguments(PARSE_ARGV 1 arg "PROCESSOR" "LABEL;SLOW;SHARDS" "SOURCES;LIBRARIES")
   if(NOT arg_LABEL)
     set(arg_LABEL single)
   endif()
   add_executable(${target} ${arg_SOURCES})
   target_link_libraries(${target} PRIVATE qelt_test_support ${arg_LIBRARIES})
   qelt_compile_as_test(${target})
+  set(labels ${arg_LABEL})
   if(arg_LABEL STREQUAL threaded)
     add_dependencies(qelt_threaded_tests ${target})
   endif()
-  set(properties LABELS ${arg_LABEL} COST 0)
+  if(arg_PROCESSOR)
+    list(APPEND labels processor)
+    add_dependencies(qelt_processor_tests ${target})
+  endif()
+  set(cost 0)
   if(arg_LABEL STREQUAL long)
-    set(properties LABELS long COST 1000)
+    set(cost 1000)
   endif()
   # A test that needs a GL context takes the software renderer; a loaded machine may need minutes to start it.
   set(environment "EGL_PLATFORM=surfaceless")
@@ -68,13 +84,20 @@ function(qelt_add_tests target)
         string(APPEND name .${shard})
       endif()
       add_test(NAME ${name} COMMAND ${target})
-      set_tests_properties(${name} PROPERTIES TIMEOUT 900 ${properties}
-        ENVIRONMENT "${environment};GTEST_TOTAL_SHARDS=${arg_SHARDS};GTEST_SHARD_INDEX=${index}")
+      set_tests_properties(${name} PROPERTIES TIMEOUT ${QELT_TEST_TIMEOUT} LABELS "${labels}" COST ${cost}
+        ENVIRONMENT
+        "${environment};GTEST_TOTAL_SHARDS=${arg_SHARDS};GTEST_SHARD_INDEX=${index};GTEST_FILTER=-${arg_SLOW}")
     endforeach()
+    if(arg_SLOW)
+      add_test(NAME ${target}.slow COMMAND ${target})
+      set_tests_properties(${target}.slow PROPERTIES TIMEOUT ${QELT_TEST_TIMEOUT} LABELS ${arg_LABEL} COST ${cost}
+        ENVIRONMENT "${environment};GTEST_FILTER=${arg_SLOW}")
+    endif()
   else()
+    # One label, since it takes no lists.
     gtest_discover_tests(${target}
       NO_PRETTY_VALUES
       DISCOVERY_TIMEOUT 120
-      PROPERTIES TIMEOUT 300 ${properties} ENVIRONMENT ${environment})
+      PROPERTIES TIMEOUT 300 LABELS ${arg_LABEL} COST ${cost} ENVIRONMENT ${environment})
   endif()
 endfunction()

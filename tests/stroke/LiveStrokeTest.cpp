@@ -1,6 +1,7 @@
 #include <gmock/gmock.h>
 
 #include <cmath>
+#include <cstddef>
 #include <string>
 #include <utility>
 #include <vector>
@@ -144,6 +145,21 @@ TEST(RefusedDeletion, IsOfferedAgainAheadOfTheNextBatch) {
   board.queue.accept = nullptr;
   board.move({{70.0f, 10.0f}});
   EXPECT_THAT(board.takePosts(), ElementsAre("SetRect", "DeleteBatch", "Batch", "Render", "DeleteBatch"));
+}
+
+// So long that rounding shortens most steps from stamp to stamp, and the segment takes hundreds of stamps
+// more than its length holds of spacings.
+TEST(FarMove, HandsOverEveryStampOfItsWay) {
+  DrawingBoard board({.curve = false});
+  board.down({0.0f, 10.0f});
+  board.move({{60000.0f, 10.0f}});
+  const std::vector<Stamp> stamps = board.takeStamps();
+  ASSERT_GT(stamps.size(), 150100u);
+  for (std::size_t i = 1; i < stamps.size(); ++i) {
+    ASSERT_NEAR(stamps[i].x - stamps[i - 1].x, 0.4f, 0.005f) << i;
+    ASSERT_EQ(stamps[i].tile, (stamps[i - 1].tile + 1) % 3) << i;
+  }
+  EXPECT_NEAR(stamps.back().x, 60000.0f, 0.41f);
 }
 
 // Margins of version 8 are device pixels: at zoom 4 half a pixel is 0.125 units. A view that cannot be

@@ -169,6 +169,41 @@ TEST(RoomForStamps, IsMadeForTheWayFromPointToPoint) {
   EXPECT_EQ(spacedStamps(0.0f, 1.0f, INFINITY), kMostStampsPerSegment);
 }
 
+// What a walk places is written without another look at the room, so the room has to do wherever a walk's
+// rounding leads.
+TEST(RoomForStamps, IsNeverLessThanAWalkTakes) {
+  struct Run {
+    SmPoint* next() { return &at; }
+    void place() {}
+    void passOver(float) {}
+    SmPoint at;
+  };
+  // Only how many stamps there are is looked at, not where they lie.
+  SmPath path;
+  path.moveTo(0.0f, 0.0f);
+  path.lineTo(1.0f, 0.0f);
+  path.resetPath(0);
+  std::mt19937 random(24);
+  const auto between = [&random](float low, float high) {
+    return std::uniform_real_distribution<float>(low, high)(random);
+  };
+  int beyondTheQuotient = 0;
+  for (int i = 0; i < 4000; ++i) {
+    const float spacing = i % 2 == 0 ? 0.4f : std::exp(between(-12.0f, 6.0f));
+    // So many stamps by the quotient; now and then from far out on, where a step is half again as long as
+    // another.
+    const float stamps = std::exp(between(0.0f, i % 8 == 0 ? 12.4f : 9.0f));
+    const float first =
+        i % 3 == 0 ? spacing * std::exp(between(12.0f, 17.5f)) : spacing * between(0.0f, 1.0f);
+    const float length = first + stamps * spacing;
+    const int room = spacedStamps(first, spacing, length);
+    const int taken = walkSpaced(path, first, spacing, length, kMostStampsPerSegment, Run()).stamps;
+    ASSERT_LE(taken, room) << first << " " << spacing << " " << length;
+    beyondTheQuotient += static_cast<float>(taken) > (length - first) / spacing + 2.0f ? 1 : 0;
+  }
+  EXPECT_GT(beyondTheQuotient, 100);
+}
+
 TEST(StampCounterTest, LetsTheShapesTakeTurnsEvenPastTheLargestCount) {
   constexpr int kMost = std::numeric_limits<std::int32_t>::max();  // 2147483646 = 3 * 715827882
   StampCounter one(kMost - 1);
