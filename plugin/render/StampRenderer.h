@@ -142,7 +142,11 @@ class StampRenderer : public HostBase {
   }
 
   // Makes room for stamps to come. Throws std::bad_alloc.
-  void reserve(int stamps) { reserveStamps(this->mWriteBuffer, stamps, kFloatsPerStamp); }
+  void reserve(int stamps) {
+    std::vector<float>* const batch = this->mWriteBuffer;
+    if (batch == nullptr) return;
+    reserveFloats(*batch, batch->size() + static_cast<std::size_t>(stamps) * kFloatsPerStamp + kPastLast);
+  }
 
   UnclaimedBatch* unclaimedBatch() { return &mUnclaimed; }
 

@@ -128,11 +128,9 @@ inline StampExtent antialiasedExtent(float halfWidth, Vector2<float> inverseScal
 // How many floats a stamp's last store reaches past it (StampWriter).
 inline constexpr std::size_t kPastLast = 1;
 
-// Makes room for `count` more stamps, at least doubling so that a long redraw stays linear.
-inline void reserveStamps(std::vector<float>* buffer, int count, std::size_t floatsPerStamp) {
-  if (buffer == nullptr) return;
-  const std::size_t needed = buffer->size() + static_cast<std::size_t>(count) * floatsPerStamp + kPastLast;
-  if (needed > buffer->capacity()) buffer->reserve(std::max(needed, 2 * buffer->capacity()));
+// Makes room for so many floats in all, at least doubling so that a long redraw stays linear.
+inline void reserveFloats(std::vector<float>& batch, std::size_t floats) {
+  if (floats > batch.capacity()) batch.reserve(std::max(floats, 2 * batch.capacity()));
 }
 
 // Writes the vertices of stamps that are posed alike: 6 * Stride floats each, where Stride is that of one of
@@ -201,8 +199,7 @@ class StampAppender {
   StampAppender(std::vector<float>* batch, int stamps) : mBatch(batch) {
     if (batch == nullptr) return;
     mUsed = batch->size();
-    reserveStamps(batch, stamps, kFloats);
-    batch->resize(mUsed + static_cast<std::size_t>(stamps) * kFloats + kPastLast);
+    makeRoom(stamps);
   }
   ~StampAppender() {
     if (mBatch != nullptr) mBatch->resize(mUsed);
@@ -210,15 +207,25 @@ class StampAppender {
   StampAppender(const StampAppender&) = delete;
   StampAppender& operator=(const StampAppender&) = delete;
 
-  // Where the next stamps are to be written, of those that there is room for; null without a batch.
+  // Where the next stamps are to be written; null without a batch. Where there is no room for them after all,
+  // it is made, and may throw std::bad_alloc.
   float* take(int stamps) {
-    return mBatch != nullptr
-               ? mBatch->data() + std::exchange(mUsed, mUsed + static_cast<std::size_t>(stamps) * kFloats)
-               : nullptr;
+    if (mBatch == nullptr) return nullptr;
+    if (endAfter(stamps) > mBatch->size()) [[unlikely]]
+      makeRoom(stamps);
+    return mBatch->data() + std::exchange(mUsed, mUsed + static_cast<std::size_t>(stamps) * kFloats);
   }
 
  private:
   static constexpr std::size_t kFloats = 6 * Stride;
+
+  std::size_t endAfter(int stamps) const {
+    return mUsed + static_cast<std::size_t>(stamps) * kFloats + kPastLast;
+  }
+  void makeRoom(int stamps) {
+    reserveFloats(*mBatch, endAfter(stamps));
+    mBatch->resize(endAfter(stamps));
+  }
 
   std::vector<float>* mBatch;
   std::size_t mUsed = 0;

@@ -7,6 +7,7 @@
 #include <cstdint>
 #include <limits>
 #include <random>
+#include <vector>
 
 #include "base/RectF.h"
 #include "engine/MotionEvent.h"
@@ -173,10 +174,10 @@ TEST(RoomForStamps, IsMadeForTheWayFromPointToPoint) {
 // rounding leads.
 TEST(RoomForStamps, IsNeverLessThanAWalkTakes) {
   struct Run {
-    SmPoint* next() { return &at; }
-    void place() {}
+    SmPoint* places() { return at.data(); }
+    void place(int) {}
     void passOver(float) {}
-    SmPoint at;
+    std::array<SmPoint, kStampsAtOnce> at;
   };
   // Only how many stamps there are is looked at, not where they lie.
   SmPath path;
@@ -202,6 +203,19 @@ TEST(RoomForStamps, IsNeverLessThanAWalkTakes) {
     beyondTheQuotient += static_cast<float>(taken) > (length - first) / spacing + 2.0f ? 1 : 0;
   }
   EXPECT_GT(beyondTheQuotient, 100);
+}
+
+// Should the reckoning ever be short, room is made late rather than never.
+TEST(RoomForStamps, GrowsWhereItIsShort) {
+  std::vector<float> batch(7);
+  {
+    StampAppender<9> appender(&batch, 0);
+    appender.take(2)[2 * 54 - 1] = 5.0f;
+    std::fill_n(appender.take(40), 40 * 54, 6.0f);
+  }
+  ASSERT_EQ(batch.size(), 7u + 42 * 54);
+  EXPECT_EQ(batch[7 + 107], 5.0f);
+  EXPECT_EQ(batch.back(), 6.0f);
 }
 
 TEST(StampCounterTest, LetsTheShapesTakeTurnsEvenPastTheLargestCount) {
