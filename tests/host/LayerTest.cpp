@@ -177,6 +177,10 @@ TEST_P(Layer, SaysClearlyWhatCannotBeDrawn) {
   EXPECT_EQ(tiled.GetBitmap()->GetSubBitmap(6), nullptr);
   EXPECT_EQ(tiled.GetBitmap()->GetSubBitmap(-1), nullptr);
   EXPECT_EQ(CanvasLayer(queue, 1030, 600, CanvasLayer::kOneTile).GetBitmap()->GetTileCount(), 1);
+  EXPECT_THROW(tiled.setTileSize(0), std::runtime_error);
+  EXPECT_EQ(tiled.GetBitmap()->GetTileCount(), 6);
+  tiled.setTileSize(CanvasLayer::kOneTile);
+  EXPECT_EQ(tiled.GetBitmap()->GetTileCount(), 1);
   EXPECT_THROW(CanvasLayer(queue, 0, 10), std::runtime_error);
   EXPECT_THROW(CanvasLayer(queue, 10, 10, 0), std::runtime_error);
   RenderQueue blind(GetParam(), RenderQueue::GL::None);

@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <functional>
 #include <new>
+#include <span>
 #include <stdexcept>
 #include <vector>
 
@@ -14,6 +15,8 @@
 #include "desktop/pencommon/BatchObserver.h"
 #include "ink/Ink.h"
 #include "output/OutputFile.h"
+#include "output/PictureSink.h"
+#include "output/StageTimes.h"
 #include "output/Terminal.h"
 #include "play/CallRecorder.h"
 #include "play/Options.h"
@@ -88,10 +91,71 @@ TEST(PageDrawing, StartsAgainWhereTheContextIsLost) {
   };
   const std::vector<std::uint8_t> whole = drawZigzag(12, losing(1, 0));
   const int all = posts;
-  for (const int number : {1, all / 2, all})
+  // With outlines two layers are drawn, each of which may be lost.
+  for (const int number : {1, all / 4, all / 2, all / 2 + 1, 3 * all / 4, all})
     EXPECT_TRUE(drawZigzag(12, losing(number, 1)) == whole) << number;
   EXPECT_NE(whole, std::vector<std::uint8_t>(whole.size(), 255));
   EXPECT_THROW(drawZigzag(12, losing(all / 2, 1000)), std::runtime_error) << "no end";
+}
+
+// Takes a picture, and the context away after some of its rows.
+class LosingSink : public PictureSink {
+ public:
+  LosingSink(RenderQueue& queue, int losses) : mQueue(queue), mLosses(losses) {}
+  void begin(int, int) override {}
+  void takeRows(std::span<const std::uint8_t> rows) override {
+    pixels.insert(pixels.end(), rows.begin(), rows.end());
+    if (mLosses-- <= 0) return;
+    mQueue.loseContext();
+    mQueue.restoreContext();
+  }
+
+  std::vector<std::uint8_t> pixels;
+
+ private:
+  RenderQueue& mQueue;
+  int mLosses;
+};
+
+// The page is taller than what is read back at once, with a cross in each part. Outlines are white where
+// their own stroke is, so they lie under another's ink only where strokes cross.
+TEST(PageDrawing, LaysLayersOverEachOtherInEveryPart) {
+  constexpr int kWidth = 128, kHeight = 9'000, kApart = 1'500;
+  Page page;
+  for (int y = 60; y < kHeight; y += kApart) {
+    const float x = 40.0f + static_cast<float>(y) / 400.0f, middle = static_cast<float>(y);
+    for (const float slope : {-1.0f, 1.0f}) {
+      page.strokes.add({{.x = x - 20, .y = middle - 20 * slope},
+                        {.x = x, .y = middle, .time = 8},
+                        {.x = x + 20, .y = middle + 20 * slope, .time = 16}});
+    }
+  }
+  const PluginLibrary plugin(QELT_PLUGIN_PATH);
+  RenderQueue queue(RenderQueue::Mode::Caller, RenderQueue::GL::Context);
+  StageTimes times;
+  Options options;
+  options.size = 6.0f;
+  options.argb = 0xC0000000u;
+  options.outline = {5.0f, 0xFF0000FFu};
+  const auto draw = [&](const DrawableSet& drawables, int losses = 0) {
+    Progress progress("drawing stroke", 1);
+    LosingSink sink(queue, losses);
+    PageDrawer(plugin, queue, times)
+        .draw(page, options, layOut({0, 0, kWidth, kHeight}, 1, 0), drawables, progress, sink);
+    return sink.pixels;
+  };
+  const auto both = draw({.stroke = true, .outline = true});
+  EXPECT_TRUE(draw({.stroke = true, .outline = true}, 4) == both) << "drawn again";
+  const std::vector<std::uint8_t> stroke = draw({.stroke = true});
+  const std::vector<std::uint8_t> outline = draw({.outline = true});
+  std::vector<int> shining(kHeight / kApart);  // pixels in which an outline is seen through ink
+  for (std::size_t i = 0; i < both.size(); i += 4) {
+    // Ink is grey, and blue below takes no blue from it.
+    ASSERT_NEAR(both[i + 2], stroke[i + 2], 1) << i;
+    ASSERT_NEAR(both[i], stroke[i] * outline[i] / 255, 1) << i;
+    if (stroke[i] < 200 && both[i] + 30 < stroke[i]) ++shining[i / 4 / kWidth / kApart];
+  }
+  EXPECT_GT(*std::min_element(shining.begin(), shining.end()), 10);
 }
 
 TEST(CallRecorder, LeavesNoCallWithoutItsBatches) {

@@ -19,6 +19,7 @@
 #include "desktop/graphics/Compose.h"
 #include "desktop/graphics/PenCanvas.h"
 #include "desktop/pencommon/BatchObserver.h"
+#include "output/PackedRows.h"
 #include "output/PictureSink.h"
 #include "output/StageTimes.h"
 #include "output/Terminal.h"
@@ -61,75 +62,104 @@ PixelSize pixelSizeOf(const PageLayout& layout, const Page& page, const Options&
   throw Refusal(page.name + text.data() + "; --fit WxH draws it smaller");
 }
 
-// A layer of the picture, and the canvas through which a drawable draws the page into it.
-class Layer {
+// The layers that a picture consists of, the lowest first.
+std::vector<DrawableKind> layersOf(const DrawableSet& drawables, const Options& options) {
+  std::vector<DrawableKind> layers;
+  if (drawables.outline) layers.push_back(DrawableKind::Outline);
+  if (drawables.stroke) layers.push_back(DrawableKind::Stroke);
+  if (drawables.preview) layers.push_back(DrawableKind::Preview);
+  // Predictions are gone again when the pen goes up.
+  if (drawables.prediction && options.points) layers.push_back(DrawableKind::Prediction);
+  return layers;
+}
+
+// A page being drawn, one layer after the other, in the same pixels.
+class Drawing : public PlayObserver {
  public:
-  Layer(RenderQueue& queue, PixelSize size, const Qelt::Matrix3<float>& matrix,
-        int tileSize = CanvasLayer::kTileSize)
-      : mQueue(queue),
-        mTileSize(tileSize),
-        mPixels(std::in_place, queue, size.width, size.height, tileSize),
-        mCanvas(&queue, &*mPixels) {
-    mCanvas.setMatrix(matrix);
+  // What is given outlives it.
+  Drawing(const PluginLibrary& plugin, RenderQueue& queue, const Page& page, const Options& options,
+          const PageLayout& layout, const DrawableSet& drawables, Progress& progress, StageTimes& times)
+      : mPlugin(plugin),
+        mQueue(queue),
+        mPage(page),
+        mOptions(options),
+        mDrawables(drawables),
+        mProgress(progress),
+        mTimes(times),
+        mSize(pixelSizeOf(layout, page, options)),
+        mLayers(layersOf(drawables, options)),
+        mWatch(queue),
+        mCanvas(&queue, nullptr),
+        mUnseenCanvas(&queue, nullptr) {
+    const StageTimes::Watch watch(mTimes, Stage::GL);
+    mPixels.emplace(queue, mSize.width, mSize.height);
+    mCanvas.setMatrix(layout.matrix);
+    mUnseenCanvas.setMatrix(layout.matrix);
   }
 
-  CanvasLayer& pixels() { return *mPixels; }
-  PenCanvas* canvas() { return &mCanvas; }
+  PixelSize size() const { return mSize; }
+  // The lowest first.
+  const std::vector<DrawableKind>& layers() const { return mLayers; }
 
-  // Gives it another size, and no pixels. Nothing posted through the canvas may still wait.
-  void resize(PixelSize size) {
-    if (mPixels->width() == size.width && mPixels->height() == size.height) return;
-    mCanvas.setLayer(nullptr);
-    mPixels.reset();
-    mPixels.emplace(mQueue, size.width, size.height, mTileSize);
-    mCanvas.setLayer(&*mPixels);
+  // Draws one of the layers, then reads it back in bands, which are the same for each layer, from the top on.
+  // Where the context is lost, which empties the layer, it is drawn anew, by new pens.
+  void draw(DrawableKind layer, const std::function<void(std::span<std::uint8_t> band)>& take) {
+    mLayer = layer;
+    mTries = 0;
+    // Predictions reach over the edges of tiles.
+    mPixels->setTileSize(isPrediction() ? CanvasLayer::kOneTile : CanvasLayer::kTileSize);
+    play();
+    const int rowsAtOnce = std::max(static_cast<int>(kBandBytes / rowBytes()), 1);
+    std::vector<std::uint8_t> band;
+    for (int top = 0; top < mSize.height; top += rowsAtOnce) {
+      band.resize(rowBytes() * static_cast<std::size_t>(std::min(rowsAtOnce, mSize.height - top)));
+      do {
+        if (wasEmptied()) play();
+        const StageTimes::Watch watch(mTimes, Stage::Compose);
+        mPixels->readRows(top, band);
+      } while (wasEmptied());
+      take(band);
+    }
   }
 
  private:
-  RenderQueue& mQueue;
-  const int mTileSize;
-  std::optional<CanvasLayer> mPixels;
-  PenCanvas mCanvas;
-};
-
-// A page on its layers. All but the last prediction, if the pen stays down after it, is gone again in the
-// finished picture; so the predictions' layer, which nobody sees until then, has a single pixel.
-class Drawing : public PlayObserver {
- public:
-  Drawing(RenderQueue& queue, PixelSize size, const PageLayout& layout, const DrawableSet& drawables,
-          Progress& progress, StageTimes& times)
-      : mWatch(queue), mProgress(progress), mTimes(times), mSize(size) {
-    const StageTimes::Watch watch(mTimes, Stage::GL);
-    if (drawables.outline) mOutline.emplace(queue, size, layout.matrix);
-    if (drawables.stroke || drawables.preview) mStroke.emplace(queue, size, layout.matrix);
-    if (drawables.prediction) mPrediction.emplace(queue, kUnseen, layout.matrix, CanvasLayer::kOneTile);
-    mCanvases.stroke = drawables.stroke ? mStroke->canvas() : nullptr;
-    mCanvases.preview = drawables.preview ? mStroke->canvas() : nullptr;
-    mCanvases.outline = mOutline ? mOutline->canvas() : nullptr;
-    mCanvases.prediction = mPrediction ? mPrediction->canvas() : nullptr;
+  // Whatever the layer, every drawable is called, since pens keep what one call leaves for the next; on a
+  // canvas without a layer they draw nothing.
+  void play() {
+    constexpr int kMostTries = 8;
+    const auto canvasFor = [this](bool takesPart, DrawableKind drawable) -> PenCanvas* {
+      if (!takesPart) return nullptr;
+      return drawable == mLayer ? &mCanvas : &mUnseenCanvas;
+    };
+    const Canvases canvases{.stroke = canvasFor(mDrawables.stroke, DrawableKind::Stroke),
+                            .outline = canvasFor(mDrawables.outline, DrawableKind::Outline),
+                            .preview = canvasFor(mDrawables.preview, DrawableKind::Preview),
+                            .prediction = canvasFor(mDrawables.prediction, DrawableKind::Prediction)};
+    do {
+      if (++mTries > kMostTries) throw std::runtime_error("the GL context is lost again and again");
+      mTimesEmptied = mPixels->timesEmptied();
+      // The drawable gets ready for a layer when it is given its canvas.
+      showDrawable(true);
+      const PenSet pens(mPlugin, mQueue, mPage, mOptions);
+      PagePlayer(pens, mPage, mOptions, canvases).play(*this);
+      // Reading waits until all is drawn.
+      const StageTimes::Watch watch(mTimes, Stage::GL);
+      std::vector<std::uint8_t> row(rowBytes());
+      mPixels->readRows(0, row);
+    } while (wasEmptied());
   }
-
-  const Canvases& canvases() const { return mCanvases; }
-  PixelSize size() const { return mSize; }
 
   void passBegins() override {
     const StageTimes::Watch watch(mTimes, Stage::GL);
-    if (!std::exchange(mIsNew, false)) {
-      for (Layer* const layer : pageLayers()) layer->pixels().clear();
-    }
-    if (mPrediction) {
-      letQueueCatchUp();
-      mPrediction->resize(kUnseen);
-      mPredictionIsSeen = false;
-    }
+    if (!std::exchange(mIsNew, false)) mPixels->clear();
+    // All but the last prediction, if the pen stays down after it, is gone again in the finished picture.
+    if (isPrediction()) showDrawable(false);
   }
 
   void call(const DrawableCall& call, const std::function<bool(Qelt::RectF*)>& make) override {
-    if (call.staysInSight) {
+    if (call.staysInSight && isPrediction()) {
       const StageTimes::Watch watch(mTimes, Stage::GL);
-      letQueueCatchUp();
-      mPrediction->resize(mSize);
-      mPredictionIsSeen = true;
+      showDrawable(true);
     }
     {
       const StageTimes::Watch watch(mTimes, Stage::Geometry);
@@ -144,65 +174,46 @@ class Drawing : public PlayObserver {
     }
   }
 
+  // Each layer has all strokes, and together they count once.
   void strokeEnds() override {
     const StageTimes::Watch watch(mTimes, Stage::GL);
     letQueueCatchUp();
-    mProgress.step();
+    if (++mStrokesEnded % mLayers.size() == 0) mProgress.step();
   }
 
-  // Goes up with every context loss that emptied the layers.
-  int timesEmptied() { return pageLayers().front()->pixels().timesEmptied(); }
-
-  // From the lowest to the highest, all of the page's size.
-  std::vector<Layer*> pageLayers() {
-    std::vector<Layer*> layers;
-    for (std::optional<Layer>* layer : {&mOutline, &mStroke, &mPrediction}) {
-      if (*layer && (layer != &mPrediction || mPredictionIsSeen)) layers.push_back(&**layer);
-    }
-    return layers;
+  void showDrawable(bool shown) {
+    letQueueCatchUp();
+    mCanvas.setLayer(shown ? &*mPixels : nullptr);
   }
-
- private:
-  static constexpr PixelSize kUnseen{1, 1};
 
   void letQueueCatchUp() {
     mWatch.finish();
     mWaitingBytes = 0;
   }
 
-  QueueWatch mWatch;
+  bool isPrediction() const { return mLayer == DrawableKind::Prediction; }
+  bool wasEmptied() const { return mPixels->timesEmptied() != mTimesEmptied; }
+  std::size_t rowBytes() const { return static_cast<std::size_t>(mSize.width) * 4; }
+
+  const PluginLibrary& mPlugin;
+  RenderQueue& mQueue;
+  const Page& mPage;
+  const Options& mOptions;
+  const DrawableSet& mDrawables;
   Progress& mProgress;
   StageTimes& mTimes;
   const PixelSize mSize;
-  bool mIsNew = true;  // nothing has been drawn on the layers
-  bool mPredictionIsSeen = false;
+  const std::vector<DrawableKind> mLayers;
+  DrawableKind mLayer = DrawableKind::Stroke;
+  QueueWatch mWatch;
+  std::optional<CanvasLayer> mPixels;
+  PenCanvas mCanvas;        // of the layer's drawable
+  PenCanvas mUnseenCanvas;  // of all others
+  bool mIsNew = true;       // nothing has been drawn on the pixels
+  int mTries = 0;           // of the layer
+  int mTimesEmptied = 0;    // when the layer was begun
   std::uint64_t mWaitingBytes = 0;
-  std::optional<Layer> mOutline, mStroke, mPrediction;
-  Canvases mCanvases;
-};
-
-// Some rows of all layers.
-class Band {
- public:
-  void read(Drawing& drawing, int top, std::size_t bytes) {
-    const std::vector<Layer*> layers = drawing.pageLayers();
-    mRead.resize(layers.size());
-    mViews.clear();
-    for (std::size_t i = 0; i < layers.size(); ++i) {
-      mRead[i].resize(bytes);
-      layers[i]->pixels().readRows(top, mRead[i]);
-      mViews.emplace_back(mRead[i]);
-    }
-  }
-  // Lays them over each other, where the lowest was.
-  std::span<const std::uint8_t> compose(const std::optional<std::array<std::uint8_t, 3>>& background) {
-    composeLayers(mViews, background, mRead.front());
-    return mRead.front();
-  }
-
- private:
-  std::vector<std::vector<std::uint8_t>> mRead;
-  std::vector<std::span<const std::uint8_t>> mViews;
+  std::size_t mStrokesEnded = 0;
 };
 
 std::optional<std::array<std::uint8_t, 3>> backgroundOf(const Options& options) {
@@ -261,42 +272,35 @@ float largestOutlineSize(const Page& page, const Options& options) {
 
 void PageDrawer::draw(const Page& page, const Options& options, const PageLayout& layout,
                       const DrawableSet& drawables, Progress& progress, PictureSink& sink) {
-  const PixelSize size = pixelSizeOf(layout, page, options);
-  Drawing drawing(mQueue, size, layout, drawables, progress, mTimes);
-  // What was drawn before the context was lost is gone: then the page is drawn anew, by a new pen.
-  constexpr int kMostTries = 8;
-  int timesBefore = 0, tries = 0;
-  const auto play = [&] {
-    do {
-      if (++tries > kMostTries) throw std::runtime_error("the GL context is lost again and again");
-      timesBefore = drawing.timesEmptied();
-      const PenSet pens(mPlugin, mQueue, page, options);
-      PagePlayer(pens, page, options, drawing.canvases()).play(drawing);
-      // Reading waits until all is drawn.
-      const StageTimes::Watch watch(mTimes, Stage::GL);
-      std::vector<std::uint8_t> row(static_cast<std::size_t>(size.width) * 4);
-      drawing.pageLayers().front()->pixels().readRows(0, row);
-    } while (drawing.timesEmptied() != timesBefore);
-  };
-  play();
+  Drawing drawing(mPlugin, mQueue, page, options, layout, drawables, progress, mTimes);
+  const std::vector<DrawableKind>& layers = drawing.layers();
+  std::vector<std::vector<PackedRows>> below(layers.size() - 1);  // of each layer but the highest, its bands
+  for (std::size_t i = 0; i < below.size(); ++i) {
+    drawing.draw(layers[i], [&](std::span<const std::uint8_t> band) {
+      const StageTimes::Watch watch(mTimes, Stage::Compose);
+      below[i].emplace_back(band);
+    });
+  }
 
   const auto background = backgroundOf(options);
-  const std::size_t rowBytes = static_cast<std::size_t>(size.width) * 4;
-  const int rowsAtOnce = std::max(static_cast<int>(kBandBytes / rowBytes), 1);
-  Band band;
-  for (int top = 0; top < size.height; top += rowsAtOnce) {
-    const std::size_t bytes = rowBytes * static_cast<std::size_t>(std::min(rowsAtOnce, size.height - top));
-    std::span<const std::uint8_t> rows;
-    do {
-      if (drawing.timesEmptied() != timesBefore) play();
+  std::vector<std::vector<std::uint8_t>> unpacked(below.size());
+  std::size_t number = 0;
+  drawing.draw(layers.back(), [&](std::span<std::uint8_t> band) {
+    {
       const StageTimes::Watch watch(mTimes, Stage::Compose);
-      band.read(drawing, top, bytes);
-      rows = band.compose(background);
-    } while (drawing.timesEmptied() != timesBefore);
+      std::vector<std::span<const std::uint8_t>> views;
+      for (std::size_t i = 0; i < below.size(); ++i) {
+        unpacked[i].resize(band.size());
+        below[i][number].unpack(unpacked[i]);
+        views.emplace_back(unpacked[i]);
+      }
+      views.emplace_back(band);
+      composeLayers(views, background, band);
+    }
     const StageTimes::Watch watch(mTimes, Stage::Encode);
-    if (top == 0) sink.begin(size.width, size.height);
-    sink.takeRows(rows);
-  }
+    if (number++ == 0) sink.begin(drawing.size().width, drawing.size().height);
+    sink.takeRows(band);
+  });
 }
 
 Picture drawPage(const PluginLibrary& plugin, RenderQueue& queue, const Page& page, const Options& options,

@@ -31,8 +31,9 @@ float largestPenSize(const PluginLibrary& plugin, RenderQueue& queue, const Page
 // The largest outline size on the page, as `outlineFor` gives it; 0 without outlines.
 float largestOutlineSize(const Page& page, const Options& options);
 
-// Draws pages, one after the other, with one plug-in and one GL context. A page takes its pixels once for
-// each layer, and little besides: the picture is composed and handed on in bands. Main thread.
+// Draws pages, one after the other, with one plug-in and one GL context. A page takes its pixels once and
+// little besides: its layers are drawn one after the other, those below are kept packed, and the picture is
+// composed and handed on in bands. Main thread.
 class PageDrawer {
  public:
   // All outlive it.

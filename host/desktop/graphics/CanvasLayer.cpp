@@ -24,27 +24,20 @@ std::size_t rowBytes(int width) {
   return static_cast<std::size_t>(width) * 4;
 }
 
+std::string sizeText(int width, int height) {
+  return std::to_string(width) + " x " + std::to_string(height) + " pixels";
+}
+
 }  // namespace
 
 CanvasLayer::CanvasLayer(RenderQueue& queue, int width, int height, int tileSize)
     : mQueue(queue), mWidth(width), mHeight(height) {
-  const std::string size = std::to_string(width) + " x " + std::to_string(height) + " pixels";
-  if (width < 1 || height < 1 || tileSize < 1) throw std::runtime_error("a page of " + size + " has no area");
   const bool ran = mQueue.run([&] {
-    const GlDevice* const device = GlDevice::live();
-    if (device == nullptr) throw std::runtime_error("a page needs OpenGL, and there is none");
-    // A tile is drawn into at once, a page is not.
-    const bool drawable = std::min(std::max(width, height), tileSize) <= device->maxViewportSize();
-    const int most =
-        drawable ? device->maxTextureSize() : std::min(device->maxTextureSize(), device->maxViewportSize());
-    if (width > most || height > most) {
-      throw std::runtime_error("a page of " + size + " is larger than OpenGL can draw here (" +
-                               std::to_string(most) + " x " + std::to_string(most) + ")");
-    }
+    checkSize(tileSize);
     mBitmap = std::make_unique<GlBitmap>(width, height, tileSize);
     if (!mBitmap->isRenderable()) {
       mBitmap.reset();
-      throw std::runtime_error("OpenGL has no memory for a page of " + size);
+      throw std::runtime_error("OpenGL has no memory for a page of " + sizeText(width, height));
     }
   });
   if (!ran) throw std::runtime_error("a page needs a render thread, and it has been shut down");
@@ -60,6 +53,13 @@ CanvasLayer::~CanvasLayer() {
 
 Qelt::ISPBitmap* CanvasLayer::GetBitmap() {
   return mBitmap.get();
+}
+
+void CanvasLayer::setTileSize(int tileSize) {
+  mQueue.run([&] {
+    checkSize(tileSize);
+    mBitmap->setTiles(tileSize);
+  });
 }
 
 void CanvasLayer::clear() {
@@ -99,6 +99,23 @@ void CanvasLayer::readRows(int top, std::span<std::uint8_t> pixels) {
   bool read = false;
   mQueue.run([&] { read = mBitmap->readRows(top, pixels); });
   if (!read) throw std::runtime_error("a page cannot be read back without OpenGL");
+}
+
+void CanvasLayer::checkSize(int tileSize) const {
+  if (mWidth < 1 || mHeight < 1 || tileSize < 1) {
+    throw std::runtime_error("a page of " + sizeText(mWidth, mHeight) + " has no area");
+  }
+  const GlDevice* const device = GlDevice::live();
+  if (device == nullptr) throw std::runtime_error("a page needs OpenGL, and there is none");
+  // A tile is drawn into at once, a page is not.
+  const bool drawable = std::min(std::max(mWidth, mHeight), tileSize) <= device->maxViewportSize();
+  const int most =
+      drawable ? device->maxTextureSize() : std::min(device->maxTextureSize(), device->maxViewportSize());
+  if (mWidth > most || mHeight > most) {
+    throw std::runtime_error("a page of " + sizeText(mWidth, mHeight) +
+                             " is larger than OpenGL can draw here (" + std::to_string(most) + " x " +
+                             std::to_string(most) + ")");
+  }
 }
 
 }  // namespace QeltDesktop

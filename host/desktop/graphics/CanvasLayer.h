@@ -40,6 +40,9 @@ class QELT_HOST_API CanvasLayer : public Qelt::ISPLayer {
 
   int width() const { return mWidth; }
   int height() const { return mHeight; }
+  // Divides the layer into other tiles, which leaves its pixels as they are. Nothing that is to draw into it
+  // may still wait. Throws as the constructor does, and the tiles are then the old ones.
+  void setTileSize(int tileSize);
   // Makes every pixel transparent, after everything posted so far.
   void clear();
   // The same for the pixels of an area; what of it lies outside the layer is left out.
@@ -58,6 +61,9 @@ class QELT_HOST_API CanvasLayer : public Qelt::ISPLayer {
 
  private:
   friend class LayerBackup;
+
+  // Throws for the constructor. Render thread.
+  void checkSize(int tileSize) const;
 
   RenderQueue& mQueue;
   int mWidth;

@@ -63,12 +63,7 @@ void GlTile::EndRender(int) {}
 
 GlBitmap::GlBitmap(int width, int height, int tileSize)
     : mWidth(width), mHeight(height), mTextureInterface(*this) {
-  for (int y = 0; tileSize > 0 && y < height; y += std::min(tileSize, height - y)) {
-    for (int x = 0; x < width; x += std::min(tileSize, width - x)) {
-      mTiles.push_back(std::make_unique<GlTile>(*this, x, y, std::min(tileSize, width - x),
-                                                std::min(tileSize, height - y)));
-    }
-  }
+  setTiles(tileSize);
   // Sampling works without mipmaps from the start.
   mParameters = {{GL_TEXTURE_MIN_FILTER, GL_LINEAR},
                  {GL_TEXTURE_MAG_FILTER, GL_LINEAR},
@@ -83,6 +78,16 @@ GlBitmap::~GlBitmap() {
   gl(glDeleteFramebuffers)(1, &mFramebuffer);
   device()->state().forgetTexture(mTexture);
   gl(glDeleteTextures)(1, &mTexture);
+}
+
+void GlBitmap::setTiles(int tileSize) {
+  mTiles.clear();
+  for (int y = 0; tileSize > 0 && y < mHeight; y += std::min(tileSize, mHeight - y)) {
+    for (int x = 0; x < mWidth; x += std::min(tileSize, mWidth - x)) {
+      mTiles.push_back(std::make_unique<GlTile>(*this, x, y, std::min(tileSize, mWidth - x),
+                                                std::min(tileSize, mHeight - y)));
+    }
+  }
 }
 
 void GlBitmap::SetDebugName(const char*) {}

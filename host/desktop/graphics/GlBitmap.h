@@ -61,6 +61,8 @@ class QELT_HOST_API GlBitmap final : public Qelt::ISPBitmap, public GlResource {
   int GetWidth() const override { return mWidth; }
   int GetHeight() const override { return mHeight; }
   Qelt::ISPTexture* GetTexture() override { return &mTextureInterface; }
+  // Instead of those there are. 0: none.
+  void setTiles(int tileSize);
   void SetDebugName(const char* name) override;
   void SetPixels(const void* pixels, int width, int height) override;
   int GetTileCount() const override { return static_cast<int>(mTiles.size()); }
