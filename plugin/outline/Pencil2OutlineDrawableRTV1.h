@@ -54,7 +54,7 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
           mOutlineSize(drawable.GetOutlineSize()) {}
 
     // Appends stamps, for which there must be room.
-    void AddPoints(PlacedStamps stamps, const StampPose& pose) {
+    void AddPoints(const PlacedStamps& stamps, const StampPose& pose) {
       write(mInner, stamps, pose, [](const StampExtent& extent) { return extent; });
       write(mOuter, stamps, pose, [size = mOutlineSize](StampExtent extent) {
         extent.x = std::max(extent.x + size, 0.0f);

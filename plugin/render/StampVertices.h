@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <array>
-#include <bit>
 #include <cmath>
 #include <cstddef>
 #include <cstring>
@@ -52,7 +51,6 @@ inline GraphicsObject* createStampObject(const VertexLayout& layout) {
 
 // Four floats that are computed together.
 using Four [[gnu::vector_size(16)]] = float;
-using TwoDoubles [[gnu::vector_size(16)]] = double;
 
 // Writes four floats anywhere.
 inline void storeFour(float* out, Four four) {
@@ -60,12 +58,14 @@ inline void storeFour(float* out, Four four) {
   *reinterpret_cast<FourAnywhere*>(out) = four;
 }
 
-// The two floats of a point, to be moved as one.
-inline double asDouble(const SmPoint& point) {
+// Two points side by side. x and y of each are loaded as one.
+inline Four sideBySide(const SmPoint& a, const SmPoint& b) {
   static_assert(sizeof(SmPoint) == sizeof(double));
-  double both;
-  std::memcpy(&both, &point, sizeof both);
-  return both;
+  using TwoDoubles [[gnu::vector_size(16)]] = double;
+  double first, second;
+  std::memcpy(&first, &a, sizeof first);
+  std::memcpy(&second, &b, sizeof second);
+  return reinterpret_cast<Four>(TwoDoubles{first, second});
 }
 
 // The stamp shapes, which take turns along a stroke. An outline's stamps have none.
@@ -163,8 +163,7 @@ class StampWriter {
   }
 
   void write(float* out, const SmPoint& centre, float alpha, Four look) const {
-    const double both = asDouble(centre);
-    const Four edges = std::bit_cast<Four>(TwoDoubles{both, both}) + mReach;
+    const Four edges = sideBySide(centre, centre) + mReach;
     const Four leftTop = __builtin_shufflevector(edges, Four{0.0f, 1.0f}, 0, 1, 4, 5);
     const Four leftBottom = __builtin_shufflevector(edges, Four{0.0f, 0.0f}, 0, 3, 4, 5);
     const Four rightTop = __builtin_shufflevector(edges, Four{1.0f, 1.0f}, 2, 1, 4, 5);

@@ -46,12 +46,11 @@ class DirtyBox {
     };
     int i = 0;
     for (; i + 1 < count; i += 2) {
-      take(std::bit_cast<Four>(TwoDoubles{asDouble(centres[i]), asDouble(centres[i + 1])}),
+      take(sideBySide(centres[i], centres[i + 1]),
            Four{reaches[i], reaches[i], reaches[i + 1], reaches[i + 1]});
     }
     if (i < count) {
-      take(std::bit_cast<Four>(TwoDoubles{asDouble(centres[i]), asDouble(centres[i])}),
-           Four{reaches[i], reaches[i], reaches[i], reaches[i]});
+      take(sideBySide(centres[i], centres[i]), Four{reaches[i], reaches[i], reaches[i], reaches[i]});
     }
     mLeast = least;
     mMost = most;
