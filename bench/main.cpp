@@ -1,4 +1,5 @@
 #include <benchmark/benchmark.h>
+#include <malloc.h>
 
 #include <algorithm>
 #include <cstdio>
@@ -46,6 +47,10 @@ class RatioReporter : public benchmark::ConsoleReporter {
 }  // namespace
 
 int main(int argc, char** argv) {
+  // Freed memory is kept: to give it back to the system and take it anew, page by page, costs several times
+  // what the pen does with it, and the C library does so in one run and not in the next.
+  mallopt(M_MMAP_THRESHOLD, 1 << 30);
+  mallopt(M_TRIM_THRESHOLD, 1 << 30);
   // Short repetitions, mixed, so that what disturbs them disturbs all alike; later options win.
   char repetitions[] = "--benchmark_repetitions=9";
   char interleaving[] = "--benchmark_enable_random_interleaving=true";

@@ -53,10 +53,13 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
           mOuter(drawable.mOuterWriteBuffer, stamps),
           mOutlineSize(drawable.GetOutlineSize()) {}
 
-    // Appends stamps, for which there must be room.
+    // Appends stamps. There should be room for them: what is short of it is allocated, and may throw
+    // std::bad_alloc.
     void AddPoints(const PlacedStamps& stamps, const StampPose& pose) {
-      write(mInner, stamps, pose, [](const StampExtent& extent) { return extent; });
-      write(mOuter, stamps, pose, [size = mOutlineSize](StampExtent extent) {
+      mInner.makeRoom(stamps.count);
+      mOuter.makeRoom(stamps.count);
+      write(mInner.take(stamps.count), stamps, pose, [](const StampExtent& extent) { return extent; });
+      write(mOuter.take(stamps.count), stamps, pose, [size = mOutlineSize](StampExtent extent) {
         extent.x = std::max(extent.x + size, 0.0f);
         extent.y = std::max(extent.y + size, 0.0f);
         return extent;
@@ -65,9 +68,7 @@ class Pencil2OutlineDrawableRTV1 final : public Pencil2OutlineDrawableRT {
 
    private:
     template <typename Grow>
-    static void write(StampAppender<kFloatsPerVertex>& stream, const PlacedStamps& stamps,
-                      const StampPose& pose, Grow&& grow) {
-      float* out = stream.take(stamps.count);
+    static void write(float* out, const PlacedStamps& stamps, const StampPose& pose, Grow&& grow) {
       if (out == nullptr) return;
       StampWriter<kFloatsPerVertex> writer(pose);
       for (int i = 0; i < stamps.count; ++i, out += kFloatsPerStamp) {

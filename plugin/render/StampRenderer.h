@@ -95,7 +95,8 @@ class StampRenderer : public HostBase {
     Appender(StampRenderer& renderer, int stamps)
         : mStamps(renderer.mWriteBuffer, stamps), mInverseScale(renderer.mInverseScale) {}
 
-    // Appends stamps, for which there must be room.
+    // Appends stamps. There should be room for them: what is short of it is allocated, and may throw
+    // std::bad_alloc.
     void AddPoints(PlacedStamps stamps, const StampPose& pose) {
       float* out = mStamps.take(stamps.count);
       if (out == nullptr) return;

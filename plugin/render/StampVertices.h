@@ -76,8 +76,8 @@ struct PlacedStamps {
   int count;
   const SmPoint* centres;
   const float* sizes;   // their widths, or half of that where they are anti-aliased
-  const float* alphas;  // null for an outline's, which have none
-  int shape;            // of the first, 0 to 2
+  const float* alphas;  // not looked at for an outline's, which have none
+  int shape;            // of the first, 0 to 2; likewise
 };
 
 // What they have in common.
@@ -198,7 +198,7 @@ class StampAppender {
   StampAppender(std::vector<float>* batch, int stamps) : mBatch(batch) {
     if (batch == nullptr) return;
     mUsed = batch->size();
-    makeRoom(stamps);
+    grow(stamps);
   }
   ~StampAppender() {
     if (mBatch != nullptr) mBatch->resize(mUsed);
@@ -206,12 +206,16 @@ class StampAppender {
   StampAppender(const StampAppender&) = delete;
   StampAppender& operator=(const StampAppender&) = delete;
 
-  // Where the next stamps are to be written; null without a batch. Where there is no room for them after all,
-  // it is made, and may throw std::bad_alloc.
+  // Makes room for so many from here on, where there is too little. Throws as the constructor does.
+  void makeRoom(int stamps) {
+    if (mBatch != nullptr && endAfter(stamps) > mBatch->size()) [[unlikely]]
+      grow(stamps);
+  }
+
+  // Where the next stamps are to be written, which makes room where there is none; null without a batch.
   float* take(int stamps) {
     if (mBatch == nullptr) return nullptr;
-    if (endAfter(stamps) > mBatch->size()) [[unlikely]]
-      makeRoom(stamps);
+    makeRoom(stamps);
     return mBatch->data() + std::exchange(mUsed, mUsed + static_cast<std::size_t>(stamps) * kFloats);
   }
 
@@ -221,7 +225,7 @@ class StampAppender {
   std::size_t endAfter(int stamps) const {
     return mUsed + static_cast<std::size_t>(stamps) * kFloats + kPastLast;
   }
-  void makeRoom(int stamps) {
+  void grow(int stamps) {
     reserveFloats(*mBatch, endAfter(stamps));
     mBatch->resize(endAfter(stamps));
   }

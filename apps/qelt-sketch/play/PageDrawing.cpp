@@ -70,6 +70,8 @@ std::vector<DrawableKind> layersOf(const DrawableSet& drawables, const Options& 
   if (drawables.preview) layers.push_back(DrawableKind::Preview);
   // Predictions are gone again when the pen goes up.
   if (drawables.prediction && options.points) layers.push_back(DrawableKind::Prediction);
+  // A picture of predictions alone, or of nothing, is bare.
+  if (layers.empty()) layers.push_back(DrawableKind::Stroke);
   return layers;
 }
 

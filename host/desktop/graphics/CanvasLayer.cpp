@@ -24,6 +24,8 @@ std::size_t rowBytes(int width) {
   return static_cast<std::size_t>(width) * 4;
 }
 
+constexpr const char* kNoThread = "a page needs a render thread, and it has been shut down";
+
 std::string sizeText(int width, int height) {
   return std::to_string(width) + " x " + std::to_string(height) + " pixels";
 }
@@ -40,7 +42,7 @@ CanvasLayer::CanvasLayer(RenderQueue& queue, int width, int height, int tileSize
       throw std::runtime_error("OpenGL has no memory for a page of " + sizeText(width, height));
     }
   });
-  if (!ran) throw std::runtime_error("a page needs a render thread, and it has been shut down");
+  if (!ran) throw std::runtime_error(kNoThread);
 }
 
 CanvasLayer::~CanvasLayer() {
@@ -56,10 +58,11 @@ Qelt::ISPBitmap* CanvasLayer::GetBitmap() {
 }
 
 void CanvasLayer::setTileSize(int tileSize) {
-  mQueue.run([&] {
+  const bool ran = mQueue.run([&] {
     checkSize(tileSize);
     mBitmap->setTiles(tileSize);
   });
+  if (!ran) throw std::runtime_error(kNoThread);
 }
 
 void CanvasLayer::clear() {

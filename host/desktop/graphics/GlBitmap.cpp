@@ -81,13 +81,14 @@ GlBitmap::~GlBitmap() {
 }
 
 void GlBitmap::setTiles(int tileSize) {
-  mTiles.clear();
+  decltype(mTiles) tiles;
   for (int y = 0; tileSize > 0 && y < mHeight; y += std::min(tileSize, mHeight - y)) {
     for (int x = 0; x < mWidth; x += std::min(tileSize, mWidth - x)) {
-      mTiles.push_back(std::make_unique<GlTile>(*this, x, y, std::min(tileSize, mWidth - x),
-                                                std::min(tileSize, mHeight - y)));
+      tiles.push_back(std::make_unique<GlTile>(*this, x, y, std::min(tileSize, mWidth - x),
+                                               std::min(tileSize, mHeight - y)));
     }
   }
+  mTiles.swap(tiles);
 }
 
 void GlBitmap::SetDebugName(const char*) {}
