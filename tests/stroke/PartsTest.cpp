@@ -110,6 +110,19 @@ TEST(DirtyBoxTest, LeavesOutEdgesThatAreNaN) {
   }
 }
 
+// A box without any width, since nothing had an x, is none.
+TEST(DirtyBoxTest, IsNoneWhereAnAxisIsMissing) {
+  for (const SmPoint centre : {SmPoint{NAN, 5.0f}, SmPoint{5.0f, NAN}}) {
+    DirtyBox box;
+    const float reach = 1.0f;
+    box.add(&centre, &reach, 1);
+    RectF rect{3.0f, 4.0f, 5.0f, 6.0f};
+    box.uniteInto(&rect);
+    EXPECT_THAT((std::array{rect.left, rect.top, rect.right, rect.bottom}),
+                ElementsAreArray({3.0f, 4.0f, 5.0f, 6.0f}));
+  }
+}
+
 // An edge at zero is written as 0, never as -0.
 TEST(DirtyBoxTest, HasPositiveZeros) {
   DirtyBox box;
@@ -157,6 +170,38 @@ TEST(StampWalkTest, EndsWhereItCannotGoOn) {
   EXPECT_EQ(walk.stamps, 4);
   EXPECT_EQ(run.placed, 4);
   EXPECT_TRUE(walk.cutShort);
+}
+
+// However many are handed over at once: those beyond the bound are passed over, one by one and in order.
+TEST(StampWalkTest, PlacesNoMoreThanItMay) {
+  SmPath path;
+  path.moveTo(0.0f, 0.0f);
+  path.lineTo(100.0f, 0.0f);
+  path.resetPath(0);
+  struct Run {
+    SmPoint* places() { return at.data(); }
+    void place(int count) {
+      for (int i = 0; i < count; ++i) placed.push_back(at[static_cast<std::size_t>(i)].x);
+    }
+    void passOver(float distance) { passed.push_back(distance); }
+    std::array<SmPoint, kStampsAtOnce> at;
+    std::vector<float> placed, passed;
+  };
+  for (const int most : {0, 1, 31, 32, 33, 50, 100}) {
+    for (const bool evenly : {false, true}) {
+      Run run;
+      const WalkResult walk =
+          evenly ? walkEvenly(path, 100, 100.0f, most, run) : walkSpaced(path, 0.0f, 1.0f, 99.5f, most, run);
+      EXPECT_EQ(walk.stamps, 100);
+      EXPECT_FALSE(walk.cutShort);
+      EXPECT_EQ(walk.carry, evenly ? 0.0f : 0.5f);
+      ASSERT_EQ(run.placed.size(), static_cast<std::size_t>(most));
+      std::vector<float> all = run.placed;
+      all.insert(all.end(), run.passed.begin(), run.passed.end());
+      ASSERT_EQ(all.size(), 100u);
+      for (std::size_t i = 0; i < 100; ++i) EXPECT_FLOAT_EQ(all[i], static_cast<float>(i));
+    }
+  }
 }
 
 // Room is made ahead: a stamp every half unit of 1.95 + 5 + 12, which is 37.9, and two a sample, of which one

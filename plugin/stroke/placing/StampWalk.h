@@ -43,17 +43,12 @@ inline int spacedStamps(float first, float spacing, float length) {
 // run.places() says, and calls run.place(count); see StampRun.
 
 // The places at `count` distances, at most kStampsAtOnce; returns how many there are. Where the path has no
-// place, those after it are `wanted` or not.
-enum class AfterGap { Wanted, Unwanted };
-inline int findPlaces(const SmPath& path, const float* distances, int count, AfterGap wanted,
-                      SmPoint* places) {
+// place, none is written.
+inline int findPlaces(const SmPath& path, const float* distances, int count, SmPoint* places) {
   SmPoint* next = places;
   for (int i = 0; i < count; ++i) {
-    if (path.getPosTan(distances[i], next, nullptr)) [[likely]] {
+    if (path.getPosTan(distances[i], next, nullptr)) [[likely]]
       ++next;
-    } else if (wanted == AfterGap::Unwanted) {
-      break;
-    }
   }
   return static_cast<int>(next - places);
 }
@@ -98,7 +93,7 @@ WalkResult walkSpaced(const SmPath& path, float first, float spacing, float leng
     Spaced some;
     if (stamps < bound) {
       some = spaceOut(distance, spacing, length, std::min(kStampsAtOnce, bound - stamps), distances.data());
-      run.place(findPlaces(path, distances.data(), some.count, AfterGap::Wanted, run.places()));
+      run.place(findPlaces(path, distances.data(), some.count, run.places()));
     } else {
       if (stamps == kMostStampsPerSegment) return {spacing, true, stamps};
       some = {1, distance + spacing, distance + spacing > distance};
@@ -126,7 +121,7 @@ WalkResult walkEvenly(const SmPath& path, int count, float length, int most, Run
   while (i < bound) {
     const int some = std::min(kStampsAtOnce, bound - i);
     for (int k = 0; k < some; ++k) distances[static_cast<std::size_t>(k)] = static_cast<float>(i + k) * step;
-    const int found = findPlaces(path, distances.data(), some, AfterGap::Unwanted, run.places());
+    const int found = findPlaces(path, distances.data(), some, run.places());
     run.place(found);
     i += found;
     if (found < some) return {0.0f, stamps < count, i};
