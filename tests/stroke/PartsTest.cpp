@@ -140,35 +140,39 @@ TEST(DistanceTest, IsTakenInDoublesWhereSquaresDoNotFit) {
   EXPECT_FLOAT_EQ(distanceBetween({0.0f, -2e19f}, {0.0f, 2e19f}), 4e19f);
 }
 
+// Notes the x of the stamps that a walk places, and the distances of those that it passes over.
+struct NotedRun {
+  SmPoint* places() { return at.data(); }
+  void place(int count) {
+    for (int i = 0; i < count; ++i) placed.push_back(at[static_cast<std::size_t>(i)].x);
+  }
+  void passOver(float distance) { passed.push_back(distance); }
+  std::array<SmPoint, kStampsAtOnce> at;
+  std::vector<float> placed, passed;
+};
+
 // So far out that the next float is further away than the next stamp, or that there is none.
 TEST(StampWalkTest, EndsWhereItCannotGoOn) {
   SmPath path;
   path.moveTo(0.0f, 0.0f);
   path.lineTo(2e8f, 0.0f);
   path.resetPath(0);
-  struct Run {
-    SmPoint* places() { return at.data(); }
-    void place(int count) { placed += count; }
-    void passOver(float) { ++passed; }
-    std::array<SmPoint, kStampsAtOnce> at;
-    int placed = 0, passed = 0;
-  };
   for (const auto& [first, spacing, length] :
        {std::array{1e8f, 0.4f, 2e8f}, std::array{3e38f, 3e38f, 3e38f}}) {
     for (const int most : {0, 9}) {
-      Run run;
+      NotedRun run;
       const WalkResult walk = walkSpaced(path, first, spacing, length, most, run);
       EXPECT_EQ(walk.stamps, 1);
       EXPECT_TRUE(walk.cutShort);
       EXPECT_EQ(walk.carry, spacing);
-      EXPECT_EQ(run.passed, most == 0 ? 1 : 0);
+      EXPECT_EQ(run.passed.size(), most == 0 ? 1u : 0u);
     }
   }
   // The last steps before 2^24 are a whole one each; from there on half a step and a bit leads nowhere.
-  Run run;
+  NotedRun run;
   const WalkResult walk = walkSpaced(path, 0x1p24f - 3.0f, 1.0f, 2e8f, 99, run);
   EXPECT_EQ(walk.stamps, 4);
-  EXPECT_EQ(run.placed, 4);
+  EXPECT_EQ(run.placed.size(), 4u);
   EXPECT_TRUE(walk.cutShort);
 }
 
@@ -178,18 +182,9 @@ TEST(StampWalkTest, PlacesNoMoreThanItMay) {
   path.moveTo(0.0f, 0.0f);
   path.lineTo(100.0f, 0.0f);
   path.resetPath(0);
-  struct Run {
-    SmPoint* places() { return at.data(); }
-    void place(int count) {
-      for (int i = 0; i < count; ++i) placed.push_back(at[static_cast<std::size_t>(i)].x);
-    }
-    void passOver(float distance) { passed.push_back(distance); }
-    std::array<SmPoint, kStampsAtOnce> at;
-    std::vector<float> placed, passed;
-  };
   for (const int most : {0, 1, 31, 32, 33, 50, 100}) {
     for (const bool evenly : {false, true}) {
-      Run run;
+      NotedRun run;
       const WalkResult walk =
           evenly ? walkEvenly(path, 100, 100.0f, most, run) : walkSpaced(path, 0.0f, 1.0f, 99.5f, most, run);
       EXPECT_EQ(walk.stamps, 100);
@@ -218,12 +213,6 @@ TEST(RoomForStamps, IsMadeForTheWayFromPointToPoint) {
 // What a walk places is written without another look at the room, so the room has to do wherever a walk's
 // rounding leads.
 TEST(RoomForStamps, IsNeverLessThanAWalkTakes) {
-  struct Run {
-    SmPoint* places() { return at.data(); }
-    void place(int) {}
-    void passOver(float) {}
-    std::array<SmPoint, kStampsAtOnce> at;
-  };
   // Only how many stamps there are is looked at, not where they lie.
   SmPath path;
   path.moveTo(0.0f, 0.0f);
@@ -243,7 +232,7 @@ TEST(RoomForStamps, IsNeverLessThanAWalkTakes) {
         i % 3 == 0 ? spacing * std::exp(between(12.0f, 17.5f)) : spacing * between(0.0f, 1.0f);
     const float length = first + stamps * spacing;
     const int room = spacedStamps(first, spacing, length);
-    const int taken = walkSpaced(path, first, spacing, length, kMostStampsPerSegment, Run()).stamps;
+    const int taken = walkSpaced(path, first, spacing, length, kMostStampsPerSegment, NotedRun()).stamps;
     ASSERT_LE(taken, room) << first << " " << spacing << " " << length;
     beyondTheQuotient += static_cast<float>(taken) > (length - first) / spacing + 2.0f ? 1 : 0;
   }

@@ -155,8 +155,10 @@ class StampRun {
     // Width and alpha where the ramps are at each stamp; then what follows from them.
     Floats widths, alphas;
     mLook.width = runUp(mLook.width, mLook.widthStep, count, widths);
-    mLook.alpha = runUp(mLook.alpha, mLook.alphaStep, count, alphas);
-    mLastAlpha = alphas[last];
+    if constexpr (!kProfile.isOutline) {
+      mLook.alpha = runUp(mLook.alpha, mLook.alphaStep, count, alphas);
+      mLastAlpha = alphas[last];
+    }
     Floats sizes, reaches;
     for (std::size_t i = 0; i <= last; ++i) {
       sizes[i] = kProfile.stampSize(widths[i]);
