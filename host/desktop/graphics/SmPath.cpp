@@ -151,12 +151,12 @@ class Parabola {
   double length(const Joint& from, const Joint& to) const {
     const double time = to.t - from.t;
     if (mA == 0.0) return time * mAcross;
-    // Mirrored, if need be, so that most of the way leads away from the vertex.
-    const bool mirrored = from.along + to.along < 0.0;
-    const double q0 = mirrored ? -to.along : from.along;
-    const double q1 = mirrored ? -from.along : to.along;
-    const double v0 = mirrored ? to.speed : from.speed;
-    const double v1 = mirrored ? from.speed : to.speed;
+    // Mirrored, if need be, so that most of the way leads away from the vertex. Chosen without a branch: a
+    // stroke that bends evenly has the vertex in the middle, and chance decides.
+    const auto mirrored = both(from.along + to.along) < Two{};
+    const Two q = mirrored ? Two{-to.along, -from.along} : Two{from.along, to.along};
+    const Two v = mirrored ? Two{to.speed, from.speed} : Two{from.speed, to.speed};
+    const double q0 = q[0], q1 = q[1], v0 = v[0], v1 = v[1];
     if (mIsStraight) {
       return q0 < 0.0 ? (q0 * q0 + q1 * q1) / (4.0 * mA) : 0.5 * time * (v0 + v1);
     }
