@@ -63,7 +63,7 @@ class SegmentPlacer {
   // (StampLimits.h).
   void placeOne(const SegmentLook& look, RectF* rect) {
     Appender appender(*mRenderDrawable, 1);
-    StampRun<Version> run(appender, look, mStamps);
+    StampRun<Version> run(appender, look, mStamps, mPlaces);
     *run.places() = {mPath.last().x, mPath.last().y};
     run.place(1);
     finish(run, rect);
@@ -83,7 +83,7 @@ class SegmentPlacer {
     const int most = mLimits.left();
     const std::int32_t before = mStamps.count();
     Appender appender(*mRenderDrawable, std::min(expected, most));
-    StampRun<Version> run(appender, look, mStamps);
+    StampRun<Version> run(appender, look, mStamps, mPlaces);
     const WalkResult walked = walk(run, most);
     finish(run, rect);
     mLimits.note(walked, Version::name, length);
@@ -101,6 +101,7 @@ class SegmentPlacer {
   SegmentPath mPath;
   StampCounter mStamps;
   StampLimits mLimits;
+  Places mPlaces;
   float mCarried = 0.0f;
   Vector2<float> mLastStamp;
   float mLastAlpha = 0.0f;

@@ -115,8 +115,9 @@ struct SegmentLook {
   }
 };
 
-// So many floats, one for each stamp that is handed over at once.
+// So many floats and places, one for each stamp that is handed over at once.
 using Floats = std::array<float, kStampsAtOnce>;
+using Places = std::array<SmPoint, kStampsAtOnce>;
 
 // Writes `count` floats that grow by `step`, rounded each time, and returns the next one. Four at a time, as
 // whoever reads them does: a load that spans several stores waits until all of them have left the processor.
@@ -141,9 +142,10 @@ class StampRun {
  public:
   using Appender = typename Version::RenderDrawable::Appender;
 
-  // `counter`: where the stroke's count stands before the segment.
-  StampRun(Appender& appender, const SegmentLook& look, StampCounter counter)
-      : mAppender(appender), mLook(look), mCounter(counter) {}
+  // `counter`: where the stroke's count stands before the segment. `places`: room for the places, whatever it
+  // holds; room of the run's own would be set to zero for each segment.
+  StampRun(Appender& appender, const SegmentLook& look, StampCounter counter, Places& places)
+      : mAppender(appender), mLook(look), mCounter(counter), mPlaces(places) {}
 
   // Where to write the places of the next stamps, at most kStampsAtOnce.
   SmPoint* places() { return mPlaces.data(); }
@@ -199,8 +201,8 @@ class StampRun {
   Appender& mAppender;
   SegmentLook mLook;
   StampCounter mCounter;
+  Places& mPlaces;
   DirtyBox mBox;
-  std::array<SmPoint, kStampsAtOnce> mPlaces;
   Vector2<float> mLastStamp;
   float mLastAlpha = 0.0f;
   float mPassedOver = -1.0f;  // where the last stamp left out would lie; below 0 when none was left out
