@@ -17,7 +17,8 @@ if(QELT_SANITIZE)
   endif()
   add_link_options(-fsanitize=${QELT_SANITIZE})
 elseif(NOT EMSCRIPTEN)
-  # Calls from one library to another without a stop in between: a stamp's place is one.
+  # A call from one library to another jumps to the address itself, not by way of a stub: the pen makes one for each
+  # stamp's place.
   add_compile_options(-fno-plt)
   add_link_options(LINKER:--no-undefined)
 endif()

@@ -225,10 +225,10 @@ class StampAppender {
   std::size_t endAfter(int stamps) const {
     return mUsed + static_cast<std::size_t>(stamps) * kFloats + kPastLast;
   }
-  // In steps of less than 2 KiB: std::vector fills what is new with zeros, and more than that the C library
-  // of a desktop fills with an instruction that is slow to start.
+  // In steps of less than 2 KiB: std::vector fills what is new with zeros, and for more than that glibc uses
+  // an instruction that is slow to start.
   void grow(int stamps) {
-    constexpr std::size_t kStep = 480;
+    constexpr std::size_t kStep = 480;  // floats
     const std::size_t end = endAfter(stamps);
     reserveFloats(*mBatch, end);
     while (mBatch->size() < end) mBatch->resize(std::min(mBatch->size() + kStep, end));

@@ -151,8 +151,9 @@ class Parabola {
   double length(const Joint& from, const Joint& to) const {
     const double time = to.t - from.t;
     if (mA == 0.0) return time * mAcross;
-    // Mirrored, if need be, so that most of the way leads away from the vertex. Chosen without a branch: a
-    // stroke that bends evenly has the vertex in the middle, and chance decides.
+    // Mirrored, if need be, so that most of the way leads away from the vertex. Chosen without a branch:
+    // where a stroke bends evenly the vertex is in the middle, and which half is longer is a matter of
+    // chance.
     const auto mirrored = both(from.along + to.along) < Two{};
     const Two q = mirrored ? Two{-to.along, -from.along} : Two{from.along, to.along};
     const Two v = mirrored ? Two{to.speed, from.speed} : Two{from.speed, to.speed};

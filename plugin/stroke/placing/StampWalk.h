@@ -43,8 +43,7 @@ inline int spacedStamps(float first, float spacing, float length) {
 // run.places() says, and calls run.place(count); see StampRun.
 
 // The places at `count` distances, at most kStampsAtOnce; returns how many there are. Where the path has no
-// place, none is written. Out of line, where all that it needs stays in
-// registers.
+// place, none is written. Out of line, where all that it needs stays in registers.
 [[gnu::noinline]] inline int findPlaces(const SmPath& path, const float* distances, int count,
                                         SmPoint* places) {
   SmPoint* next = places;
@@ -63,7 +62,7 @@ struct Spaced {
 };
 
 // Writes distances `spacing` apart, from `first` on, up to `length`; at least one and at most `room`. Ends
-// before the first that does not lie beyond the one before it. Out of line too.
+// before the first that does not lie beyond the one before it. Out of line, like findPlaces.
 [[gnu::noinline]] inline Spaced spaceOut(float first, float spacing, float length, int room,
                                          float* distances) {
   float* end = distances;
