@@ -226,7 +226,7 @@ class StampAppender {
     return mUsed + static_cast<std::size_t>(stamps) * kFloats + kPastLast;
   }
   // In steps of less than 2 KiB: std::vector fills what is new with zeros, and for more than that glibc uses
-  // an instruction that is slow to start.
+  // a string instruction, which takes half again as long.
   void grow(int stamps) {
     constexpr std::size_t kStep = 480;  // floats
     const std::size_t end = endAfter(stamps);

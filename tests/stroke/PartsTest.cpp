@@ -210,8 +210,7 @@ TEST(RoomForStamps, IsMadeForTheWayFromPointToPoint) {
   EXPECT_EQ(spacedStamps(0.0f, 1.0f, INFINITY), kMostStampsPerSegment);
 }
 
-// What a walk places is written without another look at the room, so the room has to do wherever a walk's
-// rounding leads.
+// A batch that is allocated once an event needs room that does wherever a walk's rounding leads.
 TEST(RoomForStamps, IsNeverLessThanAWalkTakes) {
   // Only how many stamps there are is looked at, not where they lie.
   SmPath path;
